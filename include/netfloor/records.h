@@ -1,0 +1,185 @@
+/* SPDX-License-Identifier: MIT */
+/*
+ * The records that a host and the plug-in share.
+ *
+ * Every record belongs to the host: the host allocates it, sets it up and frees it. The plug-in
+ * reads and writes the fields named here, and lets four arrays grow through hs_Realloc (see
+ * host.h): both stacks, the layer frames and the bit ranges. It frees nothing.
+ *
+ * Bits are numbered from 1 at the first octet of the packet and, within an octet, from the least
+ * significant bit up: bit n lies in octet (n - 1) / 8 and has there the value 1 << ((n - 1) % 8).
+ * So the most significant four bits of the first octet are the bits 5 to 8. Lengths are in bits
+ * where a name says "bits" and in octets where it says "octets".
+ *
+ * The header compiles alone as C11 and as C++20. With 32-bit pointers each record has the size
+ * asserted at the end of this page; with 64-bit pointers it widens with its pointers.
+ */
+#ifndef NETFLOOR_RECORDS_H
+#define NETFLOOR_RECORDS_H
+
+#include <stdint.h>
+
+#ifdef __cplusplus
+extern "C" {
+#endif
+
+/* One piece of a field: what was read and from where. */
+typedef struct BitRange {
+    uint32_t value;        /* the number read; a later octet is the more significant */
+    uint32_t firstBit;     /* number of the first bit read */
+    uint32_t lastBit;      /* number of the last bit read */
+    uint32_t flagWord;     /* 0, or left as it was by fields read octet by octet */
+    uint32_t untouched[2]; /* the host's own */
+} BitRange;
+
+/* The field read last. It is complete whenever the plug-in calls the host, and on return. */
+typedef struct FieldRecord {
+    uint32_t fieldId;          /* id of the field, as in the field table */
+    char *fieldName;           /* buffer of at least 255 octets: name of the field, zero-terminated */
+    uint32_t value;            /* value of the field, scaled where the field's text says so */
+    char *valueText;           /* buffer of at least 255 octets: emptied at each field */
+    uint32_t rangeCount;       /* elements of `ranges` that were filled */
+    uint32_t outputRangeCount; /* elements of `ranges` that count for the output */
+    BitRange *ranges;          /* the pieces of the field, in the order in which they were read */
+    uint32_t rangeCapacity;    /* elements that `ranges` has room for; 200 at set-up */
+    uint32_t wideStart;        /* address read as groups: 0 */
+    uint32_t wideBits;         /* address read as groups: bits read */
+    uint32_t untouched1[2];    /* the host's own */
+    uint32_t rawFlag;          /* 0 after every field */
+    uint32_t untouched2[2];    /* the host's own */
+} FieldRecord;
+
+/* A stack of bit numbers. The host gives it with one element, at `base`. */
+typedef struct BitStack {
+    uint32_t *base;    /* the bottom element */
+    uint32_t *top;     /* the current element */
+    uint32_t count;    /* elements above the bottom one at the last push */
+    uint32_t capacity; /* elements that there is room for, at least 1 */
+} BitStack;
+
+/* One layer of the packet, as the plug-ins hand it from one to the next. */
+typedef struct LayerFrame {
+    uint32_t firstBit;          /* bit number at which the layer starts */
+    uint32_t cleared1[10];      /* 0 when the layer is opened; the host's own afterwards */
+    uint32_t nextLayerKey;      /* key under which the owner of the next layer is looked up */
+    uint32_t nextLayerProtocol; /* IP protocol number that goes with the key, or 0 */
+    uint32_t cleared2;          /* 0 when the layer is opened; the host's own afterwards */
+} LayerFrame;
+
+/* One layer in the host's list of decoded layers (MD and TO passes). */
+typedef struct LayerInfoRecord {
+    uint32_t firstBit;    /* number of the layer's first bit */
+    uint32_t lastBit;     /* number of its last bit; firstBit - 1 for a layer without bits */
+    uint32_t decoderId;   /* the host's word for the plug-in that decoded it */
+    uint32_t layerNumber; /* number of the layer */
+} LayerInfoRecord;
+
+/* Bits of `flags` in DecodeState. Any of them makes the MV pass set its verdict. */
+enum {
+    NETFLOOR_FLAG_EXPECTATION = 0x2,           /* a fixed value, a bound or a count was not met */
+    NETFLOOR_FLAG_LIMIT_TOO_LONG = 0x8,        /* a length reaches behind the bits left (MV) */
+    NETFLOOR_FLAG_BITS_LEFT_OVER = 0x10,       /* bits that no field covers inside a length (MV) */
+    NETFLOOR_FLAG_NO_LAYER_FRAMES = 0x10000000, /* `layerFrames` could not grow */
+    NETFLOOR_FLAG_NO_STACK = 0x20000000,        /* `blockStarts` or `limits` could not grow */
+    NETFLOOR_FLAG_NO_RANGES = 0x40000000        /* `ranges` could not grow */
+};
+
+/* Named indices of `scratch` in DecodeState. */
+enum {
+    NETFLOOR_NEXT_LAYER_OCTETS = 1, /* octets of payload behind the transport header */
+    NETFLOOR_PRECEDING_OCTETS = 3,  /* octets of the IPv4 datagram in front of that payload */
+    NETFLOOR_NEXT_LAYER_PORT = 4    /* port by which the next layer was chosen */
+};
+
+/*
+ * The working record of one packet. It lives as long as the packet's decoding and passes from
+ * layer to layer and from plug-in to plug-in.
+ *
+ * Before the first entry of a packet the host gives: `data` with a copy of the packet,
+ * `sourceData`, `totalBits`; `bitsLeft` = `totalBits`, `cursor` = 1; `flags`, `condition`,
+ * `advance` and `scratch` 0; `blockName` empty; both stacks with their bottom element (1 in
+ * `blockStarts`, `totalBits` in `limits`), `top` = `base`; the field record with both text buffers
+ * and 200 ranges; `layerHandedOff` = 1, `layerIndex` = 0, room for one frame or more.
+ */
+typedef struct DecodeState {
+    uint8_t *data;             /* working copy of the packet: (totalBits + 7) / 8 octets that the
+                                  plug-in may change and restores from `sourceData` */
+    const uint8_t *sourceData; /* the packet as the host holds it; only read */
+    uint32_t totalBits;        /* length of the packet in bits */
+    uint32_t cursor;           /* number of the next bit to be read */
+    uint32_t reserved1;        /* never touched */
+    uint32_t bitsLeft;         /* bits that the current limit allows from `cursor` on */
+    uint32_t flags;            /* NETFLOOR_FLAG_... */
+    BitStack blockStarts;      /* for each open block the bit number at which it began */
+    BitStack limits;           /* for each open limit its last bit */
+    uint8_t condition;         /* the last condition of the grammar, 0 or 1; a word of its own */
+    int32_t advance;           /* bits of the current step */
+    uint32_t reserved2;        /* never used */
+    char *blockName;           /* buffer of at least 64 octets: name of the current block */
+    uint32_t scratch[32];      /* NETFLOOR_NEXT_LAYER_OCTETS and its like; the rest is the host's */
+    FieldRecord fieldRecord;   /* the field read last */
+    LayerFrame *layerFrames;   /* the layers of the packet */
+    uint32_t layerHandedOff;   /* 0 while a layer decodes, 1 once it has handed on */
+    uint32_t layerIndex;       /* index of the current element of `layerFrames` */
+    uint32_t layerCapacity;    /* elements that `layerFrames` has room for, at least 1 */
+} DecodeState;
+
+/* One run of the MD, TO or MV pass. */
+typedef struct PreDecodeContext {
+    uint32_t bitsLeft;           /* out: bits that were not decoded, at the end or at a hand-off */
+    uint8_t layerNumber;         /* in, out: number of the layer; each hand-off adds 1 */
+    uint32_t decoderId;          /* in, out: the host's word for the decoding plug-in */
+    int32_t verdict;             /* out: -52 from the MV pass when a flag is set; else untouched */
+    uint8_t *fieldRecords;       /* in: records of 1000 octets each, written by the MD pass */
+    uint32_t fieldRecordCount;   /* in: index of the record now being written; the host's to move */
+    LayerInfoRecord *layerInfo;  /* in: the list of layers (MD, TO) */
+    uint32_t layerInfoCount;     /* in, out: index of the open record of `layerInfo` */
+    uint32_t layerInfoCapacity;  /* in: highest index for which `layerInfo` has room */
+    DecodeState *decodeState;    /* in: the packet */
+} PreDecodeContext;
+
+/* One run of the XTR pass. */
+typedef struct XtrContext {
+    uint32_t bitsLeft;        /* out: bits that were not decoded, at the end or at a hand-off */
+    uint8_t *keyRecord;       /* in: this packet's record, filled by the offsets of the key table */
+    uint16_t byteAreaOffset;  /* in, out: octets from `keyRecord` to the next free place for a value
+                                 stored as octets */
+    uint16_t byteAreaSize;    /* in: room in octets for one such value; an address needs 17 */
+    DecodeState *decodeState; /* in: the packet */
+} XtrContext;
+
+/*
+ * One row of the key-field table. The first three words are the host's to fill in
+ * hx_InitialiseOptXTR; the plug-in stores a field's value without asking whether it is wanted.
+ */
+typedef struct KeyFieldRow {
+    uint32_t presenceOffset;  /* octets from the key record to the octet that marks the row present */
+    uint32_t valueOffset;     /* octets from the key record to the row's value */
+    uint32_t presenceMask;    /* its low octet is or-ed into the presence octet */
+    const char *protocolName; /* "netfloor" */
+    const char *fieldName;    /* name of the field; of several rows of one name the last is filled */
+    uint32_t zero[3];         /* 0, not used */
+} KeyFieldRow;
+
+#if UINTPTR_MAX == 0xffffffffu
+#ifdef __cplusplus
+#define NETFLOOR_RECORD_SIZE(record, octets) static_assert(sizeof(record) == (octets), "a 32-bit host expects " #octets)
+#else
+#define NETFLOOR_RECORD_SIZE(record, octets) _Static_assert(sizeof(record) == (octets), "a 32-bit host expects " #octets)
+#endif
+NETFLOOR_RECORD_SIZE(BitRange, 24);
+NETFLOOR_RECORD_SIZE(FieldRecord, 60);
+NETFLOOR_RECORD_SIZE(BitStack, 16);
+NETFLOOR_RECORD_SIZE(LayerFrame, 56);
+NETFLOOR_RECORD_SIZE(LayerInfoRecord, 16);
+NETFLOOR_RECORD_SIZE(DecodeState, 280);
+NETFLOOR_RECORD_SIZE(PreDecodeContext, 40);
+NETFLOOR_RECORD_SIZE(XtrContext, 16);
+NETFLOOR_RECORD_SIZE(KeyFieldRow, 32);
+#endif
+
+#ifdef __cplusplus
+}
+#endif
+
+#endif

@@ -1,0 +1,11 @@
+// SPDX-License-Identifier: MIT
+// The entry of the TO pass.
+#include "frame/entry.h"
+#include "frame/export.h"
+#include "frame/outputs.h"
+#include "grammar.h"
+
+extern "C" NETFLOOR_EXPORT std::uint8_t NETFLOOR_CDECL vex_PreDecodeTO(PreDecodeContext* context) {
+    using namespace netfloor;
+    return runPass<ToPass<Grammar>, Grammar>(*context) == Outcome::cutOff ? 0 : 1;
+}

@@ -1,0 +1,54 @@
+// SPDX-License-Identifier: MIT
+// A stretch of grammar in which the bits of each octet are read in reverse order.
+#pragma once
+
+#include <algorithm>
+#include <cstdint>
+#include <cstring>
+
+#include "frame/reader.h"
+
+namespace netfloor {
+
+// Reverses the working copy from the cursor on as long as it lives, and restores it then. In the form that
+// tells the host, fields are reported with a bit order of 8.
+template <class Pass> class [[nodiscard]] ReversedBits {
+public:
+    enum class Report : bool { plain, toldToHost };
+
+    ReversedBits(Reader<Pass>& reader, Report report) : at_(reader), outerOrder_(reader.bitOrder) {
+        if (at_.over()) {
+            return;
+        }
+        if (report == Report::toldToHost) {
+            at_.bitOrder = bitsPerOctet;
+        }
+        at_.writeLastRead();
+        reverseOctets(at_.data, at_.cursor, at_.state->totalBits);
+    }
+
+    // Behind the stretch the cursor stands on a whole octet, counted from the start of the innermost block.
+    ~ReversedBits() {
+        if (at_.over()) {
+            return;
+        }
+        at_.writeLastRead();
+        std::memcpy(at_.data, at_.state->sourceData, at_.state->totalBits / bitsPerOctet);
+        const std::uint32_t blockStart = at_.state->blockStarts.base[at_.blockDepth];
+        if (const std::uint32_t odd = (at_.cursor - blockStart) % bitsPerOctet; odd != 0) {
+            const std::uint32_t rest = std::min(bitsPerOctet - odd, at_.left);
+            at_.cursor += rest;
+            at_.left -= rest;
+        }
+        at_.bitOrder = outerOrder_;
+    }
+
+    ReversedBits(const ReversedBits&) = delete;
+    ReversedBits& operator=(const ReversedBits&) = delete;
+
+private:
+    Reader<Pass>& at_;
+    std::uint32_t outerOrder_;
+};
+
+} // namespace netfloor

@@ -1,0 +1,96 @@
+// SPDX-License-Identifier: MIT
+// The bit reader: the one place where octets of the packet are read.
+//
+// Bits are numbered from 1, and within an octet from the least significant bit up. A number that
+// reaches over several octets takes the later octet as the more significant, which is not network
+// order: byte order is made field by field, from pieces.
+#pragma once
+
+#include <array>
+#include <cstdint>
+
+namespace netfloor {
+
+inline constexpr std::uint32_t bitsPerOctet = 8;
+
+// Reads the bits `first` to `last`, at most 32, where first is not above last.
+[[nodiscard]] constexpr std::uint32_t bitsAscending(const std::uint8_t* data, std::uint32_t first, std::uint32_t last) {
+    const std::uint32_t low = first - 1;
+    const std::uint32_t high = last - 1;
+    std::uint64_t gathered = 0;
+    for (std::uint32_t octet = high / bitsPerOctet + 1; octet-- > low / bitsPerOctet;) {
+        gathered = gathered << bitsPerOctet | data[octet];
+    }
+    const std::uint64_t mask = (std::uint64_t{1} << (high - low + 1)) - 1;
+    return static_cast<std::uint32_t>(gathered >> (low % bitsPerOctet) & mask);
+}
+
+// The low `width` bits of `value`, in reverse order.
+[[nodiscard]] constexpr std::uint32_t reversed(std::uint32_t value, std::uint32_t width) {
+    std::uint32_t result = 0;
+    for (std::uint32_t bit = 0; bit < width; ++bit) {
+        result = result << 1 | (value >> bit & 1);
+    }
+    return result;
+}
+
+// Reads the bits between `first` and `last`; where first is above last, in reverse order.
+[[nodiscard]] constexpr std::uint32_t bits(const std::uint8_t* data, std::uint32_t first, std::uint32_t last) {
+    if (static_cast<std::int32_t>(first) <= static_cast<std::int32_t>(last)) {
+        return bitsAscending(data, first, last);
+    }
+    return reversed(bitsAscending(data, last, first), first - last + 1);
+}
+
+// True where a bit number is the first of an octet.
+[[nodiscard]] constexpr bool onOctetBorder(std::uint32_t bit) {
+    return (bit - 1) % bitsPerOctet == 0;
+}
+
+// Reads the 8 bits from bit number `first` on, wherever they lie.
+[[nodiscard]] constexpr std::uint32_t octetAt(const std::uint8_t* data, std::uint32_t first) {
+    if (onOctetBorder(first)) [[likely]] {
+        return data[(first - 1) / bitsPerOctet];
+    }
+    return bitsAscending(data, first, first + bitsPerOctet - 1);
+}
+
+// Reads `count` octets from bit number `first` on in network order; of more than four the last four stay.
+[[nodiscard]] constexpr std::uint32_t octetsAt(const std::uint8_t* data, std::uint32_t first, std::uint32_t count) {
+    std::uint32_t value = 0;
+    for (std::uint32_t octet = 0; octet < count; ++octet) {
+        value = value << bitsPerOctet | octetAt(data, first + octet * bitsPerOctet);
+    }
+    return value;
+}
+
+inline constexpr auto reversedOctets = [] {
+    std::array<std::uint8_t, 256> table{};
+    for (std::uint32_t value = 0; value < table.size(); ++value) {
+        table[value] = static_cast<std::uint8_t>(reversed(value, bitsPerOctet));
+    }
+    return table;
+}();
+
+// Reverses the bits of each octet of `data` from bit number `from` on, up to the last whole octet of a
+// packet of `totalBits`. Off an octet border the octets are those counted from `from` on.
+constexpr void reverseOctets(std::uint8_t* data, std::uint32_t from, std::uint32_t totalBits) {
+    const std::uint32_t shift = (from - 1) % bitsPerOctet;
+    const std::uint32_t end = totalBits / bitsPerOctet;
+    std::uint32_t octet = (from - 1) / bitsPerOctet;
+    if (shift == 0) {
+        for (; octet < end; ++octet) {
+            data[octet] = reversedOctets[data[octet]];
+        }
+        return;
+    }
+    for (++octet; octet < end; ++octet) {
+        const auto pair = static_cast<std::uint32_t>(data[octet - 1] | data[octet] << bitsPerOctet);
+        const std::uint32_t window = reversedOctets[pair >> shift & 0xff];
+        const std::uint32_t mixed = (pair & ~(0xffu << shift)) | window << shift;
+        data[octet - 1] = static_cast<std::uint8_t>(mixed);
+        data[octet] = static_cast<std::uint8_t>(mixed >> bitsPerOctet);
+    }
+}
+
+} // namespace netfloor

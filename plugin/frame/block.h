@@ -1,0 +1,138 @@
+// SPDX-License-Identifier: MIT
+// Blocks: named stretches of the grammar. A block is open as long as its object lives.
+#pragma once
+
+#include <cstdint>
+#include <string_view>
+
+#include "frame/reader.h"
+
+namespace netfloor {
+
+// A block.
+template <class Pass> class [[nodiscard]] Block {
+public:
+    [[gnu::always_inline]] Block(Reader<Pass>& reader, std::string_view name) : at_(reader), outer_(reader.block) {
+        if (!at_.over()) {
+            at_.openBlock(name);
+        }
+    }
+
+    [[gnu::always_inline]] ~Block() {
+        if (!at_.over()) {
+            at_.closeBlock();
+            at_.block = outer_;
+        }
+    }
+
+    Block(const Block&) = delete;
+    Block& operator=(const Block&) = delete;
+
+private:
+    Reader<Pass>& at_;
+    std::string_view outer_;
+};
+
+// A block with a length of its own: it narrows the limit, has its own live flag, and skips at its end what
+// nothing has read. The live flag of the enclosing production comes back at the end, so that what is cut
+// short inside the block does not stop what stands around it.
+template <class Pass> class [[nodiscard]] LimitedBlock {
+public:
+    // Opens the block; `limit` must follow, once the length is known.
+    [[gnu::always_inline]] LimitedBlock(Reader<Pass>& reader, std::string_view name)
+        : at_(reader), outer_(reader.block), outerLive_(reader.live) {
+        if (!at_.over() && at_.openBlock(name)) {
+            at_.live = true;
+        }
+    }
+
+    // Opens the block with a length in bits.
+    [[gnu::always_inline]] LimitedBlock(Reader<Pass>& reader, std::string_view name, std::uint32_t bitCount)
+        : LimitedBlock(reader, name) {
+        limit(bitCount);
+    }
+
+    // Sets the limit. A length that reaches behind the bits left does not narrow anything: the block is read
+    // as far as bits last, and the enclosing production reads no further.
+    [[gnu::always_inline]] void limit(std::uint32_t bitCount) {
+        if (at_.over()) {
+            return;
+        }
+        at_.advance = static_cast<std::int32_t>(bitCount);
+        if (bitCount > at_.left) {
+            outerLive_ = false;
+            at_.mark(Mark::limitTooLong);
+        } else {
+            at_.left = bitCount;
+        }
+        at_.pushLimit();
+    }
+
+    [[gnu::always_inline]] ~LimitedBlock() {
+        if (at_.over()) {
+            return;
+        }
+        at_.sweep();
+        at_.closeBlock();
+        at_.popLimit();
+        at_.block = outer_;
+        at_.live = outerLive_;
+    }
+
+    LimitedBlock(const LimitedBlock&) = delete;
+    LimitedBlock& operator=(const LimitedBlock&) = delete;
+
+private:
+    Reader<Pass>& at_;
+    std::string_view outer_;
+    bool outerLive_;
+};
+
+// The blocks of a chain, in which each link stands inside the one before: they stay open until the chain is
+// through. A chain is a loop, so that the native stack does not grow with the packet; closing all blocks at
+// its end leaves the same as if each link had been a call.
+template <class Pass> class [[nodiscard]] BlockChain {
+public:
+    [[gnu::always_inline]] explicit BlockChain(Reader<Pass>& reader) : at_(reader), outer_(reader.block) {}
+
+    // Opens the next block, inside the others.
+    [[gnu::always_inline]] void open(std::string_view name) {
+        if (!at_.over() && at_.openBlock(name)) {
+            ++blocks_;
+        }
+    }
+
+    [[gnu::always_inline]] ~BlockChain() {
+        for (; blocks_ > 0 && !at_.over(); --blocks_) {
+            at_.closeBlock();
+        }
+        at_.block = outer_;
+    }
+
+    BlockChain(const BlockChain&) = delete;
+    BlockChain& operator=(const BlockChain&) = delete;
+
+private:
+    Reader<Pass>& at_;
+    std::string_view outer_;
+    std::uint32_t blocks_ = 0;
+};
+
+// Runs a production out of line: the caller's reader is not touched by the call, and so can stay in
+// registers, and so can the production's own.
+template <auto production, class Pass> [[gnu::noinline]] void outOfLine(Reader<Pass>& reader) {
+    Reader<Pass> at = reader;
+    production(at);
+    reader = at;
+}
+
+template <auto production, class Pass> [[gnu::always_inline]] inline void apart(Reader<Pass>& at) {
+    if (!at.live) {
+        return;
+    }
+    Reader<Pass> copy = at;
+    outOfLine<production>(copy);
+    at = copy;
+}
+
+} // namespace netfloor

@@ -1,0 +1,55 @@
+// SPDX-License-Identifier: MIT
+// Head and tail of a pass entry.
+#pragma once
+
+#include <cstdint>
+#include <optional>
+
+#include "frame/reader.h"
+#include "netfloor/host.h"
+
+namespace netfloor {
+
+// Makes room for one layer frame more and opens it. The first layer of a packet has the frame 0; a plug-in that
+// starts anywhere else takes the next one.
+[[nodiscard]] inline bool openLayerFrame(DecodeState& state) {
+    const std::uint32_t wanted = state.layerIndex + 1;
+    while (wanted >= state.layerCapacity) {
+        const std::uint32_t capacity = state.layerCapacity * 2;
+        void* const grown = capacity == 0 ? nullptr : hs_Realloc(state.layerFrames, capacity * sizeof *state.layerFrames);
+        if (grown == nullptr) {
+            state.flags |= NETFLOOR_FLAG_NO_LAYER_FRAMES;
+            return false;
+        }
+        state.layerFrames = static_cast<LayerFrame*>(grown);
+        state.layerCapacity = capacity;
+    }
+    if (state.cursor != 1) {
+        ++state.layerIndex;
+    }
+    state.layerHandedOff = 0;
+    state.layerFrames[state.layerIndex] = {.firstBit = state.cursor, .cleared1 = {}, .nextLayerKey = 0, .nextLayerProtocol = 0, .cleared2 = 0};
+    return true;
+}
+
+// Runs one pass over one layer. Nothing when the pass is refused before it starts.
+template <class Pass, class Grammar> [[gnu::always_inline]] inline std::optional<Outcome> runPass(typename Pass::Context& context) {
+    DecodeState& state = *context.decodeState;
+    Pass::variables = {};
+    if (!Pass::enter(context)) {
+        return std::nullopt;
+    }
+    if (!openLayerFrame(state)) {
+        return Outcome::cutOff;
+    }
+    Reader<Pass> at(context);
+    Grammar::template packet<Pass>(at);
+    if (!at.over()) {
+        at.giveState();
+        Pass::leave(context);
+        context.bitsLeft = at.left;
+    }
+    return at.outcome;
+}
+
+} // namespace netfloor

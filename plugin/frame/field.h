@@ -1,0 +1,77 @@
+// SPDX-License-Identifier: MIT
+// The declaration of a field. A field is said once, in the file of its protocol; everything else about it,
+// here and in the tables, is worked out from the declaration at compile time.
+#pragma once
+
+#include <algorithm>
+#include <cstdint>
+#include <string_view>
+
+#include "frame/format.h"
+#include "frame/place.h"
+#include "frame/value_names.h"
+
+namespace netfloor {
+
+inline constexpr const ValueNames* noNames = nullptr;
+
+struct Field {
+    std::uint32_t id;
+    std::string_view name; // as it is handed to the host, blanks included
+    Place place;
+    std::string_view line;             // the display line, with its conversions
+    const ValueNames* names = noNames; // what %-S and %-s take
+    std::string_view shortText = {};   // the text of the TO pass, where it is not the value part of the line
+
+    // The text of the TO pass.
+    [[nodiscard]] constexpr std::string_view display() const {
+        return shortText.data() == nullptr ? valuePart(line) : shortText;
+    }
+
+    // The name as the tables hold it: without its leading blanks.
+    [[nodiscard]] constexpr std::string_view tableName() const {
+        return name.substr(std::min(name.find_first_not_of(' '), name.size()));
+    }
+};
+
+// True where the format can be filled from the field.
+[[nodiscard]] constexpr bool formatFits(const Field& field, const Format& format) {
+    const bool named = format.has(Conversion::name) || format.has(Conversion::briefName);
+    const bool manyElements = field.place.isRun() || field.place.count > 1;
+    return format.wellFormed && (!named || field.names != nullptr) &&
+           (!format.has(Conversion::briefName) || field.names->hasBriefs) &&
+           (!format.has(Conversion::list) || (manyElements && format.element != Conversion::none));
+}
+
+// True where the names stand in ascending order, so that a value has one name at most.
+[[nodiscard]] constexpr bool namesAscend(const ValueNames& names) {
+    for (std::size_t row = 0; row < names.rows.size(); ++row) {
+        if (names.rows[row].from > names.rows[row].to || (row > 0 && names.rows[row - 1].to >= names.rows[row].from)) {
+            return false;
+        }
+    }
+    return !names.rows.empty();
+}
+
+// True where a declaration does not contradict itself: each read of a field asserts it.
+[[nodiscard]] constexpr bool consistent(const Field& field) {
+    const Place& place = field.place;
+    if (place.isPieces()) {
+        for (std::uint32_t i = 0; i < place.count; ++i) {
+            if (place.pieces[i].low > place.pieces[i].high) {
+                return false;
+            }
+        }
+        if (place.count < 1 || place.width() > 32) {
+            return false;
+        }
+    }
+    const Format line = parseFormat(field.line);
+    const bool wantsNames = line.has(Conversion::name);
+    return formatFits(field, line) && formatFits(field, parseFormat(field.display())) &&
+           wantsNames == (field.names != nullptr) && (field.names == nullptr || namesAscend(*field.names)) &&
+           (place.scale == 1 || !place.isRun()) && (place.mostUnits == 0 || place.isRun()) &&
+           (place.shape != Shape::ahead || place.advance == 0);
+}
+
+} // namespace netfloor

@@ -1,0 +1,301 @@
+// SPDX-License-Identifier: MIT
+// The reader: what every production works on.
+//
+// A production is a function template over the pass. It gets a Reader and says what the wire says: opens
+// blocks, reads fields, looks ahead, narrows the limit. It never asks which pass it runs in.
+//
+// Two questions are kept apart. `live` says whether the grammar can still read: a field that does not fit
+// clears it, later fields are skipped, and blocks close in the normal way. `outcome` says whether the run
+// itself goes on. Once it is over, nothing has an effect any more, neither fields nor the closing of blocks,
+// so that productions need no test for it: they run out.
+//
+// A Reader is a value. The hot road is inlined and keeps it in registers; `apart` runs a production out of
+// line on a copy.
+#pragma once
+
+#include <cstdint>
+#include <cstring>
+#include <string_view>
+#include <type_traits>
+
+#include "frame/field.h"
+#include "frame/record.h"
+#include "netfloor/host.h"
+#include "netfloor/records.h"
+
+namespace netfloor {
+
+// What a production may find wrong. The pass decides whether it raises the mark.
+enum class Mark : std::uint8_t {
+    expectation,  // a fixed value was not met: all passes
+    count,        // a list ended with another count than it should have: MV pass
+    limitTooLong, // a length reaches behind the bits left: MV pass
+    bitsLeftOver, // bits that no field covers inside a length: MV pass
+};
+
+// Whether the run goes on.
+enum class Outcome : std::uint8_t {
+    on,
+    stopped, // at a hand-off, from which the host goes on by itself
+    cutOff,  // storage ran out, or the host refused
+};
+
+// Writes a field that was read at `cursor` into the field record.
+using RecordWriter = void (*)(FieldRecord& record, const std::uint8_t* data, std::uint32_t cursor, std::uint32_t units);
+
+template <const Field& field>
+void writeRecord(FieldRecord& record, const std::uint8_t* data, std::uint32_t cursor, std::uint32_t units) {
+    beginRecord<field>(record);
+    writeElements<field>(record, data, cursor, units);
+    record.fieldId = field.id;
+}
+
+// The passes that report nothing write the field record only where the host can look at it. Till then they
+// keep what was read last.
+struct LastRead {
+    RecordWriter writer = nullptr; // of the last field; null: the record is up to date
+    std::uint32_t cursor = 0;      // where that field lies
+    std::uint32_t units = 0;
+    std::uint32_t seenFirst = 0; // first bit of a look ahead behind that field; 0: there was none
+    std::uint32_t seenPieces = 0;
+    std::uint32_t seenWidth = 0;
+};
+
+template <class Pass> class Reader {
+public:
+    using Context = typename Pass::Context;
+
+    Context* context;
+    DecodeState* state;
+    std::uint8_t* data;
+    std::uint32_t cursor;
+    std::uint32_t left;
+    std::int32_t advance;
+    std::uint32_t rangeCapacity;
+    std::uint32_t blockDepth;
+    std::uint32_t limitDepth;
+    bool condition;
+    bool live = true;
+    Outcome outcome = Outcome::on;
+    bool unchecked = false; // a flag was set that the verdict has not taken in yet
+    std::uint32_t bitOrder = 0;
+    std::string_view block = {}; // name of the innermost open block
+    std::string_view shown = {}; // the name that `blockName` holds, or is to hold
+    LastRead last = {};
+
+    explicit Reader(Context& passContext) : context(&passContext), state(passContext.decodeState) {
+        takeState();
+    }
+
+    static typename Pass::Variables& variables() {
+        return Pass::variables;
+    }
+
+    // Raises a mark, if the pass does.
+    [[gnu::always_inline]] void mark(Mark found) {
+        if (over() || !Pass::raises(found)) {
+            return;
+        }
+        state->flags |= found == Mark::limitTooLong   ? NETFLOOR_FLAG_LIMIT_TOO_LONG
+                        : found == Mark::bitsLeftOver ? NETFLOOR_FLAG_BITS_LEFT_OVER
+                                                      : NETFLOOR_FLAG_EXPECTATION;
+        unchecked = true;
+    }
+
+    // The verdict check: a flag that is set becomes the verdict, in the pass that gives one.
+    [[gnu::always_inline]] void check() {
+        if (unchecked) {
+            Pass::giveVerdict(*context);
+            unchecked = false;
+        }
+    }
+
+    [[nodiscard, gnu::always_inline]] bool over() const {
+        return outcome != Outcome::on;
+    }
+
+    // Ends the run: nothing has an effect from here on.
+    [[gnu::always_inline]] void end(Outcome how) {
+        live = false;
+        outcome = how;
+    }
+
+    // Ends the run for want of storage.
+    void cutOff(std::uint32_t flag) {
+        state->flags |= flag;
+        end(Outcome::cutOff);
+    }
+
+    // Takes over what the state says: at the entry, and behind a hand-off.
+    void takeState() {
+        data = state->data;
+        cursor = state->cursor;
+        left = state->bitsLeft;
+        advance = state->advance;
+        condition = state->condition != 0;
+        rangeCapacity = state->fieldRecord.rangeCapacity;
+        blockDepth = static_cast<std::uint32_t>(state->blockStarts.top - state->blockStarts.base);
+        limitDepth = static_cast<std::uint32_t>(state->limits.top - state->limits.base);
+        shown = {};
+        last = {};
+        unchecked = state->flags != 0;
+    }
+
+    // Gives the state all that the reader holds: wherever the host can look.
+    [[gnu::always_inline]] void giveState() {
+        writeLastRead();
+        if (!Pass::reports && shown.data() != nullptr) {
+            std::memcpy(state->blockName, shown.data(), shown.size());
+            state->blockName[shown.size()] = '\0';
+        }
+        state->blockStarts.top = state->blockStarts.base + blockDepth;
+        state->limits.top = state->limits.base + limitDepth;
+        givePosition();
+    }
+
+    [[gnu::always_inline]] void givePosition() {
+        state->cursor = cursor;
+        state->bitsLeft = left;
+        state->advance = advance;
+        state->condition = condition;
+    }
+
+    // Brings the field record up to date: before the packet's working copy or the record changes.
+    [[gnu::always_inline]] void writeLastRead() {
+        FieldRecord& record = state->fieldRecord;
+        if (last.writer != nullptr) {
+            last.writer(record, data, last.cursor, last.units);
+        }
+        if (last.seenFirst != 0) {
+            writeSeen(last.seenFirst, last.seenPieces, last.seenWidth);
+        }
+        last = {};
+    }
+
+    // What a look ahead leaves in the field record: value and elements, under the name of the field before.
+    [[gnu::always_inline]] std::uint32_t writeSeen(std::uint32_t first, std::uint32_t pieceCount, std::uint32_t width) {
+        FieldRecord& record = state->fieldRecord;
+        record.value = 0;
+        for (std::uint32_t i = 0; i < pieceCount; ++i) {
+            BitRange& range = record.ranges[i];
+            range.firstBit = first + i * width;
+            range.lastBit = range.firstBit + width - 1;
+            range.value = bits(data, range.firstBit, range.lastBit);
+            range.flagWord = 0;
+            record.value = record.value << width | range.value;
+        }
+        record.rangeCount = pieceCount;
+        return record.value;
+    }
+
+    // Names the innermost open block in `blockName`.
+    [[gnu::always_inline]] void showBlock() {
+        if (shown.data() == block.data() && shown.data() != nullptr) {
+            return;
+        }
+        shown = block;
+        if (Pass::reports) {
+            std::memcpy(state->blockName, block.data(), block.size());
+            state->blockName[block.size()] = '\0';
+        }
+    }
+
+    // Makes the reader's block the innermost one. False when the stack cannot grow.
+    [[gnu::always_inline]] bool openBlock(std::string_view name) {
+        block = name;
+        showBlock();
+        if (!push(state->blockStarts, blockDepth, cursor)) {
+            return false;
+        }
+        check();
+        return true;
+    }
+
+    [[gnu::always_inline]] void closeBlock() {
+        check();
+        --blockDepth;
+        if (Pass::reports) {
+            --state->blockStarts.top;
+        }
+    }
+
+    [[gnu::always_inline]] void pushLimit() {
+        push(state->limits, limitDepth, cursor + left - 1);
+    }
+
+    [[gnu::always_inline]] void popLimit() {
+        --limitDepth;
+        if (Pass::reports) {
+            --state->limits.top;
+        }
+        left = state->limits.base[limitDepth] - cursor + 1;
+    }
+
+    // Skips what is left of the innermost limit.
+    [[gnu::always_inline]] void sweep() {
+        if (left != 0) {
+            cursor += left;
+            left = 0;
+            mark(Mark::bitsLeftOver);
+        }
+    }
+
+    // Makes room for so many elements. False when the ranges cannot grow.
+    [[gnu::always_inline]] bool roomFor(std::uint32_t elements) {
+        if (elements < rangeCapacity) [[likely]] {
+            return true;
+        }
+        Reader copy = *this;
+        copy.growRanges(elements);
+        *this = copy;
+        return !over();
+    }
+
+private:
+    [[gnu::always_inline]] bool push(BitStack& stack, std::uint32_t& depth, std::uint32_t bit) {
+        ++depth;
+        stack.count = depth;
+        if (Pass::reports) {
+            ++stack.top;
+        }
+        if (depth >= stack.capacity) [[unlikely]] {
+            // Growth works on a copy, so that the reader itself can stay in registers.
+            Reader copy = *this;
+            copy.growStack(stack);
+            *this = copy;
+            if (over()) {
+                return false;
+            }
+        }
+        stack.base[depth] = bit;
+        return true;
+    }
+
+    [[gnu::cold, gnu::noinline]] void growStack(BitStack& stack) {
+        giveState();
+        while (stack.count >= stack.capacity) {
+            const std::uint32_t capacity = stack.capacity * 2;
+            void* const grown = capacity == 0 ? nullptr : hs_Realloc(stack.base, capacity * sizeof *stack.base);
+            if (grown == nullptr) {
+                return cutOff(NETFLOOR_FLAG_NO_STACK);
+            }
+            stack.base = static_cast<std::uint32_t*>(grown);
+            stack.top = stack.base + stack.count;
+            stack.capacity = capacity;
+        }
+    }
+
+    [[gnu::cold, gnu::noinline]] void growRanges(std::uint32_t elements) {
+        giveState();
+        FieldRecord& record = state->fieldRecord;
+        void* const grown = hs_Realloc(record.ranges, elements * sizeof *record.ranges);
+        if (grown == nullptr) {
+            return cutOff(NETFLOOR_FLAG_NO_RANGES);
+        }
+        record.ranges = static_cast<BitRange*>(grown);
+        record.rangeCapacity = elements;
+        rangeCapacity = elements;
+    }
+};
+
+} // namespace netfloor

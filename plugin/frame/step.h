@@ -1,0 +1,119 @@
+// SPDX-License-Identifier: MIT
+// The field step: how a field is read, stored and reported. And the look ahead, which does neither.
+#pragma once
+
+#include <cstdint>
+#include <optional>
+#include <type_traits>
+
+#include "frame/reader.h"
+
+namespace netfloor {
+
+// For a field that sets no variable.
+struct Unstored {};
+
+template <class Store> [[gnu::always_inline]] inline void store(Store& into, std::uint32_t value) {
+    if constexpr (std::is_pointer_v<Store>) {
+        *into = static_cast<std::remove_pointer_t<Store>>(value);
+    } else {
+        into(value);
+    }
+}
+
+// The step of a field of `units` units; see `read` and `readRun`.
+template <const Field& field, class Pass, class Store>
+[[gnu::always_inline]] inline void step(Reader<Pass>& at, std::uint32_t units, Store into) {
+    static_assert(consistent(field), "the declaration of this field contradicts itself");
+    constexpr const Place& place = field.place;
+    if (!at.live) {
+        return;
+    }
+    at.condition = at.left >= place.needs(units);
+    if (!at.condition) {
+        at.live = false;
+        return;
+    }
+    at.showBlock();
+    if constexpr (Pass::reports) {
+        beginRecord<field>(at.state->fieldRecord);
+    }
+    if (!at.roomFor(place.elements(units))) {
+        return;
+    }
+    const std::uint32_t start = at.cursor;
+    if constexpr (!std::is_same_v<Store, Unstored>) {
+        store(into, valueAt<field>(at.data, start, units));
+    }
+    at.advance = static_cast<std::int32_t>(place.moves(units));
+    at.left -= place.moves(units);
+    at.cursor += place.moves(units);
+    if constexpr (Pass::reports) {
+        FieldRecord& record = at.state->fieldRecord;
+        writeElements<field>(record, at.data, start, units);
+        record.fieldId = field.id;
+        at.givePosition();
+    } else {
+        at.last = {.writer = writeRecord<field>, .cursor = start, .units = units};
+    }
+    Pass::template output<field>(at, start, units);
+}
+
+// Reads a field of fixed size. `into` takes its value: a pointer to a variable, or a function of the value.
+// A field that does not fit clears the live flag and changes nothing else.
+template <const Field& field, class Pass, class Store = Unstored>
+[[gnu::always_inline]] inline void read(Reader<Pass>& at, Store into = {}) {
+    static_assert(!field.place.isRun(), "a run needs its number of units");
+    step<field>(at, field.place.count, into);
+}
+
+// Reads a field of as many units (octets, nibbles) as the packet tells. The number counts as unsigned in the
+// test of the bits left, so that a negative one does not fit.
+template <const Field& field, class Pass> [[gnu::always_inline]] inline void readRun(Reader<Pass>& at, std::int32_t units) {
+    static_assert(field.place.isRun(), "a field of fixed size has its number of units");
+    step<field>(at, static_cast<std::uint32_t>(units), Unstored{});
+}
+
+// Reads a field again and again, up to `count` times, as long as its bits are left. Gives how often it was read.
+template <const Field& field, class Pass> [[gnu::always_inline]] inline std::int32_t readRepeated(Reader<Pass>& at, std::int32_t count) {
+    std::int32_t seen = 0;
+    while (at.live && seen < count) {
+        read<field>(at);
+        seen += at.live ? 1 : 0;
+    }
+    return seen;
+}
+
+// Looks at the bits of `place` without moving the cursor and without reporting anything; nothing where they
+// are not all left. The field record keeps what was seen, under the name of the field before.
+template <class Pass> [[gnu::always_inline]] inline std::optional<std::uint32_t> look(Reader<Pass>& at, const Place& place) {
+    if (at.left < place.needs(place.count) || !at.roomFor(place.count)) {
+        return std::nullopt;
+    }
+    const bool whole = !place.isPieces();
+    const std::uint32_t first = at.cursor + (whole ? 0 : place.pieces[0].low);
+    const std::uint32_t width = whole ? bitsPerOctet : place.pieces[0].width();
+    if constexpr (Pass::reports) {
+        return at.writeSeen(first, place.count, width);
+    }
+    at.last.seenFirst = first;
+    at.last.seenPieces = place.count;
+    at.last.seenWidth = width;
+    return whole ? octetsAt(at.data, first, place.count) : bits(at.data, first, first + width - 1);
+}
+
+// Moves the cursor back over `bitCount` bits, so that they can be read a second time.
+template <class Pass> [[gnu::always_inline]] inline void stepBack(Reader<Pass>& at, std::uint32_t bitCount) {
+    if (at.over()) {
+        return;
+    }
+    at.advance = -static_cast<std::int32_t>(bitCount);
+    if (!at.live || at.cursor < bitCount) {
+        at.live = false;
+        return;
+    }
+    at.cursor -= bitCount;
+    at.left += bitCount;
+}
+
+} // namespace netfloor

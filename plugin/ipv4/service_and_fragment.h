@@ -1,0 +1,78 @@
+// SPDX-License-Identifier: MIT
+// The two productions of the IPv4 header (RFC 791) that an IP in IP header shares.
+//
+//    0   1   2   3   4   5   6   7          0   1   2   3 ...                   15
+//  +---+---+---+---+---+---+---+---+      +---+---+---+--------------------------+
+//  | Precedence| D | T | R |  Rsvd |      | R | DF| MF|     Fragment Offset      |
+//  +---+---+---+---+---+---+---+---+      +---+---+---+--------------------------+
+#pragma once
+
+#include <array>
+
+#include "frame/block.h"
+#include "frame/field.h"
+#include "frame/step.h"
+
+namespace netfloor::ipv4 {
+
+inline constexpr std::array precedenceRows = {
+    ValueName{0, "Routine"},       ValueName{1, "Priority"},       ValueName{2, "Immediate"},
+    ValueName{3, "Flash"},         ValueName{4, "Flash Override"}, ValueName{5, "CRITIC/ECP"},
+    ValueName{6, "Internetwork Control"}, ValueName{7, "Network Control"},
+};
+inline constexpr std::array delayRows = {ValueName{0, "Normal Delay"}, ValueName{1, "Low Delay"}};
+inline constexpr std::array throughputRows = {ValueName{0, "Normal Throughput"}, ValueName{1, "High Throughput"}};
+inline constexpr std::array reliabilityRows = {ValueName{0, "Normal Reliability"}, ValueName{1, "High Reliability"}};
+inline constexpr std::array dontFragmentRows = {ValueName{0, "May Fragment"}, ValueName{1, "Don't Fragment"}};
+inline constexpr std::array moreFragmentsRows = {ValueName{0, "Last Fragment"}, ValueName{1, "More Fragments"}};
+
+inline constexpr ValueNames precedenceNames{precedenceRows};
+inline constexpr ValueNames delayNames{delayRows};
+inline constexpr ValueNames throughputNames{throughputRows};
+inline constexpr ValueNames reliabilityNames{reliabilityRows};
+inline constexpr ValueNames dontFragmentNames{dontFragmentRows};
+inline constexpr ValueNames moreFragmentsNames{moreFragmentsRows};
+
+// clang-format off
+inline constexpr Field precedence       {286, "Precedence",      piece(5, 7),                                  "Precedence=%-S",  &precedenceNames};
+inline constexpr Field delay            {287, "Delay",           bit(4),                                       "Delay=%-S",       &delayNames};
+inline constexpr Field throughput       {288, "Throughput",      bit(3),                                       "Throughput=%-S",  &throughputNames};
+inline constexpr Field reliability      {289, "Reliability",     bit(2),                                       "Reliability=%-S", &reliabilityNames};
+inline constexpr Field serviceReserved  {290, "Reserved",        piece(0, 1).advancing(8),                     "Reserved=%x"};
+
+inline constexpr Field fragmentReserved {291, "Reserved",        bit(7),                                       "Reserved=%x"};
+inline constexpr Field dontFragmentFlag {292, "DF",              bit(6),                                       "DF=%-S",          &dontFragmentNames};
+inline constexpr Field moreFragments    {293, "MF",              bit(5),                                       "MF=%-S",          &moreFragmentsNames};
+inline constexpr Field fragmentOffset   {294, "Fragment Offset", pieces({0, 4}, {8, 15}).advancing(16).times(8), "Fragment Offset=%u octets"};
+// clang-format on
+
+struct FragmentVariables {
+    std::uint32_t dontFragment;
+    std::uint32_t fragmentOffset; // in units of 8 octets, as on the wire
+};
+
+template <class Pass> [[gnu::always_inline]] inline void typeOfService(Reader<Pass>& at) {
+    if (!at.live) {
+        return;
+    }
+    const Block<Pass> block{at, "Type of Service"};
+    read<precedence>(at);
+    read<delay>(at);
+    read<throughput>(at);
+    read<reliability>(at);
+    read<serviceReserved>(at);
+}
+
+template <class Pass> [[gnu::always_inline]] inline void flagAndFragmentOffset(Reader<Pass>& at) {
+    if (!at.live) {
+        return;
+    }
+    auto& variables = at.variables();
+    const Block<Pass> block{at, "Flag and Fragment Offset"};
+    read<fragmentReserved>(at);
+    read<dontFragmentFlag>(at, &variables.dontFragment);
+    read<moreFragments>(at);
+    read<fragmentOffset>(at, &variables.fragmentOffset);
+}
+
+} // namespace netfloor::ipv4

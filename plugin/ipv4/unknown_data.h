@@ -1,0 +1,24 @@
+// SPDX-License-Identifier: MIT
+// Payload of a protocol that the grammar does not know: one field for each octet.
+#pragma once
+
+#include "frame/block.h"
+#include "frame/field.h"
+#include "frame/step.h"
+
+namespace netfloor {
+
+inline constexpr Field unknownProtocolData{285, "Unknown Protocol Data", octets(1), "Unknown Protocol Data=%x"};
+
+template <class Pass> void unknownData(Reader<Pass>& at) {
+    if (!at.live) {
+        return;
+    }
+    const Block<Pass> block{at, ""};
+    const std::int32_t payloadOctets = at.variables().payloadOctets;
+    if (payloadOctets > 0 && readRepeated<unknownProtocolData>(at, payloadOctets) != payloadOctets) {
+        at.mark(Mark::count);
+    }
+}
+
+} // namespace netfloor

@@ -1,0 +1,42 @@
+// SPDX-License-Identifier: MIT
+// The key-field table: which fields the XTR pass can deliver.
+//
+// The rows stand in the order in which the grammar comes to its key fields, a row for each place. A field is
+// stored in the last row that has its name, so of several rows of one name only the last is ever filled.
+#pragma once
+
+#include <array>
+#include <cstdint>
+
+#include "frame/field.h"
+#include "netfloor/records.h"
+#include "tables/key_sites_interim.h"
+
+namespace netfloor {
+
+inline constexpr std::uint32_t noKeyRow = 0xffffffff;
+
+// The table ends with a row without a name, which no field fills: a host can mark it present.
+inline constexpr std::uint32_t keyRowCount = keySites.size() + 1;
+
+[[nodiscard]] consteval std::uint32_t keyRowOf(const Field& field) {
+    bool isKey = false;
+    std::uint32_t last = noKeyRow;
+    for (std::uint32_t row = 0; row < keySites.size(); ++row) {
+        isKey = isKey || keySites[row].fieldId == field.id;
+        last = keySites[row].name == field.tableName() ? row : last;
+    }
+    return isKey ? last : noKeyRow;
+}
+
+// The host fills the first three words of each row; the rest stays as it is.
+inline constinit std::array<KeyFieldRow, keyRowCount> keyRows = [] {
+    std::array<KeyFieldRow, keyRowCount> rows{};
+    for (std::uint32_t row = 0; row < keyRowCount; ++row) {
+        rows[row].protocolName = "netfloor";
+        rows[row].fieldName = row < keySites.size() ? keySites[row].name.data() : "";
+    }
+    return rows;
+}();
+
+} // namespace netfloor

@@ -1,0 +1,78 @@
+// SPDX-License-Identifier: MIT
+// UDP (RFC 768).
+//
+//    0      7 8     15 16    23 24    31
+//   +--------+--------+--------+--------+
+//   |   Source Port   | Destination Port|
+//   +--------+--------+--------+--------+
+//   |     Length      |    Checksum     |
+//   +--------+--------+--------+--------+
+//
+// Neither the length nor the checksum is compared with anything. What goes to the next layer is reckoned from
+// the IP layer's lengths.
+#pragma once
+
+#include "frame/block.h"
+#include "frame/field.h"
+#include "frame/hand_off.h"
+#include "frame/step.h"
+#include "tables/port_names.h"
+#include "tables/protocol_numbers.h"
+
+namespace netfloor::udp {
+
+// clang-format off
+inline constexpr Field sourcePort                {479, "UDP Source Port",      octets(2), "  UDP Source Port=%-S (%u)",      &portNames, "UDP - %-s (%u)"};
+inline constexpr Field destinationPortIpInIp     {482, "UDP Destination Port", octets(2), "  UDP Destination Port=%-S (%u)", &portNames, "IPinIP - UDP - %-s (%u)"};
+inline constexpr Field destinationPortMinimal    {486, "UDP Destination Port", octets(2), "  UDP Destination Port=%-S (%u)", &portNames, "MIPinIP - UDP - %-s (%u)"};
+inline constexpr Field destinationPort           {488, "UDP Destination Port", octets(2), "  UDP Destination Port=%-S (%u)", &portNames, "UDP - %-s (%u)"};
+inline constexpr Field length                    {489, "UDP Length",           octets(2), "  UDP Length=%u octet(s)"};
+inline constexpr Field checksum                  {490, "Checksum",             octets(2), "  Checksum=%x"};
+// clang-format on
+
+inline constexpr std::int32_t headerOctets = 8;
+
+// A payload of so many bits or less is left unread.
+inline constexpr std::uint32_t handOffAbove = 32;
+
+[[nodiscard]] constexpr bool isRadius(std::uint32_t port) {
+    return port == 1812 || port == 1813;
+}
+
+template <class Pass> [[gnu::always_inline]] inline void datagram(Reader<Pass>& at) {
+    if (!at.live) {
+        return;
+    }
+    auto& variables = at.variables();
+    const Block<Pass> header{at, "User Datagram Protocol"};
+    read<sourcePort>(at, &variables.sourcePort);
+    switch (variables.outerProtocol) {
+    case protocolIpInIp:
+        read<destinationPortIpInIp>(at, &variables.destinationPort);
+        break;
+    case protocolMinimalEncapsulation:
+        read<destinationPortMinimal>(at, &variables.destinationPort);
+        break;
+    default:
+        read<destinationPort>(at, &variables.destinationPort);
+    }
+    if (!at.live) {
+        return;
+    }
+    const Block<Pass> rest{at, ""};
+    read<length>(at);
+    read<checksum>(at);
+    if (at.live) {
+        variables.payloadOctets -= headerOctets;
+        // A server's reply goes to the next layer under the server's port.
+        if (isRadius(variables.sourcePort)) {
+            variables.destinationPort = variables.sourcePort;
+        }
+        tellNextLayer(at);
+    }
+    if (at.left > handOffAbove) {
+        handOff(at);
+    }
+}
+
+} // namespace netfloor::udp
