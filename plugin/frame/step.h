@@ -21,6 +21,18 @@ template <class Store> [[gnu::always_inline]] inline void store(Store& into, std
     }
 }
 
+// Whether the bits of a field are there. A field that is not tested needs them in the packet only; where they
+// are not all there it is not reported either, and clears the live flag like any other.
+template <const Field& field, class Pass>
+[[nodiscard, gnu::always_inline]] inline bool fits(Reader<Pass>& at, std::uint32_t units) {
+    constexpr const Place& place = field.place;
+    if constexpr (!place.isTested()) {
+        return at.cursor + place.needs(units) <= at.state->totalBits + 1;
+    }
+    at.condition = at.left >= place.needs(units);
+    return at.condition;
+}
+
 // The step of a field of `units` units; see `read` and `readRun`.
 template <const Field& field, class Pass, class Store>
 [[gnu::always_inline]] inline void step(Reader<Pass>& at, std::uint32_t units, Store into) {
@@ -29,8 +41,7 @@ template <const Field& field, class Pass, class Store>
     if (!at.live) {
         return;
     }
-    at.condition = at.left >= place.needs(units);
-    if (!at.condition) {
+    if (!fits<field>(at, units)) {
         at.live = false;
         return;
     }
@@ -82,6 +93,15 @@ template <const Field& field, class Pass> [[gnu::always_inline]] inline std::int
         seen += at.live ? 1 : 0;
     }
     return seen;
+}
+
+// Reads a field `count` times. Where it ends with another count, as bits ran out or the count is negative,
+// that is marked.
+template <const Field& field, class Pass>
+[[gnu::always_inline]] inline void readCounted(Reader<Pass>& at, std::int32_t count) {
+    if (readRepeated<field>(at, count) != count) {
+        at.mark(Mark::count);
+    }
 }
 
 // Looks at the bits of `place` without moving the cursor and without reporting anything; nothing where they

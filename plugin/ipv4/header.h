@@ -24,6 +24,7 @@
 #include "frame/block.h"
 #include "frame/field.h"
 #include "frame/step.h"
+#include "icmp/icmpv6.h"
 #include "ipv4/service_and_fragment.h"
 #include "ipv4/unknown_data.h"
 #include "tables/protocol_numbers.h"
@@ -55,6 +56,8 @@ template <class Pass> [[gnu::always_inline]] inline void dispatch(Reader<Pass>& 
     switch (variables.ipProtocol) {
     case protocolUdp:
         return udp::datagram(at);
+    case protocolIcmpv6:
+        return apart<icmpv6::message<Pass>>(at);
     default:
         return apart<unknownData<Pass>>(at);
     }
