@@ -13,8 +13,11 @@
 
 namespace netfloor {
 
-inline constexpr ValueNames emptyNames{};
-inline constexpr const ValueNames* noNames = &emptyNames;
+inline constexpr ValueNames unnamed{};
+inline constexpr const ValueNames* noNames = &unnamed;
+
+// The default of a short text: the value part of the line.
+inline constexpr std::string_view asInLine = "=";
 
 struct Field {
     std::uint32_t id;
@@ -22,16 +25,15 @@ struct Field {
     Place place;
     std::string_view line;             // the display line, with its conversions
     const ValueNames* names = noNames; // what %-S and %-s take
-    std::string_view shortText = {};   // the text of the TO pass, where it is not the value part of the line
-
-    // Asks for rows, not for an address: under a sanitizer an address is no constant to compare with.
-    [[nodiscard]] constexpr bool hasNames() const {
-        return !names->rows.empty();
-    }
+    std::string_view shortText = asInLine; // the text of the TO pass
 
     // The text of the TO pass.
     [[nodiscard]] constexpr std::string_view display() const {
-        return shortText.data() == nullptr ? valuePart(line) : shortText;
+        return shortText == asInLine ? valuePart(line) : shortText;
+    }
+
+    [[nodiscard]] constexpr bool hasNames() const {
+        return !names->rows.empty();
     }
 
     // The name as the tables hold it: without its leading blanks.

@@ -23,7 +23,6 @@
 
 #include <array>
 #include <cstdint>
-#include <string_view>
 
 #include "frame/block.h"
 #include "frame/field.h"
@@ -101,7 +100,7 @@ template <class Pass> [[nodiscard, gnu::always_inline]] inline std::uint32_t hea
 
 template <class Pass>
 [[nodiscard, gnu::always_inline]] inline bool optionsHeader(Reader<Pass>& at, BlockChain<Pass>& chain,
-                                                            std::string_view name) {
+                                                            BlockName name) {
     chain.open(name);
     nextHeader(at);
     countOff(at, extensionOctets(headerLength(at)));
@@ -210,12 +209,12 @@ template <class Pass> [[gnu::always_inline]] inline void upperProtocol(Reader<Pa
 
 template <class Pass>
 [[nodiscard, gnu::always_inline]] inline bool link(Reader<Pass>& at, BlockChain<Pass>& chain, std::uint32_t protocol) {
-    using namespace std::string_view_literals;
     switch (protocol) {
     case protocolHopByHop:
     case protocolDestinationOptions:
         return optionsHeader(at, chain,
-                             protocol == protocolHopByHop ? "IPv6 Hop-by-Hop Header"sv : "Destination Option Header"sv);
+                             protocol == protocolHopByHop ? BlockName{"IPv6 Hop-by-Hop Header"}
+                                                          : BlockName{"Destination Option Header"});
     case protocolIpv6:
         return fixedHeader(at, chain);
     case protocolRouting:
