@@ -16,7 +16,7 @@ namespace netfloor {
 
 struct Grammar {
     // All variables of a pass, cleared at its entry.
-    struct Variables : SharedVariables, ipv4::FragmentVariables {};
+    struct Variables : SharedVariables, ipv4::FragmentVariables, ipv4::OptionVariables, tcp::TcpVariables {};
 
     static constexpr std::uint32_t noKeyRow = netfloor::noKeyRow;
     static constexpr auto& keyRows = netfloor::keyRows;
