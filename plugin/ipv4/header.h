@@ -25,9 +25,11 @@
 #include "frame/field.h"
 #include "frame/step.h"
 #include "icmp/icmpv6.h"
+#include "ipv4/options.h"
 #include "ipv4/service_and_fragment.h"
 #include "ipv4/unknown_data.h"
 #include "tables/protocol_numbers.h"
+#include "transport/tcp.h"
 #include "transport/udp.h"
 
 namespace netfloor::ipv4 {
@@ -54,6 +56,8 @@ template <class Pass> [[gnu::always_inline]] inline void dispatch(Reader<Pass>& 
         return apart<unknownData<Pass>>(at);
     }
     switch (variables.ipProtocol) {
+    case protocolTcp:
+        return tcp::segment(at);
     case protocolUdp:
         return udp::datagram(at);
     case protocolIcmpv6:
@@ -92,6 +96,7 @@ template <class Pass> [[gnu::always_inline]] inline void datagram(Reader<Pass>& 
     read<headerChecksum>(at);
     read<sourceAddress>(at);
     read<destinationAddress>(at);
+    options(at);
     if (at.live) {
         variables.payloadOctets = static_cast<std::int32_t>(variables.ipTotalLength - variables.ipHeaderOctets);
     }

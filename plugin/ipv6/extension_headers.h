@@ -33,6 +33,7 @@
 #include "ipv6/header.h"
 #include "ipv6/options.h"
 #include "tables/protocol_numbers.h"
+#include "transport/tcp.h"
 #include "transport/udp.h"
 
 namespace netfloor::ipv6 {
@@ -198,6 +199,8 @@ template <class Pass> [[gnu::always_inline]] inline void upperProtocol(Reader<Pa
     case protocolIcmp:
     case protocolIcmpv6:
         return apart<icmpv6::message<Pass>>(at);
+    case protocolTcp:
+        return tcp::segment(at);
     case protocolUdp:
         return udp::datagram(at);
     case protocolEsp:

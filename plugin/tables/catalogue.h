@@ -9,12 +9,15 @@
 #include "frame/field.h"
 #include "icmp/icmpv6.h"
 #include "ipv4/header.h"
+#include "ipv4/options.h"
 #include "ipv4/service_and_fragment.h"
 #include "ipv4/unknown_data.h"
 #include "ipv6/address.h"
 #include "ipv6/extension_headers.h"
 #include "ipv6/header.h"
 #include "ipv6/options.h"
+#include "transport/tcp.h"
+#include "transport/tcp_options.h"
 #include "transport/udp.h"
 #include "version.h"
 
@@ -39,7 +42,82 @@ inline constexpr std::array catalogue = {
     &ipv4::headerChecksum,
     &ipv4::sourceAddress,
     &ipv4::destinationAddress,
+    &ipv4::noOperation,
+    &ipv4::security,
+    &ipv4::securityLength,
+    &ipv4::securityLevel,
+    &ipv4::compartments,
+    &ipv4::restrictions,
+    &ipv4::transmissionControl,
+    &ipv4::looseRoute,
+    &ipv4::looseRouteLength,
+    &ipv4::looseRoutePointer,
+    &ipv4::looseRouteData,
+    &ipv6::listedAddress,
+    &ipv4::strictRoute,
+    &ipv4::strictRouteLength,
+    &ipv4::strictRoutePointer,
+    &ipv4::strictRouteData,
+    &ipv4::recordRoute,
+    &ipv4::recordRouteLength,
+    &ipv4::recordRoutePointer,
+    &ipv4::recordRouteData,
+    &ipv4::streamIdentifier,
+    &ipv4::streamLength,
+    &ipv4::streamId,
+    &ipv4::internetTimestamp,
+    &ipv4::timestampLength,
+    &ipv4::timestampPointer,
+    &ipv4::timestampOverflow,
+    &ipv4::timestampFlag,
+    &ipv4::timestamp,
+    &ipv4::registeringAddress,
+    &ipv6::address,
+    &ipv6::addressKey,
+    &ipv4::registeredTimestamp,
+    &ipv4::endOfOptionPart,
+    &ipv4::optionPadding,
     &unknownProtocolData,
+    &tcp::sourcePort,
+    &tcp::destinationPortIpInIp,
+    &tcp::destinationPortMinimal,
+    &tcp::destinationPort,
+    &tcp::sequenceNumber,
+    &tcp::acknowledgementNumber,
+    &tcp::reservedBesideDataOffset,
+    &tcp::dataOffset,
+    &tcp::reservedBesideFlags,
+    &tcp::urgent,
+    &tcp::acknowledgement,
+    &tcp::push,
+    &tcp::reset,
+    &tcp::synchronize,
+    &tcp::finish,
+    &tcp::windowSize,
+    &tcp::checksum,
+    &tcp::urgentPointer,
+    &tcp::endOfList,
+    &tcp::noOperation,
+    &tcp::maximumSegment,
+    &tcp::maximumLength,
+    &tcp::maximumSize,
+    &tcp::windowScale,
+    &tcp::windowScaleLength,
+    &tcp::shiftCount,
+    &tcp::sackPermitted,
+    &tcp::permittedLength,
+    &tcp::sack,
+    &tcp::sackLength,
+    &tcp::leftEdge,
+    &tcp::rightEdge,
+    &tcp::timestamps,
+    &tcp::timestampsLength,
+    &tcp::timestampValue,
+    &tcp::timestampEcho,
+    &tcp::md5Signature,
+    &tcp::md5Length,
+    &tcp::md5Digest,
+    &tcp::optionPadding,
     &udp::sourcePort,
     &udp::destinationPortIpInIp,
     &udp::destinationPortMinimal,
@@ -114,8 +192,6 @@ inline constexpr std::array catalogue = {
     &ipv6::unknownOptionLength,
     &ipv6::skippedOctet,
     &ipv6::discardedOptionType,
-    &ipv6::address,
-    &ipv6::addressKey,
 };
 
 // The id under which the TO pass reports a field: that of the first field of the same name.
