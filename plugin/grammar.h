@@ -8,6 +8,7 @@
 #include "frame/step.h"
 #include "frame/variables.h"
 #include "ipv4/header.h"
+#include "ipv6/extension_headers.h"
 #include "tables/catalogue.h"
 #include "tables/key_fields.h"
 #include "version.h"
@@ -16,7 +17,11 @@ namespace netfloor {
 
 struct Grammar {
     // All variables of a pass, cleared at its entry.
-    struct Variables : SharedVariables, ipv4::FragmentVariables {};
+    struct Variables : SharedVariables,
+                       ipv4::FragmentVariables,
+                       ipv4::OptionVariables,
+                       ipv6::ExtensionHeaderVariables,
+                       tcp::TcpVariables {};
 
     static constexpr std::uint32_t noKeyRow = netfloor::noKeyRow;
     static constexpr auto& keyRows = netfloor::keyRows;
@@ -32,6 +37,8 @@ struct Grammar {
         read<version>(at, &variables.ipVersion);
         if (variables.ipVersion == 4) {
             ipv4::datagram(at);
+        } else if (variables.ipVersion == 6) {
+            apart<ipv6::datagram<Pass>>(at);
         }
     }
 };

@@ -24,9 +24,12 @@
 #include "frame/block.h"
 #include "frame/field.h"
 #include "frame/step.h"
+#include "icmp/icmpv6.h"
+#include "ipv4/options.h"
 #include "ipv4/service_and_fragment.h"
 #include "ipv4/unknown_data.h"
 #include "tables/protocol_numbers.h"
+#include "transport/tcp.h"
 #include "transport/udp.h"
 
 namespace netfloor::ipv4 {
@@ -53,8 +56,12 @@ template <class Pass> [[gnu::always_inline]] inline void dispatch(Reader<Pass>& 
         return apart<unknownData<Pass>>(at);
     }
     switch (variables.ipProtocol) {
+    case protocolTcp:
+        return tcp::segment(at);
     case protocolUdp:
         return udp::datagram(at);
+    case protocolIcmpv6:
+        return apart<icmpv6::message<Pass>>(at);
     default:
         return apart<unknownData<Pass>>(at);
     }
@@ -89,6 +96,7 @@ template <class Pass> [[gnu::always_inline]] inline void datagram(Reader<Pass>& 
     read<headerChecksum>(at);
     read<sourceAddress>(at);
     read<destinationAddress>(at);
+    options(at);
     if (at.live) {
         variables.payloadOctets = static_cast<std::int32_t>(variables.ipTotalLength - variables.ipHeaderOctets);
     }
