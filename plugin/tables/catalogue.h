@@ -166,7 +166,7 @@ inline constexpr std::array catalogue = {
 };
 
 // The id under which the TO pass reports a field: that of the first field of the same name.
-[[nodiscard]] consteval std::uint32_t displayIdOf(const Field& field) {
+[[nodiscard]] constexpr std::uint32_t displayIdOf(const Field& field) {
     for (const Field* const candidate : catalogue) {
         if (candidate->tableName() == field.tableName()) {
             return candidate->id;
