@@ -17,7 +17,11 @@ namespace netfloor {
 
 struct Grammar {
     // All variables of a pass, cleared at its entry.
-    struct Variables : SharedVariables, ipv4::FragmentVariables, icmp::MessageVariables {};
+    struct Variables : SharedVariables,
+                       ipv4::FragmentVariables,
+                       ipv4::OptionVariables,
+                       icmp::MessageVariables,
+                       tcp::TcpVariables {};
 
     static constexpr std::uint32_t noKeyRow = netfloor::noKeyRow;
     static constexpr auto& keyRows = netfloor::keyRows;

@@ -94,9 +94,9 @@ template <const Field& field, class Pass> [[gnu::always_inline]] inline std::int
 }
 
 // Looks at the bits of `place` without moving the cursor and without reporting anything; nothing where they
-// are not all left. The field record keeps what was seen, under the name of the field before.
+// are not all left or the run is over. The field record keeps what was seen, under the name of the field before.
 template <class Pass> [[gnu::always_inline]] inline std::optional<std::uint32_t> look(Reader<Pass>& at, const Place& place) {
-    if (at.left < place.needs(place.count) || !at.roomFor(place.count)) {
+    if (at.over() || at.left < place.needs(place.count) || !at.roomFor(place.count)) {
         return std::nullopt;
     }
     const bool whole = !place.isPieces();

@@ -78,8 +78,7 @@ inline constexpr Field problemData          {575, "64-bit Original Data Datagram
 // clang-format on
 
 // Many senders quote more than 64 bits of data: what is left goes to the host as one field without a name.
-template <class Pass>
-[[gnu::always_inline]] inline void destinationUnreachable(Reader<Pass> &at) {
+template <class Pass> [[gnu::always_inline]] inline void destinationUnreachable(Reader<Pass>& at) {
     if (!at.live) {
         return;
     }
@@ -95,8 +94,7 @@ template <class Pass>
     }
 }
 
-template <class Pass>
-[[gnu::always_inline]] inline void sourceQuench(Reader<Pass> &at) {
+template <class Pass> [[gnu::always_inline]] inline void sourceQuench(Reader<Pass>& at) {
     if (!at.live) {
         return;
     }
@@ -108,8 +106,7 @@ template <class Pass>
     read<sourceQuenchData>(at);
 }
 
-template <class Pass>
-[[gnu::always_inline]] inline void redirect(Reader<Pass> &at) {
+template <class Pass> [[gnu::always_inline]] inline void redirect(Reader<Pass>& at) {
     if (!at.live) {
         return;
     }
@@ -121,8 +118,7 @@ template <class Pass>
     read<redirectData>(at);
 }
 
-template <class Pass>
-[[gnu::always_inline]] inline void timeExceeded(Reader<Pass> &at) {
+template <class Pass> [[gnu::always_inline]] inline void timeExceeded(Reader<Pass>& at) {
     if (!at.live) {
         return;
     }
@@ -134,8 +130,7 @@ template <class Pass>
     read<timeExceededData>(at);
 }
 
-template <class Pass>
-[[gnu::always_inline]] inline void parameterProblem(Reader<Pass> &at) {
+template <class Pass> [[gnu::always_inline]] inline void parameterProblem(Reader<Pass>& at) {
     if (!at.live) {
         return;
     }

@@ -65,12 +65,11 @@ inline constexpr Field addressMask           {604, "Address Mask",         octet
 
 inline constexpr std::int32_t echoHeaderOctets = 8;
 
-template <class Pass>
-[[gnu::always_inline]] inline void echo(Reader<Pass> &at) {
+template <class Pass> [[gnu::always_inline]] inline void echo(Reader<Pass>& at) {
     if (!at.live) {
         return;
     }
-    auto &variables = at.variables();
+    auto& variables = at.variables();
     const Block<Pass> message{at, ""};
     read<echoCode>(at);
     read<echoChecksum>(at);
@@ -85,8 +84,7 @@ template <class Pass>
     }
 }
 
-template <class Pass>
-[[gnu::always_inline]] inline void timestamp(Reader<Pass> &at) {
+template <class Pass> [[gnu::always_inline]] inline void timestamp(Reader<Pass>& at) {
     if (!at.live) {
         return;
     }
@@ -100,8 +98,7 @@ template <class Pass>
     read<transmitTimestamp>(at);
 }
 
-template <class Pass>
-[[gnu::always_inline]] inline void information(Reader<Pass> &at) {
+template <class Pass> [[gnu::always_inline]] inline void information(Reader<Pass>& at) {
     if (!at.live) {
         return;
     }
@@ -113,8 +110,7 @@ template <class Pass>
 }
 
 // An entry is 8 octets, whatever the size of an entry says. One that is cut short counts as seen.
-template <class Pass>
-[[gnu::always_inline]] inline void routerAdvertisement(Reader<Pass> &at) {
+template <class Pass> [[gnu::always_inline]] inline void routerAdvertisement(Reader<Pass>& at) {
     if (!at.live) {
         return;
     }
@@ -136,8 +132,7 @@ template <class Pass>
     }
 }
 
-template <class Pass>
-[[gnu::always_inline]] inline void routerSolicitation(Reader<Pass> &at) {
+template <class Pass> [[gnu::always_inline]] inline void routerSolicitation(Reader<Pass>& at) {
     if (!at.live) {
         return;
     }
@@ -147,8 +142,7 @@ template <class Pass>
     read<solicitationReserved>(at);
 }
 
-template <class Pass>
-[[gnu::always_inline]] inline void addressMaskMessage(Reader<Pass> &at) {
+template <class Pass> [[gnu::always_inline]] inline void addressMaskMessage(Reader<Pass>& at) {
     if (!at.live) {
         return;
     }

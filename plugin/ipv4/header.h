@@ -25,9 +25,11 @@
 #include "frame/field.h"
 #include "frame/step.h"
 #include "icmp/icmp.h"
+#include "ipv4/options.h"
 #include "ipv4/service_and_fragment.h"
 #include "ipv4/unknown_data.h"
 #include "tables/protocol_numbers.h"
+#include "transport/tcp.h"
 #include "transport/udp.h"
 #include "tunnels/gre.h"
 #include "tunnels/tunnel.h"
@@ -63,6 +65,8 @@ template <class Pass> [[gnu::always_inline]] inline void dispatch(Reader<Pass>& 
         return apart<tunnel::packet<Pass>>(at);
     case protocolGre:
         return apart<gre::packet<Pass>>(at);
+    case protocolTcp:
+        return tcp::segment(at);
     case protocolUdp:
         return udp::datagram(at);
     default:
@@ -99,6 +103,7 @@ template <class Pass> [[gnu::always_inline]] inline void datagram(Reader<Pass>& 
     read<headerChecksum>(at);
     read<sourceAddress>(at);
     read<destinationAddress>(at);
+    options(at);
     if (at.live) {
         variables.payloadOctets = static_cast<std::int32_t>(variables.ipTotalLength - variables.ipHeaderOctets);
     }
