@@ -7,6 +7,7 @@
 #include "frame/block.h"
 #include "frame/step.h"
 #include "frame/variables.h"
+#include "icmp/message_type.h"
 #include "ipv4/header.h"
 #include "ipv6/extension_headers.h"
 #include "tables/catalogue.h"
@@ -21,6 +22,7 @@ struct Grammar {
                        ipv4::FragmentVariables,
                        ipv4::OptionVariables,
                        ipv6::ExtensionHeaderVariables,
+                       icmp::MessageVariables,
                        tcp::TcpVariables {};
 
     static constexpr std::uint32_t noKeyRow = netfloor::noKeyRow;

@@ -35,6 +35,7 @@
 #include "tables/protocol_numbers.h"
 #include "transport/tcp.h"
 #include "transport/udp.h"
+#include "tunnels/gre.h"
 
 namespace netfloor::ipv6 {
 
@@ -203,6 +204,8 @@ template <class Pass> [[gnu::always_inline]] inline void upperProtocol(Reader<Pa
         return tcp::segment(at);
     case protocolUdp:
         return udp::datagram(at);
+    case protocolGre:
+        return apart<gre::packet<Pass>>(at);
     case protocolEsp:
         return apart<securityPayload<Pass>>(at);
     default:
