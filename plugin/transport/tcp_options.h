@@ -68,7 +68,7 @@ inline constexpr std::int32_t windowScaleOctets = 3;
 inline constexpr std::int32_t sackPermittedOctets = 2;
 inline constexpr std::int32_t timestampsOctets = 10;
 
-template <class Pass> void blocksOfEdges(Reader<Pass>& at) {
+template <class Pass> [[gnu::always_inline]] inline void blocksOfEdges(Reader<Pass>& at) {
     while (at.live) {
         const Block<Pass> block{at, ""};
         read<leftEdge>(at);
@@ -77,7 +77,7 @@ template <class Pass> void blocksOfEdges(Reader<Pass>& at) {
 }
 
 // The digest is what the option's length leaves, and one octet at least, so that an option without one is cut short.
-template <class Pass> void digest(Reader<Pass>& at) {
+template <class Pass> [[gnu::always_inline]] inline void digest(Reader<Pass>& at) {
     const std::uint32_t octetsLeft = at.left / bitsPerOctet;
     readRun<md5Digest>(at, static_cast<std::int32_t>(std::clamp(octetsLeft, 1U, md5Digest.place.mostUnits)));
 }
