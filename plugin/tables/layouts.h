@@ -77,6 +77,31 @@ inline constexpr std::uint32_t variableLength = 1; // reference at the end
     return place.shape != Shape::ahead && place.shape != Shape::groups;
 }
 
+// The pieces of one unit.
+constexpr void addPieces(LayoutRecord& record, const Place& place) {
+    switch (place.shape) {
+    case Shape::pieces:
+        record.add({place.count});
+        for (std::uint32_t i = 0; i < place.count; ++i) {
+            record.addPiece(place.pieces[i].low + 1, place.pieces[i].high + 1);
+        }
+        return;
+    case Shape::addressNibbles:
+        record.add({nibblesPerGroup});
+        for (std::uint32_t nibble = 0; nibble < nibblesPerGroup; ++nibble) {
+            record.addPiece(nibble * nibbleBits + 1, (nibble + 1) * nibbleBits);
+        }
+        return;
+    case Shape::reversedGroups:
+        record.add({1});
+        record.addPiece(groupBits, 1);
+        return;
+    default:
+        record.add({1});
+        record.addPiece(1, place.unitBits());
+    }
+}
+
 [[nodiscard]] constexpr LayoutRecord layoutOf(const Place& place) {
     LayoutRecord record;
     if (!hasLayout(place)) {
@@ -85,27 +110,46 @@ inline constexpr std::uint32_t variableLength = 1; // reference at the end
         return record;
     }
     record.add({0xff, 0x02, 0x55, 0x01, 0x04});
-    switch (place.shape) {
-    case Shape::pieces:
-        record.add({place.count});
-        for (std::uint32_t i = 0; i < place.count; ++i) {
-            record.addPiece(place.pieces[i].low + 1, place.pieces[i].high + 1);
-        }
-        break;
-    case Shape::addressNibbles:
-        record.add({nibblesPerGroup});
-        for (std::uint32_t nibble = 0; nibble < nibblesPerGroup; ++nibble) {
-            record.addPiece(nibble * nibbleBits + 1, (nibble + 1) * nibbleBits);
-        }
-        break;
-    case Shape::reversedGroups:
-        record.add({1});
-        record.addPiece(groupBits, 1);
-        break;
-    default:
-        record.add({1});
-        record.addPiece(1, place.unitBits());
+    addPieces(record, place);
+    const bool byPacket = (place.isRun() && place.mostUnits == 0) || place.shape == Shape::addressNibbles;
+    if (byPacket) {
+        record.addReference(countByPacket);
+    } else if (place.isRun()) {
+        record.addRange(1, place.mostUnits);
+    } else {
+        record.addConstant(place.shape == Shape::pieces ? 1 : place.count);
     }
+    record.addConstant(place.shape == Shape::pieces || place.isRun() ? place.advance : place.advance / place.count);
+    record.addReference(byPacket ? variableLength : fixedLength);
     record.finish();
     return record;
 }
+
+// All records, and where the record of each field starts.
+struct LayoutTable {
+    std::array<std::uint8_t, 4096> octets{};
+    std::array<std::uint32_t, catalogue.size()> offsets{};
+    std::size_t size = 0;
+    std::size_t records = 0;
+};
+
+inline constexpr LayoutTable layoutTable = [] {
+    LayoutTable table;
+    for (std::size_t i = 0; i < catalogue.size(); ++i) {
+        const LayoutRecord record = layoutOf(catalogue[i]->place);
+        std::size_t at = 0;
+        while (at < table.size && !record.sameAs(&table.octets[at])) {
+            at += 2u + table.octets[at];
+        }
+        table.offsets[i] = static_cast<std::uint32_t>(at);
+        if (at == table.size) {
+            for (std::size_t octet = 0; octet < record.size; ++octet) {
+                table.octets[table.size++] = record.octets[octet];
+            }
+            ++table.records;
+        }
+    }
+    return table;
+}();
+
+} // namespace netfloor
