@@ -8,6 +8,7 @@
 #include "frame/step.h"
 #include "frame/variables.h"
 #include "ipv4/header.h"
+#include "sctp/variables.h"
 #include "tables/catalogue.h"
 #include "tables/key_fields.h"
 #include "version.h"
@@ -16,7 +17,7 @@ namespace netfloor {
 
 struct Grammar {
     // All variables of a pass, cleared at its entry.
-    struct Variables : SharedVariables, ipv4::FragmentVariables {};
+    struct Variables : SharedVariables, ipv4::FragmentVariables, sctp::Variables {};
 
     static constexpr std::uint32_t noKeyRow = netfloor::noKeyRow;
     static constexpr auto& keyRows = netfloor::keyRows;

@@ -26,6 +26,7 @@
 #include "frame/step.h"
 #include "ipv4/service_and_fragment.h"
 #include "ipv4/unknown_data.h"
+#include "sctp/sctp.h"
 #include "tables/protocol_numbers.h"
 #include "transport/udp.h"
 
@@ -55,6 +56,8 @@ template <class Pass> [[gnu::always_inline]] inline void dispatch(Reader<Pass>& 
     switch (variables.ipProtocol) {
     case protocolUdp:
         return udp::datagram(at);
+    case protocolSctp:
+        return apart<sctp::packet<Pass>>(at);
     default:
         return apart<unknownData<Pass>>(at);
     }

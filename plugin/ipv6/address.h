@@ -1,0 +1,39 @@
+// SPDX-License-Identifier: MIT
+// IPv6 addresses (RFC 4291), which headers, options and parameters of several protocols hold.
+#pragma once
+
+#include "frame/bit_order.h"
+#include "frame/block.h"
+#include "frame/field.h"
+#include "frame/step.h"
+
+namespace netfloor::ipv6 {
+
+// clang-format off
+inline constexpr Field listedAddress {856, "        IP Address", addressReversed(), R"(        IP Address=%-["%x":":"])"};
+inline constexpr Field address       {948, "IP Address",         addressGroups(),   R"(IP Address=%-["%x":"."])"};
+inline constexpr Field addressKey    {950, "IP Address",         addressNibbles(),  ""};
+// clang-format on
+
+// An address is read twice: `shown` gives its text, and `key` what the key record keeps.
+template <const Field& shown, const Field& key, class Pass> void addressReadTwice(Reader<Pass>& at) {
+    if (!at.live) {
+        return;
+    }
+    const Block<Pass> block{at, "IP Address"};
+    read<shown>(at);
+    stepBack(at, addressBits);
+    read<key>(at);
+}
+
+// An address read with the bits of each octet reversed, twice over, so that its groups show in network order.
+template <class Pass> void reversedAddress(Reader<Pass>& at, typename ReversedBits<Pass>::Report report) {
+    if (!at.live) {
+        return;
+    }
+    const ReversedBits<Pass> reversed{at, report};
+    const Block<Pass> block{at, "IPv6 Address"};
+    read<listedAddress>(at);
+}
+
+} // namespace netfloor::ipv6
