@@ -14,7 +14,7 @@ namespace netfloor {
 inline constexpr std::uint32_t bitsPerOctet = 8;
 
 // Reads the bits `first` to `last`, at most 32, where first is not above last.
-[[nodiscard]] constexpr std::uint32_t bitsAscending(const std::uint8_t* data, std::uint32_t first, std::uint32_t last) {
+[[nodiscard, gnu::always_inline]] constexpr std::uint32_t bitsAscending(const std::uint8_t* data, std::uint32_t first, std::uint32_t last) {
     const std::uint32_t low = first - 1;
     const std::uint32_t high = last - 1;
     std::uint64_t gathered = 0;
@@ -35,7 +35,7 @@ inline constexpr std::uint32_t bitsPerOctet = 8;
 }
 
 // Reads the bits between `first` and `last`; where first is above last, in reverse order.
-[[nodiscard]] constexpr std::uint32_t bits(const std::uint8_t* data, std::uint32_t first, std::uint32_t last) {
+[[nodiscard, gnu::always_inline]] constexpr std::uint32_t bits(const std::uint8_t* data, std::uint32_t first, std::uint32_t last) {
     if (static_cast<std::int32_t>(first) <= static_cast<std::int32_t>(last)) {
         return bitsAscending(data, first, last);
     }
@@ -43,23 +43,57 @@ inline constexpr std::uint32_t bitsPerOctet = 8;
 }
 
 // True where a bit number is the first of an octet.
-[[nodiscard]] constexpr bool onOctetBorder(std::uint32_t bit) {
+[[nodiscard, gnu::always_inline]] constexpr bool onOctetBorder(std::uint32_t bit) {
     return (bit - 1) % bitsPerOctet == 0;
 }
 
+// Reads the bits `first` to `last` out of line: the form that need not be fast.
+[[nodiscard, gnu::cold, gnu::noinline]] constexpr std::uint32_t bitsAcross(const std::uint8_t* data, std::uint32_t first, std::uint32_t last) {
+    return bitsAscending(data, first, last);
+}
+
 // Reads the 8 bits from bit number `first` on, wherever they lie.
-[[nodiscard]] constexpr std::uint32_t octetAt(const std::uint8_t* data, std::uint32_t first) {
+[[nodiscard, gnu::always_inline]] constexpr std::uint32_t octetAt(const std::uint8_t* data, std::uint32_t first) {
     if (onOctetBorder(first)) [[likely]] {
         return data[(first - 1) / bitsPerOctet];
     }
-    return bitsAscending(data, first, first + bitsPerOctet - 1);
+    return bitsAcross(data, first, first + bitsPerOctet - 1);
+}
+
+// Reads the bits `low` to `high` behind `cursor`. On an octet border their octets and shifts are constants.
+template <std::uint32_t low, std::uint32_t high>
+[[nodiscard, gnu::always_inline]] constexpr std::uint32_t pieceAt(const std::uint8_t* data, std::uint32_t cursor) {
+    if (!onOctetBorder(cursor)) [[unlikely]] {
+        return bitsAcross(data, cursor + low, cursor + high);
+    }
+    constexpr std::uint32_t firstOctet = low / bitsPerOctet;
+    constexpr std::uint32_t lastOctet = high / bitsPerOctet;
+    constexpr std::uint64_t mask = (std::uint64_t{1} << (high - low + 1)) - 1;
+    const std::uint8_t* const from = data + (cursor - 1) / bitsPerOctet;
+    std::uint64_t gathered = 0;
+    for (std::uint32_t octet = lastOctet + 1; octet-- > firstOctet;) {
+        gathered = gathered << bitsPerOctet | from[octet];
+    }
+    return static_cast<std::uint32_t>(gathered >> (low % bitsPerOctet) & mask);
+}
+
+[[nodiscard, gnu::cold, gnu::noinline]] constexpr std::uint32_t octetsAcross(const std::uint8_t* data, std::uint32_t first, std::uint32_t count) {
+    std::uint32_t value = 0;
+    for (std::uint32_t octet = 0; octet < count; ++octet) {
+        value = value << bitsPerOctet | bitsAscending(data, first + octet * bitsPerOctet, first + octet * bitsPerOctet + bitsPerOctet - 1);
+    }
+    return value;
 }
 
 // Reads `count` octets from bit number `first` on in network order; of more than four the last four stay.
-[[nodiscard]] constexpr std::uint32_t octetsAt(const std::uint8_t* data, std::uint32_t first, std::uint32_t count) {
+[[nodiscard, gnu::always_inline]] constexpr std::uint32_t octetsAt(const std::uint8_t* data, std::uint32_t first, std::uint32_t count) {
+    if (!onOctetBorder(first)) [[unlikely]] {
+        return octetsAcross(data, first, count);
+    }
+    const std::uint8_t* const from = data + (first - 1) / bitsPerOctet;
     std::uint32_t value = 0;
     for (std::uint32_t octet = 0; octet < count; ++octet) {
-        value = value << bitsPerOctet | octetAt(data, first + octet * bitsPerOctet);
+        value = value << bitsPerOctet | from[octet];
     }
     return value;
 }

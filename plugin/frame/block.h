@@ -3,7 +3,6 @@
 #pragma once
 
 #include <cstdint>
-#include <string_view>
 
 #include "frame/reader.h"
 
@@ -12,16 +11,17 @@ namespace netfloor {
 // A block.
 template <class Pass> class [[nodiscard]] Block {
 public:
-    [[gnu::always_inline]] Block(Reader<Pass>& reader, std::string_view name) : at_(reader), outer_(reader.block) {
+    [[gnu::always_inline]] Block(Reader<Pass>& reader, BlockName name) : at_(reader), outer_(reader.block) {
+        at_.block = name;
         if (!at_.over()) {
-            at_.openBlock(name);
+            at_.openBlock();
         }
     }
 
     [[gnu::always_inline]] ~Block() {
+        at_.block = outer_;
         if (!at_.over()) {
             at_.closeBlock();
-            at_.block = outer_;
         }
     }
 
@@ -30,7 +30,7 @@ public:
 
 private:
     Reader<Pass>& at_;
-    std::string_view outer_;
+    BlockName outer_;
 };
 
 // A block with a length of its own: it narrows the limit, has its own live flag, and skips at its end what
@@ -39,15 +39,16 @@ private:
 template <class Pass> class [[nodiscard]] LimitedBlock {
 public:
     // Opens the block; `limit` must follow, once the length is known.
-    [[gnu::always_inline]] LimitedBlock(Reader<Pass>& reader, std::string_view name)
+    [[gnu::always_inline]] LimitedBlock(Reader<Pass>& reader, BlockName name)
         : at_(reader), outer_(reader.block), outerLive_(reader.live) {
-        if (!at_.over() && at_.openBlock(name)) {
+        at_.block = name;
+        if (!at_.over() && at_.openBlock()) {
             at_.live = true;
         }
     }
 
     // Opens the block with a length in bits.
-    [[gnu::always_inline]] LimitedBlock(Reader<Pass>& reader, std::string_view name, std::uint32_t bitCount)
+    [[gnu::always_inline]] LimitedBlock(Reader<Pass>& reader, BlockName name, std::uint32_t bitCount)
         : LimitedBlock(reader, name) {
         limit(bitCount);
     }
@@ -58,7 +59,7 @@ public:
         if (at_.over()) {
             return;
         }
-        at_.advance = static_cast<std::int32_t>(bitCount);
+        at_.advance() = static_cast<std::int32_t>(bitCount);
         if (bitCount > at_.left) {
             outerLive_ = false;
             at_.mark(Mark::limitTooLong);
@@ -69,13 +70,13 @@ public:
     }
 
     [[gnu::always_inline]] ~LimitedBlock() {
+        at_.block = outer_;
         if (at_.over()) {
             return;
         }
         at_.sweep();
         at_.closeBlock();
         at_.popLimit();
-        at_.block = outer_;
         at_.live = outerLive_;
     }
 
@@ -84,7 +85,7 @@ public:
 
 private:
     Reader<Pass>& at_;
-    std::string_view outer_;
+    BlockName outer_;
     bool outerLive_;
 };
 
@@ -96,8 +97,9 @@ public:
     [[gnu::always_inline]] explicit BlockChain(Reader<Pass>& reader) : at_(reader), outer_(reader.block) {}
 
     // Opens the next block, inside the others.
-    [[gnu::always_inline]] void open(std::string_view name) {
-        if (!at_.over() && at_.openBlock(name)) {
+    [[gnu::always_inline]] void open(BlockName name) {
+        at_.block = name;
+        if (!at_.over() && at_.openBlock()) {
             ++blocks_;
         }
     }
@@ -114,7 +116,7 @@ public:
 
 private:
     Reader<Pass>& at_;
-    std::string_view outer_;
+    BlockName outer_;
     std::uint32_t blocks_ = 0;
 };
 

@@ -13,7 +13,11 @@
 
 namespace netfloor {
 
-inline constexpr const ValueNames* noNames = nullptr;
+inline constexpr ValueNames unnamed{};
+inline constexpr const ValueNames* noNames = &unnamed;
+
+// The default of a short text: the value part of the line.
+inline constexpr std::string_view asInLine = "=";
 
 struct Field {
     std::uint32_t id;
@@ -21,11 +25,15 @@ struct Field {
     Place place;
     std::string_view line;             // the display line, with its conversions
     const ValueNames* names = noNames; // what %-S and %-s take
-    std::string_view shortText = {};   // the text of the TO pass, where it is not the value part of the line
+    std::string_view shortText = asInLine; // the text of the TO pass
 
     // The text of the TO pass.
     [[nodiscard]] constexpr std::string_view display() const {
-        return shortText.data() == nullptr ? valuePart(line) : shortText;
+        return shortText == asInLine ? valuePart(line) : shortText;
+    }
+
+    [[nodiscard]] constexpr bool hasNames() const {
+        return !names->rows.empty();
     }
 
     // The name as the tables hold it: without its leading blanks.
@@ -38,7 +46,7 @@ struct Field {
 [[nodiscard]] constexpr bool formatFits(const Field& field, const Format& format) {
     const bool named = format.has(Conversion::name) || format.has(Conversion::briefName);
     const bool manyElements = field.place.isRun() || field.place.count > 1;
-    return format.wellFormed && (!named || field.names != nullptr) &&
+    return format.wellFormed && (!named || field.hasNames()) &&
            (!format.has(Conversion::briefName) || field.names->hasBriefs) &&
            (!format.has(Conversion::list) || (manyElements && format.element != Conversion::none));
 }
@@ -50,7 +58,7 @@ struct Field {
             return false;
         }
     }
-    return !names.rows.empty();
+    return true;
 }
 
 // True where a declaration does not contradict itself: each read of a field asserts it.
@@ -69,7 +77,7 @@ struct Field {
     const Format line = parseFormat(field.line);
     const bool wantsNames = line.has(Conversion::name);
     return formatFits(field, line) && formatFits(field, parseFormat(field.display())) &&
-           wantsNames == (field.names != nullptr) && (field.names == nullptr || namesAscend(*field.names)) &&
+           wantsNames == field.hasNames() && namesAscend(*field.names) &&
            (place.scale == 1 || !place.isRun()) && (place.mostUnits == 0 || place.isRun()) &&
            (place.shape != Shape::ahead || place.advance == 0);
 }

@@ -4,50 +4,95 @@
 
 #include <algorithm>
 #include <array>
-#include <charconv>
 #include <cstddef>
 #include <cstdint>
 #include <cstring>
 #include <string_view>
 
 #include "frame/field.h"
+#include "frame/text.h"
 #include "netfloor/records.h"
 
 namespace netfloor {
 
-// A zero-terminated text of at most 255 characters; what does not fit is dropped.
+// The most characters of one number.
+[[nodiscard]] constexpr std::size_t longestNumber(Conversion conversion, std::uint32_t bitCount) {
+    if (conversion == Conversion::character) {
+        return 1;
+    }
+    return conversion == Conversion::decimal && bitCount <= bitsPerOctet ? 3 : mostDigits;
+}
+
+// A zero-terminated text of at most 255 characters; what does not fit is dropped. Most formats are known to fit,
+// and are built without a test; they may write whole words behind their end.
 class Line {
 public:
     static constexpr std::size_t most = 255;
+    static constexpr std::size_t slack = 128;
 
-    using Buffer = std::array<char, most + 1>;
+    using Buffer = std::array<char, most + 1 + slack>;
 
-    explicit Line(Buffer& buffer) : text_(buffer.data()), end_(text_) {}
+    [[gnu::always_inline]] explicit Line(Buffer& buffer) : text_(buffer.data()), end_(text_) {}
 
-    [[gnu::always_inline]] void append(std::string_view text) {
-        const std::size_t size = std::min(text.size(), room());
-        std::memcpy(end_, text.data(), size);
-        end_ += size;
-    }
-
-    [[gnu::always_inline]] void append(char character) {
-        if (room() > 0) {
-            *end_++ = character;
-        }
-    }
-
-    // Appends a text of known length to a line that is known to have room: the copy has a constant size.
-    template <std::size_t size> [[gnu::always_inline]] void appendFitting(const char* text) {
+    // Appends a text whose length is known where it is written.
+    template <std::size_t size> [[gnu::always_inline]] void appendLiteral(const char* text) {
         std::memcpy(end_, text, size);
         end_ += size;
     }
 
-    [[nodiscard]] constexpr std::size_t room() const {
-        return most - static_cast<std::size_t>(end_ - text_);
+    // Appends a number as a conversion shows it. A zero octet adds no character, as it would end the text.
+    template <Conversion conversion, std::uint32_t bitCount> [[gnu::always_inline]] void appendNumber(std::uint32_t value) {
+        if constexpr (conversion == Conversion::character) {
+            *end_ = static_cast<char>(value);
+            end_ += *end_ == '\0' ? 0 : 1;
+        } else if constexpr (conversion == Conversion::hexadecimal) {
+            end_ = writeHexadecimal(end_, value);
+        } else if constexpr (bitCount <= bitsPerOctet) {
+            const OctetText& octet = octetTexts[value & 0xff];
+            std::memcpy(end_, octet.text.data(), octet.text.size());
+            end_ += octet.size;
+        } else {
+            end_ = writeDecimal(end_, value);
+        }
     }
 
+    // Appends the name of a value; a name that is a format is filled with the value.
+    template <const ValueNames& names, bool brief> [[gnu::always_inline]] void appendName(std::uint32_t value) {
+        static constexpr Format otherwise = parseFormat(otherName(names, brief));
+        static_assert(otherwise.wellFormed && otherwise.conversions <= 1, "the name of other values takes one number at most");
+        const std::uint32_t row = rowNumber<names>(value);
+        if constexpr (otherwise.conversions == 1) {
+            if (row == 0) {
+                appendLiteral<otherwise.literal[0].size()>(otherwise.literal[0].data());
+                appendNumber<otherwise.conversion[0], 32>(value);
+                appendLiteral<otherwise.literal[1].size()>(otherwise.literal[1].data());
+                return;
+            }
+        }
+        const auto& name = nameTexts<names, brief>[row];
+        std::memcpy(end_, name.text.data(), name.text.size());
+        end_ += name.length;
+    }
+
+    // Appends the elements of a field; stops at the end of the buffer.
+    template <Conversion conversion, std::uint32_t bitCount>
+    [[gnu::always_inline]] void appendElements(const BitRange* ranges, std::uint32_t count, std::string_view separator) {
+        for (std::uint32_t element = 0; element < count && !full(); ++element) {
+            if (element > 0) {
+                std::memcpy(end_, separator.data(), separator.size());
+                end_ += separator.size();
+            }
+            appendNumber<conversion, bitCount>(ranges[element].value);
+        }
+    }
+
+    [[nodiscard, gnu::always_inline]] bool full() const {
+        return end_ > text_ + most;
+    }
+
+    // Ends the text, and gives it.
     [[gnu::always_inline]] const char* terminated() {
-        *end_ = '\0';
+        text_[std::min<std::size_t>(static_cast<std::size_t>(end_ - text_), most)] = '\0';
         return text_;
     }
 
@@ -56,87 +101,31 @@ private:
     char* end_; // the line itself lives in registers, the text in the buffer
 };
 
-// The decimal digits of every octet, for addresses.
-struct OctetDigits {
-    std::array<char, 3> digits;
-    std::uint8_t size;
-};
-
-inline constexpr auto octetDigits = [] {
-    std::array<OctetDigits, 256> table{};
-    for (unsigned value = 0; value < table.size(); ++value) {
-        OctetDigits& entry = table[value];
-        entry.size = value >= 100 ? 3 : value >= 10 ? 2 : 1;
-        for (unsigned rest = value, place = entry.size; place-- > 0; rest /= 10) {
-            entry.digits[place] = static_cast<char>('0' + rest % 10);
-        }
-    }
-    return table;
-}();
-
-// Appends one number as a conversion shows it.
-template <Conversion conversion> [[gnu::always_inline]] inline void appendNumber(Line& line, std::uint32_t value) {
-    if constexpr (conversion == Conversion::character) {
-        // A zero octet adds nothing, as it would end the text.
-        if (const char character = static_cast<char>(value); character != '\0') {
-            line.append(character);
-        }
-    } else {
-        if (conversion == Conversion::decimal && value < octetDigits.size()) {
-            const OctetDigits& entry = octetDigits[value];
-            line.append(std::string_view(entry.digits.data(), entry.size));
-            return;
-        }
-        constexpr int base = conversion == Conversion::decimal ? 10 : 16;
-        std::array<char, 10> digits; // NOLINT(cppcoreguidelines-pro-type-member-init): to_chars fills what is used
-        const std::to_chars_result end = std::to_chars(digits.data(), digits.data() + digits.size(), value, base);
-        line.append(std::string_view(digits.data(), static_cast<std::size_t>(end.ptr - digits.data())));
-    }
-}
-
-// Appends the name of a value; a name that is a format is filled with the value.
-template <const ValueNames& names, bool brief> [[gnu::always_inline]] inline void appendName(Line& line, std::uint32_t value) {
-    if (const ValueName* row = rowOf<names>(value)) {
-        line.append(brief ? row->brief : row->text);
-        return;
-    }
-    static constexpr Format otherwise = parseFormat(brief ? names.otherwiseBrief : names.otherwise);
-    static_assert(otherwise.wellFormed && otherwise.conversions <= 1, "the name of other values takes one number at most");
-    line.append(otherwise.literal[0]);
-    if constexpr (otherwise.conversions == 1) {
-        appendNumber<otherwise.conversion[0]>(line, value);
-        line.append(otherwise.literal[1]);
-    }
-}
-
 template <const Field& field, const Format& format, std::size_t index>
-[[gnu::always_inline]] inline void appendConversion(Line& line, const FieldRecord& record) {
+[[gnu::always_inline]] inline void appendConversion(Line& line, std::uint32_t value, const FieldRecord& record) {
     constexpr Conversion conversion = format.conversion[index];
     if constexpr (conversion == Conversion::name || conversion == Conversion::briefName) {
-        appendName<*field.names, conversion == Conversion::briefName>(line, record.value);
+        line.appendName<*field.names, conversion == Conversion::briefName>(value);
     } else if constexpr (conversion == Conversion::list) {
-        for (std::uint32_t element = 0; element < record.rangeCount; ++element) {
-            if (element > 0) {
-                line.append(format.separator);
-            }
-            appendNumber<format.element>(line, record.ranges[element].value);
-        }
+        line.appendElements<format.element, field.place.elementBits()>(
+            record.ranges, field.place.isRun() ? record.rangeCount : field.place.elements(field.place.count), format.separator);
     } else {
-        appendNumber<conversion>(line, record.value);
+        line.appendNumber<conversion, field.place.isRun() ? 32 : field.place.width() * field.place.scale>(value);
     }
 }
 
-// Builds the text of a field from its record. The first text of a format always has room.
-template <const Field& field, const Format& format> [[gnu::always_inline]] inline void fill(Line& line, const FieldRecord& record) {
+// Builds the text of a field. Behind the elements of a run there may be no room for more.
+template <const Field& field, const Format& format>
+[[gnu::always_inline]] inline void fill(Line& line, std::uint32_t value, const FieldRecord& record) {
     static_assert(format.literal[0].size() <= Line::most, "a field's name fills no line");
-    line.appendFitting<format.literal[0].size()>(format.literal[0].data());
+    line.appendLiteral<format.literal[0].size()>(format.literal[0].data());
     if constexpr (format.conversions > 0) {
-        appendConversion<field, format, 0>(line, record);
-        line.append(format.literal[1]);
+        appendConversion<field, format, 0>(line, value, record);
+        line.appendLiteral<format.literal[1].size()>(format.literal[1].data());
     }
     if constexpr (format.conversions > 1) {
-        appendConversion<field, format, 1>(line, record);
-        line.append(format.literal[2]);
+        appendConversion<field, format, 1>(line, value, record);
+        line.appendLiteral<format.literal[2].size()>(format.literal[2].data());
     }
 }
 

@@ -45,6 +45,7 @@ template <class Grammar, std::uint32_t mode> struct PreDecodePass {
     static constexpr bool reports = mode != NETFLOOR_MODE_MV; // hands each field to the host
 
     static inline constinit Variables variables{};
+    static inline constinit LastRead last{};
     static inline constinit std::uint32_t savedDecoderId = 0;
 
     static constexpr bool raises(Mark found) {
@@ -93,7 +94,7 @@ template <class Grammar, std::uint32_t mode> struct PreDecodePass {
 template <class Grammar> struct MdPass : PreDecodePass<Grammar, NETFLOOR_MODE_MD> {
     static inline constinit Line::Buffer buffer{};
 
-    template <const Field& field> [[gnu::always_inline]] static void output(Reader<MdPass>& at, std::uint32_t, std::uint32_t) {
+    template <const Field& field> [[gnu::always_inline]] static void output(Reader<MdPass>& at, std::uint32_t value) {
         static constexpr Format format = parseFormat(field.line);
         const FieldRecord& record = at.state->fieldRecord;
         std::uint8_t* const decoded = at.context->fieldRecords + at.context->fieldRecordCount * decodedFieldOctets;
@@ -103,7 +104,7 @@ template <class Grammar> struct MdPass : PreDecodePass<Grammar, NETFLOOR_MODE_MD
             decoded[2] = 0;
         }
         Line line(buffer);
-        fill<field, format>(line, record);
+        fill<field, format>(line, value, record);
         hs_AddDecodedFieldsData(at.context, record.outputRangeCount, record.ranges, line.terminated(), 0, record.fieldName,
                                 field.id, 0, at.bitOrder);
     }
@@ -113,10 +114,10 @@ template <class Grammar> struct MdPass : PreDecodePass<Grammar, NETFLOOR_MODE_MD
 template <class Grammar> struct ToPass : PreDecodePass<Grammar, NETFLOOR_MODE_TO> {
     static inline constinit Line::Buffer buffer{};
 
-    template <const Field& field> [[gnu::always_inline]] static void output(Reader<ToPass>& at, std::uint32_t, std::uint32_t) {
+    template <const Field& field> [[gnu::always_inline]] static void output(Reader<ToPass>& at, std::uint32_t value) {
         static constexpr Format format = parseFormat(field.display());
         Line line(buffer);
-        fill<field, format>(line, at.state->fieldRecord);
+        fill<field, format>(line, value, at.state->fieldRecord);
         hs_AddFieldsToDisplayData(at.context, line.terminated(), Grammar::template displayId<field>);
     }
 };
@@ -136,6 +137,7 @@ template <class Grammar> struct XtrPass {
     static constexpr bool reports = false;
 
     static inline constinit Variables variables{};
+    static inline constinit LastRead last{};
     static inline constinit std::int32_t keyFieldStatus = 0;
     static inline constinit std::uint16_t presenceRow = 0;
 

@@ -91,6 +91,18 @@ struct Place {
         }
     }
 
+    // The most bits of one element.
+    [[nodiscard]] constexpr std::uint32_t elementBits() const {
+        if (!isPieces()) {
+            return shape == Shape::addressNibbles ? nibbleBits : unitBits();
+        }
+        std::uint32_t most = 0;
+        for (std::uint32_t i = 0; i < count; ++i) {
+            most = std::max(most, pieces[i].width());
+        }
+        return most;
+    }
+
     // The bits of the field's value, without the gaps between its pieces; 0 for a run.
     [[nodiscard]] constexpr std::uint32_t width() const {
         if (!isPieces()) {

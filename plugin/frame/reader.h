@@ -13,9 +13,9 @@
 // line on a copy.
 #pragma once
 
+#include <cstddef>
 #include <cstdint>
 #include <cstring>
-#include <string_view>
 #include <type_traits>
 
 #include "frame/field.h"
@@ -40,14 +40,27 @@ enum class Outcome : std::uint8_t {
     cutOff,  // storage ran out, or the host refused
 };
 
+// The name of a block: a literal, whose length is known where it is written.
+struct BlockName {
+    const char* text = nullptr;
+    std::size_t size = 0;
+
+    BlockName() = default;
+    template <std::size_t octets> consteval BlockName(const char (&literal)[octets]) : text(literal), size(octets - 1) {}
+
+    // Copies the name and its terminating zero.
+    [[gnu::always_inline]] void copyTo(char* buffer) const {
+        std::memcpy(buffer, text, size + 1);
+    }
+};
+
 // Writes a field that was read at `cursor` into the field record.
 using RecordWriter = void (*)(FieldRecord& record, const std::uint8_t* data, std::uint32_t cursor, std::uint32_t units);
 
 template <const Field& field>
 void writeRecord(FieldRecord& record, const std::uint8_t* data, std::uint32_t cursor, std::uint32_t units) {
     beginRecord<field>(record);
-    writeElements<field>(record, data, cursor, units);
-    record.fieldId = field.id;
+    writeElements<field>(record, data, cursor, field.place.isRun() ? units : field.place.count);
 }
 
 // The passes that report nothing write the field record only where the host can look at it. Till then they
@@ -55,9 +68,9 @@ void writeRecord(FieldRecord& record, const std::uint8_t* data, std::uint32_t cu
 struct LastRead {
     RecordWriter writer = nullptr; // of the last field; null: the record is up to date
     std::uint32_t cursor = 0;      // where that field lies
-    std::uint32_t units = 0;
-    std::uint32_t seenFirst = 0; // first bit of a look ahead behind that field; 0: there was none
-    std::uint32_t seenPieces = 0;
+    std::uint32_t units = 0;      // of a run
+    std::uint32_t seenPieces = 0; // pieces of a look ahead behind that field; 0: there was none
+    std::uint32_t seenFirst = 0;
     std::uint32_t seenWidth = 0;
 };
 
@@ -70,25 +83,34 @@ public:
     std::uint8_t* data;
     std::uint32_t cursor;
     std::uint32_t left;
-    std::int32_t advance;
-    std::uint32_t rangeCapacity;
     std::uint32_t blockDepth;
     std::uint32_t limitDepth;
-    bool condition;
     bool live = true;
     Outcome outcome = Outcome::on;
     bool unchecked = false; // a flag was set that the verdict has not taken in yet
     std::uint32_t bitOrder = 0;
-    std::string_view block = {}; // name of the innermost open block
-    std::string_view shown = {}; // the name that `blockName` holds, or is to hold
-    LastRead last = {};
+    BlockName block = {}; // name of the innermost open block
+    BlockName shown = {}; // the name that `blockName` is to hold, in the passes that report nothing
 
-    explicit Reader(Context& passContext) : context(&passContext), state(passContext.decodeState) {
+    [[gnu::always_inline]] explicit Reader(Context& passContext) : context(&passContext), state(passContext.decodeState) {
         takeState();
     }
 
-    static typename Pass::Variables& variables() {
+    [[gnu::always_inline]] static typename Pass::Variables& variables() {
         return Pass::variables;
+    }
+
+    // The last condition of the grammar, and the bits of its last step. They live in the state.
+    [[nodiscard, gnu::always_inline]] std::uint8_t& condition() {
+        return state->condition;
+    }
+
+    [[nodiscard, gnu::always_inline]] std::int32_t& advance() {
+        return state->advance;
+    }
+
+    [[gnu::always_inline]] static LastRead& last() {
+        return Pass::last;
     }
 
     // Raises a mark, if the pass does.
@@ -120,33 +142,24 @@ public:
         outcome = how;
     }
 
-    // Ends the run for want of storage.
-    void cutOff(std::uint32_t flag) {
-        state->flags |= flag;
-        end(Outcome::cutOff);
-    }
-
     // Takes over what the state says: at the entry, and behind a hand-off.
-    void takeState() {
+    [[gnu::always_inline]] void takeState() {
         data = state->data;
         cursor = state->cursor;
         left = state->bitsLeft;
-        advance = state->advance;
-        condition = state->condition != 0;
-        rangeCapacity = state->fieldRecord.rangeCapacity;
         blockDepth = static_cast<std::uint32_t>(state->blockStarts.top - state->blockStarts.base);
         limitDepth = static_cast<std::uint32_t>(state->limits.top - state->limits.base);
         shown = {};
-        last = {};
+        last().writer = nullptr;
+        last().seenPieces = 0;
         unchecked = state->flags != 0;
     }
 
     // Gives the state all that the reader holds: wherever the host can look.
     [[gnu::always_inline]] void giveState() {
         writeLastRead();
-        if (!Pass::reports && shown.data() != nullptr) {
-            std::memcpy(state->blockName, shown.data(), shown.size());
-            state->blockName[shown.size()] = '\0';
+        if (!Pass::reports && shown.text != nullptr) {
+            shown.copyTo(state->blockName);
         }
         state->blockStarts.top = state->blockStarts.base + blockDepth;
         state->limits.top = state->limits.base + limitDepth;
@@ -156,20 +169,22 @@ public:
     [[gnu::always_inline]] void givePosition() {
         state->cursor = cursor;
         state->bitsLeft = left;
-        state->advance = advance;
-        state->condition = condition;
     }
 
     // Brings the field record up to date: before the packet's working copy or the record changes.
     [[gnu::always_inline]] void writeLastRead() {
-        FieldRecord& record = state->fieldRecord;
-        if (last.writer != nullptr) {
-            last.writer(record, data, last.cursor, last.units);
+        if (Pass::reports) {
+            return;
         }
-        if (last.seenFirst != 0) {
-            writeSeen(last.seenFirst, last.seenPieces, last.seenWidth);
+        const LastRead& read = last();
+        if (read.writer != nullptr) {
+            read.writer(state->fieldRecord, data, read.cursor, read.units);
         }
-        last = {};
+        if (read.seenPieces != 0) {
+            writeSeen(read.seenFirst, read.seenPieces, read.seenWidth);
+        }
+        last().writer = nullptr;
+        last().seenPieces = 0;
     }
 
     // What a look ahead leaves in the field record: value and elements, under the name of the field before.
@@ -190,19 +205,15 @@ public:
 
     // Names the innermost open block in `blockName`.
     [[gnu::always_inline]] void showBlock() {
-        if (shown.data() == block.data() && shown.data() != nullptr) {
-            return;
-        }
-        shown = block;
         if (Pass::reports) {
-            std::memcpy(state->blockName, block.data(), block.size());
-            state->blockName[block.size()] = '\0';
+            block.copyTo(state->blockName);
+        } else {
+            shown = block;
         }
     }
 
-    // Makes the reader's block the innermost one. False when the stack cannot grow.
-    [[gnu::always_inline]] bool openBlock(std::string_view name) {
-        block = name;
+    // Opens the block that `block` names. False when the stack cannot grow.
+    [[gnu::always_inline]] bool openBlock() {
         showBlock();
         if (!push(state->blockStarts, blockDepth, cursor)) {
             return false;
@@ -242,13 +253,16 @@ public:
 
     // Makes room for so many elements. False when the ranges cannot grow.
     [[gnu::always_inline]] bool roomFor(std::uint32_t elements) {
-        if (elements < rangeCapacity) [[likely]] {
+        if (elements < state->fieldRecord.rangeCapacity) [[likely]] {
             return true;
         }
+        // Growth works on a copy, so that the reader itself can stay in registers.
         Reader copy = *this;
-        copy.growRanges(elements);
-        *this = copy;
-        return !over();
+        if (!copy.growRanges(elements)) {
+            end(Outcome::cutOff);
+            return false;
+        }
+        return true;
     }
 
 private:
@@ -259,11 +273,9 @@ private:
             ++stack.top;
         }
         if (depth >= stack.capacity) [[unlikely]] {
-            // Growth works on a copy, so that the reader itself can stay in registers.
             Reader copy = *this;
-            copy.growStack(stack);
-            *this = copy;
-            if (over()) {
+            if (!copy.growStack(stack)) {
+                end(Outcome::cutOff);
                 return false;
             }
         }
@@ -271,30 +283,33 @@ private:
         return true;
     }
 
-    [[gnu::cold, gnu::noinline]] void growStack(BitStack& stack) {
+    [[gnu::cold, gnu::noinline]] bool growStack(BitStack& stack) {
         giveState();
         while (stack.count >= stack.capacity) {
             const std::uint32_t capacity = stack.capacity * 2;
             void* const grown = capacity == 0 ? nullptr : hs_Realloc(stack.base, capacity * sizeof *stack.base);
             if (grown == nullptr) {
-                return cutOff(NETFLOOR_FLAG_NO_STACK);
+                state->flags |= NETFLOOR_FLAG_NO_STACK;
+                return false;
             }
             stack.base = static_cast<std::uint32_t*>(grown);
             stack.top = stack.base + stack.count;
             stack.capacity = capacity;
         }
+        return true;
     }
 
-    [[gnu::cold, gnu::noinline]] void growRanges(std::uint32_t elements) {
+    [[gnu::cold, gnu::noinline]] bool growRanges(std::uint32_t elements) {
         giveState();
         FieldRecord& record = state->fieldRecord;
         void* const grown = hs_Realloc(record.ranges, elements * sizeof *record.ranges);
         if (grown == nullptr) {
-            return cutOff(NETFLOOR_FLAG_NO_RANGES);
+            state->flags |= NETFLOOR_FLAG_NO_RANGES;
+            return false;
         }
         record.ranges = static_cast<BitRange*>(grown);
         record.rangeCapacity = elements;
-        rangeCapacity = elements;
+        return true;
     }
 };
 

@@ -4,6 +4,7 @@
 
 #include <cstdint>
 #include <cstring>
+#include <utility>
 
 #include "frame/bits.h"
 #include "frame/field.h"
@@ -11,17 +12,28 @@
 
 namespace netfloor {
 
+// Calls `visit` with the number of each piece, as a constant.
+template <std::uint32_t count, class Visit> [[gnu::always_inline]] inline void forEachPiece(Visit visit) {
+    [&]<std::size_t... i>(std::index_sequence<i...>) __attribute__((always_inline)) {
+        (visit.template operator()<i>(), ...);
+    }(std::make_index_sequence<count>{});
+}
+
+// A value with a further piece of so many bits behind it.
+[[nodiscard, gnu::always_inline]] constexpr std::uint32_t joined(std::uint32_t value, std::uint32_t piece, std::uint32_t width) {
+    return width == 32 ? piece : value << width | piece;
+}
+
 // The value of a field that lies at `cursor`, before it is scaled.
 template <const Field& field>
 [[nodiscard, gnu::always_inline]] inline std::uint32_t valueAt(const std::uint8_t* data, std::uint32_t cursor, std::uint32_t units) {
     constexpr const Place& place = field.place;
     std::uint32_t value = 0;
     if constexpr (place.isPieces()) {
-        for (std::uint32_t i = 0; i < place.count; ++i) {
-            constexpr auto pieces = place.pieces;
-            const std::uint32_t element = bits(data, cursor + pieces[i].low, cursor + pieces[i].high);
-            value = i == 0 ? element : value << pieces[i].width() | element;
-        }
+        forEachPiece<place.count>([&]<std::uint32_t i>() __attribute__((always_inline)) {
+            constexpr Piece piece = place.pieces[i];
+            value = joined(value, pieceAt<piece.low, piece.high>(data, cursor), piece.width());
+        });
     } else if constexpr (place.shape == Shape::octets) {
         value = octetsAt(data, cursor, place.isRun() ? units : place.count);
     } else if constexpr (place.shape == Shape::octetsBackward) {
@@ -32,18 +44,19 @@ template <const Field& field>
     return value;
 }
 
-// Writes the elements and the value of a field that lies at `cursor`. There is room for the elements.
+// Writes the elements and the value of a field that lies at `cursor`, and its id. There is room for the
+// elements. Gives the value.
 template <const Field& field>
-[[gnu::always_inline]] inline void writeElements(FieldRecord& record, const std::uint8_t* data, std::uint32_t cursor, std::uint32_t units) {
+[[gnu::always_inline]] inline std::uint32_t writeElements(FieldRecord& record, const std::uint8_t* data, std::uint32_t cursor, std::uint32_t units) {
     constexpr const Place& place = field.place;
     BitRange* const ranges = record.ranges;
     std::uint32_t value = 0;
-    const auto element = [&](std::uint32_t index, std::uint32_t first, std::uint32_t last) {
+    const auto element = [&](std::uint32_t index, std::uint32_t first, std::uint32_t last) __attribute__((always_inline)) {
         ranges[index].firstBit = first;
         ranges[index].lastBit = last;
         return ranges[index].value = bits(data, first, last);
     };
-    const auto octet = [&](std::uint32_t index, std::uint32_t first) {
+    const auto octet = [&](std::uint32_t index, std::uint32_t first) __attribute__((always_inline)) {
         ranges[index].firstBit = first;
         ranges[index].lastBit = first + bitsPerOctet - 1;
         ranges[index].value = octetAt(data, first);
@@ -53,12 +66,14 @@ template <const Field& field>
     std::uint32_t outputElements = elements;
 
     if constexpr (place.shape == Shape::pieces) {
-        constexpr auto pieces = place.pieces;
-        for (std::uint32_t i = 0; i < place.count; ++i) {
-            const std::uint32_t read = element(i, cursor + pieces[i].low, cursor + pieces[i].high);
+        forEachPiece<place.count>([&]<std::uint32_t i>() __attribute__((always_inline)) {
+            constexpr Piece piece = place.pieces[i];
+            ranges[i].firstBit = cursor + piece.low;
+            ranges[i].lastBit = cursor + piece.high;
+            ranges[i].value = pieceAt<piece.low, piece.high>(data, cursor);
             ranges[i].flagWord = 0;
-            value = i == 0 ? read : value << pieces[i].width() | read;
-        }
+            value = joined(value, ranges[i].value, piece.width());
+        });
     } else if constexpr (place.shape == Shape::octets) {
         for (std::uint32_t i = 0; i < (place.isRun() ? units : place.count); ++i) {
             octet(i, cursor + i * bitsPerOctet);
@@ -97,14 +112,16 @@ template <const Field& field>
             value = value << nibbleBits | element(i, first, first + nibbleBits - 1);
         }
     } else {
-        constexpr Piece piece = place.pieces[0];
-        value = bits(data, cursor + piece.low, cursor + piece.high);
+        value = valueAt<field>(data, cursor, units);
         elements = 0;
         outputElements = 0;
     }
-    record.value = value * place.scale;
+    value *= place.scale;
+    record.value = value;
     record.rangeCount = elements;
     record.outputRangeCount = outputElements;
+    record.fieldId = field.id;
+    return value;
 }
 
 // Resets the record for a field and gives it the field's name.

@@ -21,6 +21,8 @@ template <class Store> [[gnu::always_inline]] inline void store(Store& into, std
     }
 }
 
+template <const Field& field> inline constexpr std::uint32_t neededBits = field.place.needs(field.place.count);
+
 // The step of a field of `units` units; see `read` and `readRun`.
 template <const Field& field, class Pass, class Store>
 [[gnu::always_inline]] inline void step(Reader<Pass>& at, std::uint32_t units, Store into) {
@@ -29,11 +31,14 @@ template <const Field& field, class Pass, class Store>
     if (!at.live) {
         return;
     }
-    at.condition = at.left >= place.needs(units);
-    if (!at.condition) {
+    const std::uint32_t needs = place.isRun() ? place.needs(units) : neededBits<field>;
+    const std::uint32_t moves = place.isRun() ? place.moves(units) : place.advance;
+    if (at.left < needs) {
+        at.condition() = 0;
         at.live = false;
         return;
     }
+    at.condition() = 1;
     at.showBlock();
     if constexpr (Pass::reports) {
         beginRecord<field>(at.state->fieldRecord);
@@ -45,18 +50,22 @@ template <const Field& field, class Pass, class Store>
     if constexpr (!std::is_same_v<Store, Unstored>) {
         store(into, valueAt<field>(at.data, start, units));
     }
-    at.advance = static_cast<std::int32_t>(place.moves(units));
-    at.left -= place.moves(units);
-    at.cursor += place.moves(units);
+    at.advance() = static_cast<std::int32_t>(moves);
+    at.left -= moves;
+    at.cursor += moves;
     if constexpr (Pass::reports) {
-        FieldRecord& record = at.state->fieldRecord;
-        writeElements<field>(record, at.data, start, units);
-        record.fieldId = field.id;
+        const std::uint32_t value = writeElements<field>(at.state->fieldRecord, at.data, start, units);
         at.givePosition();
+        Pass::template output<field>(at, value);
     } else {
-        at.last = {.writer = writeRecord<field>, .cursor = start, .units = units};
+        at.last().writer = writeRecord<field>;
+        at.last().cursor = start;
+        if constexpr (place.isRun()) {
+            at.last().units = units;
+        }
+        at.last().seenPieces = 0;
+        Pass::template output<field>(at, start, units);
     }
-    Pass::template output<field>(at, start, units);
 }
 
 // Reads a field of fixed size. `into` takes its value: a pointer to a variable, or a function of the value.
@@ -96,9 +105,9 @@ template <class Pass> [[gnu::always_inline]] inline std::optional<std::uint32_t>
     if constexpr (Pass::reports) {
         return at.writeSeen(first, place.count, width);
     }
-    at.last.seenFirst = first;
-    at.last.seenPieces = place.count;
-    at.last.seenWidth = width;
+    at.last().seenFirst = first;
+    at.last().seenPieces = place.count;
+    at.last().seenWidth = width;
     return whole ? octetsAt(at.data, first, place.count) : bits(at.data, first, first + width - 1);
 }
 
@@ -107,7 +116,7 @@ template <class Pass> [[gnu::always_inline]] inline void stepBack(Reader<Pass>& 
     if (at.over()) {
         return;
     }
-    at.advance = -static_cast<std::int32_t>(bitCount);
+    at.advance() = -static_cast<std::int32_t>(bitCount);
     if (!at.live || at.cursor < bitCount) {
         at.live = false;
         return;

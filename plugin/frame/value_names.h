@@ -54,21 +54,20 @@ inline constexpr std::uint32_t directIndexMost = 8191;
 
 template <const ValueNames& names> inline constexpr auto valueIndex = directIndex<indexedValues(names)>(names);
 
-// The row that names `value`, or null.
-template <const ValueNames& names> [[nodiscard]] constexpr const ValueName* rowOf(std::uint32_t value) {
+// The number, from 1, of the row that names `value`; 0 where none does.
+template <const ValueNames& names> [[nodiscard, gnu::always_inline]] constexpr std::uint32_t rowNumber(std::uint32_t value) {
     constexpr std::size_t indexed = indexedValues(names);
     if (value < indexed) {
-        const std::uint16_t row = valueIndex<names>[value];
-        return row == 0 ? nullptr : &names.rows[row - 1u];
+        return valueIndex<names>[value];
     }
     if constexpr (names.rows.back().to >= indexed) {
-        for (const ValueName& row : names.rows) {
-            if (value >= row.from && value <= row.to) {
-                return &row;
+        for (std::uint32_t row = 0; row < names.rows.size(); ++row) {
+            if (value >= names.rows[row].from && value <= names.rows[row].to) {
+                return row + 1;
             }
         }
     }
-    return nullptr;
+    return 0;
 }
 
 } // namespace netfloor

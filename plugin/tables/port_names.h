@@ -10,7 +10,7 @@
 namespace netfloor {
 
 // clang-format off
-inline constexpr std::array portNameRows = {
+inline constexpr std::array<ValueName, 291> portNameRows = {{
     ValueName{1, "TCP Port Service Multiplexer", "TCPMUX"},
     ValueName{2, "Management Utility", "MNGT-UTIL"},
     ValueName{3, "Compression Process", "CMPRS-PRCS"},
@@ -302,7 +302,7 @@ inline constexpr std::array portNameRows = {
     ValueName{2152, "GTP-U", "GTP-U"},
     ValueName{3386, "GTP", "GTP"},
     ValueName{8002, "Torvane BTS O&M", "O&M"},
-};
+}};
 // clang-format on
 
 // A port without a row shows its number, and in short nothing.

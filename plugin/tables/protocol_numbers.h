@@ -9,7 +9,7 @@
 namespace netfloor {
 
 // clang-format off
-inline constexpr std::array protocolNameRows = {
+inline constexpr std::array<ValueName, 139> protocolNameRows = {{
     ValueName{0, "HOPOPT"},
     ValueName{1, "ICMP"},
     ValueName{2, "IGMP"},
@@ -149,7 +149,7 @@ inline constexpr std::array protocolNameRows = {
     ValueName{136, "UDPLite"},
     ValueName{137, "MPLS-in-IP"},
     ValueName{138, 252, "Unassigned"},
-};
+}};
 // clang-format on
 
 inline constexpr ValueNames protocolNames = {protocolNameRows};

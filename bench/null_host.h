@@ -1,0 +1,34 @@
+// SPDX-License-Identifier: MIT
+// The null host: the seven operations of a host, doing nothing, so that what is measured is the plug-in.
+//
+// The library stands in front of the reference host's libraries in the link order of the benchmark, so that its
+// operations are the ones that a plug-in finds when it is loaded.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+
+namespace netfloor::bench {
+
+// How the null host lays out key records: a bit for each row that tells whether it is present, then a place of
+// four octets for each row, then the area for values stored as octets.
+inline constexpr std::size_t keyRowCount = 113;
+inline constexpr std::size_t presenceOctets = 16;
+inline constexpr std::size_t keyPlaceOctets = 4;
+inline constexpr std::size_t byteAreaOffset = presenceOctets + keyRowCount * keyPlaceOctets;
+inline constexpr std::size_t byteAreaSize = 64; // for one value
+inline constexpr std::size_t keyRecordOctets = byteAreaOffset + 16 * byteAreaSize;
+
+constexpr std::size_t presencePlace(std::size_t row) {
+    return row / 8;
+}
+
+constexpr std::uint8_t presenceMask(std::size_t row) {
+    return static_cast<std::uint8_t>(1u << row % 8);
+}
+
+constexpr std::size_t valuePlace(std::size_t row) {
+    return presenceOctets + row * keyPlaceOctets;
+}
+
+} // namespace netfloor::bench

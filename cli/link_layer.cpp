@@ -1,0 +1,258 @@
+// SPDX-License-Identifier: MIT
+#include "link_layer.h"
+
+#include <algorithm>
+#include <array>
+#include <cstdio>
+#include <optional>
+#include <string_view>
+
+#include <pcap/dlt.h>
+#include <pcap/pcap.h>
+
+namespace netfloor::cli {
+
+namespace {
+
+constexpr std::uint16_t etherTypeIpv4 = 0x0800;
+constexpr std::uint16_t etherTypeIpv6 = 0x86dd;
+constexpr std::uint16_t etherTypePppSession = 0x8864;
+constexpr std::uint16_t leastEtherType = 0x0600; // smaller numbers are lengths (IEEE 802.3)
+constexpr std::uint16_t pppIpv4 = 0x0021;
+constexpr std::uint16_t pppIpv6 = 0x0057;
+
+struct NumberName {
+    std::uint16_t number;
+    std::string_view name;
+};
+
+constexpr std::array etherTypeNames = {
+    NumberName{0x0806, "ARP"},
+    NumberName{0x8035, "RARP"},
+    NumberName{0x809b, "AppleTalk"},
+    NumberName{0x80f3, "AppleTalk ARP"},
+    NumberName{0x8137, "IPX"},
+    NumberName{0x8808, "Ethernet flow control"},
+    NumberName{0x8809, "slow protocol"},
+    NumberName{0x8847, "MPLS"},
+    NumberName{0x8848, "MPLS multicast"},
+    NumberName{0x8863, "PPPoE discovery"},
+    NumberName{0x888e, "802.1X"},
+    NumberName{0x8892, "PROFINET"},
+    NumberName{0x88cc, "LLDP"},
+    NumberName{0x88e5, "MACsec"},
+    NumberName{0x88f7, "PTP"},
+    NumberName{0x8902, "802.1ag"},
+    NumberName{0x9000, "loopback test"},
+};
+
+constexpr std::array pppNames = {
+    NumberName{0x8021, "PPP IPCP"}, NumberName{0x8057, "PPP IPv6CP"},     NumberName{0x80fd, "PPP CCP"},
+    NumberName{0xc021, "PPP LCP"},  NumberName{0xc023, "PPP PAP"},        NumberName{0xc025, "PPP LQR"},
+    NumberName{0xc223, "PPP CHAP"}, NumberName{0x00fd, "PPP compressed"}, NumberName{0x8281, "PPP MPLSCP"},
+};
+
+template <std::size_t count>
+std::string nameOf(const std::array<NumberName, count> &names, std::uint16_t number, const char *kind) {
+    const auto *const found =
+        std::find_if(names.begin(), names.end(), [number](const NumberName &row) { return row.number == number; });
+    if (found != names.end()) {
+        return std::string(found->name);
+    }
+    std::array<char, 32> text{};
+    std::snprintf(text.data(), text.size(), "%s 0x%04x", kind, number);
+    return text.data();
+}
+
+// Goes over the headers in front of the IP header, one step for each kind of header.
+class LinkWalk {
+public:
+    explicit LinkWalk(std::span<const std::uint8_t> packet) : packet_(packet) {}
+
+    NetworkPart ethernet() {
+        if (!has(14)) {
+            return tooShort("Ethernet");
+        }
+        skip(12);
+        return etherType();
+    }
+
+    // Octet 14 of the cooked header, or octet 0 of its second version, holds the EtherType.
+    NetworkPart cooked(std::size_t typeAt, std::size_t headerOctets) {
+        if (!has(headerOctets)) {
+            return tooShort("Linux cooked");
+        }
+        const std::uint16_t type = u16(typeAt);
+        skip(headerOctets);
+        return behindEtherType(type);
+    }
+
+    // The address family of the capturing system, in its own byte order or, for `networkOrder`, in network order.
+    NetworkPart addressFamily(bool networkOrder) {
+        if (!has(4)) {
+            return tooShort("loopback");
+        }
+        const std::uint32_t asWritten = std::uint32_t{u16(0)} << 16U | u16(2);
+        const std::uint32_t reversed = __builtin_bswap32(asWritten);
+        skip(4);
+        // A family is a small number, which tells the order.
+        const std::uint32_t family = networkOrder || asWritten < 0x10000 ? asWritten : reversed;
+        // 10 Linux, 24 NetBSD and OpenBSD, 28 FreeBSD, 30 macOS, 23 Windows: AF_INET6.
+        constexpr std::array<std::uint32_t, 5> ipv6Families = {10, 23, 24, 28, 30};
+        if (family == 2 || std::find(ipv6Families.begin(), ipv6Families.end(), family) != ipv6Families.end()) {
+            return found();
+        }
+        return other("address family " + std::to_string(family));
+    }
+
+    // RFC 1661 and 1662: address and control field and the first octet of the protocol may be left out.
+    NetworkPart ppp() {
+        if (has(2) && packet_[at_] == 0xff && packet_[at_ + 1] == 0x03) {
+            skip(2);
+        } else if (has(2) && (packet_[at_] == 0x0f || packet_[at_] == 0x8f) && packet_[at_ + 1] == 0x00) {
+            // Cisco HDLC under a PPP link type: an EtherType follows.
+            skip(2);
+            return etherType();
+        }
+        if (!has(1)) {
+            return tooShort("PPP");
+        }
+        if ((packet_[at_] & 1U) != 0) {
+            const std::uint16_t shortProtocol = packet_[at_];
+            skip(1);
+            return behindPppProtocol(shortProtocol);
+        }
+        if (!has(2)) {
+            return tooShort("PPP");
+        }
+        const std::uint16_t protocol = u16(0);
+        skip(2);
+        return behindPppProtocol(protocol);
+    }
+
+    // One octet of direction in front of PPP; pppd leaves it in the place of the address field.
+    NetworkPart pppWithDirection(bool controlFollows) {
+        const std::size_t headOctets = controlFollows ? 2 : 1;
+        if (!has(headOctets)) {
+            return tooShort("PPP");
+        }
+        skip(headOctets);
+        return ppp();
+    }
+
+    NetworkPart pppoeSession() {
+        if (!has(6)) {
+            return tooShort("PPPoE");
+        }
+        skip(6);
+        return ppp();
+    }
+
+    NetworkPart raw() { return found(); }
+
+    [[nodiscard]] NetworkPart other(std::string name) const { return {{}, at_, std::move(name)}; }
+
+private:
+    [[nodiscard]] bool has(std::size_t octets) const { return packet_.size() - at_ >= octets; }
+    [[nodiscard]] std::uint16_t u16(std::size_t offset) const {
+        return static_cast<std::uint16_t>(packet_[at_ + offset] << 8U | packet_[at_ + offset + 1]);
+    }
+    void skip(std::size_t octets) { at_ += octets; }
+
+    [[nodiscard]] NetworkPart found() const {
+        if (at_ == packet_.size()) {
+            return other("no octets behind the link layer");
+        }
+        return {packet_.subspan(at_), at_, {}};
+    }
+    [[nodiscard]] NetworkPart tooShort(const char *header) const {
+        return other(std::string("cut inside the ") + header + " header");
+    }
+
+    NetworkPart etherType() {
+        if (!has(2)) {
+            return tooShort("Ethernet");
+        }
+        const std::uint16_t type = u16(0);
+        skip(2);
+        return behindEtherType(type);
+    }
+
+    NetworkPart behindEtherType(std::uint16_t type) {
+        while (type == 0x8100 || type == 0x88a8 || type == 0x9100 || type == 0x9200) { // VLAN tags, 802.1Q and 802.1ad
+            if (!has(4)) {
+                return tooShort("VLAN");
+            }
+            type = u16(2);
+            skip(4);
+        }
+        if (type == etherTypeIpv4 || type == etherTypeIpv6) {
+            return found();
+        }
+        if (type == etherTypePppSession) {
+            return pppoeSession();
+        }
+        if (type < leastEtherType) {
+            return behindLength();
+        }
+        return other(nameOf(etherTypeNames, type, "EtherType"));
+    }
+
+    // IEEE 802.3: an LLC header follows, with SNAP (RFC 1042) an EtherType behind it.
+    NetworkPart behindLength() {
+        constexpr std::array<std::uint8_t, 6> snap = {0xaa, 0xaa, 0x03, 0x00, 0x00, 0x00};
+        if (has(8) && std::equal(snap.begin(), snap.end(), packet_.begin() + static_cast<std::ptrdiff_t>(at_))) {
+            skip(6);
+            const std::uint16_t type = u16(0);
+            skip(2);
+            if (type >= leastEtherType) {
+                return behindEtherType(type);
+            }
+        }
+        if (has(2) && packet_[at_] == 0x42 && packet_[at_ + 1] == 0x42) {
+            return other("spanning tree");
+        }
+        return other("802.3 frame");
+    }
+
+    NetworkPart behindPppProtocol(std::uint16_t protocol) {
+        if (protocol == pppIpv4 || protocol == pppIpv6) {
+            return found();
+        }
+        return other(nameOf(pppNames, protocol, "PPP protocol"));
+    }
+
+    std::span<const std::uint8_t> packet_;
+    std::size_t at_ = 0;
+};
+
+} // namespace
+
+NetworkPart findNetworkPart(int linkType, std::span<const std::uint8_t> packet) {
+    LinkWalk walk(packet);
+    switch (linkType) {
+    case DLT_EN10MB: return walk.ethernet();
+    case DLT_LINUX_SLL: return walk.cooked(14, 16);
+    case DLT_LINUX_SLL2: return walk.cooked(0, 20);
+    case DLT_RAW:
+    case 14: // DLT_RAW of OpenBSD
+    case 101:
+    case DLT_IPV4:
+    case DLT_IPV6: return walk.raw();
+    case DLT_NULL: return walk.addressFamily(false);
+    case DLT_LOOP: return walk.addressFamily(true);
+    case DLT_PPP:
+    case DLT_PPP_SERIAL: return walk.ppp();
+    case DLT_PPP_ETHER: return walk.pppoeSession();
+    case DLT_PPP_PPPD: return walk.pppWithDirection(true);
+    case DLT_PPP_WITH_DIR: return walk.pppWithDirection(false);
+    default: return walk.other("link type " + linkTypeName(linkType));
+    }
+}
+
+std::string linkTypeName(int linkType) {
+    const char *const text = pcap_datalink_val_to_description(linkType);
+    return text != nullptr ? text : std::to_string(linkType);
+}
+
+} // namespace netfloor::cli

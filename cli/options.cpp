@@ -1,0 +1,153 @@
+// SPDX-License-Identifier: MIT
+#include "options.h"
+
+#include <algorithm>
+#include <array>
+#include <map>
+#include <string_view>
+
+#include <CLI/CLI.hpp>
+
+namespace netfloor::cli {
+
+namespace {
+
+struct CommandName {
+    Command command;
+    const char *name;
+    const char *help;
+};
+
+constexpr std::array commandNames = {
+    CommandName{Command::summary, "summary", "One line a packet (what 'netfloor FILE' does)"},
+    CommandName{Command::detail, "detail", "Every field of each packet, as a tree of layers and blocks"},
+    CommandName{Command::verify, "verify", "A verdict on each packet, and a total"},
+    CommandName{Command::keys, "keys", "The key fields of each packet, as CSV"},
+};
+
+constexpr const char *footer = R"(
+Exit codes:
+  0  all packets were read (also when the reader of the output closed it)
+  1  verify: at least one packet is damaged
+  2  an option, a filter or a packet number that makes no sense
+  3  the file is missing, empty or no capture
+  4  the capture is cut or damaged: the whole packets in front were decoded
+  5  the plug-in is missing or no plug-in
+  6  the output cannot be written
+
+Examples:
+  netfloor capture.pcap                          what is in it
+  netfloor detail --packet 7 --bits capture.pcap one packet, with the bits of each field
+  netfloor verify --filter 'tcp port 80' c.pcapng
+  netfloor keys --column 'Source Address' --column 'Destination Address' c.pcap
+  tcpdump -w - | netfloor -)";
+
+// The word for the command may be left out, which CLI11's own usage line does not say.
+class UsageFormatter : public CLI::Formatter {
+public:
+    std::string make_usage(const CLI::App *app, std::string name) const override {
+        if (app->get_parent() != nullptr) {
+            return CLI::Formatter::make_usage(app, name);
+        }
+        return "Usage: netfloor [summary|detail|verify|keys] [OPTIONS] FILE\n"
+               "       netfloor detail --help    tells the options of a command\n";
+    }
+};
+
+void addOptions(CLI::App &app, Options &options) {
+    app.add_option("file", options.file, "Capture file (pcap or pcapng, gzip or not); '-' for standard input")
+        ->type_name("FILE")
+        ->required();
+    app.add_option("-f,--filter", options.filter, "Only packets that match, in libpcap's language (man pcap-filter)")
+        ->type_name("EXPRESSION");
+    app.add_option("-c,--count", options.count, "Stop after N packets")->type_name("N");
+    app.add_option("-p,--packet", options.packet, "Only packet number N of the file")
+        ->type_name("N")
+        ->check(CLI::PositiveNumber);
+    app.add_flag("--utc", options.utc, "Date and time of day (UTC) instead of seconds since the first packet");
+    app.add_option("--plugin", options.plugin,
+                   "The plug-in to decode with (default: the one that belongs to this command)")
+        ->type_name("PATH");
+    const std::map<std::string, Colour> colours = {
+        {"auto", Colour::automatic}, {"always", Colour::always}, {"never", Colour::never}};
+    app.add_option("--color", options.colour, "auto (default: on a terminal, if NO_COLOR is not set), always, never")
+        ->type_name("WHEN")
+        ->transform(CLI::CheckedTransformer(colours));
+}
+
+void addOwnOptions(CLI::App &app, Command command, Options &options) {
+    switch (command) {
+    case Command::summary:
+        app.add_flag("-a,--all", options.all, "The text of every field, not of the key fields alone");
+        break;
+    case Command::detail:
+        app.add_flag("-b,--bits", options.bits, "With the bits of each field; the first bit of the IP header is bit 1");
+        app.add_flag("-a,--all", options.all, "One line for each octet of data, too");
+        break;
+    case Command::keys:
+        app.add_option("--column", options.columns, "Only the key field of this name (may be repeated)")
+            ->type_name("NAME")
+            ->allow_extra_args(false);
+        app.add_flag("--raw", options.raw, "Addresses as the plug-in stores them, in hexadecimal");
+        break;
+    case Command::verify: break;
+    }
+}
+
+// Brings the command's name to the front, so that options may stand before it, and adds the one that
+// 'netfloor FILE' leaves out.
+void putCommandFirst(const CLI::App &app, std::vector<std::string> &words) {
+    const CLI::App *const common = app.get_subcommand(commandNames.front().name);
+    auto word = words.begin();
+    while (word != words.end() && word->starts_with("-") && *word != "-") {
+        const CLI::Option *const option = common->get_option_no_throw(*word);
+        const bool valueFollows = option != nullptr && option->get_items_expected() > 0;
+        word += valueFollows && std::next(word) != words.end() ? 2 : 1;
+    }
+    const bool named = word != words.end() && std::any_of(commandNames.begin(), commandNames.end(),
+                                                          [&](const CommandName &row) { return *word == row.name; });
+    if (named) {
+        std::rotate(words.begin(), word, word + 1);
+    } else {
+        words.insert(words.begin(), commandNames.front().name);
+    }
+}
+
+} // namespace
+
+std::variant<Options, ExitCode> parseOptions(int argumentCount, char **arguments) {
+    Options options;
+    CLI::App app{"netfloor decodes the IP layers of the packets in a capture file.", "netfloor"};
+    app.set_version_flag("--version", "netfloor " NETFLOOR_VERSION);
+    app.formatter(std::make_shared<UsageFormatter>());
+    app.footer(footer);
+    app.require_subcommand(1);
+    for (const CommandName &row : commandNames) {
+        CLI::App *const sub = app.add_subcommand(row.name, row.help);
+        addOptions(*sub, options);
+        addOwnOptions(*sub, row.command, options);
+        sub->callback([&options, &row] { options.command = row.command; });
+    }
+
+    std::vector<std::string> words(arguments + 1, arguments + argumentCount);
+    constexpr std::array<std::string_view, 3> forAll = {"--help", "-h", "--version"};
+    if (words.empty()) {
+        words.emplace_back("--help");
+    }
+    if (std::find(forAll.begin(), forAll.end(), words.front()) == forAll.end()) {
+        putCommandFirst(app, words);
+    }
+    std::reverse(words.begin(), words.end()); // as CLI11 takes them
+    try {
+        app.parse(words);
+    } catch (const CLI::Success &answer) {
+        app.exit(answer);
+        return ExitCode::good;
+    } catch (const CLI::ParseError &mistake) {
+        std::cerr << "netfloor: " << mistake.what() << "\nnetfloor --help tells what can be asked for.\n";
+        return ExitCode::usage;
+    }
+    return options;
+}
+
+} // namespace netfloor::cli

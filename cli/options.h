@@ -1,0 +1,38 @@
+// SPDX-License-Identifier: MIT
+// The command line.
+#pragma once
+
+#include <cstdint>
+#include <filesystem>
+#include <optional>
+#include <string>
+#include <variant>
+#include <vector>
+
+#include "exit_code.h"
+
+namespace netfloor::cli {
+
+enum class Command : std::uint8_t { summary, detail, verify, keys };
+
+enum class Colour : std::uint8_t { automatic, always, never };
+
+struct Options {
+    Command command = Command::summary;
+    std::string file;
+    std::filesystem::path plugin; // empty: where the command is installed
+    std::string filter;
+    std::optional<std::uint64_t> count;  // packets to show at most
+    std::optional<std::uint64_t> packet; // the one packet to show
+    Colour colour = Colour::automatic;
+    bool utc = false;                 // times of day instead of seconds since the first packet
+    bool all = false;                 // summary, detail: nothing left out
+    bool bits = false;                // detail: bit ranges
+    bool raw = false;                 // keys: addresses as the plug-in stores them
+    std::vector<std::string> columns; // keys: these key fields only
+};
+
+// The options, or the code to end with when the command line has been answered: --help, or a mistake.
+[[nodiscard]] std::variant<Options, ExitCode> parseOptions(int argumentCount, char **arguments);
+
+} // namespace netfloor::cli

@@ -1,0 +1,76 @@
+// SPDX-License-Identifier: MIT
+// A plug-in, loaded from a file.
+#pragma once
+
+#include <cstdint>
+#include <filesystem>
+#include <memory>
+#include <stdexcept>
+#include <string>
+#include <vector>
+
+#include <netfloor/plugin.h>
+
+namespace netfloor {
+
+// A file could not be used as a plug-in. what() is a sentence for the user: what is missing or wrong, in
+// which file, and what to do.
+class PluginError : public std::runtime_error {
+public:
+    using std::runtime_error::runtime_error;
+};
+
+// How this host answers hx_InitialiseOptXTR: with the results in turn, the last of them for good.
+struct KeySetUp {
+    std::vector<std::int32_t> results = {1};
+    std::uint16_t presenceRow = 0; // what a result above 1 marks as present in every record
+};
+
+class LoadedPlugin;
+
+// A handle of a loaded plug-in; copies share it.
+//
+// A pass of a plug-in keeps its variables in statics and serves one packet at a time. Who decodes in several
+// threads, or wants the key-field table set up anew, opens a copy for each.
+class PluginLibrary {
+public:
+    // Loads the plug-in at `path`, or gives a handle of it when this process has loaded it before. It stays
+    // loaded until the process ends, as the set-up of its key-field table does. Throws PluginError.
+    [[nodiscard]] static PluginLibrary open(const std::filesystem::path &path);
+
+    // Loads the plug-in once more, with statics of its own. It is unloaded with the last handle. Throws
+    // PluginError.
+    [[nodiscard]] static PluginLibrary openCopy(const std::filesystem::path &path);
+
+    [[nodiscard]] const std::filesystem::path &path() const;
+
+    [[nodiscard]] NetfloorPreDecode preDecodeMD() const;
+    [[nodiscard]] NetfloorPreDecode preDecodeTO() const;
+    [[nodiscard]] NetfloorPreDecode preDecodeMV() const;
+    [[nodiscard]] NetfloorExtract extract() const;
+    [[nodiscard]] NetfloorDateConv dateConv() const;
+
+    // Any other export by its name, or null.
+    [[nodiscard]] void *find(const std::string &exportName) const;
+
+    // The time stamp `seconds` since 1970-01-01 00:00:00 UTC as the plug-in's date_conv writes it.
+    [[nodiscard]] std::string dateText(std::uint32_t seconds) const;
+
+    // Decides what later calls of hx_InitialiseOptXTR get. A plug-in that was told 1 or more, or a negative
+    // number, does not ask again: open a copy first.
+    void setKeySetUp(KeySetUp keySetUp);
+
+    // How often the plug-in has called hx_InitialiseOptXTR.
+    [[nodiscard]] std::uint32_t keySetUpCalls() const;
+
+    // The key-field table as the plug-in handed it over; empty before the first XTR pass.
+    [[nodiscard]] std::vector<std::string> keyFieldNames() const;
+
+private:
+    friend class Host;
+    explicit PluginLibrary(std::shared_ptr<LoadedPlugin> loaded);
+
+    std::shared_ptr<LoadedPlugin> loaded_;
+};
+
+} // namespace netfloor

@@ -1,0 +1,238 @@
+// SPDX-License-Identifier: MIT
+#include "loaded_plugin.h"
+
+#include <algorithm>
+#include <array>
+#include <cerrno>
+#include <cstring>
+#include <elf.h>
+#include <fstream>
+#include <map>
+#include <memory>
+#include <mutex>
+#include <string>
+#include <string_view>
+#include <system_error>
+#include <utility>
+
+#include <dlfcn.h>
+#include <sys/mman.h>
+#include <unistd.h>
+
+namespace netfloor {
+namespace {
+
+constexpr std::string_view advice = " Give the path of a netfloor plug-in, such as build/plugin/libnetfloor.so.";
+
+[[noreturn]] void refuse(const std::filesystem::path &path, std::string_view reason, std::string_view whatToDo) {
+    throw PluginError("cannot use " + path.string() + " as a plug-in: " + std::string(reason) + std::string(whatToDo));
+}
+
+// The loader's own messages for these are obscure, so they are told apart first.
+void checkFile(const std::filesystem::path &path) {
+    std::error_code error;
+    const std::filesystem::file_status status = std::filesystem::status(path, error);
+    if (!std::filesystem::exists(status)) {
+        refuse(path, error && error != std::errc::no_such_file_or_directory ? error.message() + "." : "no such file.",
+               advice);
+    }
+    if (std::filesystem::is_directory(status)) {
+        refuse(path, "it is a directory.", advice);
+    }
+    std::ifstream file(path, std::ios::binary);
+    if (!file) {
+        refuse(path, "it cannot be read.", " Check the permissions of the file.");
+    }
+    std::array<char, SELFMAG> mark = {};
+    file.read(mark.data(), mark.size());
+    if (std::string_view(mark.data(), mark.size()) != std::string_view(ELFMAG, SELFMAG)) {
+        refuse(path, "it is not a shared library.", advice);
+    }
+}
+
+// The plug-in finds the three libraries by their names among those that the process has loaded; naming their
+// operations here keeps them loaded in every program that uses this library.
+[[gnu::used]] const std::array boundary = {
+    reinterpret_cast<void (*)()>(&hs_Malloc),
+    reinterpret_cast<void (*)()>(&hd_PreDecode),
+    reinterpret_cast<void (*)()>(&hx_InitialiseOptXTR),
+};
+
+void *load(const std::filesystem::path &path, const std::filesystem::path &loadPath) {
+    void *const handle = ::dlopen(loadPath.c_str(), RTLD_NOW | RTLD_LOCAL);
+    if (handle != nullptr) {
+        return handle;
+    }
+    const std::string message = ::dlerror();
+    const bool unresolved = message.find("undefined symbol") != std::string::npos ||
+                            message.find("cannot open shared object file") != std::string::npos;
+    if (unresolved) {
+        refuse(path, "it needs something that this process does not have (" + message + ").",
+               " A plug-in may import the operations of netfloor/host.h and the C library; build it again for this"
+               " host.");
+    }
+    refuse(path, "the loader refuses it (" + message + ").",
+           " Build the plug-in as a shared library for this machine.");
+}
+
+template <typename Entry>
+void resolve(void *handle, const char *name, Entry &entry, std::string &missing) {
+    entry = reinterpret_cast<Entry>(::dlsym(handle, name));
+    if (entry == nullptr) {
+        missing += (missing.empty() ? "" : ", ") + std::string(name);
+    }
+}
+
+// A file in memory with the same content. A library is known to the loader by its file, so that a copy
+// loads as another library.
+int copyToMemory(const std::filesystem::path &path) {
+    const auto fail = [&](int descriptor) {
+        const std::string reason = std::strerror(errno);
+        if (descriptor >= 0) {
+            ::close(descriptor);
+        }
+        refuse(path, "it cannot be copied (" + reason + ").", " Free some memory or file descriptors and try again.");
+    };
+    std::ifstream source(path, std::ios::binary);
+    const std::string content((std::istreambuf_iterator<char>(source)), std::istreambuf_iterator<char>());
+    const int copy = ::memfd_create(path.filename().c_str(), MFD_CLOEXEC);
+    if (copy < 0) {
+        fail(copy);
+    }
+    std::string_view rest = content;
+    while (!rest.empty()) {
+        const ssize_t written = ::write(copy, rest.data(), rest.size());
+        if (written < 0) {
+            fail(copy);
+        }
+        rest.remove_prefix(static_cast<std::size_t>(written));
+    }
+    return copy;
+}
+
+} // namespace
+
+LoadedPlugin::LoadedPlugin(std::filesystem::path path, const std::filesystem::path &loadPath, int descriptor)
+    : path_(std::move(path)), descriptor_(descriptor), handle_(load(path_, loadPath)) {
+    std::string missing;
+    resolve(handle_, "vex_PreDecodeMD", preDecodeMD, missing);
+    resolve(handle_, "vex_PreDecodeTO", preDecodeTO, missing);
+    resolve(handle_, "vex_PreDecodeMV", preDecodeMV, missing);
+    resolve(handle_, "XTR_netfloor", extract, missing);
+    resolve(handle_, "date_conv", dateConv, missing);
+    if (!missing.empty()) {
+        ::dlclose(handle_);
+        refuse(path_, "it is a shared library, but does not export " + missing + ".", advice);
+    }
+}
+
+LoadedPlugin::~LoadedPlugin() {
+    ::dlclose(handle_);
+    if (descriptor_ >= 0) {
+        ::close(descriptor_);
+    }
+}
+
+void *LoadedPlugin::find(const char *exportName) const {
+    return ::dlsym(handle_, exportName);
+}
+
+std::int32_t LoadedPlugin::initialise(KeyFieldRow *table, std::uint32_t rowCount, std::uint16_t *presenceRow) noexcept {
+    const std::vector<std::int32_t> &results = keySetUp.results;
+    const std::int32_t result = results.empty() ? 1 : results[std::min<std::size_t>(keySetUpCalls, results.size() - 1)];
+    ++keySetUpCalls;
+    if (rowCount > KeyRecord::mostRows) {
+        return -1;
+    }
+    if (result > 0) {
+        KeyRecord::layOut({table, rowCount});
+        keyTable_ = {table, rowCount};
+        *presenceRow = keySetUp.presenceRow;
+    }
+    return result;
+}
+
+std::int32_t LoadedPlugin::enterExtract(XtrContext *context) {
+    netfloor_setKeyOptions(this);
+    const std::int32_t result = extract(context);
+    netfloor_setKeyOptions(nullptr);
+    return result;
+}
+
+PluginLibrary::PluginLibrary(std::shared_ptr<LoadedPlugin> loaded) : loaded_(std::move(loaded)) {}
+
+PluginLibrary PluginLibrary::open(const std::filesystem::path &path) {
+    static std::mutex mutex;
+    static std::map<void *, std::shared_ptr<LoadedPlugin>> loads;
+
+    checkFile(path);
+    // An absolute path, since the loader searches its own directories for a bare name.
+    auto loaded = std::make_shared<LoadedPlugin>(path, std::filesystem::absolute(path), -1);
+    const std::scoped_lock lock(mutex);
+    return PluginLibrary(loads.try_emplace(loaded->handle(), loaded).first->second);
+}
+
+PluginLibrary PluginLibrary::openCopy(const std::filesystem::path &path) {
+    checkFile(path);
+    const int copy = copyToMemory(path);
+    try {
+        return PluginLibrary(std::make_shared<LoadedPlugin>(path, "/proc/self/fd/" + std::to_string(copy), copy));
+    } catch (...) {
+        ::close(copy);
+        throw;
+    }
+}
+
+const std::filesystem::path &PluginLibrary::path() const {
+    return loaded_->path();
+}
+
+NetfloorPreDecode PluginLibrary::preDecodeMD() const {
+    return loaded_->preDecodeMD;
+}
+
+NetfloorPreDecode PluginLibrary::preDecodeTO() const {
+    return loaded_->preDecodeTO;
+}
+
+NetfloorPreDecode PluginLibrary::preDecodeMV() const {
+    return loaded_->preDecodeMV;
+}
+
+NetfloorExtract PluginLibrary::extract() const {
+    return loaded_->extract;
+}
+
+NetfloorDateConv PluginLibrary::dateConv() const {
+    return loaded_->dateConv;
+}
+
+void *PluginLibrary::find(const std::string &exportName) const {
+    return loaded_->find(exportName.c_str());
+}
+
+std::string PluginLibrary::dateText(std::uint32_t seconds) const {
+    DecodeState state = {};
+    state.fieldRecord.value = seconds;
+    std::array<char, 64> text = {};
+    return loaded_->dateConv(text.data(), nullptr, &state);
+}
+
+void PluginLibrary::setKeySetUp(KeySetUp keySetUp) {
+    loaded_->keySetUp = std::move(keySetUp);
+    loaded_->keySetUpCalls = 0;
+}
+
+std::uint32_t PluginLibrary::keySetUpCalls() const {
+    return loaded_->keySetUpCalls;
+}
+
+std::vector<std::string> PluginLibrary::keyFieldNames() const {
+    std::vector<std::string> names;
+    for (const KeyFieldRow &row : loaded_->keyTable()) {
+        names.emplace_back(row.fieldName);
+    }
+    return names;
+}
+
+} // namespace netfloor

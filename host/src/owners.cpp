@@ -1,0 +1,189 @@
+// SPDX-License-Identifier: MIT
+#include "netfloor-host/owners.h"
+
+#include <algorithm>
+#include <string>
+
+#include "packet_run.h"
+
+namespace netfloor {
+namespace {
+
+constexpr std::uint32_t bitsPerOctet = 8;
+constexpr std::uint32_t protocolNumbers = 256;
+constexpr std::uint32_t sctpProtocol = 132;
+constexpr std::uint32_t hostsOwnDecoder = 0;
+
+std::string octetsText(std::uint32_t bits) {
+    const std::uint32_t octets = bits / bitsPerOctet;
+    const std::uint32_t rest = bits % bitsPerOctet;
+    return std::to_string(octets) + (octets == 1 ? " octet" : " octets") +
+           (rest == 0 ? "" : " and " + std::to_string(rest) + " bits");
+}
+
+void takeBitsAsData(NextLayer &next, std::uint32_t bits) {
+    if (bits > 0) {
+        next.take(bits, "data", "Data=" + octetsText(bits), "Data - " + octetsText(bits));
+    }
+}
+
+// The user data of the DATA chunk whose 16 octets of head stand in front of the payload.
+struct UserData {
+    std::uint32_t octets;
+    std::uint32_t paddingOctets;
+};
+
+std::optional<UserData> userDataAt(NextLayer &next) {
+    constexpr std::uint32_t headOctets = 16;
+    constexpr std::uint32_t lengthPlace = 2;
+    constexpr std::uint8_t dataChunk = 0;
+    constexpr std::uint32_t chunkAlignment = 4;
+
+    const std::uint32_t bitsBefore = next.state().cursor - 1;
+    if (bitsBefore % bitsPerOctet != 0 || bitsBefore / bitsPerOctet < headOctets) {
+        return std::nullopt;
+    }
+    const auto head = next.packet().subspan(bitsBefore / bitsPerOctet - headOctets, headOctets);
+    const auto length = static_cast<std::uint32_t>(head[lengthPlace] << bitsPerOctet | head[lengthPlace + 1]);
+    if (head[0] != dataChunk || length < headOctets) {
+        return std::nullopt;
+    }
+    return UserData{length - headOctets, (chunkAlignment - length % chunkAlignment) % chunkAlignment};
+}
+
+} // namespace
+
+Pass NextLayer::pass() const {
+    return run_.pass_;
+}
+
+std::uint32_t NextLayer::key() const {
+    return run_.frame().nextLayerKey;
+}
+
+std::uint32_t NextLayer::protocol() const {
+    return run_.frame().nextLayerProtocol;
+}
+
+std::optional<std::uint32_t> NextLayer::ipProtocol() const {
+    if (protocol() != 0) {
+        return protocol();
+    }
+    return key() < protocolNumbers ? std::optional(key()) : std::nullopt;
+}
+
+std::span<const std::uint8_t> NextLayer::packet() const {
+    return run_.packet_.packet();
+}
+
+std::span<const std::uint8_t> NextLayer::payload() const {
+    const DecodeState &state = run_.packet_.state();
+    const std::size_t first = (state.cursor - 1 + bitsPerOctet - 1) / bitsPerOctet;
+    const std::size_t skippedBits = first * bitsPerOctet - (state.cursor - 1);
+    if (first >= packet().size() || skippedBits > state.bitsLeft) {
+        return {};
+    }
+    return packet().subspan(first, std::min(packet().size() - first, (state.bitsLeft - skippedBits) / bitsPerOctet));
+}
+
+std::uint32_t NextLayer::bitsLeft() const {
+    return run_.packet_.state().bitsLeft;
+}
+
+const Report &NextLayer::soFar() const {
+    return run_.report_;
+}
+
+DecodeState &NextLayer::state() {
+    return run_.packet_.state();
+}
+
+PreDecodeContext *NextLayer::preDecodeContext() {
+    return pass() == Pass::xtr ? nullptr : &run_.preDecode_.context;
+}
+
+XtrContext *NextLayer::xtrContext() {
+    return pass() == Pass::xtr ? &run_.xtr_ : nullptr;
+}
+
+void NextLayer::consume(std::uint32_t bits) {
+    const std::uint32_t consumed = std::min(bits, bitsLeft());
+    state().cursor += consumed;
+    state().bitsLeft -= consumed;
+}
+
+void NextLayer::take(std::uint32_t bits, std::string_view name, std::string_view longText, std::string_view shortText) {
+    run_.addOwnEntry(std::min(bits, bitsLeft()), name, longText, shortText);
+    consume(bits);
+}
+
+void NextLayer::layer(std::uint32_t decoderId, const std::function<void()> &decode) {
+    const bool listed = pass() == Pass::md || pass() == Pass::to;
+    if (listed) {
+        run_.openLayer(decoderId);
+    }
+    decode();
+    if (listed) {
+        run_.closeLayer();
+    }
+}
+
+bool NextLayer::runPlugin() {
+    return run_.enterFromOwner();
+}
+
+Handled takeAsData(NextLayer &next) {
+    next.layer(hostsOwnDecoder, [&] { takeBitsAsData(next, next.bitsLeft()); });
+    return Handled::yes;
+}
+
+Handled takeSctpUserData(NextLayer &next) {
+    const std::optional<UserData> data = userDataAt(next);
+    if (!data) {
+        return takeAsData(next);
+    }
+    next.layer(hostsOwnDecoder, [&] {
+        takeBitsAsData(next, std::min(data->octets * bitsPerOctet, next.bitsLeft()));
+        next.consume(data->paddingOctets * bitsPerOctet);
+    });
+    return Handled::yes;
+}
+
+OwnerRegistry::OwnerRegistry() : default_(takeAsData) {
+    addProtocol(sctpProtocol, takeSctpUserData);
+}
+
+void OwnerRegistry::add(std::uint32_t key, Owner owner) {
+    byKey_.insert_or_assign(key, std::move(owner));
+}
+
+void OwnerRegistry::add(std::uint32_t key, std::uint32_t protocol, Owner owner) {
+    byKeyAndProtocol_.insert_or_assign({key, protocol}, std::move(owner));
+}
+
+void OwnerRegistry::addProtocol(std::uint32_t protocol, Owner owner) {
+    byProtocol_.insert_or_assign(protocol, std::move(owner));
+}
+
+void OwnerRegistry::setDefault(Owner owner) {
+    default_ = std::move(owner);
+}
+
+const Owner &OwnerRegistry::find(std::uint32_t key, std::optional<std::uint32_t> protocol) const {
+    if (protocol) {
+        if (const auto found = byKeyAndProtocol_.find({key, *protocol}); found != byKeyAndProtocol_.end()) {
+            return found->second;
+        }
+    }
+    if (const auto found = byKey_.find(key); found != byKey_.end()) {
+        return found->second;
+    }
+    if (protocol) {
+        if (const auto found = byProtocol_.find(*protocol); found != byProtocol_.end()) {
+            return found->second;
+        }
+    }
+    return default_;
+}
+
+} // namespace netfloor

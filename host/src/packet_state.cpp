@@ -1,0 +1,136 @@
+// SPDX-License-Identifier: MIT
+#include "netfloor-host/packet_state.h"
+
+#include <algorithm>
+#include <array>
+#include <cstring>
+#include <limits>
+#include <new>
+#include <stdexcept>
+#include <string>
+
+#include "links.h"
+
+namespace netfloor {
+namespace {
+
+constexpr std::uint32_t bitsPerOctet = 8;
+constexpr std::size_t mostOctets = std::numeric_limits<std::uint32_t>::max() / bitsPerOctet;
+constexpr std::size_t textOctets = 255;
+
+std::uint32_t checkedBits(std::span<const std::uint8_t> packet, const StateOptions &options) {
+    if (packet.size() > mostOctets) {
+        throw std::invalid_argument("a packet has at most " + std::to_string(mostOctets) + " octets");
+    }
+    const auto allBits = static_cast<std::uint32_t>(packet.size() * bitsPerOctet);
+    const std::uint32_t totalBits = options.totalBits.value_or(allBits);
+    if (totalBits > allBits) {
+        throw std::invalid_argument("totalBits is above the bits that the packet has");
+    }
+    if (options.cursor == 0 || options.cursor - 1 > totalBits) {
+        throw std::invalid_argument("the cursor stands outside the packet");
+    }
+    if (options.blockCapacity == 0 || options.limitCapacity == 0 || options.layerCapacity == 0 ||
+        options.rangeCapacity == 0) {
+        throw std::invalid_argument("a capacity is 0; each array has at least one element");
+    }
+    return totalBits;
+}
+
+// An array on the host's heap, which the plug-in may let grow and move: the record alone knows where it is.
+template <typename Element>
+Element *allocate(std::size_t count, standin::HeapKeeper &keeper) {
+    void *const block = standin::allocateBlock(&keeper, count * sizeof(Element));
+    if (block == nullptr) {
+        throw std::bad_alloc();
+    }
+    std::memset(block, 0, count * sizeof(Element));
+    return static_cast<Element *>(block);
+}
+
+void setUp(BitStack &stack, std::uint32_t capacity, std::uint32_t bottom, standin::HeapKeeper &keeper) {
+    stack.base = allocate<std::uint32_t>(capacity, keeper);
+    stack.base[0] = bottom;
+    stack.top = stack.base;
+    stack.capacity = capacity;
+}
+
+} // namespace
+
+struct PacketState::Storage final : standin::HeapKeeper {
+    Storage() = default;
+    Storage(const Storage &) = delete;
+    Storage &operator=(const Storage &) = delete;
+
+    ~Storage() {
+        standin::freeBlock(state.fieldRecord.ranges);
+        standin::freeBlock(state.layerFrames);
+        standin::freeBlock(state.limits.base);
+        standin::freeBlock(state.blockStarts.base);
+    }
+
+    // Not the constructor: what has been allocated when a later part fails is to be freed.
+    void setUpFor(std::span<const std::uint8_t> octets, const StateOptions &options) {
+        packet = octets;
+        allowGrowth = options.allowGrowth;
+        const std::uint32_t totalBits = checkedBits(octets, options);
+        const std::size_t copied = (std::size_t{totalBits} + bitsPerOctet - 1) / bitsPerOctet;
+        copy = std::make_unique<std::uint8_t[]>(copied);
+        std::copy_n(octets.data(), copied, copy.get());
+
+        state.data = copy.get();
+        state.sourceData = octets.data();
+        state.totalBits = totalBits;
+        state.cursor = options.cursor;
+        state.bitsLeft = totalBits - (options.cursor - 1);
+        state.flags = options.flags;
+        state.blockName = blockName.data();
+        state.layerHandedOff = 1;
+        state.layerCapacity = options.layerCapacity;
+        state.fieldRecord.rangeCapacity = options.rangeCapacity;
+        state.fieldRecord.fieldName = fieldName.data();
+        state.fieldRecord.valueText = valueText.data();
+        setUp(state.blockStarts, options.blockCapacity, 1, *this);
+        setUp(state.limits, options.limitCapacity, totalBits, *this);
+        state.layerFrames = allocate<LayerFrame>(options.layerCapacity, *this);
+        state.fieldRecord.ranges = allocate<BitRange>(options.rangeCapacity, *this);
+    }
+
+    bool allowsGrowth(std::size_t octets) noexcept override { return !allowGrowth || allowGrowth(octets); }
+
+    DecodeState state = {};
+    std::span<const std::uint8_t> packet;
+    std::function<bool(std::size_t)> allowGrowth;
+    std::unique_ptr<std::uint8_t[]> copy;
+    std::array<char, textOctets> blockName = {};
+    std::array<char, textOctets> fieldName = {};
+    std::array<char, textOctets> valueText = {};
+};
+
+PacketState::PacketState(std::span<const std::uint8_t> packet, const StateOptions &options)
+    : storage_(std::make_unique<Storage>()) {
+    storage_->setUpFor(packet, options);
+    if (options.prepare) {
+        options.prepare(storage_->state);
+    }
+}
+
+PacketState::~PacketState() = default;
+
+DecodeState &PacketState::state() {
+    return storage_->state;
+}
+
+const DecodeState &PacketState::state() const {
+    return storage_->state;
+}
+
+std::span<const std::uint8_t> PacketState::packet() const {
+    return storage_->packet;
+}
+
+std::uint32_t depthOf(const BitStack &stack) {
+    return static_cast<std::uint32_t>(stack.top - stack.base);
+}
+
+} // namespace netfloor

@@ -1,0 +1,192 @@
+// SPDX-License-Identifier: MIT
+#include "netfloor-host/text.h"
+
+#include <algorithm>
+#include <charconv>
+#include <cstddef>
+#include <string_view>
+
+#include <netfloor/records.h>
+
+namespace netfloor {
+namespace {
+
+constexpr std::uint32_t bitsPerOctet = 8;
+constexpr std::size_t groupCount = 8;
+constexpr int decimal = 10;
+constexpr int hexadecimal = 16;
+
+struct NamedFlag {
+    std::uint32_t bit;
+    std::string_view name;
+};
+
+constexpr NamedFlag namedFlags[] = {
+    {NETFLOOR_FLAG_EXPECTATION, "expectation not met"},
+    {NETFLOOR_FLAG_LIMIT_TOO_LONG, "length reaches behind the bits left"},
+    {NETFLOOR_FLAG_BITS_LEFT_OVER, "bits left over inside a length"},
+    {NETFLOOR_FLAG_NO_LAYER_FRAMES, "no storage for layer frames"},
+    {NETFLOOR_FLAG_NO_STACK, "no storage for a stack"},
+    {NETFLOOR_FLAG_NO_RANGES, "no storage for bit ranges"},
+};
+
+std::string numberText(std::uint32_t number, int base) {
+    char text[16];
+    const auto end = std::to_chars(std::begin(text), std::end(text), number, base).ptr;
+    return {text, end};
+}
+
+std::string flagName(std::uint32_t bit) {
+    const auto *const found = std::ranges::find(namedFlags, bit, &NamedFlag::bit);
+    return found != std::end(namedFlags) ? std::string(found->name)
+                                         : std::string("flag 0x").append(numberText(bit, hexadecimal));
+}
+
+// A run of groups that are 0.
+struct ZeroRun {
+    std::size_t first = 0;
+    std::size_t count = 0;
+};
+
+using Groups = std::array<std::uint32_t, groupCount>;
+
+// RFC 5952, 4.2: the longest run of two groups or more is shortened, the first of several of one length.
+ZeroRun longestZeroRun(const Groups &groups) {
+    ZeroRun longest;
+    for (std::size_t first = 0; first < groupCount; ++first) {
+        std::size_t count = 0;
+        while (first + count < groupCount && groups[first + count] == 0) {
+            ++count;
+        }
+        if (count > longest.count) {
+            longest = {first, count};
+        }
+    }
+    return longest.count < 2 ? ZeroRun{} : longest;
+}
+
+std::string joinGroups(const Groups &groups, std::size_t first, std::size_t end) {
+    std::string text;
+    for (std::size_t group = first; group < end; ++group) {
+        text.append(group == first ? "" : ":").append(numberText(groups[group], hexadecimal));
+    }
+    return text;
+}
+
+// The bits of a field whose ranges lie one behind the other.
+struct Stretch {
+    std::uint32_t firstBit;
+    std::uint32_t bits;
+};
+
+std::optional<Stretch> stretchOf(const std::vector<ReportedRange> &ranges, std::uint32_t bitsEach) {
+    const std::uint32_t firstBit = ranges.front().firstBit;
+    std::uint32_t next = firstBit;
+    for (const ReportedRange &range : ranges) {
+        if (range.firstBit != next || range.lastBit - range.firstBit + 1 != bitsEach) {
+            return std::nullopt;
+        }
+        next = range.lastBit + 1;
+    }
+    return Stretch{firstBit, next - firstBit};
+}
+
+// The bits in each range of a field that is an address of so many ranges, or 0.
+std::uint32_t addressRangeBits(std::size_t rangeCount) {
+    constexpr std::uint32_t addressBits = 128;
+    switch (rangeCount) {
+    case 1:
+    case groupCount:
+    case 4 * groupCount: return addressBits / static_cast<std::uint32_t>(rangeCount);
+    default: return 0;
+    }
+}
+
+} // namespace
+
+std::vector<std::string> flagNames(std::uint32_t flags) {
+    std::vector<std::string> names;
+    for (std::uint32_t bit = 1; bit != 0; bit <<= 1) {
+        if ((flags & bit) != 0) {
+            names.push_back(flagName(bit));
+        }
+    }
+    return names;
+}
+
+std::string_view passName(Pass pass) {
+    switch (pass) {
+    case Pass::md: return "MD";
+    case Pass::to: return "TO";
+    case Pass::mv: return "MV";
+    case Pass::xtr: return "XTR";
+    }
+    return "";
+}
+
+std::string ipv6Text(const Ipv6Octets &octets) {
+    Groups groups = {};
+    for (std::size_t group = 0; group < groupCount; ++group) {
+        groups[group] = static_cast<std::uint32_t>(octets[2 * group] << bitsPerOctet | octets[2 * group + 1]);
+    }
+    // RFC 5952, 5: IPv4-mapped addresses (RFC 4291, 2.5.5.2) show their last four octets in dotted form.
+    constexpr Ipv6Octets mapped = {0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0xff, 0xff};
+    if (std::equal(mapped.begin(), mapped.begin() + 12, octets.begin())) {
+        return "::ffff:" + ipv4Text(groups[6] << 16 | groups[7]);
+    }
+    const ZeroRun zeros = longestZeroRun(groups);
+    if (zeros.count == 0) {
+        return joinGroups(groups, 0, groupCount);
+    }
+    return joinGroups(groups, 0, zeros.first) + "::" + joinGroups(groups, zeros.first + zeros.count, groupCount);
+}
+
+std::string ipv4Text(std::uint32_t address) {
+    std::string text;
+    for (std::uint32_t shift = 32; shift != 0; shift -= bitsPerOctet) {
+        text.append(numberText(address >> (shift - bitsPerOctet) & 0xff, decimal));
+        text.append(shift == bitsPerOctet ? "" : ".");
+    }
+    return text;
+}
+
+std::optional<Ipv6Octets> ipv6Address(const FieldReport &field, std::span<const std::uint8_t> packet) {
+    const std::uint32_t bitsEach = addressRangeBits(field.ranges.size());
+    if (bitsEach == 0) {
+        return std::nullopt;
+    }
+    const std::optional<Stretch> stretch = stretchOf(field.ranges, bitsEach);
+    if (!stretch || (stretch->firstBit - 1) % bitsPerOctet != 0) {
+        return std::nullopt;
+    }
+    const std::size_t first = (stretch->firstBit - 1) / bitsPerOctet;
+    Ipv6Octets octets = {};
+    if (first > packet.size() || packet.size() - first < octets.size()) {
+        return std::nullopt;
+    }
+    std::copy_n(packet.begin() + static_cast<std::ptrdiff_t>(first), octets.size(), octets.begin());
+    return octets;
+}
+
+std::optional<Ipv6Octets> ipv6Address(const KeyValue &key) {
+    Ipv6Octets octets = {};
+    if (key.type != KeyType::ipv6Address || key.octets.size() != octets.size()) {
+        return std::nullopt;
+    }
+    std::ranges::transform(key.octets, octets.begin(),
+                           [](std::uint8_t octet) { return static_cast<std::uint8_t>(octet << 4 | octet >> 4); });
+    return octets;
+}
+
+std::string keyText(const KeyValue &key) {
+    switch (key.type) {
+    case KeyType::ipv4Address: return ipv4Text(key.number);
+    case KeyType::ipv6Address: {
+        const std::optional<Ipv6Octets> octets = ipv6Address(key);
+        return octets ? ipv6Text(*octets) : std::string();
+    }
+    default: return numberText(key.number, decimal);
+    }
+}
+
+} // namespace netfloor

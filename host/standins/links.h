@@ -1,0 +1,91 @@
+// SPDX-License-Identifier: MIT
+// How the three stand-in libraries reach the host library above them, without linking to it and without
+// knowing more of it than these interfaces.
+//
+// A run is found by its context record, which is the first member of a PreDecodeRun. A block of the heap
+// names its keeper in front of itself, since hs_Realloc gets no context. hx_InitialiseOptXTR gets nothing to go
+// by, so the host names the plug-in that its thread is about to enter (netfloor_setKeyOptions).
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <cstdlib>
+
+#include <netfloor/host.h>
+
+namespace netfloor::standin {
+
+// Decides whether the arrays of one DecodeState may grow.
+class HeapKeeper {
+public:
+    virtual bool allowsGrowth(std::size_t octets) noexcept = 0;
+
+protected:
+    ~HeapKeeper() = default;
+};
+
+// One run of the MD, TO or MV pass.
+class RunOperations {
+public:
+    virtual void addField(std::uint32_t outputRangeCount, const BitRange *ranges, const char *display,
+                          const char *fieldName, std::uint32_t fieldId, std::uint32_t bitOrder) noexcept = 0;
+    virtual void addDisplay(const char *display, std::uint32_t displayId) noexcept = 0;
+    virtual void growLayerInfo() noexcept = 0;
+    virtual std::int32_t preDecode(std::uint32_t mode) noexcept = 0;
+
+protected:
+    ~RunOperations() = default;
+};
+
+// What the host's contexts really are: the plug-in sees the first member.
+struct PreDecodeRun {
+    PreDecodeContext context;
+    RunOperations *operations;
+};
+
+[[nodiscard]] inline RunOperations &operationsOf(PreDecodeContext *context) {
+    return *reinterpret_cast<PreDecodeRun *>(context)->operations;
+}
+
+// The set-up of one plug-in's key-field table.
+class KeyOptions {
+public:
+    virtual std::int32_t initialise(KeyFieldRow *table, std::uint32_t rowCount,
+                                    std::uint16_t *presenceRow) noexcept = 0;
+
+protected:
+    ~KeyOptions() = default;
+};
+
+// Stands in front of each block of the heap.
+struct alignas(std::max_align_t) BlockHead {
+    HeapKeeper *keeper;
+};
+
+[[nodiscard]] inline void *allocateBlock(HeapKeeper *keeper, std::size_t octets) {
+    if (octets > SIZE_MAX - sizeof(BlockHead)) {
+        return nullptr;
+    }
+    auto *const head = static_cast<BlockHead *>(std::malloc(sizeof(BlockHead) + octets));
+    if (head == nullptr) {
+        return nullptr;
+    }
+    head->keeper = keeper;
+    return head + 1;
+}
+
+[[nodiscard]] inline BlockHead *headOf(void *block) {
+    return static_cast<BlockHead *>(block) - 1;
+}
+
+inline void freeBlock(void *block) {
+    if (block != nullptr) {
+        std::free(headOf(block));
+    }
+}
+
+} // namespace netfloor::standin
+
+// libhx_KeyOptions: names what answers hx_InitialiseOptXTR on this thread, or null for nobody. This is the one thing
+// that a stand-in exports beside the operations of netfloor/host.h.
+extern "C" void netfloor_setKeyOptions(netfloor::standin::KeyOptions *options);

@@ -1,0 +1,50 @@
+#!/bin/sh
+# SPDX-License-Identifier: MIT
+# Installs the Debian packages that are missing, and says nothing when none is.
+#
+#   scripts/install-packages.sh decode    what it takes to build the command and decode a capture
+#   scripts/install-packages.sh all       that, and what the tests, the checks and the benchmarks need
+set -eu
+
+decode="g++ cmake ninja-build pkg-config libpcap-dev libcli11-dev zlib1g-dev"
+all="$decode libgtest-dev libbenchmark-dev libtins-dev nlohmann-json3-dev clang clang-format clang-tidy tshark"
+
+case "${1:-all}" in
+decode) wanted=$decode ;;
+all) wanted=$all ;;
+*) echo "usage: $0 [decode|all]" >&2; exit 2 ;;
+esac
+
+if ! command -v apt-get >/dev/null 2>&1; then
+    echo "netfloor: this system has no apt-get; install these packages (Debian names) by hand: $wanted" >&2
+    exit 0
+fi
+
+missing=
+for package in $wanted; do
+    state=$(dpkg-query -W -f '${db:Status-Status}' "$package" 2>/dev/null || true)
+    [ "$state" = installed ] || missing="$missing $package"
+done
+[ -n "$missing" ] || exit 0
+
+echo "netfloor: installing the packages that are missing:$missing" >&2
+as_root=
+if [ "$(id -u)" -ne 0 ]; then
+    if ! command -v sudo >/dev/null 2>&1; then
+        echo "netfloor: these packages can be installed by root only. As root, run:" >&2
+        echo "    apt-get install$missing" >&2
+        exit 1
+    fi
+    as_root=sudo
+fi
+
+log=$(mktemp)
+trap 'rm -f "$log"' EXIT
+# The lists may be old or absent (a fresh container): fetch them, and go on with the old ones if that fails.
+$as_root apt-get update -q >"$log" 2>&1 || true
+# shellcheck disable=SC2086
+if ! $as_root env DEBIAN_FRONTEND=noninteractive apt-get install -y -q --no-install-recommends $missing >>"$log" 2>&1; then
+    tail -n 15 "$log" >&2
+    echo "netfloor: apt-get could not install:$missing. Is the network there, and is no other apt-get running?" >&2
+    exit 1
+fi

@@ -1,0 +1,21 @@
+#!/bin/sh
+# SPDX-License-Identifier: MIT
+# clang-tidy over every source of the build in $1 (default: build), a file a core. A file that passed
+# is not looked at again until it, a header or the set of checks has changed.
+set -eu
+cd "$(dirname "$0")/.."
+build=${1:-build}
+stamps=$build/tidy
+mkdir -p "$stamps"
+
+export stamps build
+shared=$(git ls-files -z --cached --others --exclude-standard -- '*.h' '*.hpp' .clang-tidy |
+    xargs -0 cat | sha256sum | cut -c1-16)
+export shared
+
+git ls-files --cached --others --exclude-standard -- 'plugin/*.cpp' 'host/*.cpp' 'cli/*.cpp' |
+    while read -r file; do [ ! -f "$file" ] || echo "$file"; done |
+    xargs -P "$(nproc)" -I{} sh -c '
+        stamp=$stamps/$(cat "{}" | sha256sum | cut -c1-16)-$shared
+        [ -f "$stamp" ] && exit 0
+        clang-tidy --quiet -p "$build" "{}" 2>/dev/null && touch "$stamp"'

@@ -1,0 +1,243 @@
+// SPDX-License-Identifier: MIT
+// The hand-off to the next layer: the choice of its key, what stands in the records, and what comes back.
+#include <limits>
+#include <optional>
+#include <string>
+#include <vector>
+
+#include <gtest/gtest.h>
+
+#include "frame/bare_host.h"
+#include "frame/example.h"
+#include "support/runs.h"
+
+namespace netfloor::test {
+namespace {
+
+constexpr std::uint32_t unset = 0xabcdef;
+
+struct KeyCase {
+    std::uint16_t source, destination;
+    std::uint32_t port, key, protocol;
+};
+
+TEST(HandOffKey, goesByThePorts) {
+    const std::vector<KeyCase> cases = {
+        // a well-known source port
+        {53, 3452, 53, 53, 17},
+        {0, 0, 0, 0, 17},
+        {1023, 40000, 1023, 1023, 17},
+        // 3452 on either side names no protocol
+        {3452, 53, 3452, 3452, 0},
+        {3452, 3452, 3452, 3452, 0},
+        {1024, 3452, 3452, 3452, 0},
+        {40000, 3452, 3452, 3452, 0},
+        // a destination port below 9000
+        {2000, 2001, 2001, 2001, 17},
+        {1024, 0, 0, 0, 17},
+        {8999, 8999, 8999, 8999, 17},
+        {9000, 8999, 8999, 8999, 17},
+        {3451, 3453, 3453, 3453, 17},
+        // a source port below 9000
+        {1024, 40000, 1024, 1024, 17},
+        {2000, 9000, 2000, 2000, 17},
+        {8999, 9000, 8999, 8999, 17},
+        // neither: the protocol is the key
+        {9000, 9000, unset, 17, 0},
+        {65535, 65535, unset, 17, 0},
+        // a server of RADIUS answers under its own port (RFC 2865, RFC 2866)
+        {1812, 40000, 1812, 1812, 17},
+        {1812, 53, 1812, 1812, 17},
+        {1813, 3452, 1813, 1813, 17},
+        {1811, 53, 53, 53, 17},
+        {1814, 53, 53, 53, 17},
+        {40000, 1812, 1812, 1812, 17},
+    };
+    for (const KeyCase &one : cases) {
+        SCOPED_TRACE(std::to_string(one.source) + " to " + std::to_string(one.destination));
+        RunOptions options;
+        options.state.prepare = [](DecodeState &state) { state.scratch[NETFLOOR_NEXT_LAYER_PORT] = unset; };
+        const Octets datagram = udp(one.source, one.destination, hex("61*5"));
+        const Runs runs = runAll(ipv4({.protocol = 17, .payload = datagram}), options);
+        EXPECT_EQ(handOffLines(runs.md), "hand-off key " + std::to_string(one.key) + " protocol " +
+                                             std::to_string(one.protocol) + " port " + std::to_string(one.port) +
+                                             " at 225 bits 40 octets 5 preceding 28\n");
+        EXPECT_EQ(runs.xtr.key("UDP Destination Port")->number, one.destination); // as it was sent
+        EXPECT_EQ(runs.mv.flags, 0u);
+    }
+}
+
+std::string frameText(const DecodeState &state) {
+    const LayerFrame &frame = state.layerFrames[state.layerIndex];
+    return "frame " + std::to_string(state.layerIndex) + " from " + std::to_string(frame.firstBit) + " key " +
+           std::to_string(frame.nextLayerKey) + " protocol " + std::to_string(frame.nextLayerProtocol) +
+           " handed off " + std::to_string(state.layerHandedOff);
+}
+
+std::string openText(const DecodeState &state) {
+    return "blocks " + stackText(state.blockStarts) + " (" + std::to_string(state.blockStarts.count) + "), limits " +
+           stackText(state.limits) + " (" + std::to_string(state.limits.count) + "), \"" + state.blockName + '"';
+}
+
+// In the XTR pass the host takes over where the others call it.
+TEST(HandOff, whatTheNextLayerFinds) {
+    for (const Pass pass : allPasses) {
+        SCOPED_TRACE(passName(pass));
+        BareRun run(examplePacket());
+        bool called = false;
+        const auto look = [&] {
+            called = true;
+            EXPECT_EQ(frameText(run.state()), "frame 0 from 1 key 53 protocol 17 handed off 1");
+            EXPECT_EQ(openText(run.state()),
+                      "blocks 1 1 1 1 33 161 193 225 225 (8), limits 344 320 (1), \"NEXT LAYER\"");
+            EXPECT_EQ(run.state().cursor, 225u);
+            EXPECT_EQ(run.state().bitsLeft, 96u);
+            EXPECT_EQ(run.contextBitsLeft(pass), 96u);
+            const bool lists = pass == Pass::md || pass == Pass::to;
+            EXPECT_EQ(run.context().layerInfoCount, lists ? 1u : 0u);
+            EXPECT_EQ(run.layerInfo[0].lastBit, lists ? 224u : 0u);
+            EXPECT_EQ(run.context().layerNumber, pass == Pass::xtr ? 1 : 2);
+            return 0;
+        };
+        run.nextLayer = look;
+        EXPECT_EQ(run.enter(pass), 1);
+        EXPECT_EQ(called, pass != Pass::xtr);
+        if (pass == Pass::xtr) {
+            look();
+            continue;
+        }
+        const std::uint32_t mode = pass == Pass::md ? 1 : pass == Pass::mv ? 2 : 0;
+        EXPECT_EQ(run.modes, std::vector<std::uint32_t>{mode});
+    }
+}
+
+// What the next layer leaves is skipped up to the datagram's end, and the layer that goes on is on record.
+TEST(HandOff, whatComesBack) {
+    for (const Pass pass : passesThatHandOn) {
+        SCOPED_TRACE(passName(pass));
+        for (const std::uint32_t taken : {0u, 32u, 95u, 96u}) {
+            BareRun run(examplePacket());
+            run.nextLayer = [&] {
+                run.context().decoderId = 99;
+                run.context().layerNumber = 5;
+                return run.take(taken);
+            };
+            EXPECT_EQ(run.enter(pass), 1);
+            EXPECT_EQ(run.state().cursor, 321u);
+            EXPECT_EQ(run.contextBitsLeft(pass), 24u);
+            EXPECT_EQ(run.context().decoderId, 7u);
+            EXPECT_EQ(run.context().layerNumber, 5);
+            EXPECT_EQ(run.state().flags, pass == Pass::mv && taken < 96 ? 0x10u : 0u);
+            EXPECT_EQ(run.context().verdict, pass == Pass::mv && taken < 96 ? -52 : 1);
+            if (pass != Pass::mv) {
+                EXPECT_EQ(run.context().layerInfoCount, 2u);
+                const LayerInfoRecord &layer = run.layerInfo[1];
+                EXPECT_EQ(layer.firstBit, 225 + taken);
+                EXPECT_EQ(layer.lastBit, 320u);
+                EXPECT_EQ(layer.decoderId, 7u);
+                EXPECT_EQ(layer.layerNumber, 5u);
+            }
+        }
+    }
+}
+
+TEST(HandOff, aFlagOfTheNextLayerCounts) {
+    BareRun run(examplePacket());
+    run.nextLayer = [&run] {
+        run.state().flags |= 0x2;
+        return run.take(96);
+    };
+    EXPECT_EQ(run.enter(Pass::mv), 1);
+    EXPECT_EQ(run.context().verdict, -52);
+}
+
+TEST(HandOff, aNegativeResultCutsThePassOff) {
+    for (const Pass pass : passesThatHandOn) {
+        for (const std::int32_t result : {std::numeric_limits<std::int32_t>::min(), -1, 0, 1, 1000}) {
+            BareRun run(examplePacket());
+            run.nextLayer = [&] {
+                run.context().decoderId = 99;
+                run.take(96);
+                return result;
+            };
+            const bool refused = result < 0;
+            EXPECT_EQ(run.enter(pass), refused ? 0 : 1);
+            EXPECT_EQ(run.state().flags, 0u);
+            EXPECT_EQ(run.context().verdict, 1);
+            EXPECT_EQ(run.context().decoderId, refused ? 99u : 7u);
+            EXPECT_EQ(run.contextBitsLeft(pass), refused ? 96u : 24u);
+            EXPECT_EQ(run.context().layerNumber, 2);
+            EXPECT_EQ(run.context().layerInfoCount, pass == Pass::mv ? 0u : refused ? 1u : 2u);
+            EXPECT_EQ(openText(run.state()),
+                      refused ? "blocks 1 1 1 1 33 161 193 225 225 (8), limits 344 320 (1), \"NEXT LAYER\""
+                              : "blocks 1 (8), limits 344 (1), \"NEXT LAYER\"");
+        }
+    }
+}
+
+// Packets in packets, by way of the host. The pass has one set of variables: the plug-in's id that goes back into
+// the context is that of the innermost entry.
+TEST(HandOff, entriesInsideOneAnother) {
+    Octets packet = ipv4({.protocol = 17, .payload = udp(2000, 2001, hex("61*12"))});
+    packet = ipv4({.protocol = 17, .payload = udp(3452, 9, packet)});
+    packet = ipv4({.protocol = 17, .payload = udp(1812, 3452, packet)});
+    for (const Pass pass : passesThatHandOn) {
+        SCOPED_TRACE(passName(pass));
+        BareRun run(packet);
+        std::vector<std::string> frames;
+        run.nextLayer = [&] {
+            frames.push_back(frameText(run.state()));
+            if (frames.size() == 3) {
+                return run.take(96);
+            }
+            run.context().decoderId = static_cast<std::uint32_t>(50 + frames.size());
+            EXPECT_EQ(run.enter(pass), 1);
+            return 0;
+        };
+        EXPECT_EQ(run.enter(pass), 1);
+        EXPECT_EQ(frames, (std::vector<std::string>{"frame 0 from 1 key 1812 protocol 17 handed off 1",
+                                                    "frame 1 from 225 key 3452 protocol 0 handed off 1",
+                                                    "frame 2 from 449 key 2001 protocol 17 handed off 1"}));
+        EXPECT_EQ(run.state().cursor, 8 * packet.size() + 1);
+        EXPECT_EQ(run.contextBitsLeft(pass), 0u);
+        EXPECT_EQ(run.state().flags, 0u);
+        EXPECT_EQ(stackText(run.state().blockStarts), "1");
+        EXPECT_EQ(run.context().decoderId, 52u);
+        if (pass == Pass::mv) {
+            continue;
+        }
+        EXPECT_EQ(run.seen.size(), 3 * 22u);
+        std::string layers;
+        for (std::uint32_t i = 0; i < run.context().layerInfoCount; ++i) {
+            const LayerInfoRecord &layer = run.layerInfo[i];
+            layers += std::to_string(layer.layerNumber) + " of " + std::to_string(layer.decoderId) + ": " +
+                      std::to_string(layer.firstBit) + '-' + std::to_string(layer.lastBit) + '\n';
+        }
+        EXPECT_EQ(layers, expected(R"(
+            1 of 7: 1-224
+            2 of 51: 225-448
+            3 of 52: 449-672
+            4 of 52: 769-768
+            4 of 52: 769-768
+            4 of 52: 769-768
+        )"));
+    }
+}
+
+// The host may enter the XTR pass again at the stop, on the stacks as they stand.
+TEST(HandOff, extractionGoesOnAtTheStop) {
+    const Octets inner = ipv4({.protocol = 17, .payload = udp(2000, 2001, hex("61*12")), .identification = 0x77});
+    const Octets packet = ipv4({.protocol = 17, .payload = udp(53, 53, inner)});
+    BareRun run(packet);
+    EXPECT_EQ(run.enter(Pass::xtr), 1);
+    EXPECT_EQ(run.enter(Pass::xtr), 1);
+    EXPECT_EQ(frameText(run.state()), "frame 1 from 225 key 2001 protocol 17 handed off 1");
+    EXPECT_EQ(openText(run.state()), "blocks 1 1 1 1 33 161 193 225 225 225 225 225 257 385 417 449 449 (16), "
+                                     "limits 544 544 544 (2), \"NEXT LAYER\"");
+    EXPECT_EQ(run.xtr.bitsLeft, 96u);
+    EXPECT_EQ(linesWith(run.keyText(), "2=77"), "");
+    EXPECT_NE(run.keyText().find("2=77 00\n"), std::string::npos); // the later store wins
+}
+
+} // namespace
+} // namespace netfloor::test

@@ -1,0 +1,224 @@
+// SPDX-License-Identifier: MIT
+// The key-field table, its set-up, and the stores into the key record.
+#include <algorithm>
+#include <array>
+#include <limits>
+#include <string>
+#include <vector>
+
+#include <gtest/gtest.h>
+
+#include "frame/bare_host.h"
+#include "frame/example.h"
+
+namespace netfloor::test {
+namespace {
+
+// All 113 rows, in the order in which a host finds them.
+constexpr std::array<const char *, KeyRoom::rows> names = {"Version",
+                                                           "Total Length",
+                                                           "Identification",
+                                                           "Time to Live",
+                                                           "Protocol",
+                                                           "Source Address",
+                                                           "Destination Address",
+                                                           "DF",
+                                                           "MF",
+                                                           "Fragment Offset",
+                                                           "IP Address",
+                                                           "ICMP Message Type",
+                                                           "ICMP Message Type",
+                                                           "ICMP Message Type",
+                                                           "Code",
+                                                           "ICMP Sequence Number",
+                                                           "Code",
+                                                           "ICMP Sequence Number",
+                                                           "Code",
+                                                           "Code",
+                                                           "Code",
+                                                           "Code",
+                                                           "Code",
+                                                           "Code",
+                                                           "ICMP Sequence Number",
+                                                           "Code",
+                                                           "ICMP Sequence Number",
+                                                           "Code",
+                                                           "ICMP Sequence Number",
+                                                           "Code",
+                                                           "ICMP Sequence Number",
+                                                           "Code",
+                                                           "Code",
+                                                           "Code",
+                                                           "ICMP Sequence Number",
+                                                           "Address Mask",
+                                                           "Code",
+                                                           "ICMP Sequence Number",
+                                                           "Address Mask",
+                                                           "Embedded IP Protocols",
+                                                           "Embedded IP Protocols",
+                                                           "Embedded IP Protocols",
+                                                           "Embedded IP Protocols",
+                                                           "Embedded IP Protocols",
+                                                           "Embedded IP Protocols",
+                                                           "Embedded IP Protocols",
+                                                           "Embedded IP Protocols",
+                                                           "Embedded IP Protocols",
+                                                           "Embedded IP Protocols",
+                                                           "TCP Source Port",
+                                                           "TCP Destination Port",
+                                                           "TCP Destination Port",
+                                                           "TCP Destination Port",
+                                                           "Sequence Number",
+                                                           "Acknowledgement Number",
+                                                           "Data Offset",
+                                                           "RST",
+                                                           "SYN",
+                                                           "FIN",
+                                                           "UDP Source Port",
+                                                           "UDP Destination Port",
+                                                           "UDP Destination Port",
+                                                           "UDP Destination Port",
+                                                           "Original Internet Header Length",
+                                                           "Original IP Total Length",
+                                                           "IPinIP Protocol",
+                                                           "Original Src Address",
+                                                           "Original Dest Address",
+                                                           "MIPinIP Protocol",
+                                                           "Original Dest Address",
+                                                           "Original Src Address",
+                                                           "Checksum Present",
+                                                           "Key Present",
+                                                           "Sequence Number Present",
+                                                           "GRE Protocol",
+                                                           "GRE Key",
+                                                           "Sequence Number",
+                                                           "ICMP Message Type",
+                                                           "Code ",
+                                                           "Code ",
+                                                           "Code ",
+                                                           "Code ",
+                                                           "Code ",
+                                                           "Code ",
+                                                           "SCTP Source Port Number",
+                                                           "SCTP Destination Port Number",
+                                                           "SCTP Chunk Type",
+                                                           "TSN",
+                                                           "Stream Indetifier S",
+                                                           "Stream Sequence Number n",
+                                                           "Payload Protocol Identifier",
+                                                           "Initial Transmission Sequence Number(I_TSN)",
+                                                           "Initial Transmission Sequence Number(I_TSN)",
+                                                           "Cumulative TSN Ack",
+                                                           "Cumulative TSN Ack",
+                                                           "Payload Length",
+                                                           "Payload Length",
+                                                           "Source IP Address",
+                                                           "Destination IP Address",
+                                                           "Next Header",
+                                                           "IP Address",
+                                                           "fragment Offset",
+                                                           "M Flag",
+                                                           "SPI",
+                                                           "Sequence Number",
+                                                           "SPI",
+                                                           "Sequency Number",
+                                                           "Header Extention length",
+                                                           "Option Type",
+                                                           "Option Type",
+                                                           "Option Type",
+                                                           "Opt Data Length",
+                                                           ""};
+
+// Octets of the example's key fields, numbers in the order of a little-endian host.
+constexpr const char *exampleKeys = "0=04\n1=28 00\n2=ab 00\n3=40\n4=11\n5=01 00 00 0a\n6=02 00 a8 c0\n7=01\n8=01\n"
+                                    "9=c8 05\n59=35 00\n62=40 9c\n";
+
+TEST(KeyTable, isHandedToTheHost) {
+    BarePlugin plugin;
+    BareRun run(examplePacket(), {}, plugin);
+    EXPECT_EQ(run.enter(Pass::xtr), 1);
+    EXPECT_EQ(plugin.rowCount, 113u);
+    ASSERT_EQ(plugin.tableAtLoad.size(), names.size());
+    for (std::size_t row = 0; row < names.size(); ++row) {
+        const KeyFieldRow &entry = plugin.tableAtLoad[row];
+        EXPECT_STREQ(entry.fieldName, names[row]) << row;
+        EXPECT_STREQ(entry.protocolName, "netfloor");
+        EXPECT_EQ(entry.presenceOffset | entry.valueOffset | entry.presenceMask, 0u);
+        EXPECT_EQ(entry.zero[0] | entry.zero[1] | entry.zero[2], 0u);
+    }
+}
+
+// A value takes the octets of its field's width and no more; other marks in a presence octet stay.
+TEST(KeyRecord, holdsTheFieldsOfAPacket) {
+    BareRun run(examplePacket());
+    EXPECT_EQ(run.enter(Pass::xtr), 1);
+    EXPECT_EQ(run.keyText(), exampleKeys);
+    EXPECT_TRUE(run.modes.empty() && run.seen.empty());
+    EXPECT_EQ(run.xtr.byteAreaOffset, 0u);
+}
+
+TEST(KeyRecord, isFilledAsFarAsThePacketGoes) {
+    const std::string all = exampleKeys;
+    struct Case {
+        std::size_t octets;
+        const char *nextRow; // the first that is not there
+    };
+    for (const Case &cut : {Case{0, "0="}, Case{1, "1="}, Case{3, "1="}, Case{4, "2="}, Case{39, "2="}}) {
+        BareRun run(Octets(examplePacket().begin(), examplePacket().begin() + static_cast<std::ptrdiff_t>(cut.octets)));
+        EXPECT_EQ(run.enter(Pass::xtr), 1);
+        EXPECT_EQ(run.keyText(), all.substr(0, all.find(cut.nextRow))) << cut.octets;
+    }
+}
+
+struct SetUpCase {
+    std::vector<std::int32_t> answers; // of the host, in turn
+    std::uint16_t presenceRow;
+    std::vector<std::int32_t> results;    // of one entry after another
+    std::vector<std::uint32_t> callsThen; // of the set-up, behind each entry
+    std::string marked;                   // in the record of a packet without fields
+};
+
+// Refused once is refused for good, and so is ready; not ready is asked again.
+TEST(KeyTable, isSetUpUntilItIsDone) {
+    constexpr std::int32_t lowest = std::numeric_limits<std::int32_t>::min();
+    const std::vector<SetUpCase> cases = {
+        {{1}, 7, {1, 1, 1}, {1, 1, 1}, ""},
+        {{0, 0, 0, 1}, 7, {1, 1, 1, 1, 1}, {1, 2, 3, 4, 4}, ""},
+        {{-5, 1}, 7, {-5, -5, -5}, {1, 1, 1}, ""},
+        {{lowest, 1}, 7, {lowest, lowest}, {1, 1}, ""},
+        {{0, -7, 1}, 7, {1, -7, -7}, {1, 2, 2}, ""},
+        {{2, -1}, 7, {1, 1, 1}, {1, 1, 1}, "7=\n"},
+        {{0, 300, -1}, 0, {1, 1, 1}, {1, 2, 2}, "0=\n"},
+        {{2}, 112, {1, 1}, {1, 1}, "112=\n"}, // the row of no field
+    };
+    for (const SetUpCase &setUp : cases) {
+        BarePlugin plugin(setUp.answers, setUp.presenceRow);
+        for (std::size_t entry = 0; entry < setUp.results.size(); ++entry) {
+            SCOPED_TRACE("first answer " + std::to_string(setUp.answers[0]) + ", entry " + std::to_string(entry));
+            BareRun run(examplePacket(), {}, plugin);
+            EXPECT_EQ(run.enter(Pass::xtr), setUp.results[entry]);
+            EXPECT_EQ(plugin.calls, setUp.callsThen[entry]);
+            if (setUp.results[entry] < 0) {
+                EXPECT_EQ(run.keyText(), "");
+                EXPECT_EQ(run.state().cursor, 1u);
+                EXPECT_EQ(run.state().layerHandedOff, 1u);
+                EXPECT_EQ(run.state().blockName, std::string());
+                EXPECT_EQ(run.xtr.bitsLeft, 0xeeeeeeeeu);
+                continue;
+            }
+            EXPECT_EQ(run.keyText(), exampleKeys + std::string(setUp.presenceRow == 112 ? setUp.marked : ""));
+            if (plugin.calls < setUp.callsThen.back()) {
+                continue;
+            }
+            BareRun empty({}, {}, plugin);
+            EXPECT_EQ(empty.enter(Pass::xtr), 1);
+            EXPECT_EQ(empty.keyText(), setUp.marked);
+        }
+        BareRun other(examplePacket(), {}, plugin); // only the XTR pass asks
+        EXPECT_EQ(other.enter(Pass::md), 1);
+        EXPECT_EQ(plugin.calls, setUp.callsThen.back());
+    }
+}
+
+} // namespace
+} // namespace netfloor::test

@@ -1,0 +1,216 @@
+// SPDX-License-Identifier: MIT
+// The field step: what the host can see at each call, and what stays behind.
+#include <algorithm>
+#include <string>
+#include <vector>
+
+#include <gtest/gtest.h>
+
+#include "frame/bare_host.h"
+#include "frame/example.h"
+#include "support/runs.h"
+
+namespace netfloor::test {
+namespace {
+
+// Marks all that the plug-in is to leave alone, or to overwrite only as far as a field reaches.
+void seed(DecodeState &state) {
+    state.reserved1 = 0x11;
+    state.reserved2 = 0x22;
+    state.condition = 1;
+    state.advance = -5;
+    std::fill_n(state.scratch, 32, 0x33);
+    FieldRecord &record = state.fieldRecord;
+    record.fieldId = 9999;
+    std::copy_n("seed", 5, record.fieldName);
+    std::copy_n("old", 4, record.valueText);
+    record.value = 12345;
+    record.rangeCount = 2;
+    record.outputRangeCount = 3;
+    record.wideStart = 0x44;
+    record.wideBits = 0x55;
+    record.rawFlag = 0x66;
+    std::fill_n(record.untouched1, 2, 0x77);
+    std::fill_n(record.untouched2, 2, 0x88);
+    std::fill_n(record.ranges, record.rangeCapacity, BitRange{8, 8, 8, 90, {0x99, 0x99}});
+}
+
+StateOptions seeded() {
+    StateOptions options;
+    options.prepare = seed;
+    return options;
+}
+
+const std::string &stateAt(const BareRun &run, std::uint32_t id) {
+    return std::ranges::find(run.seen, id, &Seen::id)->state;
+}
+
+// The cursor stands behind the field already. A single or written-out element clears its flag word, the octets of
+// a loop leave it.
+TEST(FieldStep, whatTheHostSeesDuringACall) {
+    BareRun md(examplePacket(), seeded());
+    EXPECT_EQ(md.enter(Pass::md), 1);
+    ASSERT_EQ(md.seen.size(), 22u);
+    const std::string states = stateAt(md, 150) + '\n' + stateAt(md, 152) + '\n' + stateAt(md, 286) + '\n' +
+                               stateAt(md, 290) + '\n' + stateAt(md, 153) + '\n' + stateAt(md, 292) + '\n' +
+                               stateAt(md, 294) + '\n' + stateAt(md, 295) + '\n' + stateAt(md, 159) + '\n' +
+                               stateAt(md, 479) + '\n' + stateAt(md, 490) + '\n';
+    EXPECT_EQ(states, expected(R"(
+        cursor 1 left 344 advance 0 condition 1 block "Ip Header" field 150 "Version" value 4 ranges 1/1 4:5-8:0
+        cursor 9 left 336 advance 8 condition 1 block "IPv4 Header" field 152 "Internet Header Length" value 5 ranges 1/1 5:1-4:0
+        cursor 9 left 336 advance 0 condition 1 block "Type of Service" field 286 "Precedence" value 5 ranges 1/1 5:14-16:0
+        cursor 17 left 328 advance 8 condition 1 block "Type of Service" field 290 "Reserved" value 3 ranges 1/1 3:9-10:0
+        cursor 33 left 312 advance 16 condition 1 block "IPv4 Header" field 153 "Total Length" value 40 ranges 2/2 0:17-24:0 40:25-32:90
+        cursor 49 left 272 advance 0 condition 1 block "Flag and Fragment Offset" field 292 "DF" value 1 ranges 1/1 1:55-55:0
+        cursor 65 left 256 advance 16 condition 1 block "Flag and Fragment Offset" field 294 "Fragment Offset" value 1480 ranges 2/2 0:49-53:0 185:57-64:0
+        cursor 81 left 240 advance 8 condition 1 block "Protocol" field 295 "Protocol" value 17 ranges 1/1 17:73-80:0
+        cursor 129 left 192 advance 32 condition 1 block "Extra" field 159 "Source Address" value 167772161 ranges 4/4 10:97-104:0 0:105-112:0 0:113-120:90 1:121-128:90
+        cursor 177 left 144 advance 16 condition 1 block "User Datagram Protocol" field 479 "UDP Source Port" value 53 ranges 2/2 0:161-168:0 53:169-176:0
+        cursor 225 left 96 advance 16 condition 1 block "" field 490 "Checksum" value 48879 ranges 2/2 190:209-216:0 239:217-224:0
+    )"));
+
+    BareRun to(examplePacket(), seeded());
+    EXPECT_EQ(to.enter(Pass::to), 1);
+    ASSERT_EQ(to.seen.size(), md.seen.size());
+    for (std::size_t i = 0; i < md.seen.size(); ++i) {
+        EXPECT_EQ(to.seen[i].state, md.seen[i].state);
+        EXPECT_EQ(md.seen[i].bitOrder, 0u);
+    }
+}
+
+// Elements that a later field does not reach keep what an earlier one left, in every pass.
+TEST(FieldStep, whatStaysBehindARun) {
+    for (const Pass pass : allPasses) {
+        SCOPED_TRACE(passName(pass));
+        BareRun run(examplePacket(), seeded());
+        std::string atHandOff = "none";
+        run.nextLayer = [&] {
+            atHandOff = describe(run.state());
+            return run.take(96);
+        };
+        EXPECT_EQ(run.enter(pass), 1);
+        EXPECT_EQ(run.seen.empty(), pass == Pass::mv || pass == Pass::xtr);
+        const DecodeState &state = run.state();
+        if (pass == Pass::xtr) {
+            atHandOff = describe(state);
+        }
+        EXPECT_EQ(atHandOff.substr(atHandOff.find(" block")),
+                  " block \"NEXT LAYER\" field 490 \"Checksum\" value 48879 "
+                  "ranges 2/2 190:209-216:0 239:217-224:0");
+        const FieldRecord &record = state.fieldRecord;
+        EXPECT_EQ(describe(state).substr(describe(state).find(" field")), atHandOff.substr(atHandOff.find(" field")));
+        EXPECT_EQ(record.rawFlag, 0u);
+        EXPECT_EQ(record.wideStart + record.wideBits, 0x99u);
+        EXPECT_EQ(record.untouched1[0] + record.untouched1[1], 2 * 0x77u);
+        EXPECT_EQ(record.untouched2[0] + record.untouched2[1], 2 * 0x88u);
+        EXPECT_EQ(state.reserved1 + state.reserved2, 0x33u);
+        EXPECT_EQ(std::ranges::count(state.scratch, 0x33u), 29); // all but the three that the hand-off writes
+        EXPECT_EQ(hexText({state.data, examplePacket().size()}), hexText(examplePacket()));
+
+        // The last field of four elements was the destination address.
+        const BitRange third = record.ranges[2];
+        EXPECT_EQ(third.value, 0u);
+        EXPECT_EQ(third.firstBit, 145u);
+        EXPECT_EQ(third.lastBit, 152u);
+        EXPECT_EQ(third.flagWord, 90u);
+        EXPECT_EQ(record.ranges[3].value, 2u);
+        EXPECT_EQ(record.ranges[4].firstBit, 8u);
+        EXPECT_EQ(third.untouched[0] + third.untouched[1], 2 * 0x99u);
+    }
+}
+
+TEST(FieldStep, fieldThatDoesNotFitLeavesTheRecord) {
+    for (const Pass pass : allPasses) {
+        for (std::uint32_t bits = 0; bits < 8; ++bits) {
+            StateOptions options = seeded();
+            options.totalBits = bits;
+            BareRun run(hex("45"), options);
+            EXPECT_EQ(run.enter(pass), 1);
+            EXPECT_EQ(describe(run.state()), "cursor 1 left " + std::to_string(bits) +
+                                                 " advance -5 condition 0 block \"Ip Header\" field 9999 \"seed\" "
+                                                 "value 12345old ranges 2/3 8:8-8:90 8:8-8:90");
+            EXPECT_EQ(run.contextBitsLeft(pass), bits);
+            EXPECT_EQ(run.state().flags, 0u);
+            EXPECT_TRUE(run.seen.empty());
+        }
+    }
+}
+
+struct CutCase {
+    std::uint32_t bits;
+    std::size_t fields;
+    std::uint32_t cursor;
+};
+
+// The first field of an octet needs all of it, though later ones need less.
+TEST(FieldStep, packetThatEndsInsideAnOctet) {
+    const std::vector<CutCase> cases = {{8, 2, 9},   {9, 2, 9},   {15, 2, 9},   {16, 7, 17},
+                                        {31, 7, 17}, {32, 8, 33}, {319, 8, 33}, {320, 22, 321}};
+    for (const CutCase &cut : cases) {
+        SCOPED_TRACE(std::to_string(cut.bits) + " bits");
+        StateOptions options;
+        options.totalBits = cut.bits;
+        BareRun run(examplePacket(), options);
+        EXPECT_EQ(run.enter(Pass::md), 1);
+        EXPECT_EQ(run.seen.size(), cut.fields);
+        EXPECT_EQ(run.state().cursor, cut.cursor);
+        EXPECT_EQ(run.contextBitsLeft(Pass::md), cut.bits + 1 - cut.cursor);
+    }
+}
+
+// A layer below may leave the cursor on any bit: the same is read, at other bits.
+TEST(FieldStep, packetAtEveryBitOfAnOctet) {
+    const Runs plain = runAll(examplePacket());
+    for (unsigned shift = 1; shift < 8; ++shift) {
+        SCOPED_TRACE("at bit " + std::to_string(shift));
+        RunOptions options;
+        options.state.cursor = 1 + shift;
+        options.state.totalBits = shift + 8 * static_cast<std::uint32_t>(examplePacket().size());
+        const Runs moved = runAll(shifted(examplePacket(), shift), options);
+        ASSERT_EQ(moved.md.fields.size(), plain.md.fields.size());
+        for (std::size_t i = 0; i < plain.md.fields.size(); ++i) {
+            const FieldReport &field = plain.md.fields[i];
+            const FieldReport &other = moved.md.fields[i];
+            EXPECT_EQ(other.name + other.text, field.name + field.text);
+            std::vector<ReportedRange> ranges = field.ranges;
+            for (ReportedRange &range : ranges) {
+                range.firstBit += shift;
+                range.lastBit += shift;
+            }
+            EXPECT_EQ(other.ranges, ranges) << field.name;
+        }
+        EXPECT_EQ(lines(moved.to), lines(plain.to));
+        EXPECT_EQ(lines(moved.xtr), lines(plain.xtr));
+        EXPECT_EQ(moved.md.cursor, plain.md.cursor + shift);
+        EXPECT_EQ(moved.md.bitsLeft, plain.md.bitsLeft);
+    }
+}
+
+TEST(FieldStep, smallStack) {
+    onSmallStack([] { runAll(examplePacket()); });
+}
+
+struct DateCase {
+    std::uint32_t seconds;
+    const char *text;
+};
+
+TEST(DateConv, appendsTheTimeOfTheFieldRecord) {
+    const std::vector<DateCase> cases = {
+        {0, "1970-01-01 00:00:00"},          {59, "1970-01-01 00:00:59"},         {86399, "1970-01-01 23:59:59"},
+        {68169599, "1972-02-28 23:59:59"},   {951782400, "2000-02-29 00:00:00"},  {978307199, "2000-12-31 23:59:59"},
+        {1709164800, "2024-02-29 00:00:00"}, {2147483647, "2038-01-19 03:14:07"}, {2147483648, "2038-01-19 03:14:08"},
+        {4107542400, "2100-03-01 00:00:00"}, {4294967295, "2106-02-07 06:28:15"},
+    };
+    const auto dateConv = sharedHost().library().dateConv();
+    for (const DateCase &date : cases) {
+        DecodeState state = {};
+        state.fieldRecord.value = date.seconds;
+        std::array<char, 24> text = {'a', 't', ' '};
+        EXPECT_EQ(dateConv(text.data(), reinterpret_cast<void *>(1), &state), text.data());
+        EXPECT_EQ(std::string(text.data()), std::string("at ") + date.text);
+    }
+}
+
+} // namespace
+} // namespace netfloor::test

@@ -1,0 +1,156 @@
+// SPDX-License-Identifier: MIT
+// Loading a plug-in: what is refused, and with which words.
+#include <cstdlib>
+#include <filesystem>
+#include <fstream>
+#include <functional>
+#include <iterator>
+#include <string>
+#include <vector>
+
+#include <gtest/gtest.h>
+
+#include "netfloor-host/host.h"
+
+namespace netfloor::test {
+namespace {
+
+std::string contentOfPlugin() {
+    std::ifstream file(NETFLOOR_PLUGIN, std::ios::binary);
+    return {std::istreambuf_iterator<char>(file), std::istreambuf_iterator<char>()};
+}
+
+// The plug-in's file with one name in its tables changed to another of the same length.
+std::string pluginWith(const std::string &name, const std::string &changed) {
+    std::string content = contentOfPlugin();
+    const std::string whole = '\0' + name + '\0';
+    std::size_t found = 0;
+    for (std::size_t at = content.find(whole); at != std::string::npos; at = content.find(whole, at + 1)) {
+        content.replace(at + 1, name.size(), changed);
+        ++found;
+    }
+    EXPECT_GE(found, 1U) << name;
+    return content;
+}
+
+class Refusal : public testing::Test {
+protected:
+    Refusal() : directory_(std::filesystem::temp_directory_path() / "netfloor-refusal-XXXXXX") {
+        std::string pattern = directory_.string();
+        EXPECT_NE(::mkdtemp(pattern.data()), nullptr);
+        directory_ = pattern;
+    }
+    ~Refusal() override { std::filesystem::remove_all(directory_); }
+
+    std::filesystem::path file(const std::string &content) {
+        const std::filesystem::path path = directory_ / ("plugin" + std::to_string(++files_) + ".so");
+        std::ofstream(path, std::ios::binary) << content;
+        return path;
+    }
+
+    std::filesystem::path directory_;
+    int files_ = 0;
+};
+
+TEST_F(Refusal, SaysWhatIsWrongWhereAndWhatToDo) {
+    std::string otherMachine = contentOfPlugin();
+    otherMachine.at(4) = 1; // 32 bits
+    std::string cut = contentOfPlugin();
+    cut.resize(200);
+    const struct {
+        std::filesystem::path path;
+        std::vector<std::string> words;
+    } cases[] = {
+        {directory_ / "absent.so", {"no such file", "Give the path of a netfloor plug-in"}},
+        {directory_, {"it is a directory", "Give the path"}},
+        {file(""), {"it is not a shared library", "Give the path"}},
+        {file("#!/bin/sh\n"), {"it is not a shared library"}},
+        {file(otherMachine), {"the loader refuses it", "for this machine"}},
+        {file(cut), {"the loader refuses it"}},
+        {file(pluginWith("vex_PreDecodeTO", "vex_PreDecodeXX")), {"does not export vex_PreDecodeTO."}},
+        {file(pluginWith("XTR_netfloor", "XTR_otherone")), {"does not export XTR_netfloor."}},
+        {file(pluginWith("date_conv", "date_Conv")), {"does not export date_conv."}},
+        {file(pluginWith("hd_PreDecode", "hd_PreDecoDe")), {"undefined symbol: hd_PreDecoDe", "netfloor/host.h"}},
+        {file(pluginWith("libhx_KeyOptions.so", "libhx_NoOptions.so.")), {"libhx_NoOptions.so", "build it again"}},
+    };
+    for (const auto &[path, words] : cases) {
+        for (const auto open : {&PluginLibrary::open, &PluginLibrary::openCopy}) {
+            try {
+                static_cast<void>(open(path));
+                ADD_FAILURE() << path << " was taken: " << words.front();
+            } catch (const PluginError &error) {
+                const std::string message = error.what();
+                EXPECT_NE(message.find(path.string()), std::string::npos) << message;
+                for (const std::string &word : words) {
+                    EXPECT_NE(message.find(word), std::string::npos) << word << " is not in: " << message;
+                }
+            }
+        }
+    }
+}
+
+TEST_F(Refusal, NamesEachExportThatIsMissing) {
+    // A library that is loaded anyway, and is no plug-in.
+    const std::filesystem::path stranger =
+        std::filesystem::path(NETFLOOR_PLUGIN).parent_path().parent_path() / "host" / "libhd_HostDispatch.so";
+    try {
+        static_cast<void>(PluginLibrary::open(stranger));
+        ADD_FAILURE() << stranger << " was taken";
+    } catch (const PluginError &error) {
+        EXPECT_NE(std::string(error.what())
+                      .find("vex_PreDecodeMD, vex_PreDecodeTO, vex_PreDecodeMV, XTR_netfloor, date_conv"),
+                  std::string::npos)
+            << error.what();
+    }
+}
+
+TEST(PluginLibrary, SharesOneLoadAndCopiesStandAlone) {
+    const PluginLibrary first = PluginLibrary::open(NETFLOOR_PLUGIN);
+    // The same file by a relative path is the same load.
+    const PluginLibrary second = PluginLibrary::open(std::filesystem::relative(NETFLOOR_PLUGIN));
+    const PluginLibrary copy = PluginLibrary::openCopy(NETFLOOR_PLUGIN);
+    EXPECT_EQ(first.preDecodeMD(), second.preDecodeMD());
+    EXPECT_NE(first.preDecodeMD(), copy.preDecodeMD());
+    EXPECT_EQ(copy.find("vex_PreDecodeMV"), reinterpret_cast<void *>(copy.preDecodeMV()));
+    EXPECT_EQ(copy.find("no_such_export"), nullptr);
+    EXPECT_EQ(copy.path(), NETFLOOR_PLUGIN);
+}
+
+TEST(PluginLibrary, WritesDates) {
+    const PluginLibrary library = PluginLibrary::open(NETFLOOR_PLUGIN);
+    EXPECT_EQ(library.dateText(0), "1970-01-01 00:00:00");
+    EXPECT_EQ(library.dateText(951827696), "2000-02-29 12:34:56");
+}
+
+// Each load asks for its set-up until it is told 1 or more, or is refused for good.
+TEST(PluginLibrary, SetsUpKeysOncePerLoad) {
+    const std::vector<std::uint8_t> packet = {0x45};
+    const struct {
+        KeySetUp setUp;
+        std::vector<std::int32_t> results; // of an XTR pass each
+        std::uint32_t calls;
+        std::size_t keysAtLast;
+    } cases[] = {
+        {{{1}, 0}, {1, 1}, 1, 1},                   // "Version"
+        {{{0, 0, 0, 1}, 0}, {1, 1, 1, 1, 1}, 4, 1}, // not ready three times
+        {{{-7}, 0}, {-7, -7}, 1, 0},
+        {{{0, -3}, 0}, {1, -3, -3}, 2, 0},
+        {{{2}, 7}, {1, 1}, 1, 2}, // row 7 is marked in every record
+    };
+    for (const auto &[setUp, results, calls, keysAtLast] : cases) {
+        Host host(PluginLibrary::openCopy(NETFLOOR_PLUGIN));
+        host.library().setKeySetUp(setUp);
+        Report report;
+        for (const std::int32_t result : results) {
+            report = host.run(Pass::xtr, packet);
+            EXPECT_EQ(report.result, result);
+            EXPECT_EQ(report.ending, result < 0 ? Ending::keysDenied : Ending::complete);
+        }
+        EXPECT_EQ(host.library().keySetUpCalls(), calls);
+        EXPECT_EQ(report.keys.size(), keysAtLast);
+        EXPECT_EQ(host.library().keyFieldNames().size(), results.back() < 0 ? 0U : 113U);
+    }
+}
+
+} // namespace
+} // namespace netfloor::test

@@ -1,0 +1,91 @@
+// SPDX-License-Identifier: MIT
+// Results in words: addresses, flags, key fields.
+#include <cstdint>
+#include <numeric>
+#include <string>
+#include <utility>
+#include <vector>
+
+#include <gtest/gtest.h>
+
+#include "netfloor-host/text.h"
+#include "support/packets.h"
+
+namespace netfloor::test {
+namespace {
+
+Ipv6Octets octetsOf(std::string_view text) {
+    Ipv6Octets octets = {};
+    const Octets given = hex(text);
+    std::copy(given.begin(), given.end(), octets.begin());
+    return octets;
+}
+
+TEST(Text, ShowsIpv6AddressesAsRfc5952Asks) {
+    const std::pair<std::string_view, std::string_view> cases[] = {
+        {"", "::"},
+        {"00*15 01", "::1"},
+        {"20010db8 00*11 01", "2001:db8::1"},
+        {"20010db8 0000 0001 0001 0001 0001 0001", "2001:db8:0:1:1:1:1:1"}, // one group is not shortened
+        {"2001 0000 0000 0001 0000 0000 0000 0001", "2001:0:0:1::1"},       // the longest run
+        {"20010db8 0000 0000 0001 0000 0000 0001", "2001:db8::1:0:0:1"},    // the first of two runs
+        {"2001 0db8 aaaa bbbb cccc dddd eeee 0000", "2001:db8:aaaa:bbbb:cccc:dddd:eeee:0"},
+        {"2001 0db8 aaaa bbbb cccc dddd 0000 0000", "2001:db8:aaaa:bbbb:cccc:dddd::"},
+        {"0000 0000 0001 0002 0003 0004 0005 0006", "::1:2:3:4:5:6"},
+        {"00*10 ffff c0a80001", "::ffff:192.168.0.1"},
+        {"ABCDEF01 00*11 0A", "abcd:ef01::a"},
+    };
+    for (const auto &[octets, text] : cases) {
+        EXPECT_EQ(ipv6Text(octetsOf(octets)), text);
+    }
+    EXPECT_EQ(ipv4Text(0xc0a8000a), "192.168.0.10");
+    EXPECT_EQ(ipv4Text(0xffffffff), "255.255.255.255");
+}
+
+// `count` ranges of `bits` bits, one behind the other.
+FieldReport fieldOf(std::uint32_t firstBit, std::uint32_t count, std::uint32_t bits) {
+    FieldReport field;
+    for (std::uint32_t i = 0; i < count; ++i) {
+        field.ranges.push_back({0, firstBit + i * bits, firstBit + (i + 1) * bits - 1});
+    }
+    return field;
+}
+
+TEST(Text, FindsIpv6AddressesByTheirRanges) {
+    Octets packet(20);
+    std::iota(packet.begin(), packet.end(), std::uint8_t{0});
+    const Ipv6Octets wanted = octetsOf("02030405 06070809 0a0b0c0d 0e0f1011");
+
+    EXPECT_EQ(ipv6Address(fieldOf(17, 1, 128), packet), wanted);
+    EXPECT_EQ(ipv6Address(fieldOf(17, 8, 16), packet), wanted);
+    EXPECT_EQ(ipv6Address(fieldOf(17, 32, 4), packet), wanted);
+
+    EXPECT_EQ(ipv6Address(fieldOf(17, 16, 8), packet), std::nullopt) << "16 octets are a byte string";
+    EXPECT_EQ(ipv6Address(fieldOf(17, 1, 32), packet), std::nullopt);
+    EXPECT_EQ(ipv6Address(fieldOf(17, 0, 0), packet), std::nullopt);
+    EXPECT_EQ(ipv6Address(fieldOf(20, 1, 128), packet), std::nullopt) << "off an octet border";
+    EXPECT_EQ(ipv6Address(fieldOf(41, 1, 128), packet), std::nullopt) << "behind the packet's end";
+    FieldReport scattered = fieldOf(17, 8, 16);
+    scattered.ranges[3].firstBit += 16;
+    scattered.ranges[3].lastBit += 16;
+    EXPECT_EQ(ipv6Address(scattered, packet), std::nullopt);
+}
+
+TEST(Text, ShowsKeyFieldsByTheirTypes) {
+    // Stored with the nibbles of each octet exchanged.
+    const KeyValue address = {"Source IP Address", 97, KeyType::ipv6Address, 0, hex("0210d08b 00*11 10")};
+    EXPECT_EQ(keyText(address), "2001:db8::1");
+    EXPECT_EQ(keyText({"Source IP Address", 97, KeyType::ipv6Address, 0x80000080, {}}), "") << "did not fit";
+    EXPECT_EQ(keyText({"Source Address", 5, KeyType::ipv4Address, 0x0a000001, {}}), "10.0.0.1");
+    EXPECT_EQ(keyText({"TSN", 87, KeyType::number32, 0xffffffff, {}}), "4294967295");
+}
+
+TEST(Text, NamesFlags) {
+    using Names = std::vector<std::string>;
+    EXPECT_EQ(flagNames(0), Names());
+    EXPECT_EQ(flagNames(0x2 | 0x10), (Names{"expectation not met", "bits left over inside a length"}));
+    EXPECT_EQ(flagNames(0x80000008), (Names{"length reaches behind the bits left", "flag 0x80000000"}));
+}
+
+} // namespace
+} // namespace netfloor::test

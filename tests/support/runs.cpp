@@ -1,0 +1,316 @@
+// SPDX-License-Identifier: MIT
+#include "support/runs.h"
+
+#include <algorithm>
+#include <optional>
+#include <sstream>
+
+#include <gtest/gtest.h>
+
+#include "support/memory.h"
+
+namespace netfloor::test {
+namespace {
+
+constexpr std::uint32_t flagsOfMvAlone =
+    NETFLOOR_FLAG_EXPECTATION | NETFLOOR_FLAG_LIMIT_TOO_LONG | NETFLOOR_FLAG_BITS_LEFT_OVER;
+
+std::uint32_t widthOf(const ReportedRange &range) {
+    return range.lastBit - range.firstBit + 1;
+}
+
+// The ranges from `at` on that one line item shows.
+std::size_t joined(const std::vector<ReportedRange> &ranges, std::size_t at) {
+    std::size_t end = at + 1;
+    while (end < ranges.size() && ranges[end].firstBit == ranges[end - 1].lastBit + 1 &&
+           widthOf(ranges[end]) == widthOf(ranges[at])) {
+        ++end;
+    }
+    return end;
+}
+
+void writeRanges(std::ostream &out, const std::vector<ReportedRange> &ranges) {
+    for (std::size_t at = 0; at < ranges.size();) {
+        const std::size_t end = joined(ranges, at);
+        out << ' ' << ranges[at].firstBit << '-' << ranges[end - 1].lastBit;
+        if (end - at > 1) {
+            out << '/' << widthOf(ranges[at]);
+        }
+        at = end;
+    }
+}
+
+std::size_t depth(const Report &report, std::size_t block) {
+    std::size_t blocks = 0;
+    for (; block != Block::none; block = report.blocks[block].parent) {
+        ++blocks;
+    }
+    return blocks;
+}
+
+void writeField(std::ostream &out, const Report &report, const FieldReport &field) {
+    out << field.id << " |" << depth(report, field.block) << ' ' << report.blockName(field) << "| \"" << field.name
+        << "\" \"" << field.text << '"';
+    writeRanges(out, field.ranges);
+    if (field.bitOrder != 0) {
+        out << " order " << field.bitOrder;
+    }
+    out << '\n';
+}
+
+void writeOthers(std::ostream &out, const Report &report) {
+    for (const DisplayReport &display : report.displays) {
+        if (display.displayId != 0) {
+            out << display.displayId << " \"" << display.text << "\"\n";
+        }
+    }
+    for (const KeyValue &key : report.keys) {
+        out << "row " << key.row << ' ' << key.name << '=' << keyText(key) << '\n';
+    }
+    if (report.pass == Pass::mv) {
+        out << verdictLine(report);
+    }
+}
+
+std::string_view withoutBlanks(std::string_view name) {
+    name.remove_prefix(std::min(name.find_first_not_of(' '), name.size()));
+    return name;
+}
+
+bool hasField(const Report &md, const KeyValue &key) {
+    const std::uint32_t mask = key.type == KeyType::number8 ? 0xff : key.type == KeyType::number16 ? 0xffff : ~0u;
+    return std::any_of(md.fields.begin(), md.fields.end(), [&](const FieldReport &field) {
+        return withoutBlanks(field.name) == withoutBlanks(key.name) && (field.value & mask) == key.number;
+    });
+}
+
+// A nested hand-off ends before the one that it stands in.
+const HandOff &firstOf(const Report &report) {
+    return *std::ranges::min_element(report.handOffs, {}, &HandOff::cursor);
+}
+
+void writeHandOff(std::ostream &out, const HandOff &handOff) {
+    out << "hand-off key " << handOff.key << " protocol " << handOff.protocol << " port " << handOff.port << " at "
+        << handOff.cursor << " bits " << handOff.bitsLeft << " octets " << handOff.nextLayerOctets << " preceding "
+        << handOff.precedingOctets << '\n';
+}
+
+std::string firstHandOff(const Report &report) {
+    std::ostringstream out;
+    if (report.handOffs.empty()) {
+        return "none";
+    }
+    const HandOff &first = firstOf(report);
+    writeHandOff(out, first);
+    out << "blocks " << first.blockDepth << " limits " << first.limitDepth << " layer index " << first.layerIndex;
+    return out.str();
+}
+
+// Collects what differs.
+class Comparison {
+public:
+    template <typename Value>
+    void same(std::string_view what, std::string_view pass, const Value &md, const Value &other) {
+        if (!(md == other)) {
+            out_ << what << ": MD " << md << ", " << pass << ' ' << other << '\n';
+        }
+    }
+    void holds(bool condition, std::string_view what) {
+        if (!condition) {
+            out_ << what << '\n';
+        }
+    }
+    [[nodiscard]] std::string text() const { return out_.str(); }
+
+private:
+    std::ostringstream out_;
+};
+
+// What all passes but an XTR pass that has stopped leave alike.
+void compareEnds(Comparison &comparison, const Report &md, const Report &other) {
+    const std::string_view pass = passName(other.pass);
+    comparison.same("bits left of the state", pass, md.stateBitsLeft, other.stateBitsLeft);
+    comparison.same("cursor", pass, md.cursor, other.cursor);
+    if (md.ending == Ending::complete && other.ending == Ending::complete) {
+        comparison.same("bits left of the context", pass, md.bitsLeft, other.bitsLeft);
+        comparison.same("condition", pass, md.condition, other.condition);
+    }
+    comparison.same("depth of blocks", pass, md.blockDepth, other.blockDepth);
+    comparison.same("depth of limits", pass, md.limitDepth, other.limitDepth);
+    comparison.same("layer index", pass, md.layerIndex, other.layerIndex);
+    comparison.same("handed off", pass, md.layerHandedOff, other.layerHandedOff);
+    comparison.holds(md.scratch == other.scratch, "the scratch area differs between MD and " + std::string(pass));
+    comparison.same("flags but those of MV", pass, md.flags & ~flagsOfMvAlone, other.flags & ~flagsOfMvAlone);
+}
+
+void compareXtr(Comparison &comparison, const Runs &runs) {
+    const Report &xtr = runs.xtr;
+    if (runs.md.handOffs.empty()) {
+        compareEnds(comparison, runs.md, xtr);
+        comparison.same("flags", "XTR", runs.md.flags, xtr.flags);
+        comparison.same("ending", "XTR", static_cast<int>(runs.md.ending), static_cast<int>(xtr.ending));
+    } else {
+        comparison.same("first hand-off", "XTR", firstHandOff(runs.md), firstHandOff(xtr));
+        comparison.same("bits left at the stop", "XTR", firstOf(runs.md).contextBitsLeft, xtr.bitsLeft);
+        comparison.same("cursor at the stop", "XTR", firstOf(runs.md).cursor, xtr.cursor);
+    }
+    for (const KeyValue &key : xtr.keys) {
+        comparison.holds(key.type == KeyType::ipv6Address || hasField(runs.md, key),
+                         "no field in MD has the name and value of the key field " + key.name);
+    }
+}
+
+Report runGuarded(Pass pass, std::span<const std::uint8_t> packet, RunOptions options, bool followStop, Host &host) {
+    const GuardedOctets source(packet);
+    const GuardedOctets working(packet);
+    options.followStop = followStop;
+    options.state.prepare = [&working, then = options.state.prepare](DecodeState &state) {
+        state.data = working.octets().data();
+        if (then) {
+            then(state);
+        }
+    };
+    return host.run(pass, source.octets(), options);
+}
+
+bool plainEnd(const Report &report) {
+    return report.ending != Ending::complete || (report.blockDepth == 0 && report.limitDepth == 0);
+}
+
+} // namespace
+
+Host &sharedHost() {
+    static Host host(PluginLibrary::open(NETFLOOR_PLUGIN));
+    return host;
+}
+
+Host freshHost() {
+    return Host(PluginLibrary::openCopy(NETFLOOR_PLUGIN));
+}
+
+Report runPass(Pass pass, std::span<const std::uint8_t> packet, const RunOptions &options, Host &host) {
+    Report report = runGuarded(pass, packet, options, false, host);
+    if (pass == Pass::xtr && report.layerHandedOff && report.ending == Ending::complete) {
+        report.handOffs = runGuarded(pass, packet, options, true, host).handOffs;
+    }
+    return report;
+}
+
+Runs runAll(std::span<const std::uint8_t> packet, const RunOptions &options, Host &host) {
+    Runs runs{runPass(Pass::md, packet, options, host), runPass(Pass::to, packet, options, host),
+              runPass(Pass::mv, packet, options, host), runPass(Pass::xtr, packet, options, host)};
+    const std::string differences = disagreements(runs);
+    if (!differences.empty()) {
+        ADD_FAILURE() << "the passes disagree:\n" << differences << "packet: " << hexText(packet);
+    }
+    return runs;
+}
+
+std::string disagreements(const Runs &runs) {
+    Comparison comparison;
+    compareEnds(comparison, runs.md, runs.to);
+    compareEnds(comparison, runs.md, runs.mv);
+    compareXtr(comparison, runs);
+    comparison.same("fields and texts", "TO", runs.md.fields.size(), runs.to.displays.size());
+    comparison.same("layers", "TO", layerLines(runs.md), layerLines(runs.to));
+    comparison.same("flags", "TO", runs.md.flags, runs.to.flags);
+    comparison.same("hand-offs", "TO", handOffLines(runs.md), handOffLines(runs.to));
+    comparison.same("hand-offs", "MV", handOffLines(runs.md), handOffLines(runs.mv));
+    comparison.holds((runs.md.flags & ~runs.mv.flags) == 0, "MD sets a flag that MV does not set");
+    comparison.holds(runs.mv.ending != Ending::complete || runs.mv.verdict.fault() == (runs.mv.flags != 0),
+                     "the verdict does not go with the flags");
+    for (const Report *report : {&runs.md, &runs.to, &runs.mv}) {
+        comparison.holds(plainEnd(*report), "blocks or limits stay open in " + std::string(passName(report->pass)));
+    }
+    return comparison.text();
+}
+
+void cutEverywhere(const Octets &packet, const std::function<void(std::size_t, const Runs &)> &check, Host &host) {
+    for (std::size_t octets = 0; octets <= packet.size(); ++octets) {
+        SCOPED_TRACE("cut behind " + std::to_string(octets) + " octets");
+        const Runs runs = runAll(std::span(packet).first(octets), {}, host);
+        if (check) {
+            check(octets, runs);
+        }
+        runAll(shortened(packet, octets), {}, host);
+    }
+}
+
+std::string lines(const Report &report) {
+    std::ostringstream out;
+    for (const FieldReport &field : report.fields) {
+        if (field.id != 0) {
+            writeField(out, report, field);
+        }
+    }
+    writeOthers(out, report);
+    return out.str();
+}
+
+std::string shortLines(const Report &report) {
+    std::ostringstream out;
+    for (const FieldReport &field : report.fields) {
+        if (field.id != 0) {
+            out << field.id << " \"" << field.text << "\"\n";
+        }
+    }
+    writeOthers(out, report);
+    return out.str();
+}
+
+std::string linesWith(std::string_view text, std::string_view word) {
+    const std::string quoted = '"' + std::string(word) + '"';
+    std::string kept;
+    while (!text.empty()) {
+        const std::string_view line = text.substr(0, text.find('\n') + 1);
+        text.remove_prefix(line.size());
+        if (line.starts_with(std::string(word) + ' ') || line.find(quoted) != std::string_view::npos) {
+            kept += line;
+        }
+    }
+    return kept;
+}
+
+std::string linesFrom(std::string_view text, std::string_view word) {
+    const std::string start = '\n' + std::string(word) + ' ';
+    const std::size_t at = ('\n' + std::string(text)).find(start);
+    return std::string(at == std::string::npos ? std::string_view() : text.substr(at));
+}
+
+std::string verdictLine(const Report &report) {
+    std::ostringstream out;
+    out << "verdict " << report.verdict.value << " flags 0x" << std::hex << report.flags << '\n';
+    return out.str();
+}
+
+std::string handOffLines(const Report &report) {
+    std::ostringstream out;
+    for (const HandOff &handOff : report.handOffs) {
+        writeHandOff(out, handOff);
+    }
+    return out.str();
+}
+
+std::string layerLines(const Report &report) {
+    std::ostringstream out;
+    for (const LayerRecord &layer : report.layers) {
+        out << "layer " << layer.layerNumber << " of " << layer.decoderId << ": " << layer.firstBit << '-'
+            << layer.lastBit << '\n';
+    }
+    return out.str();
+}
+
+std::string expected(std::string_view text) {
+    std::string result;
+    while (!text.empty()) {
+        std::string_view line = text.substr(0, text.find('\n'));
+        text.remove_prefix(std::min(line.size() + 1, text.size()));
+        line.remove_prefix(std::min(line.find_first_not_of(' '), line.size()));
+        if (!line.empty() && !line.starts_with('#')) {
+            result.append(line).push_back('\n');
+        }
+    }
+    return result;
+}
+
+} // namespace netfloor::test
