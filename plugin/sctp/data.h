@@ -64,8 +64,7 @@ template <class Pass> [[gnu::always_inline]] inline void data(Reader<Pass>& at) 
     read<streamIdentifier>(at);
     read<streamSequenceNumber>(at);
     read<payloadProtocolIdentifier>(at);
-    at.condition = at.variables().chunkOctets > emptyDataOctets;
-    if (at.condition) {
+    if (at.test(at.variables().chunkOctets > emptyDataOctets)) {
         handOff(at);
     }
 }

@@ -15,7 +15,6 @@
 
 #include <array>
 #include <cstdint>
-#include <string_view>
 
 #include "frame/block.h"
 #include "frame/field.h"
@@ -112,8 +111,7 @@ template <class Pass> void unrecognizedParameterList(Reader<Pass>& at) {
 template <class Pass> void unknownCauseValue(Reader<Pass>& at) {
     std::int32_t& errorOctets = at.variables().errorOctets;
     read<unknownCauseLength>(at, octetsBehindHead(errorOctets));
-    at.condition = errorOctets >= 1;
-    if (at.condition) {
+    if (at.test(errorOctets >= 1)) {
         readRun<unknownCause>(at, errorOctets);
     }
 }
@@ -153,16 +151,20 @@ template <class Pass> void causeOf(Reader<Pass>& at, std::uint32_t code) {
 }
 
 // The block of a cause bears the name of its code.
-[[nodiscard]] constexpr std::string_view causeBlock(std::uint32_t code) {
-    const ValueName* const known = rowOf<causeCodeNames>(code);
-    return known != nullptr ? known->text : "Unknown Cause Code";
+[[nodiscard]] constexpr BlockName causeBlock(std::uint32_t code) {
+    BlockName name{"Unknown Cause Code"};
+    if (const std::uint32_t row = rowNumber<causeCodeNames>(code); row != 0) {
+        name.text = causeCodeRows[row - 1].text.data();
+        name.size = causeCodeRows[row - 1].text.size();
+    }
+    return name;
 }
 
 // The list goes on as long as its rounds end with the condition true, that is, with a field that did fit, whether or not
 // anything is left. It ordinarily ends with a limit that is longer than what is left.
 template <class Pass> void errorCauses(Reader<Pass>& at) {
-    at.condition = true;
-    while (at.live && at.condition) {
+    at.test(true);
+    while (at.live && at.condition() != 0) {
         const LimitedBlock<Pass> cause{at, "Error Causes", bitsOf(at.variables().errorOctets)};
         std::uint32_t code = 0;
         read<causeCode>(at, &code);

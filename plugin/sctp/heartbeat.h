@@ -13,7 +13,6 @@
 #pragma once
 
 #include <optional>
-#include <string_view>
 
 #include "frame/block.h"
 #include "frame/field.h"
@@ -49,7 +48,7 @@ template <class Pass> void heartbeatInformation(Reader<Pass>& at) {
     readRun<heartbeatInfo>(at, errorOctets);
 }
 
-template <const Field& flags, class Pass> void heartbeatChunk(Reader<Pass>& at, std::string_view name) {
+template <const Field& flags, class Pass> void heartbeatChunk(Reader<Pass>& at, BlockName name) {
     const Block<Pass> block{at, name};
     read<flags>(at);
     readChunkLength(at);

@@ -16,7 +16,6 @@
 
 #include <array>
 #include <cstdint>
-#include <string_view>
 
 #include "frame/block.h"
 #include "frame/field.h"
@@ -89,12 +88,11 @@ template <class Pass> void reckonParameter(Reader<Pass>& at, std::int32_t& listO
 
 // Whether the list has another parameter, by that reckoning.
 template <class Pass> [[nodiscard]] bool listGoesOn(Reader<Pass>& at, std::int32_t listOctets) {
-    at.condition = listOctets >= 1;
-    return at.live && at.condition;
+    return at.test(listOctets >= 1) && at.live;
 }
 
 // A parameter whose value is one field, of fixed size or of as many octets as the Length tells.
-template <const Field& field, class Pass> void parameterOf(Reader<Pass>& at, std::string_view name) {
+template <const Field& field, class Pass> void parameterOf(Reader<Pass>& at, BlockName name) {
     if (!at.live) {
         return;
     }

@@ -60,7 +60,7 @@ template <const LengthAhead& ahead, class Pass, class Store>
     const std::uint32_t cursor = at.cursor;
     const std::uint32_t left = at.left;
     const auto stepOver = [&at](std::int32_t width) {
-        at.advance = width;
+        at.advance() = width;
         at.cursor += static_cast<std::uint32_t>(width);
         at.left -= static_cast<std::uint32_t>(width);
     };
@@ -70,19 +70,17 @@ template <const LengthAhead& ahead, class Pass, class Store>
         if (stretch.needs == 0) {
             continue;
         }
-        at.condition = at.left >= stretch.needs;
-        if (at.condition) {
+        if (at.test(at.left >= stretch.needs)) {
             stepOver(stretch.width);
         }
-        sum += ahead.countsStretches ? at.advance : 0;
+        sum += ahead.countsStretches ? at.advance() : 0;
     }
     const std::optional<std::uint32_t> length = look(at, octets(2));
-    at.condition = length.has_value();
-    if (at.condition) {
+    if (at.test(length.has_value())) {
         store(into, *length);
         stepOver(lengthBits);
     }
-    sum += at.advance;
+    sum += at.advance();
 
     at.cursor = cursor;
     at.left = left;

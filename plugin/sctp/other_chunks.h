@@ -2,7 +2,6 @@
 // ECNE and CWR, which RFC 9260 reserves (appendix A), and the chunks of unknown types: a head, and octets.
 #pragma once
 
-#include <string_view>
 
 #include "frame/block.h"
 #include "frame/field.h"
@@ -24,7 +23,7 @@ inline constexpr Field reservedContents {813, "    Reserved contents", octetRun(
 // clang-format on
 
 template <const Field& flags, const Field& reserved, class Pass>
-void congestionChunk(Reader<Pass>& at, std::string_view name) {
+void congestionChunk(Reader<Pass>& at, BlockName name) {
     auto& variables = at.variables();
     const Block<Pass> block{at, name};
     read<flags>(at);
@@ -32,8 +31,7 @@ void congestionChunk(Reader<Pass>& at, std::string_view name) {
     if (at.live) {
         variables.parameterOctets = variables.chunkOctets - headOctets;
     }
-    at.condition = variables.parameterOctets >= 1;
-    if (at.condition) {
+    if (at.test(variables.parameterOctets >= 1)) {
         readRun<reserved>(at, variables.parameterOctets);
     }
 }
@@ -52,8 +50,7 @@ template <class Pass> void reservedChunk(Reader<Pass>& at) {
     const Block<Pass> block{at, "Reserved chunks"};
     read<unknownFlags>(at);
     readChunkLength(at);
-    at.condition = chunkOctets > headOctets;
-    if (!at.condition) {
+    if (!at.test(chunkOctets > headOctets)) {
         return;
     }
     if (at.live) {

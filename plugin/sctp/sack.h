@@ -59,7 +59,7 @@ template <class Pass> [[gnu::always_inline]] inline void selectiveAcknowledgemen
         read<duplicateTsn>(at);
     });
     // Unlike a list of an error cause, these leave no trace of an element that was cut short.
-    at.condition = true;
+    at.test(true);
 }
 
 } // namespace netfloor::sctp

@@ -112,8 +112,7 @@ template <class Pass> [[gnu::always_inline]] inline void commonHeader(Reader<Pas
 template <class Pass> [[gnu::always_inline]] inline std::uint32_t readChunkType(Reader<Pass>& at) {
     std::uint32_t& chunksSeen = at.variables().chunksSeen;
     std::uint32_t type = 0;
-    at.condition = chunksSeen == 0;
-    if (at.condition) {
+    if (at.test(chunksSeen == 0)) {
         read<firstChunkType>(at, &type);
         chunksSeen += at.live ? 1 : 0;
     } else {
@@ -166,8 +165,7 @@ template <class Pass> [[gnu::always_inline]] inline void chunks(Reader<Pass>& at
     BlockChain<Pass> chain{at};
     while (at.live) {
         chain.open("Chunk list");
-        at.condition = variables.payloadOctets >= 1;
-        if (!at.condition) {
+        if (!at.test(variables.payloadOctets >= 1)) {
             return;
         }
         chain.open("Chunk");
