@@ -11,6 +11,9 @@
 
 namespace netfloor {
 
+// A payload of so many bits or less is left unread.
+inline constexpr std::uint32_t handOffAbove = 32;
+
 // Who gets the payload.
 struct NextLayer {
     std::uint32_t key;

@@ -24,11 +24,17 @@
 #include "frame/block.h"
 #include "frame/field.h"
 #include "frame/step.h"
+#include "icmp/icmpv6.h"
+#include "icmp/icmp.h"
+#include "ipv4/options.h"
 #include "ipv4/service_and_fragment.h"
 #include "ipv4/unknown_data.h"
 #include "sctp/sctp.h"
 #include "tables/protocol_numbers.h"
+#include "transport/tcp.h"
 #include "transport/udp.h"
+#include "tunnels/gre.h"
+#include "tunnels/tunnel.h"
 
 namespace netfloor::ipv4 {
 
@@ -54,8 +60,19 @@ template <class Pass> [[gnu::always_inline]] inline void dispatch(Reader<Pass>& 
         return apart<unknownData<Pass>>(at);
     }
     switch (variables.ipProtocol) {
+    case protocolIcmp:
+        return apart<icmp::message<Pass>>(at);
+    case protocolIpInIp:
+    case protocolMinimalEncapsulation:
+        return apart<tunnel::packet<Pass>>(at);
+    case protocolGre:
+        return apart<gre::packet<Pass>>(at);
+    case protocolTcp:
+        return tcp::segment(at);
     case protocolUdp:
         return udp::datagram(at);
+    case protocolIcmpv6:
+        return apart<icmpv6::message<Pass>>(at);
     case protocolSctp:
         return apart<sctp::packet<Pass>>(at);
     default:
@@ -92,6 +109,7 @@ template <class Pass> [[gnu::always_inline]] inline void datagram(Reader<Pass>& 
     read<headerChecksum>(at);
     read<sourceAddress>(at);
     read<destinationAddress>(at);
+    options(at);
     if (at.live) {
         variables.payloadOctets = static_cast<std::int32_t>(variables.ipTotalLength - variables.ipHeaderOctets);
     }

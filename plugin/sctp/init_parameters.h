@@ -136,9 +136,7 @@ template <class Pass> void supportedAddressTypes(Reader<Pass>& at) {
     std::int32_t& typeCount = at.variables().parameterOctets;
     const Block<Pass> block{at, "Supported Address Types"};
     typeCount /= 2;
-    if (readRepeated<supportedAddressType>(at, typeCount) != typeCount) {
-        at.mark(Mark::count);
-    }
+    readCounted<supportedAddressType>(at, typeCount);
 }
 
 template <class Pass> void initParameter(Reader<Pass>& at) {

@@ -16,8 +16,8 @@
 #include "frame/field.h"
 #include "frame/hand_off.h"
 #include "frame/step.h"
+#include "ipv4/carriage.h"
 #include "tables/port_names.h"
-#include "tables/protocol_numbers.h"
 
 namespace netfloor::udp {
 
@@ -32,9 +32,6 @@ inline constexpr Field checksum                  {490, "Checksum",             o
 
 inline constexpr std::int32_t headerOctets = 8;
 
-// A payload of so many bits or less is left unread.
-inline constexpr std::uint32_t handOffAbove = 32;
-
 [[nodiscard]] constexpr bool isRadius(std::uint32_t port) {
     return port == 1812 || port == 1813;
 }
@@ -46,16 +43,7 @@ template <class Pass> [[gnu::always_inline]] inline void datagram(Reader<Pass>& 
     auto& variables = at.variables();
     const Block<Pass> header{at, "User Datagram Protocol"};
     read<sourcePort>(at, &variables.sourcePort);
-    switch (variables.outerProtocol) {
-    case protocolIpInIp:
-        read<destinationPortIpInIp>(at, &variables.destinationPort);
-        break;
-    case protocolMinimalEncapsulation:
-        read<destinationPortMinimal>(at, &variables.destinationPort);
-        break;
-    default:
-        read<destinationPort>(at, &variables.destinationPort);
-    }
+    readByCarriage<destinationPortIpInIp, destinationPortMinimal, destinationPort>(at, &variables.destinationPort);
     if (!at.live) {
         return;
     }

@@ -1,0 +1,132 @@
+// SPDX-License-Identifier: MIT
+// TCP (RFC 9293).
+//
+//    0                   1                   2                   3
+//    0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1
+//   +-------------------------------+-------------------------------+
+//   |          Source Port          |       Destination Port        |
+//   +-------------------------------+-------------------------------+
+//   |                        Sequence Number                        |
+//   +---------------------------------------------------------------+
+//   |                    Acknowledgement Number                     |
+//   +-------+-------+---+-+-+-+-+-+-+-------------------------------+
+//   |  Data | Reser-|Re-|U|A|P|R|S|F|                               |
+//   | Offset|  ved  |ser|R|C|S|S|Y|I|          Window Size          |
+//   |       |       |ved|G|K|H|T|N|N|                               |
+//   +-------+-------+---+-+-+-+-+-+-+-------------------------------+
+//   |           Checksum            |        Urgent Pointer         |
+//   +-------------------------------+-------------------------------+
+//   |                      Options and padding                      |
+//   +---------------------------------------------------------------+
+//
+// The checksum is not verified. What stands behind the acknowledgement number is a limited block, as long as the
+// Data Offset says; a Data Offset that reaches past the packet, or is below 3, keeps the payload from the next layer.
+#pragma once
+
+#include <cstdint>
+
+#include "frame/block.h"
+#include "frame/field.h"
+#include "frame/hand_off.h"
+#include "frame/step.h"
+#include "ipv4/carriage.h"
+#include "tables/port_names.h"
+#include "transport/tcp_options.h"
+
+namespace netfloor::tcp {
+
+// clang-format off
+inline constexpr Field sourcePort              {384, "TCP Source Port",        octets(2),                "  TCP Source Port=%-S (%u)",      &portNames, "TCP - %-s (%u)"};
+inline constexpr Field destinationPortIpInIp   {387, "TCP Destination Port",   octets(2),                "  TCP Destination Port=%-S (%u)", &portNames, "IPinIP - TCP - %-s (%u)"};
+inline constexpr Field destinationPortMinimal  {391, "TCP Destination Port",   octets(2),                "  TCP Destination Port=%-S (%u)", &portNames, "MIPinIP - TCP - %-s (%u)"};
+inline constexpr Field destinationPort         {393, "TCP Destination Port",   octets(2),                "  TCP Destination Port=%-S (%u)", &portNames, "TCP - %-s (%u)"};
+inline constexpr Field sequenceNumber          {394, "Sequence Number",        octets(4),                "Sequence Number=%u(dec)"};
+inline constexpr Field acknowledgementNumber   {395, "Acknowledgement Number", octets(4),                "Acknowledgement Number=%u(dec)"};
+inline constexpr Field reservedBesideDataOffset{396, "Reserved",               piece(0, 3),              "  Reserved=%u"};
+
+inline constexpr Field dataOffset              {398, "Data Offset",            piece(4, 7).advancing(8), "  Data Offset=%u*4 octets"};
+inline constexpr Field reservedBesideFlags     {399, "Reserved",               piece(6, 7),              "  Reserved=%u"};
+inline constexpr Field urgent                  {400, "URG",                    bit(5),                   "  URG=%u"};
+inline constexpr Field acknowledgement         {401, "ACK",                    bit(4),                   "  ACK=%u"};
+inline constexpr Field push                    {402, "PSH",                    bit(3),                   "  PSH=%u"};
+inline constexpr Field reset                   {403, "RST",                    bit(2),                   "  RST=%u"};
+inline constexpr Field synchronize             {404, "SYN",                    bit(1),                   "  SYN=%u"};
+inline constexpr Field finish                  {405, "FIN",                    bit(0).advancing(8),      "  FIN=%u"};
+inline constexpr Field windowSize              {406, "Window Size",            octets(2),                "  Window Size=%u(dec)", noNames, "%u"};
+inline constexpr Field checksum                {407, "Checksum",               octets(2),                "  Checksum=%x"};
+inline constexpr Field urgentPointer           {408, "Urgent Pointer",         octets(2),                "  Urgent Pointer=%x"};
+// clang-format on
+
+struct TcpVariables {
+    std::uint32_t tcpLengthShort; // a header was longer than the payload of its datagram
+};
+
+inline constexpr std::int32_t fixedHeaderOctets = 20;
+
+// The header's words in front of its limited block.
+inline constexpr std::uint32_t wordsBeforeLimit = 3;
+inline constexpr std::uint32_t bitsPerWord = 32;
+
+// Reads the header from the Data Offset on and gives its length in octets. A Data Offset of 3 or 4 has no room for the
+// fixed header: the header then counts for as many octets, not words, and what is behind its block for payload.
+template <class Pass> [[gnu::always_inline]] inline std::int32_t limitedPart(Reader<Pass>& at) {
+    LimitedBlock<Pass> block{at, "INLINE BLOCK"};
+    const std::uint32_t words = look(at, dataOffset.place).value_or(0);
+    // Below three words this wraps to a huge number, which is more than any packet holds.
+    block.limit((words - wordsBeforeLimit) * bitsPerWord);
+    read<dataOffset>(at);
+    read<reservedBesideFlags>(at);
+    read<urgent>(at);
+    read<acknowledgement>(at);
+    read<push>(at);
+    read<reset>(at);
+    read<synchronize>(at);
+    read<finish>(at);
+    read<windowSize>(at);
+    read<checksum>(at);
+    read<urgentPointer>(at);
+    if (!at.live) {
+        return static_cast<std::int32_t>(words);
+    }
+    const auto headerOctets = static_cast<std::int32_t>(words * bitsPerWord / bitsPerOctet);
+    options(at, headerOctets - fixedHeaderOctets);
+    return headerOctets;
+}
+
+// Takes the header off the payload. Once one was longer than its payload, no later one of the packet is taken off.
+template <class Pass> [[gnu::always_inline]] inline void accountFor(Reader<Pass>& at, std::int32_t headerOctets) {
+    auto& variables = at.variables();
+    if (variables.payloadOctets < headerOctets) {
+        variables.tcpLengthShort = 1;
+        variables.payloadOctets = 0;
+    }
+    if (variables.tcpLengthShort == 0) {
+        variables.payloadOctets -= headerOctets;
+    }
+}
+
+template <class Pass> [[gnu::always_inline]] inline void segment(Reader<Pass>& at) {
+    if (!at.live) {
+        return;
+    }
+    auto& variables = at.variables();
+    const Block<Pass> header{at, "Transmission Control Protocol"};
+    read<sourcePort>(at, &variables.sourcePort);
+    readByCarriage<destinationPortIpInIp, destinationPortMinimal, destinationPort>(at, &variables.destinationPort);
+    read<sequenceNumber>(at);
+    read<acknowledgementNumber>(at);
+    read<reservedBesideDataOffset>(at);
+    if (!at.live) {
+        return;
+    }
+    const std::int32_t headerOctets = limitedPart(at);
+    if (at.live) {
+        accountFor(at, headerOctets);
+        tellNextLayer(at);
+    }
+    if (at.left > handOffAbove) {
+        handOff(at);
+    }
+}
+
+} // namespace netfloor::tcp

@@ -1,0 +1,160 @@
+// SPDX-License-Identifier: MIT
+// The options of a TCP header (RFC 9293; window scale and timestamps RFC 7323, selective acknowledgements RFC 2018,
+// MD5 signature RFC 2385).
+//
+//   kind 0  End of Option List         kind  4  SACK-Permitted
+//   kind 1  No Operation               kind  5  SACK
+//   kind 2  Maximum Segment Size       kind  8  Timestamps
+//   kind 3  Window Scale               kind 19  MD5 Signature
+//
+// Kind 0 ends nothing: the list goes on behind it. Any other kind turns the rest of the area into padding.
+//
+// Each kind that has its turn in a round and does not find its option raises the mark of a failed expectation, and
+// so does a round that needs no padding. So every TCP header raises it, a sound one too, and the one with no
+// options: in TCP the mark says nothing about damage.
+#pragma once
+
+#include <algorithm>
+#include <array>
+#include <cstddef>
+#include <cstdint>
+
+#include "frame/block.h"
+#include "frame/field.h"
+#include "frame/options.h"
+#include "frame/step.h"
+
+namespace netfloor::tcp {
+
+// clang-format off
+inline constexpr Field endOfList         {441, "TCP Option Kind=0 (End of Option List)", octets(1), "TCP Option Kind=0 (End of Option List)=%x"};
+inline constexpr Field noOperation       {444, "TCP Option Kind",    octets(1),                  "TCP Option Kind=%u (No Operation)"};
+
+inline constexpr Field maximumSegment    {447, "TCP Option Kind",    octets(1),                  "TCP Option Kind=%u (Maximum Segment Size)"};
+inline constexpr Field maximumLength     {448, "Length",             octets(1),                  "  Length=%u octet(s)"};
+inline constexpr Field maximumSize       {451, "max seg size",       octets(2),                  "  max seg size=%u"};
+
+inline constexpr Field windowScale       {452, "TCP Option Kind",    octets(1),                  "TCP Option Kind=%u (Window Scale Option)"};
+inline constexpr Field windowScaleLength {453, "Length",             octets(1),                  "  Length=%u octet(s)"};
+inline constexpr Field shiftCount        {456, "shift count",        octets(1),                  "  shift count=%u"};
+
+inline constexpr Field sackPermitted     {457, "TCP Option Kind",    octets(1),                  "TCP Option Kind=%u (SACK-Permitted)"};
+inline constexpr Field permittedLength   {458, "Length",             octets(1),                  "  Length=%u octet(s)"};
+
+inline constexpr Field sack              {461, "TCP Option Kind",    octets(1),                  "TCP Option Kind=%u (SACK Option)"};
+inline constexpr Field sackLength        {462, "Length",             octets(1),                  "  Length=%u octet(s)"};
+inline constexpr Field leftEdge          {466, "Left Edge of Block", octets(4),                  "  Left Edge of Block=%x"};
+inline constexpr Field rightEdge         {467, "Right Edge of Block", octets(4),                 "  Right Edge of Block=%x"};
+
+// Both stamps are taken as little-endian numbers.
+inline constexpr Field timestamps        {468, "TCP Option Kind",    octets(1),                  "TCP Option Kind=%u (Timestamps Option)"};
+inline constexpr Field timestampsLength  {469, "Length",             octets(1),                  "  Length=%u octet(s)"};
+inline constexpr Field timestampValue    {472, "TS value",           piece(0, 31).advancing(32), "  TS value=%u"};
+inline constexpr Field timestampEcho     {473, "TS Echo Reply",      piece(0, 31).advancing(32), "  TS Echo Reply=%u"};
+
+inline constexpr Field md5Signature      {474, "TCP Option Kind",    octets(1),                  "TCP Option Kind=%u (MD5 Signature Option)"};
+inline constexpr Field md5Length         {475, "Length",             octets(1),                  "  Length=%u octet(s)"};
+inline constexpr Field md5Digest         {478, "MD5 digest",         octetRun().atMost(16),      R"(    MD5 digest=%-["%x"])", noNames, "%x"};
+
+inline constexpr Field optionPadding     {439, "Padding",            octetRun(),                 "  Padding=%x"};
+// clang-format on
+
+// The kinds, in the order of their turns in a round.
+inline constexpr std::array<std::uint8_t, 8> optionKinds = {0, 1, 2, 3, 4, 5, 8, 19};
+
+// These count as long as they should be, whatever their length says.
+inline constexpr std::int32_t maximumSegmentOctets = 4;
+inline constexpr std::int32_t windowScaleOctets = 3;
+inline constexpr std::int32_t sackPermittedOctets = 2;
+inline constexpr std::int32_t timestampsOctets = 10;
+
+template <class Pass> [[gnu::always_inline]] inline void blocksOfEdges(Reader<Pass>& at) {
+    while (at.live) {
+        const Block<Pass> block{at, ""};
+        read<leftEdge>(at);
+        read<rightEdge>(at);
+    }
+}
+
+// The digest is what the option's length leaves, and one octet at least, so that an option without one is cut short.
+template <class Pass> [[gnu::always_inline]] inline void digest(Reader<Pass>& at) {
+    const std::uint32_t octetsLeft = at.left / bitsPerOctet;
+    readRun<md5Digest>(at, static_cast<std::int32_t>(std::clamp(octetsLeft, 1U, md5Digest.place.mostUnits)));
+}
+
+// Takes the option under the cursor, which is of a known kind.
+template <class Pass> [[gnu::always_inline]] inline void option(Reader<Pass>& at, std::uint8_t kind, OptionArea& area) {
+    switch (kind) {
+    case 0:
+        return optionOfOneOctet<endOfList>(at, "", area);
+    case 1:
+        return optionOfOneOctet<noOperation>(at, "", area);
+    case 2:
+        return optionWithLength<maximumSegment, maximumLength, maximumSegmentOctets>(
+            at, "", area, [&] { read<maximumSize>(at); });
+    case 3:
+        return optionWithLength<windowScale, windowScaleLength, windowScaleOctets>(
+            at, "", area, [&] { read<shiftCount>(at); });
+    case 4:
+        return optionWithLength<sackPermitted, permittedLength, sackPermittedOctets>(at, "", area, [] {});
+    case 5:
+        return optionWithLength<sack, sackLength>(at, "", area, [&] { blocksOfEdges(at); });
+    case 8:
+        return optionWithLength<timestamps, timestampsLength, timestampsOctets>(at, "", area, [&] {
+            read<timestampValue>(at);
+            read<timestampEcho>(at);
+        });
+    default:
+        return optionWithLength<md5Signature, md5Length>(at, "", area, [&] { digest(at); });
+    }
+}
+
+template <class Pass> [[gnu::always_inline]] inline void padding(Reader<Pass>& at, OptionArea& area) {
+    const Block<Pass> block{at, "Padding"};
+    readRun<optionPadding>(at, area.octets);
+    if (at.live) {
+        area.octets = 0;
+    }
+}
+
+// Once the area is used up no kind takes an option any more.
+template <class Pass> [[gnu::always_inline]] inline void optionRound(Reader<Pass>& at, OptionArea& area) {
+    area.taken = false;
+    for (std::size_t turn = 0; at.live && turn < optionKinds.size(); ++turn) {
+        std::size_t taker = nextTaker<optionKinds>(at, turn);
+        if (area.octets < 1) {
+            taker = optionKinds.size();
+        }
+        if (taker != turn) {
+            at.mark(Mark::expectation);
+        }
+        turn = taker;
+        if (turn < optionKinds.size()) {
+            option(at, optionKinds[turn], area);
+        }
+    }
+    if (!at.live) {
+        return;
+    }
+    if (!area.taken && area.octets >= 1) {
+        padding(at, area);
+    } else {
+        at.mark(Mark::expectation);
+    }
+}
+
+// The options stand in the block that the Data Offset limits, and their live flag is that block's: an option that
+// reaches past the header ends the list, but not the segment, whose payload starts where the Data Offset says.
+template <class Pass> [[gnu::always_inline]] inline void options(Reader<Pass>& at, std::int32_t areaOctets) {
+    if (!at.live) {
+        return;
+    }
+    OptionArea area{areaOctets};
+    BlockChain<Pass> rounds{at};
+    do {
+        rounds.open("options");
+        optionRound(at, area);
+    } while (at.live && area.octets >= 1);
+}
+
+} // namespace netfloor::tcp
