@@ -10,6 +10,7 @@
 #include "icmp/message_type.h"
 #include "ipv4/header.h"
 #include "ipv6/extension_headers.h"
+#include "sctp/variables.h"
 #include "tables/catalogue.h"
 #include "tables/key_fields.h"
 #include "version.h"
@@ -23,7 +24,8 @@ struct Grammar {
                        ipv4::OptionVariables,
                        ipv6::ExtensionHeaderVariables,
                        icmp::MessageVariables,
-                       tcp::TcpVariables {};
+                       tcp::TcpVariables,
+                       sctp::Variables {};
 
     static constexpr std::uint32_t noKeyRow = netfloor::noKeyRow;
     static constexpr auto& keyRows = netfloor::keyRows;

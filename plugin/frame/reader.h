@@ -109,6 +109,14 @@ public:
         return state->advance;
     }
 
+    // Keeps a condition of the grammar as the last one, and gives it back.
+    [[gnu::always_inline]] bool test(bool holds) {
+        if (!over()) {
+            state->condition = holds ? 1 : 0;
+        }
+        return holds;
+    }
+
     [[gnu::always_inline]] static LastRead& last() {
         return Pass::last;
     }

@@ -29,6 +29,7 @@
 #include "ipv4/options.h"
 #include "ipv4/service_and_fragment.h"
 #include "ipv4/unknown_data.h"
+#include "sctp/sctp.h"
 #include "tables/protocol_numbers.h"
 #include "transport/tcp.h"
 #include "transport/udp.h"
@@ -72,6 +73,8 @@ template <class Pass> [[gnu::always_inline]] inline void dispatch(Reader<Pass>& 
         return udp::datagram(at);
     case protocolIcmpv6:
         return apart<icmpv6::message<Pass>>(at);
+    case protocolSctp:
+        return apart<sctp::packet<Pass>>(at);
     default:
         return apart<unknownData<Pass>>(at);
     }

@@ -32,6 +32,7 @@
 #include "ipv6/address.h"
 #include "ipv6/header.h"
 #include "ipv6/options.h"
+#include "sctp/sctp.h"
 #include "tables/protocol_numbers.h"
 #include "transport/tcp.h"
 #include "transport/udp.h"
@@ -206,6 +207,8 @@ template <class Pass> [[gnu::always_inline]] inline void upperProtocol(Reader<Pa
         return udp::datagram(at);
     case protocolGre:
         return apart<gre::packet<Pass>>(at);
+    case protocolSctp:
+        return apart<sctp::packet<Pass>>(at);
     case protocolEsp:
         return apart<securityPayload<Pass>>(at);
     default:
