@@ -4,8 +4,6 @@
 #include <algorithm>
 #include <cstring>
 
-#include "key_types.h"
-
 namespace netfloor {
 namespace {
 
@@ -62,7 +60,8 @@ KeyRecord::KeyRecord() : octets_(std::make_unique_for_overwrite<std::uint8_t[]>(
     std::fill(octets_.get() + presenceStart, octets_.get() + recordOctets, std::uint8_t{0});
 }
 
-std::vector<KeyValue> KeyRecord::values(std::span<const KeyFieldRow> table, std::uint16_t byteAreaOffset) const {
+std::vector<KeyValue> KeyRecord::values(std::span<const KeyFieldRow> table, std::span<const KeyType> types,
+                                        std::uint16_t byteAreaOffset) const {
     std::vector<KeyValue> values;
     for (std::size_t number = 0; number < table.size(); ++number) {
         const KeyFieldRow &row = table[number];
@@ -73,7 +72,7 @@ std::vector<KeyValue> KeyRecord::values(std::span<const KeyFieldRow> table, std:
         const std::uint8_t *const place = octets_.get() + row.valueOffset;
         value.name = row.fieldName;
         value.row = static_cast<std::uint32_t>(number);
-        value.type = keyTypeOf(value.name);
+        value.type = types[number];
         value.number = loadAs(value.type, place);
         if (value.type == KeyType::ipv6Address) {
             value.octets = loadOctets(octets_.get(), place, byteAreaOffset);

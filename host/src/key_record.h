@@ -29,8 +29,10 @@ public:
 
     [[nodiscard]] std::uint8_t *octets() { return octets_.get(); }
 
-    // The rows that are marked present. `byteAreaOffset` is that of the context behind the pass.
-    [[nodiscard]] std::vector<KeyValue> values(std::span<const KeyFieldRow> table, std::uint16_t byteAreaOffset) const;
+    // The rows that are marked present, `types` those of all rows. `byteAreaOffset` is that of the context behind
+    // the pass.
+    [[nodiscard]] std::vector<KeyValue> values(std::span<const KeyFieldRow> table, std::span<const KeyType> types,
+                                               std::uint16_t byteAreaOffset) const;
 
 private:
     std::unique_ptr<std::uint8_t[]> octets_;

@@ -19,6 +19,8 @@
 #include <sys/mman.h>
 #include <unistd.h>
 
+#include "key_types.h"
+
 namespace netfloor {
 namespace {
 
@@ -120,6 +122,8 @@ LoadedPlugin::LoadedPlugin(std::filesystem::path path, const std::filesystem::pa
     resolve(handle_, "vex_PreDecodeMV", preDecodeMV, missing);
     resolve(handle_, "XTR_netfloor", extract, missing);
     resolve(handle_, "date_conv", dateConv, missing);
+    resolve(handle_, "vx_DLLGetPtr", getPtr, missing);
+    resolve(handle_, "vx_DLLGetTable", getTable, missing);
     if (!missing.empty()) {
         ::dlclose(handle_);
         refuse(path_, "it is a shared library, but does not export " + missing + ".", advice);
@@ -147,6 +151,7 @@ std::int32_t LoadedPlugin::initialise(KeyFieldRow *table, std::uint32_t rowCount
     if (result > 0) {
         KeyRecord::layOut({table, rowCount});
         keyTable_ = {table, rowCount};
+        keyTypes_ = keyTypesOf(keyTable_, getTable);
         *presenceRow = keySetUp.presenceRow;
     }
     return result;
@@ -205,6 +210,14 @@ NetfloorExtract PluginLibrary::extract() const {
 
 NetfloorDateConv PluginLibrary::dateConv() const {
     return loaded_->dateConv;
+}
+
+NetfloorGetTable PluginLibrary::getPtr() const {
+    return loaded_->getPtr;
+}
+
+NetfloorGetTable PluginLibrary::getTable() const {
+    return loaded_->getTable;
 }
 
 void *PluginLibrary::find(const std::string &exportName) const {

@@ -4,6 +4,7 @@
 
 #include <filesystem>
 #include <span>
+#include <vector>
 
 #include "key_record.h"
 #include "links.h"
@@ -29,12 +30,15 @@ public:
     [[nodiscard]] const std::filesystem::path &path() const { return path_; }
     [[nodiscard]] void *find(const char *exportName) const;
     [[nodiscard]] std::span<const KeyFieldRow> keyTable() const { return keyTable_; }
+    [[nodiscard]] const std::vector<KeyType> &keyTypes() const { return keyTypes_; } // of its rows
 
     NetfloorPreDecode preDecodeMD = nullptr;
     NetfloorPreDecode preDecodeTO = nullptr;
     NetfloorPreDecode preDecodeMV = nullptr;
     NetfloorExtract extract = nullptr;
     NetfloorDateConv dateConv = nullptr;
+    NetfloorGetTable getPtr = nullptr;
+    NetfloorGetTable getTable = nullptr;
 
     KeySetUp keySetUp;
     std::uint32_t keySetUpCalls = 0;
@@ -44,6 +48,7 @@ private:
     int descriptor_;
     void *handle_;
     std::span<const KeyFieldRow> keyTable_;
+    std::vector<KeyType> keyTypes_;
 };
 
 } // namespace netfloor

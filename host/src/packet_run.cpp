@@ -242,7 +242,7 @@ void PacketRun::finish() {
     report_.ending = report_.result > 0 ? Ending::complete : report_.result == 0 ? Ending::cutOff : Ending::keysDenied;
     if (pass_ == Pass::xtr) {
         report_.bitsLeft = xtr_.bitsLeft;
-        report_.keys = keyRecord_->values(plugin_.keyTable(), xtr_.byteAreaOffset);
+        report_.keys = keyRecord_->values(plugin_.keyTable(), plugin_.keyTypes(), xtr_.byteAreaOffset);
         return;
     }
     report_.bitsLeft = context.bitsLeft;

@@ -70,6 +70,7 @@ TEST_F(Refusal, SaysWhatIsWrongWhereAndWhatToDo) {
         {file(pluginWith("vex_PreDecodeTO", "vex_PreDecodeXX")), {"does not export vex_PreDecodeTO."}},
         {file(pluginWith("XTR_netfloor", "XTR_otherone")), {"does not export XTR_netfloor."}},
         {file(pluginWith("date_conv", "date_Conv")), {"does not export date_conv."}},
+        {file(pluginWith("vx_DLLGetTable", "vx_DLLGetTablE")), {"does not export vx_DLLGetTable."}},
         {file(pluginWith("hd_PreDecode", "hd_PreDecoDe")), {"undefined symbol: hd_PreDecoDe", "netfloor/host.h"}},
         {file(pluginWith("libhx_KeyOptions.so", "libhx_NoOptions.so.")), {"libhx_NoOptions.so", "build it again"}},
     };
@@ -98,7 +99,8 @@ TEST_F(Refusal, NamesEachExportThatIsMissing) {
         ADD_FAILURE() << stranger << " was taken";
     } catch (const PluginError &error) {
         EXPECT_NE(std::string(error.what())
-                      .find("vex_PreDecodeMD, vex_PreDecodeTO, vex_PreDecodeMV, XTR_netfloor, date_conv"),
+                      .find("vex_PreDecodeMD, vex_PreDecodeTO, vex_PreDecodeMV, XTR_netfloor, date_conv, "
+                            "vx_DLLGetPtr, vx_DLLGetTable"),
                   std::string::npos)
             << error.what();
     }

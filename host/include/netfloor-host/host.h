@@ -11,6 +11,7 @@
 #include <cstdint>
 #include <span>
 
+#include "netfloor-host/field_tables.h"
 #include "netfloor-host/owners.h"
 #include "netfloor-host/packet_state.h"
 #include "netfloor-host/plugin_library.h"

@@ -9,6 +9,7 @@
 #include <string>
 #include <vector>
 
+#include <netfloor/descriptors.h>
 #include <netfloor/plugin.h>
 
 namespace netfloor {
@@ -49,6 +50,8 @@ public:
     [[nodiscard]] NetfloorPreDecode preDecodeMV() const;
     [[nodiscard]] NetfloorExtract extract() const;
     [[nodiscard]] NetfloorDateConv dateConv() const;
+    [[nodiscard]] NetfloorGetTable getPtr() const; // FieldTables reads what these two give
+    [[nodiscard]] NetfloorGetTable getTable() const;
 
     // Any other export by its name, or null.
     [[nodiscard]] void *find(const std::string &exportName) const;
