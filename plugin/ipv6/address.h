@@ -17,7 +17,7 @@ inline constexpr Field addressKey    {950, "IP Address",         addressNibbles(
 
 // An address is read twice: `shown` gives its text, and `key` what the key record keeps.
 template <const Field& shown, const Field& key, class Pass>
-[[gnu::always_inline]] inline void addressReadTwice(Reader<Pass>& at) {
+NETFLOOR_INLINE inline void addressReadTwice(Reader<Pass>& at) {
     if (!at.live) {
         return;
     }
