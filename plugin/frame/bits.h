@@ -62,6 +62,15 @@ inline constexpr std::uint32_t bitsPerOctet = 8;
     return bitsAcross(data, first, first + bitsPerOctet - 1);
 }
 
+// Reads the 4 bits from bit number `first` on, wherever they lie.
+[[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t nibbleAt(const std::uint8_t* data, std::uint32_t first) {
+    const std::uint32_t low = (first - 1) % bitsPerOctet;
+    if (low <= 4) [[likely]] {
+        return data[(first - 1) / bitsPerOctet] >> low & 0xfu;
+    }
+    return bitsAcross(data, first, first + 3);
+}
+
 // Reads the bits `low` to `high` behind `cursor`. On an octet border their octets and shifts are constants.
 template <std::uint32_t low, std::uint32_t high>
 [[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t pieceAt(const std::uint8_t* data, std::uint32_t cursor) {

@@ -51,10 +51,11 @@ NETFLOOR_INLINE inline std::uint32_t writeElements(FieldRecord& record, const st
     constexpr const Place& place = field.place;
     BitRange* const ranges = record.ranges;
     std::uint32_t value = 0;
-    const auto element = [&](std::uint32_t index, std::uint32_t first, std::uint32_t last) NETFLOOR_INLINE {
+    const auto nibble = [&](std::uint32_t index, std::uint32_t first) NETFLOOR_INLINE {
         ranges[index].firstBit = first;
-        ranges[index].lastBit = last;
-        return ranges[index].value = bits(data, first, last);
+        ranges[index].lastBit = first + nibbleBits - 1;
+        ranges[index].value = nibbleAt(data, first);
+        value = value << nibbleBits | ranges[index].value;
     };
     const auto octet = [&](std::uint32_t index, std::uint32_t first) NETFLOOR_INLINE {
         ranges[index].firstBit = first;
@@ -89,9 +90,8 @@ NETFLOOR_INLINE inline std::uint32_t writeElements(FieldRecord& record, const st
         // Only the values of the later groups are kept: the first element stands for the whole address.
         for (std::uint32_t group = 0; group < units; ++group) {
             std::uint32_t digits = 0;
-            for (std::uint32_t nibble = 0; nibble < nibblesPerGroup; ++nibble) {
-                const std::uint32_t first = cursor + group * groupBits + nibble * nibbleBits;
-                digits = digits << nibbleBits | bits(data, first, first + nibbleBits - 1);
+            for (std::uint32_t digit = 0; digit < nibblesPerGroup; ++digit) {
+                digits = digits << nibbleBits | nibbleAt(data, cursor + group * groupBits + digit * nibbleBits);
             }
             ranges[group].value = digits;
         }
@@ -111,8 +111,7 @@ NETFLOOR_INLINE inline std::uint32_t writeElements(FieldRecord& record, const st
         }
     } else if constexpr (place.shape == Shape::nibbles || place.shape == Shape::addressNibbles) {
         for (std::uint32_t i = 0; i < elements; ++i) {
-            const std::uint32_t first = cursor + i * nibbleBits;
-            value = value << nibbleBits | element(i, first, first + nibbleBits - 1);
+            nibble(i, cursor + i * nibbleBits);
         }
     } else {
         value = valueAt<field>(data, cursor, units);

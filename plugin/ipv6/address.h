@@ -16,7 +16,8 @@ inline constexpr Field addressKey    {950, "IP Address",         addressNibbles(
 // clang-format on
 
 // An address is read twice: `shown` gives its text, and `key` what the key record keeps.
-template <const Field& shown, const Field& key, class Pass> void addressReadTwice(Reader<Pass>& at) {
+template <const Field& shown, const Field& key, class Pass>
+NETFLOOR_INLINE inline void addressReadTwice(Reader<Pass>& at) {
     if (!at.live) {
         return;
     }

@@ -202,7 +202,7 @@ template <class Pass> NETFLOOR_INLINE inline void upperProtocol(Reader<Pass>& at
     case protocolIcmpv6:
         return apart<icmpv6::message<Pass>>(at);
     case protocolTcp:
-        return tcp::segment(at);
+        return apart<tcp::segment<Pass>>(at);
     case protocolUdp:
         return udp::datagram(at);
     case protocolGre:
@@ -242,10 +242,10 @@ template <class Pass>
 template <class Pass> NETFLOOR_INLINE inline void datagram(Reader<Pass>& at) {
     const auto& variables = at.variables();
     BlockChain<Pass> chain{at};
-    bool goesOn = link(at, chain, protocolIpv6);
-    while (goesOn && at.live && variables.payloadOctets >= 1) {
+    std::uint32_t next = protocolIpv6;
+    while (link(at, chain, next) && at.live && variables.payloadOctets >= 1) {
         chain.open("Choose Protocol");
-        goesOn = link(at, chain, variables.ipProtocol);
+        next = variables.ipProtocol;
     }
 }
 
