@@ -10,6 +10,7 @@
 #include "icmp/message_type.h"
 #include "ipv4/header.h"
 #include "ipv6/extension_headers.h"
+#include "sctp/variables.h"
 #include "tables/catalogue.h"
 #include "tables/key_fields.h"
 #include "version.h"
@@ -23,7 +24,8 @@ struct Grammar {
                        ipv4::OptionVariables,
                        ipv6::ExtensionHeaderVariables,
                        icmp::MessageVariables,
-                       tcp::TcpVariables {};
+                       tcp::TcpVariables,
+                       sctp::Variables {};
 
     static constexpr std::uint32_t noKeyRow = netfloor::noKeyRow;
     static constexpr auto& keyRows = netfloor::keyRows;
@@ -32,7 +34,7 @@ struct Grammar {
     template <const Field& field> static constexpr std::uint32_t keyRow = keyRowOf(field);
 
     // One packet, from its version on. With a version other than 4 and 6 nothing further is read.
-    template <class Pass> [[gnu::always_inline]] static void packet(Reader<Pass>& at) {
+    template <class Pass> NETFLOOR_INLINE static void packet(Reader<Pass>& at) {
         auto& variables = at.variables();
         const Block<Pass> ip{at, "Ip"};
         const Block<Pass> header{at, "Ip Header"};

@@ -45,7 +45,7 @@ inline constexpr std::uint32_t signallingPort = 3452;
 
 // Tells the next layer how many octets it has, and how many of the IPv4 datagram stand in front of them. Over
 // IPv6 the latter is the negated payload, as no Total Length was read.
-template <class Pass> [[gnu::always_inline]] inline void tellNextLayer(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void tellNextLayer(Reader<Pass>& at) {
     const auto& variables = at.variables();
     const auto payloadOctets = static_cast<std::uint32_t>(variables.payloadOctets);
     at.state->scratch[NETFLOOR_NEXT_LAYER_OCTETS] = payloadOctets;
@@ -54,7 +54,7 @@ template <class Pass> [[gnu::always_inline]] inline void tellNextLayer(Reader<Pa
 
 // Hands the rest of the packet to the owner of the next layer. The XTR pass ends here; the others come back
 // with the cursor where the next layer left it.
-template <class Pass> [[gnu::always_inline]] inline void handOff(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void handOff(Reader<Pass>& at) {
     if (!at.live) {
         return;
     }
@@ -76,14 +76,15 @@ template <class Pass> [[gnu::always_inline]] inline void handOff(Reader<Pass>& a
     at.state->layerHandedOff = 1;
     at.giveState();
     at.context->bitsLeft = at.left;
+    const std::uint32_t payload = at.cursor;
     if (const Outcome outcome = Pass::transfer(*at.context); outcome != Outcome::on) {
         at.end(outcome);
         return;
     }
     at.takeState();
-    // What the next layer leaves beyond the limit is not the grammar's to read on.
-    const std::uint32_t limit = at.state->limits.base[at.limitDepth];
-    if (at.cursor > limit + 1 || at.left > limit + 1 - at.cursor) {
+    // What the next layer leaves in front of its payload or beyond the limit is not the grammar's to read on.
+    const std::uint32_t end = at.state->limits.base[at.limitDepth] + 1;
+    if (at.cursor < payload || at.cursor > end || at.left > end - at.cursor) {
         at.live = false;
     }
 }

@@ -29,6 +29,7 @@
 #include "ipv4/options.h"
 #include "ipv4/service_and_fragment.h"
 #include "ipv4/unknown_data.h"
+#include "sctp/sctp.h"
 #include "tables/protocol_numbers.h"
 #include "transport/tcp.h"
 #include "transport/udp.h"
@@ -53,7 +54,7 @@ inline constexpr std::uint32_t bitsBeforeLimit = 32;
 
 // Runs the production of the payload. A later fragment is data, whatever its protocol; with DF set the offset
 // does not count.
-template <class Pass> [[gnu::always_inline]] inline void dispatch(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void dispatch(Reader<Pass>& at) {
     const auto& variables = at.variables();
     if (variables.fragmentOffset >= 1 && variables.dontFragment == 0) {
         return apart<unknownData<Pass>>(at);
@@ -72,12 +73,14 @@ template <class Pass> [[gnu::always_inline]] inline void dispatch(Reader<Pass>& 
         return udp::datagram(at);
     case protocolIcmpv6:
         return apart<icmpv6::message<Pass>>(at);
+    case protocolSctp:
+        return apart<sctp::packet<Pass>>(at);
     default:
         return apart<unknownData<Pass>>(at);
     }
 }
 
-template <class Pass> [[gnu::always_inline]] inline void datagram(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void datagram(Reader<Pass>& at) {
     if (!at.live) {
         return;
     }
