@@ -77,7 +77,8 @@ inline constexpr Field problemUnused        {574, "Unused",                     
 inline constexpr Field problemData          {575, "64-bit Original Data Datagram", octets(8), R"(  64-bit Original Data Datagram=%-["%x"])", noNames, "%x"};
 // clang-format on
 
-// Many senders quote more than 64 bits of data: what is left goes to the host as one field without a name.
+// Many senders quote more than 64 bits of data. Here what is left goes to the host as one field without a name; in
+// the other messages nothing reads it, and the datagram ends with bits left over.
 template <class Pass> NETFLOOR_INLINE inline void destinationUnreachable(Reader<Pass>& at) {
     if (!at.live) {
         return;
