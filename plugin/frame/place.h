@@ -62,7 +62,7 @@ struct Place {
     }
 
     // Bits that must be left for a field of so many units.
-    [[nodiscard]] constexpr std::uint32_t needs(std::uint32_t units) const {
+    [[nodiscard, gnu::always_inline]] constexpr std::uint32_t needs(std::uint32_t units) const {
         if (!isPieces()) {
             return units * unitBits();
         }

@@ -56,7 +56,7 @@ template <class Pass> [[gnu::always_inline]] inline void dispatch(Reader<Pass>& 
     }
     switch (variables.ipProtocol) {
     case protocolTcp:
-        return tcp::segment(at);
+        return apart<tcp::segment<Pass>>(at);
     case protocolUdp:
         return udp::datagram(at);
     default:

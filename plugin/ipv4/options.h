@@ -107,7 +107,9 @@ struct OptionVariables {
     std::int32_t optionOctets; // of the area behind the fixed header
 };
 
-template <class Pass> void securityData(Reader<Pass>& at) {
+template <class Pass> void securityOption(Reader<Pass>& at, OptionArea& area) {
+    const OptionBlock<Pass> option{at, "Type130"};
+    optionHead<security, securityLength>(at, area);
     read<securityLevel>(at);
     read<compartments>(at);
     read<restrictions>(at);
@@ -126,6 +128,30 @@ template <const Field& pointer, const Field& routeData, class Pass> void route(R
     }
 }
 
+template <class Pass> void looseRouteOption(Reader<Pass>& at, OptionArea& area) {
+    const OptionBlock<Pass> option{at, "Type131"};
+    optionHead<looseRoute, looseRouteLength>(at, area);
+    route<looseRoutePointer, looseRouteData>(at);
+}
+
+template <class Pass> void strictRouteOption(Reader<Pass>& at, OptionArea& area) {
+    const OptionBlock<Pass> option{at, "Type137"};
+    optionHead<strictRoute, strictRouteLength>(at, area);
+    route<strictRoutePointer, strictRouteData>(at);
+}
+
+template <class Pass> void recordRouteOption(Reader<Pass>& at, OptionArea& area) {
+    const OptionBlock<Pass> option{at, "Type7"};
+    optionHead<recordRoute, recordRouteLength>(at, area);
+    route<recordRoutePointer, recordRouteData>(at);
+}
+
+template <class Pass> void streamIdentifierOption(Reader<Pass>& at, OptionArea& area) {
+    const OptionBlock<Pass> option{at, "Type136"};
+    optionHead<streamIdentifier, streamLength>(at, area);
+    read<streamId>(at);
+}
+
 template <class Pass> void addressAndTimestamp(Reader<Pass>& at) {
     const Block<Pass> block{at, "INLINE BLOCK"};
     if (at.variables().ipVersion == 4) {
@@ -137,8 +163,10 @@ template <class Pass> void addressAndTimestamp(Reader<Pass>& at) {
 }
 
 // With prespecified addresses these show as timestamps too.
-template <class Pass> void timestampData(Reader<Pass>& at) {
+template <class Pass> void timestampOption(Reader<Pass>& at, OptionArea& area) {
+    const OptionBlock<Pass> option{at, "Type68"};
     std::uint32_t flag = 0;
+    optionHead<internetTimestamp, timestampLength>(at, area);
     read<timestampPointer>(at);
     read<timestampOverflow>(at);
     read<timestampFlag>(at, &flag);
@@ -158,20 +186,17 @@ template <class Pass> void option(Reader<Pass>& at, std::uint8_t type, OptionAre
     case 1:
         return optionOfOneOctet<noOperation>(at, "Type1", area);
     case 130:
-        return optionWithLength<security, securityLength>(at, "Type130", area, [&] { securityData(at); });
+        return securityOption(at, area);
     case 131:
-        return optionWithLength<looseRoute, looseRouteLength>(
-            at, "Type131", area, [&] { route<looseRoutePointer, looseRouteData>(at); });
+        return looseRouteOption(at, area);
     case 137:
-        return optionWithLength<strictRoute, strictRouteLength>(
-            at, "Type137", area, [&] { route<strictRoutePointer, strictRouteData>(at); });
+        return strictRouteOption(at, area);
     case 7:
-        return optionWithLength<recordRoute, recordRouteLength>(
-            at, "Type7", area, [&] { route<recordRoutePointer, recordRouteData>(at); });
+        return recordRouteOption(at, area);
     case 136:
-        return optionWithLength<streamIdentifier, streamLength>(at, "Type136", area, [&] { read<streamId>(at); });
+        return streamIdentifierOption(at, area);
     case 68:
-        return optionWithLength<internetTimestamp, timestampLength>(at, "Type68", area, [&] { timestampData(at); });
+        return timestampOption(at, area);
     default:
         optionOfOneOctet<endOfOptionPart>(at, "", area);
         area.taken = false; // no further round

@@ -68,18 +68,46 @@ inline constexpr std::int32_t windowScaleOctets = 3;
 inline constexpr std::int32_t sackPermittedOctets = 2;
 inline constexpr std::int32_t timestampsOctets = 10;
 
-template <class Pass> void blocksOfEdges(Reader<Pass>& at) {
+template <class Pass> [[gnu::always_inline]] inline void maximumSegmentOption(Reader<Pass>& at, OptionArea& area) {
+    const OptionBlock<Pass> option{at, ""};
+    optionHead<maximumSegment, maximumLength>(at, area, maximumSegmentOctets);
+    read<maximumSize>(at);
+}
+
+template <class Pass> [[gnu::always_inline]] inline void windowScaleOption(Reader<Pass>& at, OptionArea& area) {
+    const OptionBlock<Pass> option{at, ""};
+    optionHead<windowScale, windowScaleLength>(at, area, windowScaleOctets);
+    read<shiftCount>(at);
+}
+
+template <class Pass> [[gnu::always_inline]] inline void sackPermittedOption(Reader<Pass>& at, OptionArea& area) {
+    const OptionBlock<Pass> option{at, ""};
+    optionHead<sackPermitted, permittedLength>(at, area, sackPermittedOctets);
+}
+
+// The limit ends the blocks: the first edge that does not fit in.
+template <class Pass> [[gnu::always_inline]] inline void sackOption(Reader<Pass>& at, OptionArea& area) {
+    const OptionBlock<Pass> option{at, ""};
+    optionHead<sack, sackLength>(at, area);
     while (at.live) {
-        const Block<Pass> block{at, ""};
+        const Block<Pass> edges{at, ""};
         read<leftEdge>(at);
         read<rightEdge>(at);
     }
 }
 
-// The digest is what the option's length leaves, and one octet at least, so that an option without one is cut short.
-template <class Pass> void digest(Reader<Pass>& at) {
-    const std::uint32_t octetsLeft = at.left / bitsPerOctet;
-    readRun<md5Digest>(at, static_cast<std::int32_t>(std::clamp(octetsLeft, 1U, md5Digest.place.mostUnits)));
+template <class Pass> [[gnu::always_inline]] inline void timestampsOption(Reader<Pass>& at, OptionArea& area) {
+    const OptionBlock<Pass> option{at, ""};
+    optionHead<timestamps, timestampsLength>(at, area, timestampsOctets);
+    read<timestampValue>(at);
+    read<timestampEcho>(at);
+}
+
+// The digest is what the length leaves, and one octet at least, so that it is cut short where nothing is left.
+template <class Pass> [[gnu::always_inline]] inline void md5SignatureOption(Reader<Pass>& at, OptionArea& area) {
+    const OptionBlock<Pass> option{at, ""};
+    optionHead<md5Signature, md5Length>(at, area);
+    readRun<md5Digest>(at, static_cast<std::int32_t>(std::clamp(at.left / bitsPerOctet, 1U, md5Digest.place.mostUnits)));
 }
 
 // Takes the option under the cursor, which is of a known kind.
@@ -90,22 +118,17 @@ template <class Pass> [[gnu::always_inline]] inline void option(Reader<Pass>& at
     case 1:
         return optionOfOneOctet<noOperation>(at, "", area);
     case 2:
-        return optionWithLength<maximumSegment, maximumLength, maximumSegmentOctets>(
-            at, "", area, [&] { read<maximumSize>(at); });
+        return maximumSegmentOption(at, area);
     case 3:
-        return optionWithLength<windowScale, windowScaleLength, windowScaleOctets>(
-            at, "", area, [&] { read<shiftCount>(at); });
+        return windowScaleOption(at, area);
     case 4:
-        return optionWithLength<sackPermitted, permittedLength, sackPermittedOctets>(at, "", area, [] {});
+        return sackPermittedOption(at, area);
     case 5:
-        return optionWithLength<sack, sackLength>(at, "", area, [&] { blocksOfEdges(at); });
+        return sackOption(at, area);
     case 8:
-        return optionWithLength<timestamps, timestampsLength, timestampsOctets>(at, "", area, [&] {
-            read<timestampValue>(at);
-            read<timestampEcho>(at);
-        });
+        return timestampsOption(at, area);
     default:
-        return optionWithLength<md5Signature, md5Length>(at, "", area, [&] { digest(at); });
+        return md5SignatureOption(at, area);
     }
 }
 
