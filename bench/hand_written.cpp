@@ -47,16 +47,19 @@ std::uint32_t load32(const std::uint8_t* octets) {
     return load16(octets) << 16 | load16(octets + 2);
 }
 
-// Writes the line and reports the field. The line's buffer is large enough for every line of these fields.
+// Stands apart from the writer, so that its members can stay in registers. Large enough for every line.
+std::array<char, 256> line;
+
+// Writes the line of a field and reports it.
 class Reporter {
 public:
-    Reporter(PreDecodeContext& context, const std::uint8_t* packet)
-        : context_(context), record_(context.decodeState->fieldRecord), packet_(packet) {}
+    [[gnu::always_inline]] Reporter(PreDecodeContext& context, const std::uint8_t* packet)
+        : context_(context), record_(context.decodeState->fieldRecord), ranges_(record_.ranges), packet_(packet) {}
 
     // A field inside one octet: the bits `low` to `high` of it, counted from the least significant.
-    std::uint32_t bits(std::uint32_t octet, std::uint32_t low, std::uint32_t high) {
+    [[gnu::always_inline]] std::uint32_t bits(std::uint32_t octet, std::uint32_t low, std::uint32_t high) {
         const std::uint32_t value = packet_[octet] >> low & ((1u << (high - low + 1)) - 1);
-        BitRange& range = record_.ranges[0];
+        BitRange& range = ranges_[0];
         range.value = value;
         range.firstBit = octet * 8 + low + 1;
         range.lastBit = octet * 8 + high + 1;
@@ -67,10 +70,10 @@ public:
     }
 
     // A field of whole octets, a range for each.
-    template <std::uint32_t count> std::uint32_t octets(std::uint32_t octet) {
+    template <std::uint32_t count> [[gnu::always_inline]] std::uint32_t octets(std::uint32_t octet) {
         std::uint32_t value = 0;
         for (std::uint32_t i = 0; i < count; ++i) {
-            BitRange& range = record_.ranges[i];
+            BitRange& range = ranges_[i];
             range.value = packet_[octet + i];
             range.firstBit = (octet + i) * 8 + 1;
             range.lastBit = (octet + i) * 8 + 8;
@@ -81,52 +84,52 @@ public:
         return value;
     }
 
-    std::uint32_t fragmentOffset(std::uint32_t octet) {
+    [[gnu::always_inline]] std::uint32_t fragmentOffset(std::uint32_t octet) {
         const std::uint32_t high = packet_[octet] & 0x1fu;
         const std::uint32_t low = packet_[octet + 1];
-        record_.ranges[0] = {high, octet * 8 + 1, octet * 8 + 5, 0, {}};
-        record_.ranges[1] = {low, octet * 8 + 9, octet * 8 + 16, 0, {}};
+        ranges_[0] = {high, octet * 8 + 1, octet * 8 + 5, 0, {}};
+        ranges_[1] = {low, octet * 8 + 9, octet * 8 + 16, 0, {}};
         record_.value = (high << 8 | low) * 8;
         record_.rangeCount = 2;
         return record_.value;
     }
 
-    template <std::size_t size> Reporter& text(const char (&literal)[size]) {
+    template <std::size_t size> [[gnu::always_inline]] Reporter& text(const char (&literal)[size]) {
         std::memcpy(end_, literal, size - 1);
         end_ += size - 1;
         return *this;
     }
 
-    Reporter& text(std::string_view name) {
+    [[gnu::always_inline]] Reporter& text(std::string_view name) {
         std::memcpy(end_, name.data(), name.size());
         end_ += name.size();
         return *this;
     }
 
-    Reporter& octetNumber(std::uint32_t octet) {
+    [[gnu::always_inline]] Reporter& octetNumber(std::uint32_t octet) {
         const OctetText& text = octetTexts[octet];
         std::memcpy(end_, text.digits.data(), text.digits.size());
         end_ += text.size;
         return *this;
     }
 
-    Reporter& decimal(std::uint32_t value) {
+    [[gnu::always_inline]] Reporter& decimal(std::uint32_t value) {
         if (value < octetTexts.size()) {
             return octetNumber(value);
         }
-        end_ = std::to_chars(end_, line_.data() + line_.size(), value).ptr;
+        end_ = std::to_chars(end_, line.data() + line.size(), value).ptr;
         return *this;
     }
 
     // Up to four digits.
-    Reporter& hexadecimal(std::uint32_t value) {
+    [[gnu::always_inline]] Reporter& hexadecimal(std::uint32_t value) {
         for (int shift = value > 0xfff ? 12 : value > 0xff ? 8 : value > 0xf ? 4 : 0; shift >= 0; shift -= 4) {
             *end_++ = "0123456789abcdef"[value >> shift & 0xf];
         }
         return *this;
     }
 
-    template <std::size_t size> void report(std::uint32_t id, const char (&name)[size]) {
+    template <std::size_t size> [[gnu::always_inline]] void report(std::uint32_t id, const char (&name)[size]) {
         std::memcpy(record_.fieldName, name, size);
         record_.valueText[0] = '\0';
         record_.rawFlag = 0;
@@ -137,24 +140,24 @@ public:
         decoded[1] = 0;
         decoded[2] = 0;
         *end_ = '\0';
-        end_ = line_.data();
-        hs_AddDecodedFieldsData(&context_, record_.rangeCount, record_.ranges, line_.data(), 0, record_.fieldName, id, 0, 0);
+        end_ = line.data();
+        hs_AddDecodedFieldsData(&context_, record_.rangeCount, ranges_, line.data(), 0, record_.fieldName, id, 0, 0);
     }
 
 private:
     PreDecodeContext& context_;
     FieldRecord& record_;
+    BitRange* ranges_;
     const std::uint8_t* packet_;
-    std::array<char, 256> line_; // NOLINT(cppcoreguidelines-pro-type-member-init): written before it is read
-    char* end_ = line_.data();
+    char* end_ = line.data();
 };
 
-void reportAddress(Reporter& field, std::uint32_t address) {
+[[gnu::always_inline]] inline void reportAddress(Reporter& field, std::uint32_t address) {
     field.octetNumber(address >> 24).text(".").octetNumber(address >> 16 & 0xff).text(".");
     field.octetNumber(address >> 8 & 0xff).text(".").octetNumber(address & 0xff);
 }
 
-void reportIpv4(Reporter& field) {
+[[gnu::always_inline]] inline void reportIpv4(Reporter& field) {
     field.text("Version=").octetNumber(field.bits(0, 4, 7)).report(150, "Version");
     field.text("Internet Header Length=").octetNumber(field.bits(0, 0, 3)).text("*4 octets").report(152, "Internet Header Length");
     field.text("Precedence=").text(precedences[field.bits(1, 5, 7)]).report(286, "Precedence");
@@ -178,11 +181,11 @@ void reportIpv4(Reporter& field) {
     field.report(160, "Destination Address");
 }
 
-void reportPort(Reporter& field, std::uint32_t port) {
+[[gnu::always_inline]] inline void reportPort(Reporter& field, std::uint32_t port) {
     field.decimal(port).text(" (").decimal(port).text(")");
 }
 
-void reportUdp(Reporter& field) {
+[[gnu::always_inline]] inline void reportUdp(Reporter& field) {
     reportPort(field.text("  UDP Source Port="), field.octets<2>(20));
     field.report(479, "UDP Source Port");
     reportPort(field.text("  UDP Destination Port="), field.octets<2>(22));

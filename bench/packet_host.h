@@ -54,7 +54,7 @@ public:
     // Before the XTR pass.
     XtrContext& prepareKeys(std::span<std::uint8_t> packet) {
         reset(packet);
-        std::fill_n(keyRecord_.data(), presenceOctets, std::uint8_t{0});
+        std::memset(keyRecord_.data(), 0, presenceOctets);
         keyContext_.byteAreaOffset = bench::byteAreaOffset;
         return keyContext_;
     }
@@ -90,7 +90,10 @@ private:
         state_.condition = 0;
         state_.advance = 0;
         *state_.blockName = '\0';
-        std::fill_n(state_.scratch, std::size(state_.scratch), 0u);
+        // In pieces: a copy of this size as one makes compilers choose a string instruction, which starts slowly.
+        for (std::size_t word = 0; word < std::size(state_.scratch); word += 8) {
+            std::memset(state_.scratch + word, 0, 8 * sizeof *state_.scratch);
+        }
         state_.layerHandedOff = 1;
         state_.layerIndex = 0;
     }

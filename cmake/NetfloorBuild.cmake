@@ -23,6 +23,11 @@ target_compile_options(netfloor_warnings INTERFACE -Wall -Wextra -Wpedantic -Wsh
 if(NETFLOOR_SANITIZE)
     add_compile_options(-fsanitize=address,undefined -fno-sanitize-recover=all -fno-omit-frame-pointer)
     add_link_options(-fsanitize=address,undefined)
+    if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU")
+        # With these, g++ 12 takes a comparison with a null pointer for no constant expression; the address
+        # sanitizer finds the null pointers.
+        add_compile_options(-fno-sanitize=null,nonnull-attribute,returns-nonnull-attribute)
+    endif()
 endif()
 if(NETFLOOR_COVERAGE)
     add_compile_options(--coverage)

@@ -7,7 +7,10 @@
 #include "frame/block.h"
 #include "frame/step.h"
 #include "frame/variables.h"
+#include "icmp/message_type.h"
 #include "ipv4/header.h"
+#include "ipv6/extension_headers.h"
+#include "sctp/variables.h"
 #include "tables/catalogue.h"
 #include "tables/key_fields.h"
 #include "version.h"
@@ -16,7 +19,13 @@ namespace netfloor {
 
 struct Grammar {
     // All variables of a pass, cleared at its entry.
-    struct Variables : SharedVariables, ipv4::FragmentVariables, ipv4::OptionVariables, tcp::TcpVariables {};
+    struct Variables : SharedVariables,
+                       ipv4::FragmentVariables,
+                       ipv4::OptionVariables,
+                       ipv6::ExtensionHeaderVariables,
+                       icmp::MessageVariables,
+                       tcp::TcpVariables,
+                       sctp::Variables {};
 
     static constexpr std::uint32_t noKeyRow = netfloor::noKeyRow;
     static constexpr auto& keyRows = netfloor::keyRows;
@@ -32,6 +41,8 @@ struct Grammar {
         read<version>(at, &variables.ipVersion);
         if (variables.ipVersion == 4) {
             ipv4::datagram(at);
+        } else if (variables.ipVersion == 6) {
+            apart<ipv6::datagram<Pass>>(at);
         }
     }
 };

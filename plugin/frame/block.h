@@ -56,17 +56,9 @@ public:
     // Sets the limit. A length that reaches behind the bits left does not narrow anything: the block is read
     // as far as bits last, and the enclosing production reads no further.
     [[gnu::always_inline]] void limit(std::uint32_t bitCount) {
-        if (at_.over()) {
-            return;
-        }
-        at_.advance() = static_cast<std::int32_t>(bitCount);
-        if (bitCount > at_.left) {
+        if (!at_.over() && !at_.narrow(bitCount)) {
             outerLive_ = false;
-            at_.mark(Mark::limitTooLong);
-        } else {
-            at_.left = bitCount;
         }
-        at_.pushLimit();
     }
 
     [[gnu::always_inline]] ~LimitedBlock() {
@@ -104,7 +96,24 @@ public:
         }
     }
 
+    // Opens the next block with a length in bits, as a LimitedBlock does. Nothing is read behind a chain with
+    // such a block, so that no outer live flag is kept.
+    [[gnu::always_inline]] void openLimited(BlockName name, std::uint32_t bitCount) {
+        open(name);
+        if (!at_.over()) {
+            at_.live = true;
+            at_.narrow(bitCount);
+            ++limits_;
+        }
+    }
+
+    // Closing a block touches neither cursor nor limit, so that it does not matter which blocks a limit stands
+    // between: the limits are swept first, innermost first.
     [[gnu::always_inline]] ~BlockChain() {
+        for (; limits_ > 0 && !at_.over(); --limits_) {
+            at_.sweep();
+            at_.popLimit();
+        }
         for (; blocks_ > 0 && !at_.over(); --blocks_) {
             at_.closeBlock();
         }
@@ -118,6 +127,7 @@ private:
     Reader<Pass>& at_;
     BlockName outer_;
     std::uint32_t blocks_ = 0;
+    std::uint32_t limits_ = 0;
 };
 
 // Runs a production out of line: the caller's reader is not touched by the call, and so can stay in

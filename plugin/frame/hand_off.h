@@ -76,14 +76,15 @@ template <class Pass> [[gnu::always_inline]] inline void handOff(Reader<Pass>& a
     at.state->layerHandedOff = 1;
     at.giveState();
     at.context->bitsLeft = at.left;
+    const std::uint32_t payload = at.cursor;
     if (const Outcome outcome = Pass::transfer(*at.context); outcome != Outcome::on) {
         at.end(outcome);
         return;
     }
     at.takeState();
-    // What the next layer leaves beyond the limit is not the grammar's to read on.
-    const std::uint32_t limit = at.state->limits.base[at.limitDepth];
-    if (at.cursor > limit + 1 || at.left > limit + 1 - at.cursor) {
+    // What the next layer leaves in front of its payload or beyond the limit is not the grammar's to read on.
+    const std::uint32_t end = at.state->limits.base[at.limitDepth] + 1;
+    if (at.cursor < payload || at.cursor > end || at.left > end - at.cursor) {
         at.live = false;
     }
 }

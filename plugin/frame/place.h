@@ -61,7 +61,13 @@ struct Place {
         return shape == Shape::addressNibbles ? units * nibblesPerGroup : units;
     }
 
-    // Bits that must be left for a field of so many units.
+    // True where a field is read only when its bits are left. An address in groups and what is shown ahead
+    // are read without that test, also from behind the limit, as far as the packet reaches.
+    [[nodiscard]] constexpr bool isTested() const {
+        return shape != Shape::groups && shape != Shape::ahead;
+    }
+
+    // Bits that must be left for a field of so many units; for one that is not tested, left in the packet.
     [[nodiscard, gnu::always_inline]] constexpr std::uint32_t needs(std::uint32_t units) const {
         if (!isPieces()) {
             return units * unitBits();

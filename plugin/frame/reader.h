@@ -109,6 +109,14 @@ public:
         return state->advance;
     }
 
+    // Keeps a condition of the grammar as the last one, and gives it back.
+    [[gnu::always_inline]] bool test(bool holds) {
+        if (!over()) {
+            state->condition = holds ? 1 : 0;
+        }
+        return holds;
+    }
+
     [[gnu::always_inline]] static LastRead& last() {
         return Pass::last;
     }
@@ -230,8 +238,17 @@ public:
         }
     }
 
-    [[gnu::always_inline]] void pushLimit() {
+    // Opens a limit of so many bits. False where it reaches behind the bits left, and so narrows nothing.
+    [[gnu::always_inline]] bool narrow(std::uint32_t bitCount) {
+        const bool narrows = bitCount <= left;
+        advance() = static_cast<std::int32_t>(bitCount);
+        if (narrows) {
+            left = bitCount;
+        } else {
+            mark(Mark::limitTooLong);
+        }
         push(state->limits, limitDepth, cursor + left - 1);
+        return narrows;
     }
 
     [[gnu::always_inline]] void popLimit() {

@@ -23,6 +23,19 @@ template <class Store> [[gnu::always_inline]] inline void store(Store& into, std
 
 template <const Field& field> inline constexpr std::uint32_t neededBits = field.place.needs(field.place.count);
 
+// Whether the bits of a field are there. A field that is not tested needs them in the packet only; where they
+// are not all there it is not reported either, and clears the live flag like any other.
+template <const Field& field, class Pass>
+[[nodiscard, gnu::always_inline]] inline bool fits(Reader<Pass>& at, std::uint32_t units) {
+    constexpr const Place& place = field.place;
+    if constexpr (!place.isTested()) {
+        return at.cursor + neededBits<field> <= at.state->totalBits + 1;
+    }
+    const std::uint32_t needs = place.isRun() ? place.needs(units) : neededBits<field>;
+    at.condition() = at.left >= needs ? 1 : 0;
+    return at.left >= needs;
+}
+
 // The step of a field of `units` units; see `read` and `readRun`.
 template <const Field& field, class Pass, class Store>
 [[gnu::always_inline]] inline void step(Reader<Pass>& at, std::uint32_t units, Store into) {
@@ -31,14 +44,11 @@ template <const Field& field, class Pass, class Store>
     if (!at.live) {
         return;
     }
-    const std::uint32_t needs = place.isRun() ? place.needs(units) : neededBits<field>;
-    const std::uint32_t moves = place.isRun() ? place.moves(units) : place.advance;
-    if (at.left < needs) {
-        at.condition() = 0;
+    if (!fits<field>(at, units)) {
         at.live = false;
         return;
     }
-    at.condition() = 1;
+    const std::uint32_t moves = place.isRun() ? place.moves(units) : place.advance;
     at.showBlock();
     if constexpr (Pass::reports) {
         beginRecord<field>(at.state->fieldRecord);
@@ -91,6 +101,15 @@ template <const Field& field, class Pass> [[gnu::always_inline]] inline std::int
         seen += at.live ? 1 : 0;
     }
     return seen;
+}
+
+// Reads a field `count` times. Where it ends with another count, as bits ran out or the count is negative,
+// that is marked.
+template <const Field& field, class Pass>
+[[gnu::always_inline]] inline void readCounted(Reader<Pass>& at, std::int32_t count) {
+    if (readRepeated<field>(at, count) != count) {
+        at.mark(Mark::count);
+    }
 }
 
 // Looks at the bits of `place` without moving the cursor and without reporting anything; nothing where they

@@ -24,12 +24,17 @@
 #include "frame/block.h"
 #include "frame/field.h"
 #include "frame/step.h"
+#include "icmp/icmpv6.h"
+#include "icmp/icmp.h"
 #include "ipv4/options.h"
 #include "ipv4/service_and_fragment.h"
 #include "ipv4/unknown_data.h"
+#include "sctp/sctp.h"
 #include "tables/protocol_numbers.h"
 #include "transport/tcp.h"
 #include "transport/udp.h"
+#include "tunnels/gre.h"
+#include "tunnels/tunnel.h"
 
 namespace netfloor::ipv4 {
 
@@ -55,10 +60,21 @@ template <class Pass> [[gnu::always_inline]] inline void dispatch(Reader<Pass>& 
         return apart<unknownData<Pass>>(at);
     }
     switch (variables.ipProtocol) {
+    case protocolIcmp:
+        return apart<icmp::message<Pass>>(at);
+    case protocolIpInIp:
+    case protocolMinimalEncapsulation:
+        return apart<tunnel::packet<Pass>>(at);
+    case protocolGre:
+        return apart<gre::packet<Pass>>(at);
     case protocolTcp:
         return apart<tcp::segment<Pass>>(at);
     case protocolUdp:
         return udp::datagram(at);
+    case protocolIcmpv6:
+        return apart<icmpv6::message<Pass>>(at);
+    case protocolSctp:
+        return apart<sctp::packet<Pass>>(at);
     default:
         return apart<unknownData<Pass>>(at);
     }

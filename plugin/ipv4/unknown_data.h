@@ -16,8 +16,8 @@ template <class Pass> void unknownData(Reader<Pass>& at) {
     }
     const Block<Pass> block{at, ""};
     const std::int32_t payloadOctets = at.variables().payloadOctets;
-    if (payloadOctets > 0 && readRepeated<unknownProtocolData>(at, payloadOctets) != payloadOctets) {
-        at.mark(Mark::count);
+    if (payloadOctets > 0) {
+        readCounted<unknownProtocolData>(at, payloadOctets);
     }
 }
 

@@ -141,10 +141,12 @@ void BareRun::addField(std::uint32_t outputRangeCount, const BitRange *ranges, c
         seen.back().state += " (the arguments are not those of the field record)";
     }
     context().fieldRecordCount = (context().fieldRecordCount + 1) % fieldRecordCount;
+    afterCall();
 }
 
 void BareRun::addDisplay(const char *display, std::uint32_t displayId) noexcept {
     seen.push_back({displayId, display, describe(state()), 0});
+    afterCall();
 }
 
 void BareRun::growLayerInfo() noexcept {

@@ -90,6 +90,8 @@ public:
     std::vector<std::uint32_t> modes; // of the calls of hd_PreDecode
     std::function<std::int32_t()> nextLayer = [this] { return take(state().bitsLeft); };
 
+    std::function<void()> afterCall = [] {}; // of MD or TO output
+
     std::int32_t take(std::uint32_t bits); // as an owner does; returns 0
 
     void addField(std::uint32_t outputRangeCount, const BitRange *ranges, const char *display, const char *fieldName,

@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: MIT
 // The key-field table, its set-up, and the stores into the key record.
 #include <algorithm>
-#include <array>
 #include <limits>
 #include <string>
+#include <string_view>
 #include <vector>
 
 #include <gtest/gtest.h>
@@ -14,120 +14,26 @@
 namespace netfloor::test {
 namespace {
 
-// All 113 rows, in the order in which a host finds them.
-constexpr std::array<const char *, KeyRoom::rows> names = {"Version",
-                                                           "Total Length",
-                                                           "Identification",
-                                                           "Time to Live",
-                                                           "Protocol",
-                                                           "Source Address",
-                                                           "Destination Address",
-                                                           "DF",
-                                                           "MF",
-                                                           "Fragment Offset",
-                                                           "IP Address",
-                                                           "ICMP Message Type",
-                                                           "ICMP Message Type",
-                                                           "ICMP Message Type",
-                                                           "Code",
-                                                           "ICMP Sequence Number",
-                                                           "Code",
-                                                           "ICMP Sequence Number",
-                                                           "Code",
-                                                           "Code",
-                                                           "Code",
-                                                           "Code",
-                                                           "Code",
-                                                           "Code",
-                                                           "ICMP Sequence Number",
-                                                           "Code",
-                                                           "ICMP Sequence Number",
-                                                           "Code",
-                                                           "ICMP Sequence Number",
-                                                           "Code",
-                                                           "ICMP Sequence Number",
-                                                           "Code",
-                                                           "Code",
-                                                           "Code",
-                                                           "ICMP Sequence Number",
-                                                           "Address Mask",
-                                                           "Code",
-                                                           "ICMP Sequence Number",
-                                                           "Address Mask",
-                                                           "Embedded IP Protocols",
-                                                           "Embedded IP Protocols",
-                                                           "Embedded IP Protocols",
-                                                           "Embedded IP Protocols",
-                                                           "Embedded IP Protocols",
-                                                           "Embedded IP Protocols",
-                                                           "Embedded IP Protocols",
-                                                           "Embedded IP Protocols",
-                                                           "Embedded IP Protocols",
-                                                           "Embedded IP Protocols",
-                                                           "TCP Source Port",
-                                                           "TCP Destination Port",
-                                                           "TCP Destination Port",
-                                                           "TCP Destination Port",
-                                                           "Sequence Number",
-                                                           "Acknowledgement Number",
-                                                           "Data Offset",
-                                                           "RST",
-                                                           "SYN",
-                                                           "FIN",
-                                                           "UDP Source Port",
-                                                           "UDP Destination Port",
-                                                           "UDP Destination Port",
-                                                           "UDP Destination Port",
-                                                           "Original Internet Header Length",
-                                                           "Original IP Total Length",
-                                                           "IPinIP Protocol",
-                                                           "Original Src Address",
-                                                           "Original Dest Address",
-                                                           "MIPinIP Protocol",
-                                                           "Original Dest Address",
-                                                           "Original Src Address",
-                                                           "Checksum Present",
-                                                           "Key Present",
-                                                           "Sequence Number Present",
-                                                           "GRE Protocol",
-                                                           "GRE Key",
-                                                           "Sequence Number",
-                                                           "ICMP Message Type",
-                                                           "Code ",
-                                                           "Code ",
-                                                           "Code ",
-                                                           "Code ",
-                                                           "Code ",
-                                                           "Code ",
-                                                           "SCTP Source Port Number",
-                                                           "SCTP Destination Port Number",
-                                                           "SCTP Chunk Type",
-                                                           "TSN",
-                                                           "Stream Indetifier S",
-                                                           "Stream Sequence Number n",
-                                                           "Payload Protocol Identifier",
-                                                           "Initial Transmission Sequence Number(I_TSN)",
-                                                           "Initial Transmission Sequence Number(I_TSN)",
-                                                           "Cumulative TSN Ack",
-                                                           "Cumulative TSN Ack",
-                                                           "Payload Length",
-                                                           "Payload Length",
-                                                           "Source IP Address",
-                                                           "Destination IP Address",
-                                                           "Next Header",
-                                                           "IP Address",
-                                                           "fragment Offset",
-                                                           "M Flag",
-                                                           "SPI",
-                                                           "Sequence Number",
-                                                           "SPI",
-                                                           "Sequency Number",
-                                                           "Header Extention length",
-                                                           "Option Type",
-                                                           "Option Type",
-                                                           "Option Type",
-                                                           "Opt Data Length",
-                                                           ""};
+// The names of all 113 rows, in the order in which a host finds them, each with a bar behind it.
+constexpr std::string_view names =
+    "Version|Total Length|Identification|Time to Live|Protocol|Source Address|Destination Address|DF|MF|"
+    "Fragment Offset|IP Address|ICMP Message Type|ICMP Message Type|ICMP Message Type|Code|ICMP Sequence Number|"
+    "Code|ICMP Sequence Number|Code|Code|Code|Code|Code|Code|ICMP Sequence Number|Code|ICMP Sequence Number|Code|"
+    "ICMP Sequence Number|Code|ICMP Sequence Number|Code|Code|Code|ICMP Sequence Number|Address Mask|Code|"
+    "ICMP Sequence Number|Address Mask|Embedded IP Protocols|Embedded IP Protocols|Embedded IP Protocols|"
+    "Embedded IP Protocols|Embedded IP Protocols|Embedded IP Protocols|Embedded IP Protocols|"
+    "Embedded IP Protocols|Embedded IP Protocols|Embedded IP Protocols|TCP Source Port|TCP Destination Port|"
+    "TCP Destination Port|TCP Destination Port|Sequence Number|Acknowledgement Number|Data Offset|RST|SYN|FIN|"
+    "UDP Source Port|UDP Destination Port|UDP Destination Port|UDP Destination Port|"
+    "Original Internet Header Length|Original IP Total Length|IPinIP Protocol|Original Src Address|"
+    "Original Dest Address|MIPinIP Protocol|Original Dest Address|Original Src Address|Checksum Present|"
+    "Key Present|Sequence Number Present|GRE Protocol|GRE Key|Sequence Number|ICMP Message Type|Code |Code |"
+    "Code |Code |Code |Code |SCTP Source Port Number|SCTP Destination Port Number|SCTP Chunk Type|TSN|"
+    "Stream Indetifier S|Stream Sequence Number n|Payload Protocol Identifier|"
+    "Initial Transmission Sequence Number(I_TSN)|Initial Transmission Sequence Number(I_TSN)|Cumulative TSN Ack|"
+    "Cumulative TSN Ack|Payload Length|Payload Length|Source IP Address|Destination IP Address|Next Header|"
+    "IP Address|fragment Offset|M Flag|SPI|Sequence Number|SPI|Sequency Number|Header Extention length|"
+    "Option Type|Option Type|Option Type|Opt Data Length||";
 
 // Octets of the example's key fields, numbers in the order of a little-endian host.
 constexpr const char *exampleKeys = "0=04\n1=28 00\n2=ab 00\n3=40\n4=11\n5=01 00 00 0a\n6=02 00 a8 c0\n7=01\n8=01\n"
@@ -138,14 +44,14 @@ TEST(KeyTable, isHandedToTheHost) {
     BareRun run(examplePacket(), {}, plugin);
     EXPECT_EQ(run.enter(Pass::xtr), 1);
     EXPECT_EQ(plugin.rowCount, 113u);
-    ASSERT_EQ(plugin.tableAtLoad.size(), names.size());
-    for (std::size_t row = 0; row < names.size(); ++row) {
-        const KeyFieldRow &entry = plugin.tableAtLoad[row];
-        EXPECT_STREQ(entry.fieldName, names[row]) << row;
+    std::string found;
+    for (const KeyFieldRow &entry : plugin.tableAtLoad) {
+        found.append(entry.fieldName).append("|");
         EXPECT_STREQ(entry.protocolName, "netfloor");
         EXPECT_EQ(entry.presenceOffset | entry.valueOffset | entry.presenceMask, 0u);
         EXPECT_EQ(entry.zero[0] | entry.zero[1] | entry.zero[2], 0u);
     }
+    EXPECT_EQ(found, names);
 }
 
 // A value takes the octets of its field's width and no more; other marks in a presence octet stay.

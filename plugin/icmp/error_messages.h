@@ -1,0 +1,146 @@
+// SPDX-License-Identifier: MIT
+// The ICMP messages that report an error (RFC 792): each quotes the datagram that caused it.
+//
+//    0                   1                   2                   3
+//    0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1
+//   +---------------+---------------+-------------------------------+
+//   |     Type      |     Code      |           Checksum            |
+//   +---------------+---------------+-------------------------------+
+//   |    Unused, Gateway Internet Address, or Pointer and unused    |
+//   +---------------------------------------------------------------+
+//   |      Internet header + 64 bits of original data datagram      |
+//   +---------------------------------------------------------------+
+#pragma once
+
+#include <array>
+#include <cstdint>
+
+#include "frame/block.h"
+#include "frame/field.h"
+#include "frame/step.h"
+#include "icmp/quoted_header.h"
+
+namespace netfloor::icmp {
+
+inline constexpr std::array unreachableCodeRows = {
+    ValueName{0, "Net unreachable"},
+    ValueName{1, "Host unreachable"},
+    ValueName{2, "Protocol unreachable"},
+    ValueName{3, "Port unreachable"},
+    ValueName{4, "Fragmentation needed and DF set"},
+    ValueName{5, "Source Route Failed"},
+};
+inline constexpr std::array redirectCodeRows = {
+    ValueName{0, "Redirect datagram for the network"},
+    ValueName{1, "Redirect datagram for the host"},
+    ValueName{2, "Redirect datagram for the Type of Service and Network"},
+    ValueName{3, "Redirect datagram for the Type of Service and Host"},
+};
+inline constexpr std::array timeExceededCodeRows = {
+    ValueName{0, "Time to live exceeded in transmit"},
+    ValueName{1, "Fragment reassembly time exceeded"},
+};
+inline constexpr std::array problemCodeRows = {ValueName{0, "Pointer Indicates the error"}};
+
+inline constexpr ValueNames unreachableCodeNames{unreachableCodeRows};
+inline constexpr ValueNames redirectCodeNames{redirectCodeRows};
+inline constexpr ValueNames timeExceededCodeNames{timeExceededCodeRows};
+inline constexpr ValueNames problemCodeNames{problemCodeRows};
+
+// The short text of the original data has its last four octets only.
+// clang-format off
+inline constexpr Field unreachableCode      {548, "Code",                          octets(1), "  Code=%-S", &unreachableCodeNames};
+inline constexpr Field unreachableChecksum  {549, "Checksum",                      octets(2), "  Checksum=%x"};
+inline constexpr Field unreachableUnused    {550, "Unused",                        octets(4), "  Unused=%x"};
+inline constexpr Field unreachableData      {551, "64-bit Original Data Datagram", octets(8), R"(  64-bit Original Data Datagram=%-["%x"])", noNames, "%x"};
+inline constexpr Field unreachableTail      {555, "",                              octetRunBackward(), "", noNames, "%x"};
+
+inline constexpr Field sourceQuenchCode     {556, "Code",                          octets(1), "Code=%x"};
+inline constexpr Field sourceQuenchChecksum {557, "Checksum",                      octets(2), "  Checksum=%x"};
+inline constexpr Field sourceQuenchUnused   {558, "Unused",                        octets(4), "  Unused=%x"};
+inline constexpr Field sourceQuenchData     {559, "64-bit Original Data Datagram", octets(8), R"(  64-bit Original Data Datagram=%-["%x"])", noNames, "%x"};
+
+inline constexpr Field redirectCode         {560, "Code",                          octets(1), "  Code=%-S", &redirectCodeNames};
+inline constexpr Field redirectChecksum     {561, "Checksum",                      octets(2), "  Checksum=%x"};
+inline constexpr Field redirectGateway      {564, "Gateway Internet Address",      octets(4), R"(  Gateway Internet Address=%-["%u":"."])"};
+inline constexpr Field redirectData         {566, "64-bit Original Data Datagram", octets(8), R"(  64-bit Original Data Datagram=%-["%x"])", noNames, "%x"};
+
+inline constexpr Field timeExceededCode     {567, "Code",                          octets(1), "  Code=%-S", &timeExceededCodeNames};
+inline constexpr Field timeExceededChecksum {568, "Checksum",                      octets(2), "  Checksum=%x"};
+inline constexpr Field timeExceededUnused   {569, "Unused",                        octets(4), "  Unused=%x"};
+inline constexpr Field timeExceededData     {570, "64-bit Original Data Datagram", octets(8), R"(  64-bit Original Data Datagram=%-["%x"])", noNames, "%x"};
+
+inline constexpr Field problemCode          {571, "Code",                          octets(1), "  Code=%-S", &problemCodeNames};
+inline constexpr Field problemChecksum      {572, "Checksum",                      octets(2), "  Checksum=%x"};
+inline constexpr Field problemPointer       {573, "Pointer",                       octets(1), "  Pointer=%x"};
+inline constexpr Field problemUnused        {574, "Unused",                        octets(3), "  Unused=%x"};
+inline constexpr Field problemData          {575, "64-bit Original Data Datagram", octets(8), R"(  64-bit Original Data Datagram=%-["%x"])", noNames, "%x"};
+// clang-format on
+
+// Many senders quote more than 64 bits of data: what is left goes to the host as one field without a name.
+template <class Pass> [[gnu::always_inline]] inline void destinationUnreachable(Reader<Pass>& at) {
+    if (!at.live) {
+        return;
+    }
+    const Block<Pass> message{at, "Destination Unreachable Message"};
+    read<unreachableCode>(at);
+    read<unreachableChecksum>(at);
+    read<unreachableUnused>(at);
+    apart<quotedHeader<Pass>>(at);
+    read<unreachableData>(at);
+    if (at.left != 0) {
+        const std::uint32_t icmpTailOctets = at.left / bitsPerOctet;
+        readRun<unreachableTail>(at, static_cast<std::int32_t>(icmpTailOctets));
+    }
+}
+
+template <class Pass> [[gnu::always_inline]] inline void sourceQuench(Reader<Pass>& at) {
+    if (!at.live) {
+        return;
+    }
+    const Block<Pass> message{at, "Source Quench Message"};
+    read<sourceQuenchCode>(at);
+    read<sourceQuenchChecksum>(at);
+    read<sourceQuenchUnused>(at);
+    apart<quotedHeader<Pass>>(at);
+    read<sourceQuenchData>(at);
+}
+
+template <class Pass> [[gnu::always_inline]] inline void redirect(Reader<Pass>& at) {
+    if (!at.live) {
+        return;
+    }
+    const Block<Pass> message{at, "Redirect Message"};
+    read<redirectCode>(at);
+    read<redirectChecksum>(at);
+    read<redirectGateway>(at);
+    apart<quotedHeader<Pass>>(at);
+    read<redirectData>(at);
+}
+
+template <class Pass> [[gnu::always_inline]] inline void timeExceeded(Reader<Pass>& at) {
+    if (!at.live) {
+        return;
+    }
+    const Block<Pass> message{at, "Time Exceeded Message"};
+    read<timeExceededCode>(at);
+    read<timeExceededChecksum>(at);
+    read<timeExceededUnused>(at);
+    apart<quotedHeader<Pass>>(at);
+    read<timeExceededData>(at);
+}
+
+template <class Pass> [[gnu::always_inline]] inline void parameterProblem(Reader<Pass>& at) {
+    if (!at.live) {
+        return;
+    }
+    const Block<Pass> message{at, "Parameter Problem Message"};
+    read<problemCode>(at);
+    read<problemChecksum>(at);
+    read<problemPointer>(at);
+    read<problemUnused>(at);
+    apart<quotedHeader<Pass>>(at);
+    read<problemData>(at);
+}
+
+} // namespace netfloor::icmp

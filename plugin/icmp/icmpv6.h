@@ -1,0 +1,161 @@
+// SPDX-License-Identifier: MIT
+// ICMPv6 (RFC 2463).
+//
+//    0      7 8     15 16            31
+//   +--------+--------+----------------+
+//   |  Type  |  Code  |    Checksum    |
+//   +--------+--------+----------------+
+//   | Unused, MTU, Pointer, or         |
+//   | Identifier     | Sequence Number |
+//   +----------------+-----------------+
+//   | Invoking packet, or data ...     |
+//
+// The invoking packet is not decoded: it is a row of octets. Nor are the messages above 129, of neighbour
+// discovery among them: behind the type they stay unread.
+#pragma once
+
+#include <array>
+#include <cstdint>
+
+#include "frame/block.h"
+#include "frame/field.h"
+#include "frame/step.h"
+#include "ipv4/unknown_data.h"
+
+namespace netfloor::icmpv6 {
+
+enum : std::uint32_t {
+    typeUnreachable = 1,
+    typeTooBig = 2,
+    typeTimeExceeded = 3,
+    typeParameterProblem = 4,
+    typeFirstUndefined = 5,
+    typeLastUndefined = 127,
+    typeEchoRequest = 128,
+    typeEchoReply = 129,
+};
+
+inline constexpr std::array classRows = {ValueName{0, "Error Message"}, ValueName{1, "Informational Message"}};
+inline constexpr std::array typeRows = {
+    ValueName{typeUnreachable, "Destination Unreachable"},
+    ValueName{typeTooBig, "Packet Too Big"},
+    ValueName{typeTimeExceeded, "Time Exceeded"},
+    ValueName{typeParameterProblem, "Parameter Problem"},
+    ValueName{typeFirstUndefined, typeLastUndefined, "Undefined"},
+    ValueName{typeEchoRequest, "Echo Request"},
+    ValueName{typeEchoReply, "Echo Reply"},
+};
+inline constexpr std::array unreachableRows = {
+    ValueName{0, "no route to destination"},
+    ValueName{1, "communication with destination administratively prohibited"},
+    ValueName{2, "no assigned"},
+    ValueName{3, "address unreachable"},
+    ValueName{4, "port unreachable"},
+};
+inline constexpr std::array timeExceededRows = {
+    ValueName{0, "hop limit exceeded in transit "},
+    ValueName{1, "fragment reassembly time exceeded "},
+};
+inline constexpr std::array parameterProblemRows = {
+    ValueName{0, "erroraneous header field encountered "},
+    ValueName{1, "unrecognized Next Header type encountered "},
+    ValueName{2, "unrecognized IPv6 option encountered "},
+};
+
+inline constexpr ValueNames classNames{classRows};
+inline constexpr ValueNames typeNames{typeRows};
+inline constexpr ValueNames unreachableNames{unreachableRows};
+inline constexpr ValueNames timeExceededNames{timeExceededRows};
+inline constexpr ValueNames parameterProblemNames{parameterProblemRows};
+
+// The octets of the checksum, the data and the invoking packet are fields of their own.
+// clang-format off
+inline constexpr Field messageClass             {246, "Message Type",      bit(7),    "Message Type=%-S",      &classNames};
+inline constexpr Field messageType              {247, "ICMP Message Type", octets(1), "ICMP Message Type=%-S", &typeNames};
+
+inline constexpr Field unreachableCode          {251, "Code ",             octets(1), "Code =%-S",             &unreachableNames};
+inline constexpr Field unreachableChecksum      {252, "Checksum ",         octets(1), "Checksum =%x"};
+inline constexpr Field unreachableUnused        {253, "Unused",            octets(4), "Unused",                noNames, "%x"};
+inline constexpr Field unreachablePacket        {255, "Invoking Packet ",  octets(1), "Invoking Packet =%x"};
+
+inline constexpr Field tooBigCode               {256, "Code ",             octets(1), "Code =%u"};
+inline constexpr Field tooBigChecksum           {257, "Checksum ",         octets(1), "Checksum =%x"};
+inline constexpr Field tooBigMtu                {258, "MTU ",              octets(4), "MTU =%u"};
+inline constexpr Field tooBigPacket             {260, "Invoking Packet ",  octets(1), "Invoking Packet =%x"};
+
+inline constexpr Field timeExceededCode         {261, "Code ",             octets(1), "Code =%-S",             &timeExceededNames};
+inline constexpr Field timeExceededChecksum     {262, "Checksum ",         octets(1), "Checksum =%x"};
+inline constexpr Field timeExceededUnused       {263, "Unused",            octets(4), "Unused",                noNames, "%x"};
+inline constexpr Field timeExceededPacket       {265, "Invoking Packet ",  octets(1), "Invoking Packet =%x"};
+
+inline constexpr Field parameterProblemCode     {266, "Code ",             octets(1), "Code =%-S",             &parameterProblemNames};
+inline constexpr Field parameterProblemChecksum {267, "Checksum ",         octets(1), "Checksum =%x"};
+inline constexpr Field parameterProblemPointer  {268, "Pointer ",          octets(4), "Pointer =%x"};
+inline constexpr Field parameterProblemPacket   {270, "Invoking Packet ",  octets(1), "Invoking Packet =%x"};
+
+inline constexpr Field echoRequestCode          {271, "Code ",             octets(1), "Code =%u"};
+inline constexpr Field echoRequestChecksum      {272, "Checksum ",         octets(1), "Checksum =%x"};
+inline constexpr Field echoRequestIdentifier    {273, "Identifier ",       octets(2), "Identifier =%x"};
+inline constexpr Field echoRequestSequence      {274, "Sequence Number ",  octets(2), "Sequence Number =%x"};
+inline constexpr Field echoRequestData          {276, "Data ",             octets(1), "Data =%x"};
+
+inline constexpr Field echoReplyCode            {277, "Code ",             octets(1), "Code =%u"};
+inline constexpr Field echoReplyChecksum        {278, "Checksum ",         octets(1), "Checksum =%x"};
+inline constexpr Field echoReplyIdentifier      {279, "Identifier ",       octets(2), "Identifier =%x"};
+inline constexpr Field echoReplySequence        {280, "Sequence Number ",  octets(2), "Sequence Number =%x"};
+inline constexpr Field echoReplyData            {282, "Data ",             octets(1), "Data =%x"};
+// clang-format on
+
+inline constexpr std::int32_t typeOctets = 1;
+inline constexpr std::int32_t octetsBehindType = 7;
+
+// What stands behind the type: `fixed` are the fields of the header's second word.
+template <const Field& code, const Field& checksum, const Field& data, const Field&... fixed, class Pass>
+[[gnu::always_inline]] inline void body(Reader<Pass>& at) {
+    auto& variables = at.variables();
+    const Block<Pass> block{at, ""};
+    read<code>(at);
+    readCounted<checksum>(at, 2);
+    (read<fixed>(at), ...);
+    if (at.live) {
+        variables.payloadOctets -= octetsBehindType;
+    }
+    readCounted<data>(at, variables.payloadOctets);
+}
+
+template <class Pass> [[gnu::always_inline]] inline void bodyOf(Reader<Pass>& at, std::uint32_t type) {
+    switch (type) {
+    case typeUnreachable:
+        return body<unreachableCode, unreachableChecksum, unreachablePacket, unreachableUnused>(at);
+    case typeTooBig:
+        return body<tooBigCode, tooBigChecksum, tooBigPacket, tooBigMtu>(at);
+    case typeTimeExceeded:
+        return body<timeExceededCode, timeExceededChecksum, timeExceededPacket, timeExceededUnused>(at);
+    case typeParameterProblem:
+        return body<parameterProblemCode, parameterProblemChecksum, parameterProblemPacket, parameterProblemPointer>(at);
+    case typeEchoRequest:
+        return body<echoRequestCode, echoRequestChecksum, echoRequestData, echoRequestIdentifier, echoRequestSequence>(at);
+    case typeEchoReply:
+        return body<echoReplyCode, echoReplyChecksum, echoReplyData, echoReplyIdentifier, echoReplySequence>(at);
+    default:
+        if (type >= typeFirstUndefined && type <= typeLastUndefined) {
+            apart<unknownData<Pass>>(at);
+        }
+    }
+}
+
+template <class Pass> [[gnu::always_inline]] inline void message(Reader<Pass>& at) {
+    if (!at.live) {
+        return;
+    }
+    std::uint32_t type = 0;
+    const Block<Pass> block{at, " IPv6 - ICMP"};
+    read<messageClass>(at);
+    read<messageType>(at, &type);
+    if (at.live) {
+        at.variables().payloadOctets -= typeOctets;
+        bodyOf(at, type);
+    }
+}
+
+} // namespace netfloor::icmpv6

@@ -1,0 +1,140 @@
+// SPDX-License-Identifier: MIT
+// The IPv4 header (RFC 791) that an ICMP error message quotes.
+//
+//    0                   1                   2                   3
+//    0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1
+//   +-------+-------+---------------+-------------------------------+
+//   |Version|  IHL  |Type of Service|        Original Length        |
+//   +-------+-------+---------------+-----+-------------------------+
+//   |    Original Identification    |Flags|     Fragment Offset     |
+//   +---------------+---------------+-----+-------------------------+
+//   |      TTL      |    Protocol   |        Header Checksum        |
+//   +---------------+---------------+-------------------------------+
+//   |                       IP Source Address                       |
+//   |                     IP Destination Address                    |
+//   +---------------------------------------------------------------+
+//   |                     Options and padding                       |
+//   +---------------------------------------------------------------+
+//
+// The quotation is shown and leads to nothing: its length opens no limit, and its protocol is not decoded.
+#pragma once
+
+#include <array>
+#include <cstdint>
+
+#include "frame/block.h"
+#include "frame/field.h"
+#include "frame/step.h"
+#include "icmp/message_type.h"
+#include "ipv4/options.h"
+#include "tables/protocol_numbers.h"
+
+namespace netfloor::icmp {
+
+// The values of the outer header have the same names in another spelling.
+inline constexpr std::array quotedPrecedenceRows = {
+    ValueName{0, "Routine"},
+    ValueName{1, "Priority"},
+    ValueName{2, "Immediate"},
+    ValueName{3, "Flash"},
+    ValueName{4, "Flash override"},
+    ValueName{5, "CRITIC/ECP"},
+    ValueName{6, "Internetwork control"},
+    ValueName{7, "Network control"},
+};
+inline constexpr std::array quotedDelayRows = {ValueName{0, "Normal delay"}, ValueName{1, "Low delay"}};
+inline constexpr std::array quotedThroughputRows = {ValueName{0, "Normal throughput"}, ValueName{1, "High throughput"}};
+inline constexpr std::array quotedReliabilityRows = {ValueName{0, "Normal reliability"},
+                                                     ValueName{1, "High reliability"}};
+inline constexpr std::array quotedDontFragmentRows = {ValueName{0, "May fragment"}, ValueName{1, "Do not fragment"}};
+inline constexpr std::array quotedMoreFragmentsRows = {ValueName{0, "Last fragment"}, ValueName{1, "More fragments"}};
+
+inline constexpr ValueNames quotedPrecedenceNames{quotedPrecedenceRows};
+inline constexpr ValueNames quotedDelayNames{quotedDelayRows};
+inline constexpr ValueNames quotedThroughputNames{quotedThroughputRows};
+inline constexpr ValueNames quotedReliabilityNames{quotedReliabilityRows};
+inline constexpr ValueNames quotedDontFragmentNames{quotedDontFragmentRows};
+inline constexpr ValueNames quotedMoreFragmentsNames{quotedMoreFragmentsRows};
+
+// The cursor moves over the first octet of the Fragment Offset only: the TTL takes the second one with it.
+// clang-format off
+inline constexpr Field quotedVersion         {605, "Version",                 piece(4, 7),                                   "  Version=%u"};
+inline constexpr Field quotedHeaderLength    {606, "IHL",                     piece(0, 3).advancing(8),                      "  IHL=%u*4 octet(s)"};
+inline constexpr Field quotedPrecedence      {607, "Precedence",              piece(5, 7),                                   "  Precedence=%-S", &quotedPrecedenceNames};
+inline constexpr Field quotedDelay           {608, "D",                       bit(4),                                        "  D=%-S",          &quotedDelayNames};
+inline constexpr Field quotedThroughput      {609, "T",                       bit(3),                                        "  T=%-S",          &quotedThroughputNames};
+inline constexpr Field quotedReliability     {610, "R",                       bit(2),                                        "  R=%-S",          &quotedReliabilityNames};
+inline constexpr Field quotedServiceFixed    {611, "Fixed Value",             piece(0, 1).advancing(8),                      "  Fixed Value=%x"};
+inline constexpr Field quotedLength          {612, "Original Length",         octets(2),                                     "  Original Length=%u"};
+inline constexpr Field quotedIdentification  {615, "Original Identification", octets(2),                                     "  Original Identification=%x"};
+inline constexpr Field quotedFlagsFixed      {616, "Flags Fixed Value",       bit(7),                                        "  Flags Fixed Value=%x"};
+inline constexpr Field quotedDontFragment    {617, "Flags DF",                bit(6),                                        "  Flags DF=%-S",   &quotedDontFragmentNames};
+inline constexpr Field quotedMoreFragments   {618, "Flags MF",                bit(5),                                        "  Flags MF=%-S",   &quotedMoreFragmentsNames};
+inline constexpr Field quotedFragmentOffset  {619, "Fragment Offset",         pieces({0, 4}, {8, 15}).advancing(8).times(8), "  Fragment Offset=%u"};
+inline constexpr Field quotedTimeToLive      {620, "TTL",                     piece(8, 15).advancing(16),                    "  TTL=%u"};
+
+// The protocol: its short text tells which message quotes it, and whether that came through an IP in IP tunnel.
+inline constexpr Field unreachableInTunnel   {663, "Embedded IP Protocols",   octets(1), "Embedded IP Protocols=%-S", &protocolNames, "IPinIP - ICMP - DUM - %-S"};
+inline constexpr Field sourceQuenchInTunnel  {666, "Embedded IP Protocols",   octets(1), "Embedded IP Protocols=%-S", &protocolNames, "IPinIP- ICMP - SQM - %-S"};
+inline constexpr Field redirectInTunnel      {669, "Embedded IP Protocols",   octets(1), "Embedded IP Protocols=%-S", &protocolNames, "IPinIP - ICMP - RM - %-S"};
+inline constexpr Field timeExceededInTunnel  {672, "Embedded IP Protocols",   octets(1), "Embedded IP Protocols=%-S", &protocolNames, "IPinIP - ICMP - TEM - %-S"};
+inline constexpr Field problemInTunnel       {675, "Embedded IP Protocols",   octets(1), "Embedded IP Protocols=%-S", &protocolNames, "IPinIP - ICMP - PPM - %-S"};
+inline constexpr Field unreachableProtocol   {679, "Embedded IP Protocols",   octets(1), "Embedded IP Protocols=%-S", &protocolNames, "ICMP - DUM- %-S"};
+inline constexpr Field sourceQuenchProtocol  {682, "Embedded IP Protocols",   octets(1), "Embedded IP Protocols=%-S", &protocolNames, "ICMP - SQM- %-S"};
+inline constexpr Field redirectProtocol      {685, "Embedded IP Protocols",   octets(1), "Embedded IP Protocols=%-S", &protocolNames, "ICMP - RM - %-S"};
+inline constexpr Field timeExceededProtocol  {688, "Embedded IP Protocols",   octets(1), "Embedded IP Protocols=%-S", &protocolNames, "ICMP - TEM - %-S"};
+inline constexpr Field problemProtocol       {691, "Embedded IP Protocols",   octets(1), "Embedded IP Protocols=%-S", &protocolNames, "ICMP - PPM - %-S"};
+
+inline constexpr Field quotedChecksum        {621, "Header Checksum",         octets(2),                                     "  Header Checksum=%x"};
+inline constexpr Field quotedSource          {624, "IP Source Address",       octets(4),                                     R"(  IP Source Address=%-["%u":"."])"};
+inline constexpr Field quotedDestination     {625, "IP Destination Address",  octets(4),                                     R"(  IP Destination Address=%-["%u":"."])"};
+// clang-format on
+
+template <class Pass> [[gnu::always_inline]] inline void quotedProtocol(Reader<Pass>& at) {
+    if (!at.live) {
+        return;
+    }
+    const Block<Pass> block{at, "Embedded IP Protocols"};
+    const bool inTunnel = at.variables().outerProtocol == protocolIpInIp;
+    switch (at.variables().icmpType) {
+    case typeDestinationUnreachable: return inTunnel ? read<unreachableInTunnel>(at) : read<unreachableProtocol>(at);
+    case typeSourceQuench: return inTunnel ? read<sourceQuenchInTunnel>(at) : read<sourceQuenchProtocol>(at);
+    case typeRedirect: return inTunnel ? read<redirectInTunnel>(at) : read<redirectProtocol>(at);
+    case typeTimeExceeded: return inTunnel ? read<timeExceededInTunnel>(at) : read<timeExceededProtocol>(at);
+    default: return inTunnel ? read<problemInTunnel>(at) : read<problemProtocol>(at);
+    }
+}
+
+template <class Pass> [[gnu::always_inline]] inline void quotedHeader(Reader<Pass>& at) {
+    if (!at.live) {
+        return;
+    }
+    std::int32_t embeddedHeaderOctets = 0; // less the fixed header
+    const Block<Pass> block{at, "Internet Protocol Message in ICMP"};
+    read<quotedVersion>(at);
+    read<quotedHeaderLength>(at, [&](std::uint32_t words) {
+        embeddedHeaderOctets = static_cast<std::int32_t>(words * 4) - ipv4::fixedHeaderOctets;
+    });
+    read<quotedPrecedence>(at);
+    read<quotedDelay>(at);
+    read<quotedThroughput>(at);
+    read<quotedReliability>(at);
+    read<quotedServiceFixed>(at);
+    read<quotedLength>(at);
+    read<quotedIdentification>(at);
+    read<quotedFlagsFixed>(at);
+    read<quotedDontFragment>(at);
+    read<quotedMoreFragments>(at);
+    read<quotedFragmentOffset>(at);
+    read<quotedTimeToLive>(at);
+    quotedProtocol(at);
+    read<quotedChecksum>(at);
+    read<quotedSource>(at);
+    read<quotedDestination>(at);
+    // The options are as long as the quoted header says, whatever header the message itself stands behind.
+    if (embeddedHeaderOctets >= 1) {
+        ipv4::options(at, embeddedHeaderOctets);
+    }
+}
+
+} // namespace netfloor::icmp

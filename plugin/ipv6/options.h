@@ -1,0 +1,100 @@
+// SPDX-License-Identifier: MIT
+// The options of a Hop-by-Hop or Destination Options header (RFC 2460, section 4.2).
+//
+//   +---------------+---------------+------------- - - -
+//   |  Option Type  |  Option Length| Option Data
+//   +---------------+---------------+------------- - - -
+//
+// Only the first option of a header is read. What stands behind it is taken as the next header, so that a
+// header with several options shows the second one as something that it is not.
+#pragma once
+
+#include <cstdint>
+
+#include "frame/block.h"
+#include "frame/field.h"
+#include "frame/step.h"
+#include "ipv4/unknown_data.h"
+
+namespace netfloor::ipv6 {
+
+// clang-format off
+inline constexpr Field optionTypeAhead     {223, "Option type",          ahead(0, 7), "Option type=%x"};
+inline constexpr Field pad1Type            {232, "Option Type",          octets(1),   " Option Type=Pad1 option", noNames, "%u"};
+inline constexpr Field padNType            {226, "Option Type",          octets(1),   " Option Type=PadN option", noNames, "%u"};
+inline constexpr Field padNLength          {227, "Option Length",        octets(1),   "Option Length=%u Octetc(s)"};
+inline constexpr Field paddingData         {229, "Padding Data",         nibbleRun(), R"(Padding Data=%-["%x"] (Hex))"};
+inline constexpr Field actionAhead         {235, "highest-order 2 bits", ahead(6, 7), "highest-order 2 bits=%x"};
+inline constexpr Field unknownOptionType   {238, "Option Type",          octets(1),   " Option Type=Unknown", noNames, "%u"};
+inline constexpr Field unknownOptionLength {239, "Opt Data Length",      octets(1),   " Opt Data Length=%u Octet(s)", noNames, "%u"};
+inline constexpr Field skippedOctet        {240, "Skip",                 octets(1),   "Skip=%x"};
+inline constexpr Field discardedOptionType {243, "discard packet",       octets(1),   "unkown option type, discard packet", noNames, "%u"};
+// clang-format on
+
+struct OptionVariables {
+    std::int32_t optionLength; // of the option that told its length last
+};
+
+enum : std::uint32_t { optionPad1 = 0, optionPadN = 1 };
+
+// What the two top bits of the type say is to be done with an option that nobody knows.
+inline constexpr std::uint32_t actionSkip = 0;
+
+inline constexpr std::int32_t nibblesPerOctet = 2;
+
+template <class Pass> [[gnu::always_inline]] inline void padN(Reader<Pass>& at) {
+    auto& variables = at.variables();
+    read<padNType>(at);
+    read<padNLength>(at, &variables.optionLength);
+    readRun<paddingData>(at, variables.optionLength * nibblesPerOctet);
+}
+
+template <class Pass> [[gnu::always_inline]] inline void skippedOption(Reader<Pass>& at) {
+    auto& variables = at.variables();
+    read<unknownOptionType>(at);
+    read<unknownOptionLength>(at, &variables.optionLength);
+    readCounted<skippedOctet>(at, variables.optionLength);
+}
+
+// The option forbids to go on. Its length is not read: all behind its type is data.
+template <class Pass> [[gnu::always_inline]] inline void discardedOption(Reader<Pass>& at) {
+    read<discardedOptionType>(at);
+    if (at.variables().payloadOctets >= 1) {
+        apart<unknownData<Pass>>(at);
+    }
+}
+
+// Reads an option, whose blocks stay open in `chain`. Gives whether the chain goes on behind it.
+template <class Pass>
+[[nodiscard, gnu::always_inline]] inline bool option(Reader<Pass>& at, BlockChain<Pass>& chain) {
+    std::uint32_t type = 0;
+    chain.open("Options");
+    read<optionTypeAhead>(at, &type);
+    if (!at.live) {
+        return false;
+    }
+    switch (type) {
+    case optionPad1:
+        chain.open("Pad1 option");
+        read<pad1Type>(at);
+        return true;
+    case optionPadN:
+        chain.open("PadN Option");
+        padN(at);
+        return true;
+    default:
+        break;
+    }
+    std::uint32_t action = 0;
+    chain.open("Unknown Option");
+    read<actionAhead>(at, &action);
+    chain.open("");
+    if (action != actionSkip) {
+        discardedOption(at);
+        return false;
+    }
+    skippedOption(at);
+    return true;
+}
+
+} // namespace netfloor::ipv6

@@ -1,0 +1,57 @@
+// SPDX-License-Identifier: MIT
+// ABORT and ERROR (RFC 9260, sections 3.3.7 and 3.3.10).
+//
+//    0                   1                   2                   3
+//    0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1
+//   +---------------+-------------+-+-------------------------------+
+//   | Type = 6 or 9 |   Reserved  |T|          Chunk Length         |
+//   +---------------+-------------+-+-------------------------------+
+//   |                         Error Causes                          |
+//   +---------------------------------------------------------------+
+//
+// ABORT has a limit: nothing that goes wrong in it reaches the walk over the chunks, unless the limit itself is too
+// long. ERROR has none, and the end of its causes mostly ends the walk. The Length of both goes to the causes alone:
+// `chunkOctets` stays that of the chunk before, which the walk then counts twice.
+#pragma once
+
+#include <array>
+
+#include "frame/block.h"
+#include "frame/field.h"
+#include "frame/step.h"
+#include "sctp/chunk_head.h"
+#include "sctp/error_causes.h"
+#include "sctp/length.h"
+
+namespace netfloor::sctp {
+
+inline constexpr std::array abortTagRows = {ValueName{0, "Sender TCB"}, ValueName{1, "no sender TCB"}};
+inline constexpr ValueNames abortTagNames{abortTagRows};
+
+// clang-format off
+inline constexpr Field abortReserved {944, "  Reserved", piece(1, 7),         "  Reserved=%x"};
+inline constexpr Field abortTagBit   {945, "  T bit",    bit(0).advancing(8), "  T bit=%-S", &abortTagNames};
+inline constexpr Field abortLength   = chunkLengthField(946);
+
+inline constexpr Field errorFlags    = lowerFlagsField(909);
+inline constexpr Field errorLength   = chunkLengthField(910);
+// clang-format on
+
+template <class Pass> void abort(Reader<Pass>& at) {
+    std::int32_t& errorOctets = at.variables().errorOctets;
+    LimitedBlock<Pass> block{at, "Abort Association"};
+    block.limit(limitFromLength<abortLengthAhead>(at, octetsBehindHead(errorOctets)));
+    read<abortReserved>(at);
+    read<abortTagBit>(at);
+    read<abortLength>(at, octetsBehindHead(errorOctets));
+    errorCauses(at);
+}
+
+template <class Pass> void error(Reader<Pass>& at) {
+    const Block<Pass> block{at, "Error"};
+    read<errorFlags>(at);
+    read<errorLength>(at, octetsBehindHead(at.variables().errorOctets));
+    errorCauses(at);
+}
+
+} // namespace netfloor::sctp

@@ -1,0 +1,39 @@
+// SPDX-License-Identifier: MIT
+// The head of a chunk (RFC 9260, section 3.2), behind its type.
+//
+//    0                   1                   2                   3
+//    0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1
+//   +---------------+---------------+-------------------------------+
+//   |   Chunk Type  |  Chunk Flags  |          Chunk Length         |
+//   +---------------+---------------+-------------------------------+
+//
+// Nearly every chunk has ids of its own for these fields, and their names come in two spellings.
+#pragma once
+
+#include <cstdint>
+
+#include "frame/block.h"
+#include "frame/field.h"
+#include "frame/step.h"
+
+namespace netfloor::sctp {
+
+// clang-format off
+constexpr Field flagsField       (std::uint32_t id) { return {id, "  Chunk Flags",  octets(1), "  Chunk Flags=0x%x"}; }
+constexpr Field lowerFlagsField  (std::uint32_t id) { return {id, "  Chunk flags",  octets(1), "  Chunk flags=%x"}; }
+constexpr Field chunkLengthField (std::uint32_t id) { return {id, "  Chunk Length", octets(2), "  Chunk Length=%u"}; }
+constexpr Field lengthField      (std::uint32_t id) { return {id, "  Length",       octets(2), "  Length=%u"}; }
+// clang-format on
+
+// The Length that several chunks share.
+inline constexpr Field chunkLength = chunkLengthField(808);
+
+template <class Pass> [[gnu::always_inline]] inline void readChunkLength(Reader<Pass>& at) {
+    if (!at.live) {
+        return;
+    }
+    const Block<Pass> block{at, "Length"};
+    read<chunkLength>(at, &at.variables().chunkOctets);
+}
+
+} // namespace netfloor::sctp

@@ -1,0 +1,30 @@
+// SPDX-License-Identifier: MIT
+// A list whose elements are counted by a field in front of it.
+#pragma once
+
+#include <cstdint>
+
+#include "frame/reader.h"
+
+namespace netfloor::sctp {
+
+// Reads a list of `count` elements. The count is believed as it stands: the list ends at it, or where a field does
+// not fit. An element counts once it is begun, so a list whose last element is cut short has its full count.
+// The condition is then whether that last element is whole, and otherwise true.
+template <class Pass, class Element>
+[[gnu::always_inline]] inline void countedList(Reader<Pass>& at, std::int32_t count, Element element) {
+    std::int32_t begun = 0;
+    at.test(true);
+    while (at.live && begun < count) {
+        ++begun;
+        element();
+        if (begun < count) {
+            at.test(true);
+        }
+    }
+    if (begun != count) {
+        at.mark(Mark::count);
+    }
+}
+
+} // namespace netfloor::sctp

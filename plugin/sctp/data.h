@@ -1,0 +1,72 @@
+// SPDX-License-Identifier: MIT
+// DATA (RFC 9260, section 3.3.1).
+//
+//    0                   1                   2                   3
+//    0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1
+//   +---------------+---------+-+-+-+-------------------------------+
+//   |    Type = 0   | Reserved|U|B|E|             Length            |
+//   +---------------+---------+-+-+-+-------------------------------+
+//   |                              TSN                              |
+//   +-------------------------------+-------------------------------+
+//   |      Stream Identifier S      |    Stream Sequence Number n   |
+//   +-------------------------------+-------------------------------+
+//   |                  Payload Protocol Identifier                  |
+//   +---------------------------------------------------------------+
+//   |                           User Data                           |
+//   +---------------------------------------------------------------+
+//
+// The user data are the next layer's, which the ports choose; the Payload Protocol Identifier has no say in it. The
+// walk over the chunks goes on where the next layer stopped, so a chunk behind DATA is decoded if the next layer has
+// consumed the user data and their padding.
+#pragma once
+
+#include <array>
+
+#include "frame/block.h"
+#include "frame/field.h"
+#include "frame/hand_off.h"
+#include "frame/step.h"
+#include "sctp/chunk_head.h"
+
+namespace netfloor::sctp {
+
+inline constexpr std::array unorderedRows = {ValueName{0, "FALSE"}, ValueName{1, "TRUE"}};
+inline constexpr std::array fragmentRows = {
+    ValueName{0, "Middle piece of a fragmented user message"},
+    ValueName{1, "Last piece of a fragmented user message"},
+    ValueName{2, "First piece of a fragmented user message"},
+    ValueName{3, "Unfragmented Message"},
+};
+
+inline constexpr ValueNames unorderedNames{unorderedRows};
+inline constexpr ValueNames fragmentNames{fragmentRows};
+
+// clang-format off
+inline constexpr Field dataReserved              {814, "  Reserved",                      piece(3, 7),              "  Reserved=%x"};
+inline constexpr Field unorderedBit              {815, "  Unordered Data Chunk(U) Bit",   bit(2),                   "  Unordered Data Chunk(U) Bit=%-S", &unorderedNames};
+inline constexpr Field fragmentBits              {816, "  BE bits",                       piece(0, 1).advancing(8), "  BE bits=%-S",                     &fragmentNames};
+inline constexpr Field tsn                       {817, "    TSN",                         octets(4),                "    TSN=0x%x"};
+inline constexpr Field streamIdentifier          {818, "    Stream Indetifier S",         octets(2),                "    Stream Indetifier S=%u"};
+inline constexpr Field streamSequenceNumber      {819, "    Stream Sequence Number n",    octets(2),                "    Stream Sequence Number n=%u"};
+inline constexpr Field payloadProtocolIdentifier {820, "    Payload Protocol Identifier", octets(4),                "    Payload Protocol Identifier=0x%x"};
+// clang-format on
+
+// A Length of so many octets is that of a chunk without user data.
+inline constexpr std::int32_t emptyDataOctets = 16;
+
+template <class Pass> [[gnu::always_inline]] inline void data(Reader<Pass>& at) {
+    const Block<Pass> block{at, "Data"};
+    read<dataReserved>(at);
+    read<unorderedBit>(at);
+    read<fragmentBits>(at);
+    readChunkLength(at);
+    read<tsn>(at);
+    read<streamIdentifier>(at);
+    read<streamSequenceNumber>(at);
+    read<payloadProtocolIdentifier>(at);
+    if (at.test(at.variables().chunkOctets > emptyDataOctets)) {
+        handOff(at);
+    }
+}
+
+} // namespace netfloor::sctp

@@ -1,0 +1,178 @@
+// SPDX-License-Identifier: MIT
+// The error causes of ABORT and ERROR (RFC 9260, section 3.3.10).
+//
+//    0                   1                   2                   3
+//    0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1
+//   +-------------------------------+-------------------------------+
+//   |           Cause Code          |          Cause Length         |
+//   +-------------------------------+-------------------------------+
+//   |                   Cause-Specific Information                  |
+//   +---------------------------------------------------------------+
+//
+// The causes are not walked by their own Lengths. The first is limited by all causes of the chunk, and the end of its
+// block skips the others. What a further round is limited by depends on what the cause before has stored.
+#pragma once
+
+#include <array>
+#include <cstdint>
+
+#include "frame/block.h"
+#include "frame/field.h"
+#include "frame/step.h"
+#include "sctp/counted_list.h"
+#include "sctp/length.h"
+#include "sctp/unrecognized_parameter.h"
+
+namespace netfloor::sctp {
+
+enum CauseCode : std::uint32_t {
+    invalidStreamIdentifier = 1,
+    missingMandatoryParameter = 2,
+    staleCookie = 3,
+    outOfResource = 4,
+    unresolvableAddress = 5,
+    unrecognizedChunkType = 6,
+    invalidMandatoryParameter = 7,
+    unrecognizedParametersCause = 8,
+    noUserData = 9,
+    cookieWhileShuttingDown = 10,
+};
+
+inline constexpr std::array causeCodeRows = {
+    ValueName{invalidStreamIdentifier, "Invalid Stream Identifier"},
+    ValueName{missingMandatoryParameter, "Missing Mandatory Parameter"},
+    ValueName{staleCookie, "Stale Cookie Error"},
+    ValueName{outOfResource, "Out Of Resource"},
+    ValueName{unresolvableAddress, "Unresolvable Address"},
+    ValueName{unrecognizedChunkType, "Unrecognized Chunk Type"},
+    ValueName{invalidMandatoryParameter, "Invalid Mandatory Parameter"},
+    ValueName{unrecognizedParametersCause, "Unrecognized Parameters"},
+    ValueName{noUserData, "No User Data"},
+    ValueName{cookieWhileShuttingDown, "Cookie Rcvd While Shutting Down"},
+};
+inline constexpr ValueNames causeCodeNames{.rows = causeCodeRows, .otherwise = "UNKNOWN"};
+
+// Each cause has an id of its own for its Length: that is how the host tells the causes apart.
+constexpr Field causeLengthField(std::uint32_t id) {
+    return {id, "      Length", octets(2), "      Length=%u"};
+}
+
+constexpr Field longCauseLengthField(std::uint32_t id) {
+    return {id, "      Cause Length", octets(2), "      Cause Length=%u"};
+}
+
+// clang-format off
+inline constexpr Field causeCode                 {912, "    Cause Code",                           octets(2), "    Cause Code=%-S", &causeCodeNames};
+inline constexpr Field invalidStreamLength       = causeLengthField(914);
+inline constexpr Field invalidStream             {915, "        Stream Identifier",                octets(2), "        Stream Identifier=%u"};
+inline constexpr Field invalidStreamReserved     {916, "        Reserved",                         octets(2), "        Reserved=%u"};
+inline constexpr Field missingLength             = causeLengthField(917);
+inline constexpr Field missingNumber             {918, "        Number of missing params",         octets(4), "        Number of missing params=%u"};
+inline constexpr Field missingType               {920, "        Missing Parameters Type",          octets(2), "        Missing Parameters Type=%u"};
+inline constexpr Field staleCookieLength         = longCauseLengthField(921);
+inline constexpr Field staleness                 {922, "        Measure of staleness (usec.)",     octets(4), "        Measure of staleness (usec.)=%u"};
+inline constexpr Field outOfResourceLength       = longCauseLengthField(923);
+inline constexpr Field unresolvableLength        = causeLengthField(924);
+inline constexpr Field unresolvableValue         {925, "        Unrecognized Address",             octetRunBackward(), R"(        Unrecognized Address=%-["%x"])"};
+inline constexpr Field unrecognizedChunkLength   = causeLengthField(926);
+inline constexpr Field unrecognizedChunk         {927, "        Unrecognized Chunk",               octetRunBackward(), R"(        Unrecognized Chunk=%-["%x"])"};
+inline constexpr Field invalidMandatoryLength    = causeLengthField(928);
+inline constexpr Field unrecognizedListLength    = causeLengthField(929);
+inline constexpr Field noUserDataLength          = causeLengthField(932);
+inline constexpr Field noUserDataTsn             {933, "        TSN value",                        octets(4), "        TSN value=%u"};
+inline constexpr Field shuttingDownLength        = causeLengthField(934);
+inline constexpr Field unknownCauseLength        = causeLengthField(935);
+inline constexpr Field unknownCause              {938, "      Unknown Cause",                      octetRun(), "      Unknown Cause=%x"};
+// clang-format on
+
+template <class Pass> void missingParameters(Reader<Pass>& at) {
+    std::int32_t& missingParameterCount = at.variables().missingParameterCount;
+    read<missingLength>(at);
+    read<missingNumber>(at, &missingParameterCount);
+    countedList(at, missingParameterCount, [&at] {
+        const Block<Pass> block{at, "INLINE BLOCK"};
+        read<missingType>(at);
+    });
+}
+
+// The list runs until a field does not fit: behind the last parameter that is the type of the next.
+template <class Pass> void unrecognizedParameterList(Reader<Pass>& at) {
+    std::int32_t& errorOctets = at.variables().errorOctets;
+    read<unrecognizedListLength>(at, octetsBehindHead(errorOctets));
+    if (!at.live) {
+        return;
+    }
+    const LimitedBlock<Pass> list{at, "INLINE BLOCK", bitsOf(errorOctets)};
+    while (at.live) {
+        unrecognizedParameter(at);
+    }
+}
+
+template <class Pass> void unknownCauseValue(Reader<Pass>& at) {
+    std::int32_t& errorOctets = at.variables().errorOctets;
+    read<unknownCauseLength>(at, octetsBehindHead(errorOctets));
+    if (at.test(errorOctets >= 1)) {
+        readRun<unknownCause>(at, errorOctets);
+    }
+}
+
+template <class Pass> void causeOf(Reader<Pass>& at, std::uint32_t code) {
+    std::int32_t& errorOctets = at.variables().errorOctets;
+    switch (code) {
+    case invalidStreamIdentifier:
+        read<invalidStreamLength>(at);
+        read<invalidStream>(at);
+        return read<invalidStreamReserved>(at);
+    case missingMandatoryParameter:
+        return missingParameters(at);
+    case staleCookie:
+        read<staleCookieLength>(at);
+        return read<staleness>(at);
+    case outOfResource:
+        return read<outOfResourceLength>(at);
+    case unresolvableAddress:
+        read<unresolvableLength>(at, octetsBehindHead(errorOctets));
+        return readRun<unresolvableValue>(at, errorOctets);
+    case unrecognizedChunkType:
+        read<unrecognizedChunkLength>(at, octetsBehindHead(errorOctets));
+        return readRun<unrecognizedChunk>(at, errorOctets);
+    case invalidMandatoryParameter:
+        return read<invalidMandatoryLength>(at);
+    case unrecognizedParametersCause:
+        return unrecognizedParameterList(at);
+    case noUserData:
+        read<noUserDataLength>(at, octetsBehindHead(errorOctets));
+        return read<noUserDataTsn>(at);
+    case cookieWhileShuttingDown:
+        return read<shuttingDownLength>(at, octetsBehindHead(errorOctets));
+    default:
+        return unknownCauseValue(at);
+    }
+}
+
+// The block of a cause bears the name of its code.
+[[nodiscard]] constexpr BlockName causeBlock(std::uint32_t code) {
+    BlockName name{"Unknown Cause Code"};
+    if (const std::uint32_t row = rowNumber<causeCodeNames>(code); row != 0) {
+        name.text = causeCodeRows[row - 1].text.data();
+        name.size = causeCodeRows[row - 1].text.size();
+    }
+    return name;
+}
+
+// The list goes on as long as its rounds end with the condition true, that is, with a field that did fit, whether or not
+// anything is left. It ordinarily ends with a limit that is longer than what is left.
+template <class Pass> void errorCauses(Reader<Pass>& at) {
+    at.test(true);
+    while (at.live && at.condition() != 0) {
+        const LimitedBlock<Pass> cause{at, "Error Causes", bitsOf(at.variables().errorOctets)};
+        std::uint32_t code = 0;
+        read<causeCode>(at, &code);
+        if (at.live) {
+            const Block<Pass> block{at, causeBlock(code)};
+            causeOf(at, code);
+        }
+    }
+}
+
+} // namespace netfloor::sctp

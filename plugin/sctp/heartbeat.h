@@ -1,0 +1,66 @@
+// SPDX-License-Identifier: MIT
+// HEARTBEAT and HEARTBEAT ACK (RFC 9260, sections 3.3.5 and 3.3.6).
+//
+//    0                   1                   2                   3
+//    0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1
+//   +---------------+---------------+-------------------------------+
+//   | Type = 4 or 5 |  Chunk Flags  |         Chunk Length          |
+//   +---------------+---------------+-------------------------------+
+//   |    Heartbeat Info Type = 1    |         HB Info length        |
+//   +-------------------------------+-------------------------------+
+//   |                   Sender-specific HB Info                     |
+//   +---------------------------------------------------------------+
+#pragma once
+
+#include <optional>
+
+#include "frame/block.h"
+#include "frame/field.h"
+#include "frame/step.h"
+#include "sctp/chunk_head.h"
+#include "sctp/length.h"
+
+namespace netfloor::sctp {
+
+// clang-format off
+inline constexpr Field heartbeatFlags      = flagsField(939);
+inline constexpr Field heartbeatAckFlags   = flagsField(940);
+inline constexpr Field heartbeatInfoType   {941, "    Heartbeat Info Type",         octets(2),  "    Heartbeat Info Type=%u"};
+inline constexpr Field heartbeatInfoLength {942, "      HB Info length",            octets(2),  "      HB Info length=%u"};
+inline constexpr Field heartbeatInfo       {943, "        Sender-specific HB Info", octetRun(), R"(        Sender-specific HB Info=%-["%x"])"};
+// clang-format on
+
+inline constexpr std::uint32_t knownInfoType = 1;
+
+// Information of another type stays unread: the walk takes it for the next chunk.
+template <class Pass> void heartbeatInformation(Reader<Pass>& at) {
+    if (!at.live) {
+        return;
+    }
+    if (look(at, octets(2)) != knownInfoType) {
+        return at.mark(Mark::expectation);
+    }
+    std::int32_t& errorOctets = at.variables().errorOctets;
+    LimitedBlock<Pass> block{at, "Heartbeat Information TLV"};
+    block.limit(limitFromLength<valueLengthAhead>(at, octetsBehindHead(errorOctets)));
+    read<heartbeatInfoType>(at);
+    read<heartbeatInfoLength>(at, octetsBehindHead(errorOctets));
+    readRun<heartbeatInfo>(at, errorOctets);
+}
+
+template <const Field& flags, class Pass> void heartbeatChunk(Reader<Pass>& at, BlockName name) {
+    const Block<Pass> block{at, name};
+    read<flags>(at);
+    readChunkLength(at);
+    heartbeatInformation(at);
+}
+
+template <class Pass> void heartbeat(Reader<Pass>& at) {
+    heartbeatChunk<heartbeatFlags>(at, "Heartbeat Request");
+}
+
+template <class Pass> void heartbeatAck(Reader<Pass>& at) {
+    heartbeatChunk<heartbeatAckFlags>(at, "Heartbeat Acknowledgement");
+}
+
+} // namespace netfloor::sctp

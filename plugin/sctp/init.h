@@ -1,0 +1,77 @@
+// SPDX-License-Identifier: MIT
+// INIT and INIT ACK (RFC 9260, sections 3.3.2 and 3.3.3).
+//
+//    0                   1                   2                   3
+//    0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1
+//   +---------------+---------------+-------------------------------+
+//   | Type = 1 or 2 |  Chunk Flags  |             Length            |
+//   +---------------+---------------+-------------------------------+
+//   |                         Initiate Tag                          |
+//   +---------------------------------------------------------------+
+//   |          Advertised Receiver Window Credit (a_rwnd)           |
+//   +-------------------------------+-------------------------------+
+//   |  Number of Outbound Streams   |   Number of Inbound Streams   |
+//   +-------------------------------+-------------------------------+
+//   |            Initial Transmission Sequence Number               |
+//   +---------------------------------------------------------------+
+//   |                           Parameters                          |
+//   +---------------------------------------------------------------+
+//
+// INIT has a limit, so that a field that does not fit stays its own matter. INIT ACK has none.
+#pragma once
+
+#include <cstdint>
+
+#include "frame/block.h"
+#include "frame/field.h"
+#include "frame/step.h"
+#include "sctp/chunk_head.h"
+#include "sctp/init_parameters.h"
+#include "sctp/length.h"
+
+namespace netfloor::sctp {
+
+// The two chunks have the same fields, whose ids run on from the first.
+inline constexpr std::uint32_t initIds = 823;
+inline constexpr std::uint32_t initAckIds = 835;
+
+// clang-format off
+template <std::uint32_t ids> inline constexpr Field initFlags       = flagsField(ids);
+template <std::uint32_t ids> inline constexpr Field initLength      = lengthField(ids + 1);
+template <std::uint32_t ids> inline constexpr Field initiateTag     {ids + 2, "    Initiate Tag",                                  octets(4), "    Initiate Tag=0x%x"};
+template <std::uint32_t ids> inline constexpr Field receiverWindow  {ids + 3, "    Advertised Receiver Window Credit (a_rwnd)",    octets(4), "    Advertised Receiver Window Credit (a_rwnd)=%u(dec)"};
+template <std::uint32_t ids> inline constexpr Field outboundStreams {ids + 4, "    Number of Outbound Streams",                    octets(2), "    Number of Outbound Streams=%u(dec)"};
+template <std::uint32_t ids> inline constexpr Field inboundStreams  {ids + 5, "    Number of Inbound Streams",                     octets(2), "    Number of Inbound Streams=%u(dec)"};
+template <std::uint32_t ids> inline constexpr Field initialTsn      {ids + 6, "    Initial Transmission Sequence Number(I_TSN)",   octets(4), "    Initial Transmission Sequence Number(I_TSN)=%u"};
+// clang-format on
+
+// The Length counts in so many octets in front of the parameters.
+inline constexpr std::int32_t octetsBeforeParameters = 20;
+
+template <std::uint32_t ids, auto parameters, class Pass> void initFields(Reader<Pass>& at) {
+    auto& variables = at.variables();
+    read<initFlags<ids>>(at);
+    read<initLength<ids>>(at, &variables.chunkOctets);
+    read<initiateTag<ids>>(at);
+    read<receiverWindow<ids>>(at);
+    read<outboundStreams<ids>>(at);
+    read<inboundStreams<ids>>(at);
+    read<initialTsn<ids>>(at);
+    if (at.live) {
+        variables.chunkOctets -= octetsBeforeParameters;
+    }
+    parameters(at);
+}
+
+template <class Pass> void init(Reader<Pass>& at) {
+    LimitedBlock<Pass> block{at, "INIT"};
+    block.limit(limitFromLength<initLengthAhead>(at, &at.variables().chunkOctets));
+    initFields<initIds, initParameters<Pass>>(at);
+}
+
+template <class Pass> void initAck(Reader<Pass>& at) {
+    const Block<Pass> block{at, "Init Ack"};
+    initFields<initAckIds, initAckParameters<Pass>>(at);
+}
+
+} // namespace netfloor::sctp

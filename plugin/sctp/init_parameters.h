@@ -1,0 +1,218 @@
+// SPDX-License-Identifier: MIT
+// The parameters of INIT and INIT ACK (RFC 9260, sections 3.2.1, 3.3.2 and 3.3.3).
+//
+//    0                   1                   2                   3
+//    0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1
+//   +-------------------------------+-------------------------------+
+//   |         Parameter Type        |            Length             |
+//   +-------------------------------+-------------------------------+
+//   |                             Value                             |
+//   +---------------------------------------------------------------+
+//
+// The two lists differ: they know different types, and a parameter of INIT is a limited block, so that what does not
+// fit in it stays its own matter and what its value leaves over is skipped. In an INIT ACK the next parameter is read
+// behind the last field of the one before, padding or not, and what does not fit ends the walk over the chunks.
+#pragma once
+
+#include <array>
+#include <cstdint>
+
+#include "frame/block.h"
+#include "frame/field.h"
+#include "frame/step.h"
+#include "ipv6/address.h"
+#include "sctp/length.h"
+#include "sctp/unrecognized_parameter.h"
+
+namespace netfloor::sctp {
+
+enum ParameterType : std::uint32_t {
+    ipv4AddressType = 5,
+    ipv6AddressType = 6,
+    stateCookieType = 7,
+    unrecognizedParametersType = 8,
+    cookiePreservativeType = 9,
+    hostNameType = 11,
+    supportedAddressesType = 12,
+    ecnCapableType = 32768,
+};
+
+inline constexpr std::array initParameterRows = {
+    ValueName{ipv4AddressType, "IPv4 Address"},
+    ValueName{ipv6AddressType, "IPv6 Address"},
+    ValueName{cookiePreservativeType, "Cookie Preservative"},
+    ValueName{hostNameType, "Host Name Address"},
+    ValueName{supportedAddressesType, "Supported Address Types"},
+    ValueName{ecnCapableType, "Reserved for ECN Capable"},
+};
+inline constexpr std::array initAckParameterRows = {
+    ValueName{ipv4AddressType, "IPv4 Address"},
+    ValueName{ipv6AddressType, "IPv6 Address"},
+    ValueName{stateCookieType, "State Cookie"},
+    ValueName{unrecognizedParametersType, "Unrecognized Parameters"},
+    ValueName{hostNameType, "Host Name Address"},
+    ValueName{ecnCapableType, "Reserved for ECN Capable"},
+};
+inline constexpr std::array addressTypeRows = {
+    ValueName{ipv4AddressType, "IPv4 Address"},
+    ValueName{ipv6AddressType, "IPv6 Address"},
+    ValueName{hostNameType, "Host Name Address"},
+};
+
+inline constexpr ValueNames initParameterNames{.rows = initParameterRows, .otherwise = "UNKNOWN"};
+inline constexpr ValueNames initAckParameterNames{.rows = initAckParameterRows, .otherwise = "UNKNOWN"};
+inline constexpr ValueNames addressTypeNames{.rows = addressTypeRows, .otherwise = "Unknow Address Type"};
+
+// clang-format off
+inline constexpr Field initParameterType       {847, "Parameter Type",       octets(2), "Parameter Type=%-S", &initParameterNames};
+inline constexpr Field initParameterLength     {848, "      Length",         octets(2), "      Length=%u octet(s)"};
+inline constexpr Field initAckParameterType    {851, "Parameter Type",       octets(2), "Parameter Type=%-S", &initAckParameterNames};
+inline constexpr Field initAckParameterLength  {852, "      Length",         octets(2), "      Length=%u octet(s)"};
+
+inline constexpr Field ipv4Address             {855, "        IP Address",   octets(4), R"(        IP Address=%-["%u":"."])"};
+inline constexpr Field cookieLifeSpanIncrement {867, "        Suggested Cookie Life-span Increment", octets(4), "        Suggested Cookie Life-span Increment=%u (msec.)"};
+inline constexpr Field hostName                {868, "        Host Name",    octetRun(), R"(        Host Name=%-["%c"])"};
+inline constexpr Field supportedAddressType    {870, "        Address Type", octets(2),  "        Address Type=%-S", &addressTypeNames};
+inline constexpr Field ecnCapable              {871, "        Reserved",     octetRun(), "        Reserved", noNames, "%x"};
+inline constexpr Field unknownParameter        {872, "        Reserved",     octetRun(), "        Reserved", noNames, "%x"};
+inline constexpr Field stateCookie             {857, "        State Cookie", octetRun(), R"(        State Cookie=%-["%x"])"};
+// clang-format on
+
+// What a parameter takes from the octets of its list: its Length less 8, and not its Length. So a list seldom ends with
+// its last parameter; it ends where the bits do.
+template <class Pass> void reckonParameter(Reader<Pass>& at, std::int32_t& listOctets) {
+    if (at.live) {
+        listOctets -= at.variables().parameterOctets - headOctets;
+    }
+}
+
+// Whether the list has another parameter, by that reckoning.
+template <class Pass> [[nodiscard]] bool listGoesOn(Reader<Pass>& at, std::int32_t listOctets) {
+    return at.test(listOctets >= 1) && at.live;
+}
+
+// A parameter whose value is one field, of fixed size or of as many octets as the Length tells.
+template <const Field& field, class Pass> void parameterOf(Reader<Pass>& at, BlockName name) {
+    if (!at.live) {
+        return;
+    }
+    const Block<Pass> block{at, name};
+    if constexpr (field.place.isRun()) {
+        readRun<field>(at, at.variables().parameterOctets);
+    } else {
+        read<field>(at);
+    }
+}
+
+template <class Pass> void ipv6AddressParameter(Reader<Pass>& at) {
+    if (!at.live) {
+        return;
+    }
+    const Block<Pass> block{at, "IPv6 Address"};
+    ipv6::reversedAddress(at, ReversedBits<Pass>::Report::toldToHost);
+}
+
+// The types that both lists know, and those that neither does.
+template <class Pass> void commonParameter(Reader<Pass>& at, std::uint32_t type) {
+    switch (type) {
+    case ipv4AddressType:
+        return parameterOf<ipv4Address>(at, "IPv4 Address");
+    case ipv6AddressType:
+        return ipv6AddressParameter(at);
+    case hostNameType:
+        return parameterOf<hostName>(at, "Host Name Address");
+    case ecnCapableType:
+        return parameterOf<ecnCapable>(at, "Reserved for ECN Capable");
+    default:
+        return parameterOf<unknownParameter>(at, "Reserved for ECN Capable");
+    }
+}
+
+// From here on `parameterOctets` counts the types, and the list reckons with that number.
+template <class Pass> void supportedAddressTypes(Reader<Pass>& at) {
+    if (!at.live) {
+        return;
+    }
+    std::int32_t& typeCount = at.variables().parameterOctets;
+    const Block<Pass> block{at, "Supported Address Types"};
+    typeCount /= 2;
+    readCounted<supportedAddressType>(at, typeCount);
+}
+
+template <class Pass> void initParameter(Reader<Pass>& at) {
+    std::uint32_t type = 0;
+    read<initParameterType>(at, &type);
+    read<initParameterLength>(at, octetsBehindHead(at.variables().parameterOctets));
+    switch (type) {
+    case cookiePreservativeType:
+        return parameterOf<cookieLifeSpanIncrement>(at, "Cookie Preservative");
+    case supportedAddressesType:
+        return supportedAddressTypes(at);
+    default:
+        return commonParameter(at, type);
+    }
+}
+
+template <class Pass> void initParameters(Reader<Pass>& at) {
+    auto& variables = at.variables();
+    BlockChain<Pass> chain{at};
+    while (listGoesOn(at, variables.chunkOctets)) {
+        chain.open("Init Option Container");
+        const std::uint32_t start = at.cursor;
+        {
+            LimitedBlock<Pass> parameter{at, "Init Option"};
+            parameter.limit(limitFromLength<valueLengthAhead>(at, octetsBehindHead(variables.parameterOctets)));
+            initParameter(at);
+            reckonParameter(at, variables.chunkOctets);
+        }
+        // A parameter of Length 0 would be read again for ever. Where not even a type is left, the next limit ends
+        // the list.
+        if (at.cursor == start && at.left >= typeBits) {
+            at.live = false;
+        }
+    }
+}
+
+// The parameters set `parameterOctets` anew, so that the outer list reckons with the last of them.
+template <class Pass> void unrecognizedParameters(Reader<Pass>& at) {
+    if (!at.live) {
+        return;
+    }
+    std::int32_t unrecognizedOctets = at.variables().parameterOctets;
+    const Block<Pass> block{at, "Unrecognized Parameters"};
+    BlockChain<Pass> chain{at};
+    while (listGoesOn(at, unrecognizedOctets)) {
+        chain.open("");
+        unrecognizedParameter(at);
+        reckonParameter(at, unrecognizedOctets);
+    }
+}
+
+template <class Pass> void initAckParameter(Reader<Pass>& at) {
+    std::uint32_t type = 0;
+    read<initAckParameterType>(at, &type);
+    read<initAckParameterLength>(at, octetsBehindHead(at.variables().parameterOctets));
+    switch (type) {
+    case stateCookieType:
+        return parameterOf<stateCookie>(at, "State Cookie");
+    case unrecognizedParametersType:
+        return unrecognizedParameters(at);
+    default:
+        return commonParameter(at, type);
+    }
+}
+
+template <class Pass> void initAckParameters(Reader<Pass>& at) {
+    auto& variables = at.variables();
+    BlockChain<Pass> chain{at};
+    while (listGoesOn(at, variables.chunkOctets)) {
+        chain.open("InitAck Options Container");
+        {
+            const Block<Pass> parameter{at, "InitAck Option"};
+            initAckParameter(at);
+        }
+        reckonParameter(at, variables.chunkOctets);
+    }
+}
+
+} // namespace netfloor::sctp

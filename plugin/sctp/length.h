@@ -1,0 +1,90 @@
+// SPDX-License-Identifier: MIT
+// The Lengths of chunks, parameters and error causes (RFC 9260), and the limits taken from them.
+#pragma once
+
+#include <array>
+#include <cstdint>
+#include <optional>
+
+#include "frame/block.h"
+#include "frame/field.h"
+#include "frame/step.h"
+#include "sctp/variables.h"
+
+namespace netfloor::sctp {
+
+// The head of a chunk, a parameter or a cause, which its Length counts in.
+inline constexpr std::int32_t headOctets = 4;
+
+// Stores a Length as the octets behind the head. Of a Length below 4 the number is negative, and nothing fits.
+[[nodiscard]] constexpr auto octetsBehindHead(std::int32_t& octets) {
+    return [&octets](std::uint32_t length) { octets = static_cast<std::int32_t>(length) - headOctets; };
+}
+
+[[nodiscard]] constexpr std::uint32_t bitsOf(std::int32_t octets) {
+    return static_cast<std::uint32_t>(octets) * bitsPerOctet;
+}
+
+// A type, and a Length.
+inline constexpr std::uint32_t typeBits = 16;
+inline constexpr std::int32_t lengthBits = 16;
+
+// Bits in front of a Length: stepped over where `needs` of them are left.
+struct Stretch {
+    std::uint32_t needs;
+    std::int32_t width;
+};
+
+// A Length that lies behind the place where its limited block starts.
+struct LengthAhead {
+    std::array<Stretch, 2> stretches; // what lies in front of the Length; a stretch that needs nothing is none
+    bool countsStretches;             // whether the limit covers the stretches as well
+    std::uint32_t outside;            // bits that are added up but lie outside the limit
+};
+
+// The limits of a whole Length are Length * 8 bits, of ABORT Length * 8 - 8. INIT starts behind its Chunk Type,
+// so that its limit reaches one octet behind the chunk. Where that octet is missing the limit does not hold, and the
+// walk over the chunks ends; where it is there, it is skipped.
+inline constexpr LengthAhead initLengthAhead{{{{8, 8}}}, true, 24};
+inline constexpr LengthAhead abortLengthAhead{{{{8, 0}, {8, 8}}}, false, 24};
+inline constexpr LengthAhead valueLengthAhead{{{{typeBits, typeBits}}}, true, 32}; // of a parameter, of heartbeat information
+
+// Reads a Length ahead of its turn, and gives the bits of the limit that it sets. Nothing is reported, and the
+// cursor comes back. What does not fit adds the advance of the step before instead of its own: behind the last
+// parameter of a list that makes a limit which holds no parameter.
+template <const LengthAhead& ahead, class Pass, class Store>
+[[nodiscard]] std::uint32_t limitFromLength(Reader<Pass>& at, Store into) {
+    if (at.over()) {
+        return 0;
+    }
+    const std::uint32_t cursor = at.cursor;
+    const std::uint32_t left = at.left;
+    const auto stepOver = [&at](std::int32_t width) {
+        at.advance() = width;
+        at.cursor += static_cast<std::uint32_t>(width);
+        at.left -= static_cast<std::uint32_t>(width);
+    };
+
+    std::int32_t sum = 0;
+    for (const Stretch& stretch : ahead.stretches) {
+        if (stretch.needs == 0) {
+            continue;
+        }
+        if (at.test(at.left >= stretch.needs)) {
+            stepOver(stretch.width);
+        }
+        sum += ahead.countsStretches ? at.advance() : 0;
+    }
+    const std::optional<std::uint32_t> length = look(at, octets(2));
+    if (at.test(length.has_value())) {
+        store(into, *length);
+        stepOver(lengthBits);
+    }
+    sum += at.advance();
+
+    at.cursor = cursor;
+    at.left = left;
+    return static_cast<std::uint32_t>(sum) + length.value_or(0) * bitsPerOctet - ahead.outside;
+}
+
+} // namespace netfloor::sctp

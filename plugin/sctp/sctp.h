@@ -1,0 +1,193 @@
+// SPDX-License-Identifier: MIT
+// SCTP (RFC 9260): the common header, and the walk over the chunks.
+//
+//    0                   1                   2                   3
+//    0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1
+//   +-------------------------------+-------------------------------+
+//   |      Source Port Number       |    Destination Port Number    |
+//   +-------------------------------+-------------------------------+
+//   |                       Verification Tag                        |
+//   +---------------------------------------------------------------+
+//   |                           Checksum                            |
+//   +---------------+---------------+-------------------------------+
+//   |   Chunk Type  |                                               |
+//   +---------------+       the chunks, each starting so            |
+//   |                                                               |
+//   +---------------------------------------------------------------+
+//
+// Nothing is tested that SCTP itself would test. Nor does a chunk have a border, except in INIT and ABORT: the next
+// Chunk Type is read where the last field of the chunk before ended. So padding, and whatever a body does not read, show
+// as chunks of their own. `payloadOctets`, which ends the walk, follows the Lengths and not the cursor; where the two
+// part, the walk ends with the bits.
+#pragma once
+
+#include <array>
+#include <cstdint>
+
+#include "frame/block.h"
+#include "frame/field.h"
+#include "frame/step.h"
+#include "sctp/abort_and_error.h"
+#include "sctp/cookie.h"
+#include "sctp/data.h"
+#include "sctp/heartbeat.h"
+#include "sctp/init.h"
+#include "sctp/other_chunks.h"
+#include "sctp/sack.h"
+#include "sctp/shutdown.h"
+
+namespace netfloor::sctp {
+
+enum ChunkType : std::uint32_t {
+    dataType,
+    initType,
+    initAckType,
+    sackType,
+    heartbeatType,
+    heartbeatAckType,
+    abortType,
+    shutdownType,
+    shutdownAckType,
+    errorType,
+    cookieEchoType,
+    cookieAckType,
+    ecneType,
+    cwrType,
+    shutdownCompleteType,
+};
+
+// clang-format off
+inline constexpr std::array chunkTypeRows = {
+    ValueName{dataType,             "Payload Data (DATA)",                       "DATA"},
+    ValueName{initType,             "Initiation (INIT)",                         "INIT"},
+    ValueName{initAckType,          "Initiation Acknowledgement (INIT ACK)",     "INIT ACK"},
+    ValueName{sackType,             "Selective Acknowledgement (SACK)",          "SACK"},
+    ValueName{heartbeatType,        "Heartbeat Request (HEARTBEAT)",             "HEARTBEAT"},
+    ValueName{heartbeatAckType,     "Heartbeat Acknowledgement (HEARTBEAT ACK)", "HEARTBEAT ACK"},
+    ValueName{abortType,            "Abort (ABORT)",                             "ABORT"},
+    ValueName{shutdownType,         "Shutdown (SHUTDOWN)",                       "SHUTDOWN"},
+    ValueName{shutdownAckType,      "Shutdown Acknowledgement (SHUTDOWN ACK)",   "SHUTDOWN ACK"},
+    ValueName{errorType,            "Operation Error (ERROR)",                   "ERROR"},
+    ValueName{cookieEchoType,       "Cookie Echo (COOKIE ECHO)",                 "COOKIE ECHO"},
+    ValueName{cookieAckType,        "Cookie Acknowledgement (COOKIE ACK)",       "COOKIE ACK"},
+    ValueName{ecneType,             "Reserved for Explicit Congestion Notification Echo (ECNE)", "ECNE"},
+    ValueName{cwrType,              "Reserved for Congestion Window Reduced (CWR)", "CWR"},
+    ValueName{shutdownCompleteType, "Shutdown Complete (SHUTDOWN COMPLETE)",     "SHUTDOWN COMPLETE"},
+    ValueName{15, 62,               "reserved by IETF",                          "RESERVED"},
+    ValueName{63,                   "IETF-defined Chunk Extensions",             "IETF DEFINED"},
+    ValueName{64, 126,              "reserved by IETF",                          "RESERVED"},
+    ValueName{127,                  "IETF-defined Chunk Extensions",             "IETF DEFINED"},
+    ValueName{128, 190,             "reserved by IETF",                          "RESERVEDF"},
+    ValueName{191,                  "IETF-defined Chunk Extensions",             "IETF DEFINED"},
+    ValueName{192, 254,             "reserved by IETF",                          "RESERVED"},
+    ValueName{255,                  "IETF-defined Chunk Extensions",             "IETF DEFINED"},
+};
+// clang-format on
+inline constexpr ValueNames chunkTypeNames{.rows = chunkTypeRows, .hasBriefs = true};
+
+// Only the first chunk of a packet has a key and a summary in its short text.
+// clang-format off
+inline constexpr Field sourcePort      {795, "SCTP Source Port Number",      octets(2), "SCTP Source Port Number=%u"};
+inline constexpr Field destinationPort {796, "SCTP Destination Port Number", octets(2), "SCTP Destination Port Number=%u"};
+inline constexpr Field verificationTag {797, "Verification Tag",             octets(4), "Verification Tag=0x%x"};
+inline constexpr Field checksum        {798, "Checksum",                     octets(4), "Checksum=0x%x"};
+inline constexpr Field firstChunkType  {802, "SCTP Chunk Type",              octets(1), "SCTP Chunk Type=%-S",  &chunkTypeNames, "SCTP - %-s (%u)"};
+inline constexpr Field laterChunkType  {805, "SCTP  Chunk Type",             octets(1), "SCTP  Chunk Type=%-S", &chunkTypeNames};
+// clang-format on
+
+inline constexpr std::int32_t commonHeaderOctets = 12;
+
+template <class Pass> [[gnu::always_inline]] inline void commonHeader(Reader<Pass>& at) {
+    auto& variables = at.variables();
+    const Block<Pass> block{at, "Common Header"};
+    read<sourcePort>(at, &variables.sourcePort);
+    read<destinationPort>(at, &variables.destinationPort);
+    read<verificationTag>(at);
+    read<checksum>(at);
+    if (at.live) {
+        variables.payloadOctets -= commonHeaderOctets;
+    }
+}
+
+template <class Pass> [[gnu::always_inline]] inline std::uint32_t readChunkType(Reader<Pass>& at) {
+    std::uint32_t& chunksSeen = at.variables().chunksSeen;
+    std::uint32_t type = 0;
+    if (at.test(chunksSeen == 0)) {
+        read<firstChunkType>(at, &type);
+        chunksSeen += at.live ? 1 : 0;
+    } else {
+        read<laterChunkType>(at, &type);
+    }
+    return type;
+}
+
+template <class Pass> [[gnu::always_inline]] inline void chunkBody(Reader<Pass>& at, std::uint32_t type) {
+    switch (type) {
+    case dataType:
+        return data(at);
+    case initType:
+        return apart<init<Pass>>(at);
+    case initAckType:
+        return apart<initAck<Pass>>(at);
+    case sackType:
+        return selectiveAcknowledgement(at);
+    case heartbeatType:
+        return apart<heartbeat<Pass>>(at);
+    case heartbeatAckType:
+        return apart<heartbeatAck<Pass>>(at);
+    case abortType:
+        return apart<abort<Pass>>(at);
+    case shutdownType:
+        return apart<shutdown<Pass>>(at);
+    case shutdownAckType:
+        return apart<shutdownAck<Pass>>(at);
+    case errorType:
+        return apart<error<Pass>>(at);
+    case cookieEchoType:
+        return apart<cookieEcho<Pass>>(at);
+    case cookieAckType:
+        return apart<cookieAck<Pass>>(at);
+    case ecneType:
+        return apart<explicitCongestionEcho<Pass>>(at);
+    case cwrType:
+        return apart<congestionWindowReduced<Pass>>(at);
+    case shutdownCompleteType:
+        return apart<shutdownComplete<Pass>>(at);
+    default:
+        return apart<reservedChunk<Pass>>(at);
+    }
+}
+
+// Each round reads one Chunk Type octet at least, or ends the walk, whatever the Lengths say and whatever a next layer
+// that led back into this pass has left in the variables.
+template <class Pass> [[gnu::always_inline]] inline void chunks(Reader<Pass>& at) {
+    auto& variables = at.variables();
+    BlockChain<Pass> chain{at};
+    while (at.live) {
+        chain.open("Chunk list");
+        if (!at.test(variables.payloadOctets >= 1)) {
+            return;
+        }
+        chain.open("Chunk");
+        const std::uint32_t type = readChunkType(at);
+        if (at.live) {
+            chunkBody(at, type);
+        }
+        if (at.live) {
+            variables.payloadOctets -= variables.chunkOctets;
+        }
+    }
+}
+
+template <class Pass> void packet(Reader<Pass>& at) {
+    if (!at.live) {
+        return;
+    }
+    auto& variables = at.variables();
+    const LimitedBlock<Pass> body{at, "SCTP Body", bitsOf(variables.payloadOctets)};
+    variables.chunksSeen = 0;
+    commonHeader(at);
+    chunks(at);
+}
+
+} // namespace netfloor::sctp

@@ -1,0 +1,64 @@
+// SPDX-License-Identifier: MIT
+// SHUTDOWN, SHUTDOWN ACK and SHUTDOWN COMPLETE (RFC 9260, sections 3.3.8, 3.3.9 and 3.3.13).
+//
+//    0                   1                   2                   3
+//    0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1
+//   +---------------+---------------+-------------------------------+
+//   |    Type = 7   |  Chunk Flags  |          Length = 8           |
+//   +---------------+---------------+-------------------------------+
+//   |                      Cumulative TSN Ack                       |
+//   +---------------------------------------------------------------+
+//
+//   +---------------+-------------+-+-------------------------------+
+//   |   Type = 14   |   Reserved  |T|          Length = 4           |
+//   +---------------+-------------+-+-------------------------------+
+//
+// SHUTDOWN ACK is a head alone. Whatever a larger Length covers is read as the next chunk.
+#pragma once
+
+#include <array>
+
+#include "frame/block.h"
+#include "frame/field.h"
+#include "frame/step.h"
+#include "sctp/chunk_head.h"
+
+namespace netfloor::sctp {
+
+inline constexpr std::array completeTagRows = {ValueName{0, "Sender TCB destroyed"}, ValueName{1, "no sender TCB"}};
+inline constexpr ValueNames completeTagNames{completeTagRows};
+
+// clang-format off
+inline constexpr Field shutdownFlags            = lowerFlagsField(884);
+inline constexpr Field shutdownLength           = lengthField(885);
+inline constexpr Field shutdownCumulativeTsnAck {886, "    Cumulative TSN Ack", octets(4), "    Cumulative TSN Ack=%u"};
+
+inline constexpr Field shutdownAckFlags         = lowerFlagsField(887);
+inline constexpr Field shutdownAckLength        = lengthField(888);
+
+inline constexpr Field completeReserved         {889, "  Reserved", piece(1, 7),         "  Reserved=%x"};
+inline constexpr Field completeTagBit           {890, "  T bit",    bit(0).advancing(8), "  T bit=%-S", &completeTagNames};
+inline constexpr Field completeLength           = lengthField(891);
+// clang-format on
+
+template <class Pass> void shutdown(Reader<Pass>& at) {
+    const Block<Pass> block{at, "Shutdown"};
+    read<shutdownFlags>(at);
+    read<shutdownLength>(at, &at.variables().chunkOctets);
+    read<shutdownCumulativeTsnAck>(at);
+}
+
+template <class Pass> void shutdownAck(Reader<Pass>& at) {
+    const Block<Pass> block{at, "Shutdown Acknowledge"};
+    read<shutdownAckFlags>(at);
+    read<shutdownAckLength>(at, &at.variables().chunkOctets);
+}
+
+template <class Pass> void shutdownComplete(Reader<Pass>& at) {
+    const Block<Pass> block{at, "Shutdown Complete"};
+    read<completeReserved>(at);
+    read<completeTagBit>(at);
+    read<completeLength>(at, &at.variables().chunkOctets);
+}
+
+} // namespace netfloor::sctp

@@ -1,0 +1,27 @@
+// SPDX-License-Identifier: MIT
+// A parameter that the peer did not recognize, quoted in an INIT ACK (RFC 9260, section 3.3.3.1) or in an error cause
+// (section 3.3.10.8).
+#pragma once
+
+#include "frame/block.h"
+#include "frame/field.h"
+#include "frame/step.h"
+#include "sctp/length.h"
+
+namespace netfloor::sctp {
+
+// clang-format off
+inline constexpr Field unrecognizedType   {863, "        Unrecoginzed Parameter Type", octets(2),  "        Unrecoginzed Parameter Type=%u"};
+inline constexpr Field unrecognizedLength {864, "        Length",                      octets(2),  "        Length=%u octet(s)"};
+inline constexpr Field unrecognizedValue  {865, "                Value",               octetRun(), "                Value", noNames, "0x%x"};
+// clang-format on
+
+template <class Pass> void unrecognizedParameter(Reader<Pass>& at) {
+    std::int32_t& parameterOctets = at.variables().parameterOctets;
+    const Block<Pass> block{at, "Unrecogonized Parameters"};
+    read<unrecognizedType>(at);
+    read<unrecognizedLength>(at, octetsBehindHead(parameterOctets));
+    readRun<unrecognizedValue>(at, parameterOctets);
+}
+
+} // namespace netfloor::sctp

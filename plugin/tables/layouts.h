@@ -1,0 +1,155 @@
+// SPDX-License-Identifier: MIT
+// The published layouts: where the bits of a field lie, in a small code of octets. Fields of one layout share a
+// record; records stand in the order of first use.
+//
+//   record     length (16 bits), ff 02 55 01 04, number of pieces, pieces, count, step, reference
+//   piece      a range, or for one bit a constant
+//   count      how often the pieces repeat: a constant, a range, or a reference where the packet tells
+//   constant   10 00 00 00 v
+//   range      05, from, to; from above to means that the bits are read in reverse
+//   reference  08 n 00
+#pragma once
+
+#include <array>
+#include <cstddef>
+#include <cstdint>
+
+#include "tables/catalogue.h"
+
+namespace netfloor {
+
+// The octets of one record, its length word included.
+struct LayoutRecord {
+    std::array<std::uint8_t, 96> octets{};
+    std::size_t size = 2;
+
+    constexpr void add(std::initializer_list<unsigned> values) {
+        for (const unsigned value : values) {
+            octets[size++] = static_cast<std::uint8_t>(value);
+        }
+    }
+
+    constexpr void addConstant(std::uint32_t value) {
+        add({0x10, 0, 0, 0, value});
+    }
+
+    constexpr void addRange(std::uint32_t from, std::uint32_t to) {
+        add({0x05});
+        addConstant(from);
+        addConstant(to);
+    }
+
+    // A piece from bit `from` to bit `to`, counted from 1.
+    constexpr void addPiece(std::uint32_t from, std::uint32_t to) {
+        if (from == to) {
+            addConstant(from);
+        } else {
+            addRange(from, to);
+        }
+    }
+
+    constexpr void addReference(std::uint32_t number) {
+        add({0x08, number, 0});
+    }
+
+    constexpr void finish() {
+        const std::size_t length = size - 2;
+        octets[0] = static_cast<std::uint8_t>(length);
+        octets[1] = static_cast<std::uint8_t>(length >> 8);
+    }
+
+    [[nodiscard]] constexpr bool sameAs(const std::uint8_t* other) const {
+        for (std::size_t i = 0; i < size; ++i) {
+            if (octets[i] != other[i]) {
+                return false;
+            }
+        }
+        return true;
+    }
+};
+
+inline constexpr std::uint32_t countByPacket = 0;  // reference in the place of the count
+inline constexpr std::uint32_t fixedLength = 0;    // reference at the end
+inline constexpr std::uint32_t variableLength = 1; // reference at the end
+
+// A field that is read ahead, or by groups that no piece describes, has no layout.
+[[nodiscard]] constexpr bool hasLayout(const Place& place) {
+    return place.shape != Shape::ahead && place.shape != Shape::groups;
+}
+
+// The pieces of one unit.
+constexpr void addPieces(LayoutRecord& record, const Place& place) {
+    switch (place.shape) {
+    case Shape::pieces:
+        record.add({place.count});
+        for (std::uint32_t i = 0; i < place.count; ++i) {
+            record.addPiece(place.pieces[i].low + 1, place.pieces[i].high + 1);
+        }
+        return;
+    case Shape::addressNibbles:
+        record.add({nibblesPerGroup});
+        for (std::uint32_t nibble = 0; nibble < nibblesPerGroup; ++nibble) {
+            record.addPiece(nibble * nibbleBits + 1, (nibble + 1) * nibbleBits);
+        }
+        return;
+    case Shape::reversedGroups:
+        record.add({1});
+        record.addPiece(groupBits, 1);
+        return;
+    default:
+        record.add({1});
+        record.addPiece(1, place.unitBits());
+    }
+}
+
+[[nodiscard]] constexpr LayoutRecord layoutOf(const Place& place) {
+    LayoutRecord record;
+    if (!hasLayout(place)) {
+        record.add({0xff, 0x00, 0x00});
+        record.finish();
+        return record;
+    }
+    record.add({0xff, 0x02, 0x55, 0x01, 0x04});
+    addPieces(record, place);
+    const bool byPacket = (place.isRun() && place.mostUnits == 0) || place.shape == Shape::addressNibbles;
+    if (byPacket) {
+        record.addReference(countByPacket);
+    } else if (place.isRun()) {
+        record.addRange(1, place.mostUnits);
+    } else {
+        record.addConstant(place.shape == Shape::pieces ? 1 : place.count);
+    }
+    record.addConstant(place.shape == Shape::pieces || place.isRun() ? place.advance : place.advance / place.count);
+    record.addReference(byPacket ? variableLength : fixedLength);
+    record.finish();
+    return record;
+}
+
+// All records, and where the record of each field starts.
+struct LayoutTable {
+    std::array<std::uint8_t, 4096> octets{};
+    std::array<std::uint32_t, catalogue.size()> offsets{};
+    std::size_t size = 0;
+    std::size_t records = 0;
+};
+
+inline constexpr LayoutTable layoutTable = [] {
+    LayoutTable table;
+    for (std::size_t i = 0; i < catalogue.size(); ++i) {
+        const LayoutRecord record = layoutOf(catalogue[i]->place);
+        std::size_t at = 0;
+        while (at < table.size && !record.sameAs(&table.octets[at])) {
+            at += 2u + table.octets[at];
+        }
+        table.offsets[i] = static_cast<std::uint32_t>(at);
+        if (at == table.size) {
+            for (std::size_t octet = 0; octet < record.size; ++octet) {
+                table.octets[table.size++] = record.octets[octet];
+            }
+            ++table.records;
+        }
+    }
+    return table;
+}();
+
+} // namespace netfloor

@@ -1,0 +1,146 @@
+// SPDX-License-Identifier: MIT
+// The published texts and value names: the display line of each field, followed by the names of its list, each
+// distinct text once.
+#pragma once
+
+#include <array>
+#include <cstddef>
+#include <cstdint>
+#include <string_view>
+
+#include "netfloor/descriptors.h"
+#include "tables/catalogue.h"
+
+namespace netfloor {
+
+// Gives each distinct text a number, in the order of first use.
+template <std::size_t most> class TextNumbers {
+public:
+    constexpr std::uint32_t numberOf(std::string_view text) {
+        std::size_t slot = hash(text) % slots_.size();
+        for (; slots_[slot] != 0; slot = (slot + 1) % slots_.size()) {
+            if (texts_[slots_[slot] - 1u] == text) {
+                return slots_[slot] - 1u;
+            }
+        }
+        texts_[count_] = text;
+        slots_[slot] = static_cast<std::uint16_t>(count_ + 1);
+        return count_++;
+    }
+
+    [[nodiscard]] constexpr std::uint32_t count() const {
+        return count_;
+    }
+
+    [[nodiscard]] constexpr std::string_view operator[](std::size_t number) const {
+        return texts_[number];
+    }
+
+private:
+    // FNV-1a, of the first characters and the length: enough to tell most names apart.
+    [[nodiscard]] static constexpr std::uint32_t hash(std::string_view text) {
+        std::uint32_t value = 2166136261u ^ static_cast<std::uint32_t>(text.size());
+        for (const char character : text.substr(0, 24)) {
+            value = (value ^ static_cast<std::uint8_t>(character)) * 16777619u;
+        }
+        return value;
+    }
+
+    std::array<std::string_view, most> texts_{};
+    std::array<std::uint16_t, most * 2> slots_{};
+    std::uint32_t count_ = 0;
+};
+
+// The numbers that value rows refer to, each once, in the order of first use; a range has two of its own.
+template <std::size_t most> class ValuePool {
+public:
+    constexpr std::uint32_t indexOf(std::uint32_t value) {
+        for (std::uint32_t index = 0; index < count_; ++index) {
+            if (numbers_[index] == static_cast<std::int32_t>(value)) {
+                return index;
+            }
+        }
+        return append(value);
+    }
+
+    constexpr std::uint32_t indexOfRange(std::uint32_t from, std::uint32_t to) {
+        for (std::uint32_t index = 0; index + 1 < count_; ++index) {
+            if (numbers_[index] == static_cast<std::int32_t>(from) && numbers_[index + 1] == static_cast<std::int32_t>(to)) {
+                return index;
+            }
+        }
+        const std::uint32_t index = append(from);
+        append(to);
+        return index;
+    }
+
+    [[nodiscard]] constexpr std::uint32_t count() const {
+        return count_;
+    }
+
+    [[nodiscard]] constexpr std::int32_t operator[](std::size_t index) const {
+        return numbers_[index];
+    }
+
+private:
+    constexpr std::uint32_t append(std::uint32_t value) {
+        numbers_[count_] = static_cast<std::int32_t>(value);
+        return count_++;
+    }
+
+    std::array<std::int32_t, most> numbers_{};
+    std::uint32_t count_ = 0;
+};
+
+// The empty range that stands for any value without a row of its own.
+inline constexpr std::uint32_t anyFrom = 50;
+inline constexpr std::uint32_t anyTo = 0;
+
+// The rows of a field's list of names.
+[[nodiscard]] constexpr std::size_t valueRowCount(const Field& field) {
+    const bool hasDefault = !field.names->otherwise.empty();
+    return field.hasNames() ? field.names->rows.size() + (hasDefault ? 1 : 0) : 0;
+}
+
+inline constexpr std::size_t allValueRows = [] {
+    std::size_t rows = 0;
+    for (const Field* const field : catalogue) {
+        rows += valueRowCount(*field);
+    }
+    return rows;
+}();
+
+// Texts and value names, worked out together since both stand in the order of the fields.
+struct TextTables {
+    TextNumbers<2048> texts;
+    ValuePool<1024> pool;
+    std::array<ValueMapRow, allValueRows + 1> values{};      // ended by a row of zeros
+    std::array<std::uint32_t, catalogue.size()> lines{};     // of each field: number of its display line
+    std::array<std::int32_t, catalogue.size()> valueStart{}; // of each field: its first value row, or -1
+};
+
+inline constexpr TextTables textTables = [] {
+    TextTables tables;
+    std::size_t row = 0;
+    for (std::size_t i = 0; i < catalogue.size(); ++i) {
+        const Field& field = *catalogue[i];
+        tables.lines[i] = tables.texts.numberOf(field.line);
+        tables.valueStart[i] = field.hasNames() ? static_cast<std::int32_t>(row) : -1;
+        if (!field.hasNames()) {
+            continue;
+        }
+        if (!field.names->otherwise.empty()) {
+            const std::uint32_t index = tables.pool.indexOfRange(anyFrom, anyTo);
+            tables.values[row++] = {NETFLOOR_VALUE_RANGE, index, tables.texts.numberOf(field.names->otherwise)};
+        }
+        for (const ValueName& name : field.names->rows) {
+            const bool one = name.from == name.to;
+            const std::uint32_t index = one ? tables.pool.indexOf(name.from) : tables.pool.indexOfRange(name.from, name.to);
+            const std::uint32_t kind = one ? NETFLOOR_VALUE_ONE : NETFLOOR_VALUE_RANGE;
+            tables.values[row++] = {kind, index, tables.texts.numberOf(name.text)};
+        }
+    }
+    return tables;
+}();
+
+} // namespace netfloor

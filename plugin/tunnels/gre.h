@@ -1,0 +1,163 @@
+// SPDX-License-Identifier: MIT
+// GRE (RFC 2784, RFC 2890).
+//
+//    0                   1                   2                   3
+//    0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1
+//   +-+-+-+-+-----------------+-----+-------------------------------+
+//   |C| |K|S|    Reserved0    |Versn|         GRE Protocol          |
+//   +-+-+-+-+-----------------+-----+-------------------------------+
+//   |     CheckSum, where C is 1    |    Reserved1, where C is 1    |
+//   +-------------------------------+-------------------------------+
+//   |                     Key, where K is 1                         |
+//   |               Sequence Number, where S is 1                   |
+//   +---------------------------------------------------------------+
+//
+// The protocol is shown and not dispatched on: whatever GRE carries is taken as a frame between two HDLC flags (RFC
+// 1662), which is what it carries for point-to-point links, and as plain octets behind that.
+#pragma once
+
+#include <array>
+#include <cstdint>
+
+#include "frame/block.h"
+#include "frame/field.h"
+#include "frame/step.h"
+
+namespace netfloor::gre {
+
+inline constexpr std::array presenceRows = {ValueName{0, "Not Present"}, ValueName{1, "Present"}};
+inline constexpr std::array carriedProtocolRows = {
+    ValueName{0x0000, "Reserved"},
+    ValueName{0x0004, "SNA"},
+    ValueName{0x00fe, "OSI network layer"},
+    ValueName{0x0200, "PUP"},
+    ValueName{0x0600, "XNS"},
+    ValueName{0x0800, "IP"},
+    ValueName{0x0804, "Chaos"},
+    ValueName{0x0806, "RFC 826 ARP"},
+    ValueName{0x0808, "Frame Relay ARP"},
+    ValueName{0x0bad, "VINES"},
+    ValueName{0x0bae, "VINES Echo"},
+    ValueName{0x0baf, "VINES Loopback"},
+    ValueName{0x6003, "DECnet (Phase IV)"},
+    ValueName{0x6558, "Transparent Ethernet Bridging"},
+    ValueName{0x6559, "Raw Frame Relay"},
+    ValueName{0x8019, "Apollo Domain"},
+    ValueName{0x809b, "Ethertalk (Appletalk)"},
+    ValueName{0x8137, "Novell IPX"},
+    ValueName{0x876b, "RFC 1144 TCP/IP compression"},
+    ValueName{0x876c, "IP Autonomous Systems"},
+    ValueName{0x876d, "Secure Data"},
+    ValueName{0x880b, "PPP"},
+    ValueName{0x8881, "Unstructured Byte Stream"},
+    ValueName{0xffff, "Reserved"},
+};
+
+inline constexpr ValueNames presenceNames{presenceRows};
+inline constexpr ValueNames carriedProtocolNames{carriedProtocolRows, "%x"};
+
+// clang-format off
+inline constexpr Field checksumPresent {692, "Checksum Present",        bit(7),                     "Checksum Present=%-S",        &presenceNames};
+inline constexpr Field unusedBit       {693, "Unused bit",              bit(6),                     "Unused bit=%u"};
+inline constexpr Field keyPresent      {694, "Key Present",             bit(5),                     "Key Present=%-S",             &presenceNames};
+inline constexpr Field sequencePresent {695, "Sequence Number Present", bit(4),                     "Sequence Number Present=%-S", &presenceNames};
+inline constexpr Field reserved0       {696, "Reserved0",               pieces({0, 3}, {11, 15}),   "Reserved0=%u"};
+inline constexpr Field version         {697, "Version",                 piece(8, 10).advancing(16), "Version=%u"};
+inline constexpr Field protocol        {698, "GRE Protocol",            octets(2),                  "GRE Protocol=%-S",            &carriedProtocolNames};
+inline constexpr Field checksum        {702, "CheckSum (hex)",          octets(2),                  "CheckSum (hex)=%x"};
+inline constexpr Field reserved1       {703, "Reserved1",               octets(2),                  "Reserved1=%u"};
+inline constexpr Field key             {707, "GRE Key",                 octets(4),                  "GRE Key=%u"};
+inline constexpr Field sequence        {711, "Sequence Number",         octets(4),                  "Sequence Number=%u"};
+inline constexpr Field openingFlag     {716, "HDLC Flag",               octets(1),                  "HDLC Flag=0x%x"};
+inline constexpr Field framePayload    {719, "HDLC Payload",            octets(1),                  "HDLC Payload=0x%x"};
+inline constexpr Field closingFlag     {724, "HDLC Flag",               octets(1),                  "HDLC Flag=0x%x"};
+inline constexpr Field payload         {715, "GRE Payload",             octets(1),                  "GRE Payload=0x%x"};
+// clang-format on
+
+// What the fixed header takes, and so does each of its additions.
+inline constexpr std::int32_t partOctets = 4;
+
+inline constexpr std::uint32_t hdlcFlag = 0x7e;
+
+// Takes octets that were read off the payload.
+template <class Pass> [[gnu::always_inline]] inline void account(const Reader<Pass>& at, std::int32_t octetCount) {
+    if (at.live) {
+        at.variables().payloadOctets -= octetCount;
+    }
+}
+
+template <class Pass> [[gnu::always_inline]] inline void header(Reader<Pass>& at) {
+    std::uint32_t greChecksumPresent = 0;
+    std::uint32_t greKeyPresent = 0;
+    std::uint32_t greSequencePresent = 0;
+    read<checksumPresent>(at, &greChecksumPresent);
+    read<unusedBit>(at);
+    read<keyPresent>(at, &greKeyPresent);
+    read<sequencePresent>(at, &greSequencePresent);
+    read<reserved0>(at);
+    read<version>(at);
+    read<protocol>(at);
+    account(at, partOctets);
+    if (greChecksumPresent == 1) {
+        read<checksum>(at);
+        read<reserved1>(at);
+        account(at, partOctets);
+    }
+    if (greKeyPresent == 1) {
+        read<key>(at);
+        account(at, partOctets);
+    }
+    if (greSequencePresent == 1) {
+        read<sequence>(at);
+        account(at, partOctets);
+    }
+}
+
+template <class Pass> [[gnu::always_inline]] inline bool flagAhead(Reader<Pass>& at) {
+    return look(at, octets(1)) == hdlcFlag;
+}
+
+// The frame from its opening flag on, which stands under the cursor. A frame that the payload ends before its closing
+// flag just stops; one that the packet ends is a fault.
+template <class Pass> [[gnu::always_inline]] inline void frame(Reader<Pass>& at) {
+    const auto& variables = at.variables();
+    const Block<Pass> block{at, "HDLC Data"};
+    read<openingFlag>(at);
+    account(at, 1);
+    while (at.live && at.left >= bitsPerOctet && !flagAhead(at) && variables.payloadOctets >= 1) {
+        const Block<Pass> octet{at, "INLINE BLOCK"};
+        read<framePayload>(at);
+        account(at, 1);
+    }
+    if (!at.live || variables.payloadOctets < 1) {
+        return;
+    }
+    if (!flagAhead(at)) {
+        return at.mark(Mark::expectation);
+    }
+    const Block<Pass> octet{at, "INLINE BLOCK"};
+    read<closingFlag>(at);
+    account(at, 1);
+}
+
+template <class Pass> [[gnu::always_inline]] inline void packet(Reader<Pass>& at) {
+    if (!at.live) {
+        return;
+    }
+    const auto& variables = at.variables();
+    const Block<Pass> block{at, "Generic Routing Encapsulation"};
+    header(at);
+    if (at.live) {
+        if (flagAhead(at)) {
+            frame(at);
+        } else {
+            at.mark(Mark::expectation);
+        }
+    }
+    const std::int32_t payloadOctets = variables.payloadOctets;
+    if (payloadOctets > 0 && readRepeated<payload>(at, payloadOctets) != payloadOctets) {
+        at.mark(Mark::count);
+    }
+}
+
+} // namespace netfloor::gre

@@ -1,0 +1,64 @@
+// SPDX-License-Identifier: MIT
+// The header of a datagram inside an IPv4 datagram (RFC 2003). It is laid out like the header around it.
+//
+//    0                   1                   2                   3
+//    0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1
+//   +-------+-------+---------------+-------------------------------+
+//   |Version|  IHL  |Type of Service|   Original IP Total Length    |
+//   +-------+-------+---------------+-----+-------------------------+
+//   |    Original Identification    |Flags|     Fragment Offset     |
+//   +---------------+---------------+-----+-------------------------+
+//   |  Time to Live |IPinIP Protocol|        Header Checksum        |
+//   +---------------+---------------+-------------------------------+
+//   |                     Original Src Address                      |
+//   |                     Original Dest Address                     |
+//   +---------------------------------------------------------------+
+//   |                     Options and padding                       |
+//   +---------------------------------------------------------------+
+//
+// The inner lengths take the place of the outer ones, but open no limit: bits are bounded by the outermost header. A
+// fragment inside is read as if it were whole.
+#pragma once
+
+#include <cstdint>
+
+#include "frame/field.h"
+#include "frame/step.h"
+#include "ipv4/options.h"
+#include "ipv4/service_and_fragment.h"
+#include "tables/protocol_numbers.h"
+
+namespace netfloor::ipinip {
+
+// clang-format off
+inline constexpr Field version            {629, "Version",                         piece(4, 7),              "Version=%u"};
+inline constexpr Field headerLength       {630, "Original Internet Header Length", piece(0, 3).advancing(8), "Original Internet Header Length=%u*4 octets"};
+inline constexpr Field totalLength        {631, "Original IP Total Length",        octets(2),                "Original IP Total Length=%u octets"};
+inline constexpr Field identification     {632, "Original Identification",         octets(2),                "Original Identification=%x"};
+inline constexpr Field timeToLive         {633, "Time to Live",                    octets(1),                "Time to Live=%u"};
+inline constexpr Field protocol           {634, "IPinIP Protocol",                 octets(1),                "IPinIP Protocol=%-S", &protocolNames, "IPinIP - %-S"};
+inline constexpr Field headerChecksum     {635, "Header Checksum",                 octets(2),                "  Header Checksum=%x"};
+inline constexpr Field sourceAddress      {636, "Original Src Address",            octets(4),                R"(  Original Src Address=%-["%u":"."])"};
+inline constexpr Field destinationAddress {637, "Original Dest Address",           octets(4),                R"(  Original Dest Address=%-["%u":"."])"};
+// clang-format on
+
+template <class Pass> [[gnu::always_inline]] inline void header(Reader<Pass>& at) {
+    auto& variables = at.variables();
+    read<version>(at);
+    read<headerLength>(at, [&](std::uint32_t words) { variables.ipHeaderOctets = words * 4; });
+    ipv4::typeOfService(at);
+    read<totalLength>(at, &variables.ipTotalLength);
+    read<identification>(at);
+    ipv4::flagAndFragmentOffset(at);
+    read<timeToLive>(at);
+    read<protocol>(at, &variables.ipProtocol);
+    read<headerChecksum>(at);
+    read<sourceAddress>(at);
+    read<destinationAddress>(at);
+    ipv4::options(at);
+    if (at.live) {
+        variables.payloadOctets = static_cast<std::int32_t>(variables.ipTotalLength - variables.ipHeaderOctets);
+    }
+}
+
+} // namespace netfloor::ipinip

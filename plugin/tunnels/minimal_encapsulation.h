@@ -1,0 +1,67 @@
+// SPDX-License-Identifier: MIT
+// The forwarding header of minimal encapsulation (RFC 2004), which stands between an IPv4 header and its payload.
+//
+//    0                   1                   2                   3
+//    0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1
+//   +---------------+-+-------------+-------------------------------+
+//   |MIPinIPProtocol|S|  Reserved   |        Header Checksum        |
+//   +---------------+-+-------------+-------------------------------+
+//   |                     Original Dest Address                     |
+//   +---------------------------------------------------------------+
+//   |             Original Src Address, where S is 1                |
+//   +---------------------------------------------------------------+
+//
+// The lengths are those of the header around it, less what the forwarding header takes.
+#pragma once
+
+#include <array>
+#include <cstdint>
+
+#include "frame/field.h"
+#include "frame/step.h"
+#include "tables/protocol_numbers.h"
+
+namespace netfloor::minimal {
+
+inline constexpr std::array sourcePresentRows = {
+    ValueName{0, "Original Source Address NOT Present"},
+    ValueName{1, "Original Source Address Present"},
+};
+inline constexpr ValueNames sourcePresentNames{sourcePresentRows};
+
+// The checksum is shown digit by digit.
+// clang-format off
+inline constexpr Field protocol           {640, "MIPinIP Protocol",      octets(1),                "MIPinIP Protocol=%-S", &protocolNames, "MIPinIP - %-S"};
+inline constexpr Field reserved           {641, "  Reserved",            piece(0, 6),              "  Reserved=%x"};
+inline constexpr Field sourcePresent      {642, "  S",                   bit(7).advancing(8),      "  S=%-S", &sourcePresentNames};
+inline constexpr Field headerChecksum     {643, "Header Checksum",       pieces({4, 7}, {0, 3}, {12, 15}, {8, 11}).advancing(16), R"(  Header Checksum=%-["%x"](hex))", noNames, "%x"};
+inline constexpr Field destinationAddress {646, "Original Dest Address", octets(4),                R"(  Original Dest Address=%-["%u":"."])"};
+inline constexpr Field sourceAddress      {651, "Original Src Address",  octets(4),                R"(  Original Src Address=%-["%u":"."])"};
+// clang-format on
+
+inline constexpr std::uint32_t headerOctets = 8;
+inline constexpr std::uint32_t sourceAddressOctets = 4;
+
+template <class Pass> [[gnu::always_inline]] inline void header(Reader<Pass>& at) {
+    auto& variables = at.variables();
+    std::uint32_t minimalSourcePresent = 0;
+    read<protocol>(at, &variables.ipProtocol);
+    read<reserved>(at);
+    read<sourcePresent>(at, &minimalSourcePresent);
+    read<headerChecksum>(at);
+    read<destinationAddress>(at);
+    if (!at.live) {
+        return;
+    }
+    variables.ipTotalLength -= headerOctets;
+    if (minimalSourcePresent == 1) {
+        variables.ipTotalLength -= sourceAddressOctets;
+        read<sourceAddress>(at);
+    }
+    // The options of the header around it stand in front of the forwarding header: what follows here is the payload.
+    if (at.live) {
+        variables.payloadOctets = static_cast<std::int32_t>(variables.ipTotalLength - variables.ipHeaderOctets);
+    }
+}
+
+} // namespace netfloor::minimal
