@@ -202,7 +202,7 @@ template <class Pass> [[gnu::always_inline]] inline void upperProtocol(Reader<Pa
     case protocolIcmpv6:
         return apart<icmpv6::message<Pass>>(at);
     case protocolTcp:
-        return tcp::segment(at);
+        return apart<tcp::segment<Pass>>(at);
     case protocolUdp:
         return udp::datagram(at);
     case protocolGre:
