@@ -68,7 +68,7 @@ struct Place {
     }
 
     // Bits that must be left for a field of so many units; for one that is not tested, left in the packet.
-    [[nodiscard, gnu::always_inline]] constexpr std::uint32_t needs(std::uint32_t units) const {
+    [[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t needs(std::uint32_t units) const {
         if (!isPieces()) {
             return units * unitBits();
         }
@@ -164,6 +164,11 @@ constexpr Place pieces(Piece first, Piece second, Piece third) {
 
 constexpr Place pieces(Piece first, Piece second, Piece third, Piece fourth) {
     return {.shape = Shape::pieces, .count = 4, .pieces = {first, second, third, fourth}};
+}
+
+// Two octets in network order, as two pieces. Unlike octets(2) it has a layout record of its own.
+constexpr Place octetPair() {
+    return pieces({0, 7}, {8, 15}).advancing(16);
 }
 
 // `count` octets in network order.

@@ -36,25 +36,25 @@
 namespace netfloor::tcp {
 
 // clang-format off
-inline constexpr Field sourcePort              {384, "TCP Source Port",        octets(2),                "  TCP Source Port=%-S (%u)",      &portNames, "TCP - %-s (%u)"};
-inline constexpr Field destinationPortIpInIp   {387, "TCP Destination Port",   octets(2),                "  TCP Destination Port=%-S (%u)", &portNames, "IPinIP - TCP - %-s (%u)"};
-inline constexpr Field destinationPortMinimal  {391, "TCP Destination Port",   octets(2),                "  TCP Destination Port=%-S (%u)", &portNames, "MIPinIP - TCP - %-s (%u)"};
-inline constexpr Field destinationPort         {393, "TCP Destination Port",   octets(2),                "  TCP Destination Port=%-S (%u)", &portNames, "TCP - %-s (%u)"};
-inline constexpr Field sequenceNumber          {394, "Sequence Number",        octets(4),                "Sequence Number=%u(dec)"};
-inline constexpr Field acknowledgementNumber   {395, "Acknowledgement Number", octets(4),                "Acknowledgement Number=%u(dec)"};
-inline constexpr Field reservedBesideDataOffset{396, "Reserved",               piece(0, 3),              "  Reserved=%u"};
+inline constexpr Field sourcePort               {384, "TCP Source Port",        octetPair(),              "  TCP Source Port=%-S (%u)",      &portNames, "TCP - %-s (%u)"};
+inline constexpr Field destinationPortIpInIp    {387, "TCP Destination Port",   octetPair(),              "  TCP Destination Port=%-S (%u)", &portNames, "IPinIP - TCP - %-s (%u)"};
+inline constexpr Field destinationPortMinimal   {391, "TCP Destination Port",   octetPair(),              "  TCP Destination Port=%-S (%u)", &portNames, "MIPinIP - TCP - %-s (%u)"};
+inline constexpr Field destinationPort          {393, "TCP Destination Port",   octetPair(),              "  TCP Destination Port=%-S (%u)", &portNames, "TCP - %-s (%u)"};
+inline constexpr Field sequenceNumber           {394, "Sequence Number",        octets(4),                "Sequence Number=%u(dec)"};
+inline constexpr Field acknowledgementNumber    {395, "Acknowledgement Number", octets(4),                "Acknowledgement Number=%u(dec)"};
+inline constexpr Field reservedBesideDataOffset {396, "Reserved",               piece(0, 3),              "  Reserved=%u"};
 
-inline constexpr Field dataOffset              {398, "Data Offset",            piece(4, 7).advancing(8), "  Data Offset=%u*4 octets"};
-inline constexpr Field reservedBesideFlags     {399, "Reserved",               piece(6, 7),              "  Reserved=%u"};
-inline constexpr Field urgent                  {400, "URG",                    bit(5),                   "  URG=%u"};
-inline constexpr Field acknowledgement         {401, "ACK",                    bit(4),                   "  ACK=%u"};
-inline constexpr Field push                    {402, "PSH",                    bit(3),                   "  PSH=%u"};
-inline constexpr Field reset                   {403, "RST",                    bit(2),                   "  RST=%u"};
-inline constexpr Field synchronize             {404, "SYN",                    bit(1),                   "  SYN=%u"};
-inline constexpr Field finish                  {405, "FIN",                    bit(0).advancing(8),      "  FIN=%u"};
-inline constexpr Field windowSize              {406, "Window Size",            octets(2),                "  Window Size=%u(dec)", noNames, "%u"};
-inline constexpr Field checksum                {407, "Checksum",               octets(2),                "  Checksum=%x"};
-inline constexpr Field urgentPointer           {408, "Urgent Pointer",         octets(2),                "  Urgent Pointer=%x"};
+inline constexpr Field dataOffset               {398, "Data Offset",            piece(4, 7).advancing(8), "  Data Offset=%u*4 octets"};
+inline constexpr Field reservedBesideFlags      {399, "Reserved",               piece(6, 7),              "  Reserved=%u"};
+inline constexpr Field urgent                   {400, "URG",                    bit(5),                   "  URG=%u"};
+inline constexpr Field acknowledgement          {401, "ACK",                    bit(4),                   "  ACK=%u"};
+inline constexpr Field push                     {402, "PSH",                    bit(3),                   "  PSH=%u"};
+inline constexpr Field reset                    {403, "RST",                    bit(2),                   "  RST=%u"};
+inline constexpr Field synchronize              {404, "SYN",                    bit(1),                   "  SYN=%u"};
+inline constexpr Field finish                   {405, "FIN",                    bit(0).advancing(8),      "  FIN=%u"};
+inline constexpr Field windowSize               {406, "Window Size",            octetPair(),              "  Window Size=%u(dec)", noNames, "%u"};
+inline constexpr Field checksum                 {407, "Checksum",               octetPair(),              "  Checksum=%x"};
+inline constexpr Field urgentPointer            {408, "Urgent Pointer",         octetPair(),              "  Urgent Pointer=%x"};
 // clang-format on
 
 struct TcpVariables {
@@ -69,7 +69,8 @@ inline constexpr std::uint32_t bitsPerWord = 32;
 
 // Reads the header from the Data Offset on and gives its length in octets. A Data Offset of 3 or 4 has no room for the
 // fixed header: the header then counts for as many octets, not words, and what is behind its block for payload.
-template <class Pass> [[gnu::always_inline]] inline std::int32_t limitedPart(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline std::int32_t limitedPart(Reader<Pass> &at) {
     LimitedBlock<Pass> block{at, "INLINE BLOCK"};
     const std::uint32_t words = look(at, dataOffset.place).value_or(0);
     // Below three words this wraps to a huge number, which is more than any packet holds.
@@ -94,8 +95,9 @@ template <class Pass> [[gnu::always_inline]] inline std::int32_t limitedPart(Rea
 }
 
 // Takes the header off the payload. Once one was longer than its payload, no later one of the packet is taken off.
-template <class Pass> [[gnu::always_inline]] inline void accountFor(Reader<Pass>& at, std::int32_t headerOctets) {
-    auto& variables = at.variables();
+template <class Pass>
+NETFLOOR_INLINE inline void accountFor(Reader<Pass> &at, std::int32_t headerOctets) {
+    auto &variables = at.variables();
     if (variables.payloadOctets < headerOctets) {
         variables.tcpLengthShort = 1;
         variables.payloadOctets = 0;
@@ -105,11 +107,12 @@ template <class Pass> [[gnu::always_inline]] inline void accountFor(Reader<Pass>
     }
 }
 
-template <class Pass> [[gnu::always_inline]] inline void segment(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void segment(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }
-    auto& variables = at.variables();
+    auto &variables = at.variables();
     const Block<Pass> header{at, "Transmission Control Protocol"};
     read<sourcePort>(at, &variables.sourcePort);
     readByCarriage<destinationPortIpInIp, destinationPortMinimal, destinationPort>(at, &variables.destinationPort);
