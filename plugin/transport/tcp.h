@@ -69,8 +69,7 @@ inline constexpr std::uint32_t bitsPerWord = 32;
 
 // Reads the header from the Data Offset on and gives its length in octets. A Data Offset of 3 or 4 has no room for the
 // fixed header: the header then counts for as many octets, not words, and what is behind its block for payload.
-template <class Pass>
-NETFLOOR_INLINE inline std::int32_t limitedPart(Reader<Pass> &at) {
+template <class Pass> NETFLOOR_INLINE inline std::int32_t limitedPart(Reader<Pass>& at) {
     LimitedBlock<Pass> block{at, "INLINE BLOCK"};
     const std::uint32_t words = look(at, dataOffset.place).value_or(0);
     // Below three words this wraps to a huge number, which is more than any packet holds.
@@ -95,9 +94,8 @@ NETFLOOR_INLINE inline std::int32_t limitedPart(Reader<Pass> &at) {
 }
 
 // Takes the header off the payload. Once one was longer than its payload, no later one of the packet is taken off.
-template <class Pass>
-NETFLOOR_INLINE inline void accountFor(Reader<Pass> &at, std::int32_t headerOctets) {
-    auto &variables = at.variables();
+template <class Pass> NETFLOOR_INLINE inline void accountFor(Reader<Pass>& at, std::int32_t headerOctets) {
+    auto& variables = at.variables();
     if (variables.payloadOctets < headerOctets) {
         variables.tcpLengthShort = 1;
         variables.payloadOctets = 0;
@@ -107,12 +105,11 @@ NETFLOOR_INLINE inline void accountFor(Reader<Pass> &at, std::int32_t headerOcte
     }
 }
 
-template <class Pass>
-NETFLOOR_INLINE inline void segment(Reader<Pass> &at) {
+template <class Pass> NETFLOOR_INLINE inline void segment(Reader<Pass>& at) {
     if (!at.live) {
         return;
     }
-    auto &variables = at.variables();
+    auto& variables = at.variables();
     const Block<Pass> header{at, "Transmission Control Protocol"};
     read<sourcePort>(at, &variables.sourcePort);
     readByCarriage<destinationPortIpInIp, destinationPortMinimal, destinationPort>(at, &variables.destinationPort);
