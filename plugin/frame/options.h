@@ -25,6 +25,11 @@ namespace netfloor {
 struct OptionArea {
     std::int32_t octets; // still to decode; below 0 where an option says that it is longer than the area
     bool taken = false;  // an option was taken in this round
+
+    void take(std::int32_t optionOctets) {
+        octets -= optionOctets;
+        taken = true;
+    }
 };
 
 // The place of every type in the order of turns; behind the last one where the type is not known.
@@ -56,28 +61,37 @@ NETFLOOR_INLINE inline void optionOfOneOctet(Reader<Pass>& at, BlockName name, O
     const Block<Pass> option{at, name};
     read<type>(at);
     if (at.live) {
-        area.octets -= 1;
-        area.taken = true;
+        area.take(1);
     }
 }
 
-// The option counts for as many octets as its length says.
-inline constexpr std::int32_t countsByLength = -1;
+// The block of an option with a length: its limit is read ahead.
+template <class Pass> class [[nodiscard]] OptionBlock : public LimitedBlock<Pass> {
+public:
+    NETFLOOR_INLINE OptionBlock(Reader<Pass>& reader, BlockName name) : LimitedBlock<Pass>(reader, name) {
+        this->limit(look(reader, piece(8, 15)).value_or(0) * bitsPerOctet);
+    }
+};
 
-// An option with a length, which is read ahead as the block's limit. Only an option whose length reaches behind
-// itself counts as taken. `data` reads what stands behind the length.
-template <const Field& type, const Field& length, std::int32_t counts = countsByLength, class Pass, class Data>
-NETFLOOR_INLINE inline void optionWithLength(Reader<Pass>& at, BlockName name, OptionArea& area, Data data) {
-    LimitedBlock<Pass> option{at, name};
-    option.limit(look(at, piece(8, 15)).value_or(0) * bitsPerOctet);
-    std::int32_t lengthOctets = 0;
+// Reads the type and the length of an option, which counts for as many octets as its length says.
+template <const Field& type, const Field& length, class Pass>
+NETFLOOR_INLINE inline void optionHead(Reader<Pass>& at, OptionArea& area) {
     read<type>(at);
+    std::int32_t lengthOctets = 0;
     read<length>(at, &lengthOctets);
     if (at.live) {
-        area.octets -= counts == countsByLength ? lengthOctets : counts;
-        area.taken = true;
+        area.take(lengthOctets);
     }
-    data();
+}
+
+// The same for an option that counts for a fixed number of octets, whatever its length says.
+template <const Field& type, const Field& length, class Pass>
+NETFLOOR_INLINE inline void optionHead(Reader<Pass>& at, OptionArea& area, std::int32_t countedOctets) {
+    read<type>(at);
+    read<length>(at);
+    if (at.live) {
+        area.take(countedOctets);
+    }
 }
 
 } // namespace netfloor

@@ -68,7 +68,7 @@ struct Place {
     }
 
     // Bits that must be left for a field of so many units; for one that is not tested, left in the packet.
-    [[nodiscard]] constexpr std::uint32_t needs(std::uint32_t units) const {
+    [[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t needs(std::uint32_t units) const {
         if (!isPieces()) {
             return units * unitBits();
         }

@@ -130,7 +130,7 @@ template <class Pass> NETFLOOR_INLINE inline std::optional<std::uint32_t> look(R
     at.last().seenFirst = first;
     at.last().seenPieces = place.count;
     at.last().seenWidth = width;
-    return whole ? octetsAt(at.data, first, place.count) : bits(at.data, first, first + width - 1);
+    return width == bitsPerOctet ? octetsAt(at.data, first, place.count) : bits(at.data, first, first + width - 1);
 }
 
 // Moves the cursor back over `bitCount` bits, so that they can be read a second time.

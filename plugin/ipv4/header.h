@@ -68,7 +68,7 @@ template <class Pass> NETFLOOR_INLINE inline void dispatch(Reader<Pass>& at) {
     case protocolGre:
         return apart<gre::packet<Pass>>(at);
     case protocolTcp:
-        return tcp::segment(at);
+        return apart<tcp::segment<Pass>>(at);
     case protocolUdp:
         return udp::datagram(at);
     case protocolIcmpv6:

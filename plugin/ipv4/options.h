@@ -49,50 +49,50 @@ inline constexpr std::array timestampFlagRows = {
 };
 
 inline constexpr ValueNames securityNames{securityRows};
-inline constexpr ValueNames compartmentNames{compartmentRows,
-                                             "the compartments field may be obtained from the Defense Intelligence Agency"};
+inline constexpr ValueNames compartmentNames{
+    compartmentRows, "the compartments field may be obtained from the Defense Intelligence Agency"};
 inline constexpr ValueNames timestampFlagNames{timestampFlagRows};
 
 // clang-format off
-inline constexpr Field noOperation        {318, "Type1, No Operation",                     octets(1),                  "Type1, No Operation", noNames, "%u"};
+inline constexpr Field noOperation         {318, "Type1, No Operation",                     octets(1),                  "Type1, No Operation", noNames, "%u"};
 
-inline constexpr Field security           {321, "Type130, Security",                       octets(1),                  "Type130, Security", noNames, "%u"};
-inline constexpr Field securityLength     {322, "Length",                                  octets(1),                  "Length=%u octets"};
-inline constexpr Field securityLevel      {325, "Security (S Field)",                      piece(0, 15).advancing(16), "Security (S Field)=%-S", &securityNames};
-inline constexpr Field compartments       {326, "Compartments (C Field)",                  octets(2),                  "Compartments (C Field)=%-S", &compartmentNames};
-inline constexpr Field restrictions       {327, "Handling Restrictions (H Field)",         octets(2),                  "Handling Restrictions (H Field)=%x"};
-inline constexpr Field transmissionControl{328, "Transmission Control Code (TCC Field)",   octets(3),                  "Transmission Control Code (TCC Field)=%x"};
+inline constexpr Field security            {321, "Type130, Security",                       octets(1),                  "Type130, Security", noNames, "%u"};
+inline constexpr Field securityLength      {322, "Length",                                  octets(1),                  "Length=%u octets"};
+inline constexpr Field securityLevel       {325, "Security (S Field)",                      piece(0, 15).advancing(16), "Security (S Field)=%-S", &securityNames};
+inline constexpr Field compartments        {326, "Compartments (C Field)",                  octets(2),                  "Compartments (C Field)=%-S", &compartmentNames};
+inline constexpr Field restrictions        {327, "Handling Restrictions (H Field)",         octets(2),                  "Handling Restrictions (H Field)=%x"};
+inline constexpr Field transmissionControl {328, "Transmission Control Code (TCC Field)",   octets(3),                  "Transmission Control Code (TCC Field)=%x"};
 
-inline constexpr Field looseRoute         {329, "Type131, Loose Source and Record Route",  octets(1),                  "Type131, Loose Source and Record Route", noNames, "%u"};
-inline constexpr Field looseRouteLength   {330, "Length",                                  octets(1),                  "Length=%u octets"};
-inline constexpr Field looseRoutePointer  {333, "Pointer",                                 octets(1),                  "Pointer=%u(th) octet"};
-inline constexpr Field looseRouteData     {336, "Route Data",                              octets(4),                  R"(Route Data=%-["%u":"."])"};
+inline constexpr Field looseRoute          {329, "Type131, Loose Source and Record Route",  octets(1),                  "Type131, Loose Source and Record Route", noNames, "%u"};
+inline constexpr Field looseRouteLength    {330, "Length",                                  octets(1),                  "Length=%u octets"};
+inline constexpr Field looseRoutePointer   {333, "Pointer",                                 octets(1),                  "Pointer=%u(th) octet"};
+inline constexpr Field looseRouteData      {336, "Route Data",                              octets(4),                  R"(Route Data=%-["%u":"."])"};
 
-inline constexpr Field strictRoute        {339, "Type137, Strict Source and Record Route", octets(1),                  "Type137, Strict Source and Record Route", noNames, "%u"};
-inline constexpr Field strictRouteLength  {340, "Length",                                  octets(1),                  "Length=%u octets"};
-inline constexpr Field strictRoutePointer {343, "Pointer",                                 octets(1),                  "Pointer=%u(th) octet"};
-inline constexpr Field strictRouteData    {346, "Route Data",                              octets(4),                  R"(Route Data=%-["%u":"."])"};
+inline constexpr Field strictRoute         {339, "Type137, Strict Source and Record Route", octets(1),                  "Type137, Strict Source and Record Route", noNames, "%u"};
+inline constexpr Field strictRouteLength   {340, "Length",                                  octets(1),                  "Length=%u octets"};
+inline constexpr Field strictRoutePointer  {343, "Pointer",                                 octets(1),                  "Pointer=%u(th) octet"};
+inline constexpr Field strictRouteData     {346, "Route Data",                              octets(4),                  R"(Route Data=%-["%u":"."])"};
 
-inline constexpr Field recordRoute        {348, "Type7, Record Route",                     octets(1),                  "Type7, Record Route", noNames, "%u"};
-inline constexpr Field recordRouteLength  {349, "Length",                                  octets(1),                  "Length=%u octets"};
-inline constexpr Field recordRoutePointer {352, "Pointer",                                 octets(1),                  "Pointer=%u(th) octet"};
-inline constexpr Field recordRouteData    {355, "Route Data",                              octets(4),                  R"(Route Data=%-["%u":"."])"};
+inline constexpr Field recordRoute         {348, "Type7, Record Route",                     octets(1),                  "Type7, Record Route", noNames, "%u"};
+inline constexpr Field recordRouteLength   {349, "Length",                                  octets(1),                  "Length=%u octets"};
+inline constexpr Field recordRoutePointer  {352, "Pointer",                                 octets(1),                  "Pointer=%u(th) octet"};
+inline constexpr Field recordRouteData     {355, "Route Data",                              octets(4),                  R"(Route Data=%-["%u":"."])"};
 
-inline constexpr Field streamIdentifier   {357, "Type136, Stream Identifier",              octets(1),                  "Type136, Stream Identifier", noNames, "%u"};
-inline constexpr Field streamLength       {358, "Length",                                  octets(1),                  "Length=%u octets"};
-inline constexpr Field streamId           {361, "Stream ID",                               octets(2),                  "Stream ID=%x"};
+inline constexpr Field streamIdentifier    {357, "Type136, Stream Identifier",              octets(1),                  "Type136, Stream Identifier", noNames, "%u"};
+inline constexpr Field streamLength        {358, "Length",                                  octets(1),                  "Length=%u octets"};
+inline constexpr Field streamId            {361, "Stream ID",                               octets(2),                  "Stream ID=%x"};
 
-inline constexpr Field internetTimestamp  {362, "Type68, Internet Timestamp",              octets(1),                  "Type68, Internet Timestamp", noNames, "%u"};
-inline constexpr Field timestampLength    {363, "Length",                                  octets(1),                  "Length=%u octets"};
-inline constexpr Field timestampPointer   {366, "Pointer",                                 octets(1),                  "Pointer=%u(th) octet"};
-inline constexpr Field timestampOverflow  {367, "Overflow",                                piece(4, 7),                "Overflow=%u"};
-inline constexpr Field timestampFlag      {368, "Flag",                                    piece(0, 3).advancing(8),   "Flag=%-S", &timestampFlagNames};
-inline constexpr Field timestamp          {372, "Timestamp",                               octets(4),                  "Timestamp=%x"};
-inline constexpr Field registeringAddress {378, "Internet Address",                        octets(4),                  R"(Internet Address=%-["%u":"."])"};
-inline constexpr Field registeredTimestamp{380, "Timestamp",                               octets(4),                  "Timestamp=%x"};
+inline constexpr Field internetTimestamp   {362, "Type68, Internet Timestamp",              octets(1),                  "Type68, Internet Timestamp", noNames, "%u"};
+inline constexpr Field timestampLength     {363, "Length",                                  octets(1),                  "Length=%u octets"};
+inline constexpr Field timestampPointer    {366, "Pointer",                                 octets(1),                  "Pointer=%u(th) octet"};
+inline constexpr Field timestampOverflow   {367, "Overflow",                                piece(4, 7),                "Overflow=%u"};
+inline constexpr Field timestampFlag       {368, "Flag",                                    piece(0, 3).advancing(8),   "Flag=%-S", &timestampFlagNames};
+inline constexpr Field timestamp           {372, "Timestamp",                               octets(4),                  "Timestamp=%x"};
+inline constexpr Field registeringAddress  {378, "Internet Address",                        octets(4),                  R"(Internet Address=%-["%u":"."])"};
+inline constexpr Field registeredTimestamp {380, "Timestamp",                               octets(4),                  "Timestamp=%x"};
 
-inline constexpr Field endOfOptionPart    {381, "End Of Option Part",                      octets(1),                  "End Of Option Part", noNames, "%u"};
-inline constexpr Field optionPadding      {306, "Padding",                                 octetRun(),                 "Padding=%x"};
+inline constexpr Field endOfOptionPart     {381, "End Of Option Part",                      octets(1),                  "End Of Option Part", noNames, "%u"};
+inline constexpr Field optionPadding       {306, "Padding",                                 octetRun(),                 "Padding=%x"};
 // clang-format on
 
 inline constexpr std::int32_t fixedHeaderOctets = 20;
@@ -107,7 +107,9 @@ struct OptionVariables {
     std::int32_t optionOctets; // of the area behind the fixed header
 };
 
-template <class Pass> void securityData(Reader<Pass>& at) {
+template <class Pass> void securityOption(Reader<Pass>& at, OptionArea& area) {
+    const OptionBlock<Pass> option{at, "Type130"};
+    optionHead<security, securityLength>(at, area);
     read<securityLevel>(at);
     read<compartments>(at);
     read<restrictions>(at);
@@ -115,7 +117,10 @@ template <class Pass> void securityData(Reader<Pass>& at) {
 }
 
 // In an IPv4 header that an IPv6 packet holds, a route is taken as one of IPv6 addresses.
-template <const Field& pointer, const Field& routeData, class Pass> void route(Reader<Pass>& at) {
+template <const Field& type, const Field& length, const Field& pointer, const Field& routeData, class Pass>
+void routeOption(Reader<Pass>& at, BlockName name, OptionArea& area) {
+    const OptionBlock<Pass> option{at, name};
+    optionHead<type, length>(at, area);
     read<pointer>(at);
     if (at.variables().ipVersion == 4) {
         readRepeated<routeData>(at, mostEntries);
@@ -124,6 +129,12 @@ template <const Field& pointer, const Field& routeData, class Pass> void route(R
     for (std::int32_t entry = 0; at.live && entry < mostEntries; ++entry) {
         ipv6::reversedAddress(at, ReversedBits<Pass>::Report::plain);
     }
+}
+
+template <class Pass> void streamIdentifierOption(Reader<Pass>& at, OptionArea& area) {
+    const OptionBlock<Pass> option{at, "Type136"};
+    optionHead<streamIdentifier, streamLength>(at, area);
+    read<streamId>(at);
 }
 
 template <class Pass> void addressAndTimestamp(Reader<Pass>& at) {
@@ -137,8 +148,10 @@ template <class Pass> void addressAndTimestamp(Reader<Pass>& at) {
 }
 
 // With prespecified addresses these show as timestamps too.
-template <class Pass> void timestampData(Reader<Pass>& at) {
+template <class Pass> void timestampOption(Reader<Pass>& at, OptionArea& area) {
+    const OptionBlock<Pass> option{at, "Type68"};
     std::uint32_t flag = 0;
+    optionHead<internetTimestamp, timestampLength>(at, area);
     read<timestampPointer>(at);
     read<timestampOverflow>(at);
     read<timestampFlag>(at, &flag);
@@ -152,29 +165,24 @@ template <class Pass> void timestampData(Reader<Pass>& at) {
     }
 }
 
+// Ends the list: there is no further round.
+template <class Pass> void endOfListOption(Reader<Pass>& at, OptionArea& area) {
+    optionOfOneOctet<endOfOptionPart>(at, "", area);
+    area.taken = false;
+}
+
 // Takes the option under the cursor, which is of a known type.
 template <class Pass> void option(Reader<Pass>& at, std::uint8_t type, OptionArea& area) {
     switch (type) {
-    case 1:
-        return optionOfOneOctet<noOperation>(at, "Type1", area);
-    case 130:
-        return optionWithLength<security, securityLength>(at, "Type130", area, [&] { securityData(at); });
-    case 131:
-        return optionWithLength<looseRoute, looseRouteLength>(
-            at, "Type131", area, [&] { route<looseRoutePointer, looseRouteData>(at); });
+    case 1: return optionOfOneOctet<noOperation>(at, "Type1", area);
+    case 130: return securityOption(at, area);
+    case 131: return routeOption<looseRoute, looseRouteLength, looseRoutePointer, looseRouteData>(at, "Type131", area);
     case 137:
-        return optionWithLength<strictRoute, strictRouteLength>(
-            at, "Type137", area, [&] { route<strictRoutePointer, strictRouteData>(at); });
-    case 7:
-        return optionWithLength<recordRoute, recordRouteLength>(
-            at, "Type7", area, [&] { route<recordRoutePointer, recordRouteData>(at); });
-    case 136:
-        return optionWithLength<streamIdentifier, streamLength>(at, "Type136", area, [&] { read<streamId>(at); });
-    case 68:
-        return optionWithLength<internetTimestamp, timestampLength>(at, "Type68", area, [&] { timestampData(at); });
-    default:
-        optionOfOneOctet<endOfOptionPart>(at, "", area);
-        area.taken = false; // no further round
+        return routeOption<strictRoute, strictRouteLength, strictRoutePointer, strictRouteData>(at, "Type137", area);
+    case 7: return routeOption<recordRoute, recordRouteLength, recordRoutePointer, recordRouteData>(at, "Type7", area);
+    case 136: return streamIdentifierOption(at, area);
+    case 68: return timestampOption(at, area);
+    default: return endOfListOption(at, area);
     }
 }
 

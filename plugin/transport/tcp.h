@@ -36,25 +36,25 @@
 namespace netfloor::tcp {
 
 // clang-format off
-inline constexpr Field sourcePort              {384, "TCP Source Port",        octetPair(),                "  TCP Source Port=%-S (%u)",      &portNames, "TCP - %-s (%u)"};
-inline constexpr Field destinationPortIpInIp   {387, "TCP Destination Port",   octetPair(),                "  TCP Destination Port=%-S (%u)", &portNames, "IPinIP - TCP - %-s (%u)"};
-inline constexpr Field destinationPortMinimal  {391, "TCP Destination Port",   octetPair(),                "  TCP Destination Port=%-S (%u)", &portNames, "MIPinIP - TCP - %-s (%u)"};
-inline constexpr Field destinationPort         {393, "TCP Destination Port",   octetPair(),                "  TCP Destination Port=%-S (%u)", &portNames, "TCP - %-s (%u)"};
-inline constexpr Field sequenceNumber          {394, "Sequence Number",        octets(4),                "Sequence Number=%u(dec)"};
-inline constexpr Field acknowledgementNumber   {395, "Acknowledgement Number", octets(4),                "Acknowledgement Number=%u(dec)"};
-inline constexpr Field reservedBesideDataOffset{396, "Reserved",               piece(0, 3),              "  Reserved=%u"};
+inline constexpr Field sourcePort               {384, "TCP Source Port",        octetPair(),              "  TCP Source Port=%-S (%u)",      &portNames, "TCP - %-s (%u)"};
+inline constexpr Field destinationPortIpInIp    {387, "TCP Destination Port",   octetPair(),              "  TCP Destination Port=%-S (%u)", &portNames, "IPinIP - TCP - %-s (%u)"};
+inline constexpr Field destinationPortMinimal   {391, "TCP Destination Port",   octetPair(),              "  TCP Destination Port=%-S (%u)", &portNames, "MIPinIP - TCP - %-s (%u)"};
+inline constexpr Field destinationPort          {393, "TCP Destination Port",   octetPair(),              "  TCP Destination Port=%-S (%u)", &portNames, "TCP - %-s (%u)"};
+inline constexpr Field sequenceNumber           {394, "Sequence Number",        octets(4),                "Sequence Number=%u(dec)"};
+inline constexpr Field acknowledgementNumber    {395, "Acknowledgement Number", octets(4),                "Acknowledgement Number=%u(dec)"};
+inline constexpr Field reservedBesideDataOffset {396, "Reserved",               piece(0, 3),              "  Reserved=%u"};
 
-inline constexpr Field dataOffset              {398, "Data Offset",            piece(4, 7).advancing(8), "  Data Offset=%u*4 octets"};
-inline constexpr Field reservedBesideFlags     {399, "Reserved",               piece(6, 7),              "  Reserved=%u"};
-inline constexpr Field urgent                  {400, "URG",                    bit(5),                   "  URG=%u"};
-inline constexpr Field acknowledgement         {401, "ACK",                    bit(4),                   "  ACK=%u"};
-inline constexpr Field push                    {402, "PSH",                    bit(3),                   "  PSH=%u"};
-inline constexpr Field reset                   {403, "RST",                    bit(2),                   "  RST=%u"};
-inline constexpr Field synchronize             {404, "SYN",                    bit(1),                   "  SYN=%u"};
-inline constexpr Field finish                  {405, "FIN",                    bit(0).advancing(8),      "  FIN=%u"};
-inline constexpr Field windowSize              {406, "Window Size",            octetPair(),                "  Window Size=%u(dec)", noNames, "%u"};
-inline constexpr Field checksum                {407, "Checksum",               octetPair(),                "  Checksum=%x"};
-inline constexpr Field urgentPointer           {408, "Urgent Pointer",         octetPair(),                "  Urgent Pointer=%x"};
+inline constexpr Field dataOffset               {398, "Data Offset",            piece(4, 7).advancing(8), "  Data Offset=%u*4 octets"};
+inline constexpr Field reservedBesideFlags      {399, "Reserved",               piece(6, 7),              "  Reserved=%u"};
+inline constexpr Field urgent                   {400, "URG",                    bit(5),                   "  URG=%u"};
+inline constexpr Field acknowledgement          {401, "ACK",                    bit(4),                   "  ACK=%u"};
+inline constexpr Field push                     {402, "PSH",                    bit(3),                   "  PSH=%u"};
+inline constexpr Field reset                    {403, "RST",                    bit(2),                   "  RST=%u"};
+inline constexpr Field synchronize              {404, "SYN",                    bit(1),                   "  SYN=%u"};
+inline constexpr Field finish                   {405, "FIN",                    bit(0).advancing(8),      "  FIN=%u"};
+inline constexpr Field windowSize               {406, "Window Size",            octetPair(),              "  Window Size=%u(dec)", noNames, "%u"};
+inline constexpr Field checksum                 {407, "Checksum",               octetPair(),              "  Checksum=%x"};
+inline constexpr Field urgentPointer            {408, "Urgent Pointer",         octetPair(),              "  Urgent Pointer=%x"};
 // clang-format on
 
 struct TcpVariables {

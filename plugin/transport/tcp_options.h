@@ -27,36 +27,36 @@
 namespace netfloor::tcp {
 
 // clang-format off
-inline constexpr Field endOfList         {441, "TCP Option Kind=0 (End of Option List)", octets(1), "TCP Option Kind=0 (End of Option List)=%x"};
-inline constexpr Field noOperation       {444, "TCP Option Kind",    octets(1),                  "TCP Option Kind=%u (No Operation)"};
+inline constexpr Field endOfList         {441, "TCP Option Kind=0 (End of Option List)", octets(1),                  "TCP Option Kind=0 (End of Option List)=%x"};
+inline constexpr Field noOperation       {444, "TCP Option Kind",     octets(1),                  "TCP Option Kind=%u (No Operation)"};
 
-inline constexpr Field maximumSegment    {447, "TCP Option Kind",    octets(1),                  "TCP Option Kind=%u (Maximum Segment Size)"};
-inline constexpr Field maximumLength     {448, "Length",             octets(1),                  "  Length=%u octet(s)"};
-inline constexpr Field maximumSize       {451, "max seg size",       octetPair(),                  "  max seg size=%u"};
+inline constexpr Field maximumSegment    {447, "TCP Option Kind",     octets(1),                  "TCP Option Kind=%u (Maximum Segment Size)"};
+inline constexpr Field maximumLength     {448, "Length",              octets(1),                  "  Length=%u octet(s)"};
+inline constexpr Field maximumSize       {451, "max seg size",        octetPair(),                "  max seg size=%u"};
 
-inline constexpr Field windowScale       {452, "TCP Option Kind",    octets(1),                  "TCP Option Kind=%u (Window Scale Option)"};
-inline constexpr Field windowScaleLength {453, "Length",             octets(1),                  "  Length=%u octet(s)"};
-inline constexpr Field shiftCount        {456, "shift count",        octets(1),                  "  shift count=%u"};
+inline constexpr Field windowScale       {452, "TCP Option Kind",     octets(1),                  "TCP Option Kind=%u (Window Scale Option)"};
+inline constexpr Field windowScaleLength {453, "Length",              octets(1),                  "  Length=%u octet(s)"};
+inline constexpr Field shiftCount        {456, "shift count",         octets(1),                  "  shift count=%u"};
 
-inline constexpr Field sackPermitted     {457, "TCP Option Kind",    octets(1),                  "TCP Option Kind=%u (SACK-Permitted)"};
-inline constexpr Field permittedLength   {458, "Length",             octets(1),                  "  Length=%u octet(s)"};
+inline constexpr Field sackPermitted     {457, "TCP Option Kind",     octets(1),                  "TCP Option Kind=%u (SACK-Permitted)"};
+inline constexpr Field permittedLength   {458, "Length",              octets(1),                  "  Length=%u octet(s)"};
 
-inline constexpr Field sack              {461, "TCP Option Kind",    octets(1),                  "TCP Option Kind=%u (SACK Option)"};
-inline constexpr Field sackLength        {462, "Length",             octets(1),                  "  Length=%u octet(s)"};
-inline constexpr Field leftEdge          {466, "Left Edge of Block", octets(4),                  "  Left Edge of Block=%x"};
-inline constexpr Field rightEdge         {467, "Right Edge of Block", octets(4),                 "  Right Edge of Block=%x"};
+inline constexpr Field sack              {461, "TCP Option Kind",     octets(1),                  "TCP Option Kind=%u (SACK Option)"};
+inline constexpr Field sackLength        {462, "Length",              octets(1),                  "  Length=%u octet(s)"};
+inline constexpr Field leftEdge          {466, "Left Edge of Block",  octets(4),                  "  Left Edge of Block=%x"};
+inline constexpr Field rightEdge         {467, "Right Edge of Block", octets(4),                  "  Right Edge of Block=%x"};
 
 // Both stamps are taken as little-endian numbers.
-inline constexpr Field timestamps        {468, "TCP Option Kind",    octets(1),                  "TCP Option Kind=%u (Timestamps Option)"};
-inline constexpr Field timestampsLength  {469, "Length",             octets(1),                  "  Length=%u octet(s)"};
-inline constexpr Field timestampValue    {472, "TS value",           piece(0, 31).advancing(32), "  TS value=%u"};
-inline constexpr Field timestampEcho     {473, "TS Echo Reply",      piece(0, 31).advancing(32), "  TS Echo Reply=%u"};
+inline constexpr Field timestamps        {468, "TCP Option Kind",     octets(1),                  "TCP Option Kind=%u (Timestamps Option)"};
+inline constexpr Field timestampsLength  {469, "Length",              octets(1),                  "  Length=%u octet(s)"};
+inline constexpr Field timestampValue    {472, "TS value",            piece(0, 31).advancing(32), "  TS value=%u"};
+inline constexpr Field timestampEcho     {473, "TS Echo Reply",       piece(0, 31).advancing(32), "  TS Echo Reply=%u"};
 
-inline constexpr Field md5Signature      {474, "TCP Option Kind",    octets(1),                  "TCP Option Kind=%u (MD5 Signature Option)"};
-inline constexpr Field md5Length         {475, "Length",             octets(1),                  "  Length=%u octet(s)"};
-inline constexpr Field md5Digest         {478, "MD5 digest",         octetRun().atMost(16),      R"(    MD5 digest=%-["%x"])", noNames, "%x"};
+inline constexpr Field md5Signature      {474, "TCP Option Kind",     octets(1),                  "TCP Option Kind=%u (MD5 Signature Option)"};
+inline constexpr Field md5Length         {475, "Length",              octets(1),                  "  Length=%u octet(s)"};
+inline constexpr Field md5Digest         {478, "MD5 digest",          octetRun().atMost(16),      R"(    MD5 digest=%-["%x"])", noNames, "%x"};
 
-inline constexpr Field optionPadding     {439, "Padding",            octetRun(),                 "  Padding=%x"};
+inline constexpr Field optionPadding     {439, "Padding",             octetRun(),                 "  Padding=%x"};
 // clang-format on
 
 // The kinds, in the order of their turns in a round.
@@ -68,44 +68,60 @@ inline constexpr std::int32_t windowScaleOctets = 3;
 inline constexpr std::int32_t sackPermittedOctets = 2;
 inline constexpr std::int32_t timestampsOctets = 10;
 
-template <class Pass> NETFLOOR_INLINE inline void blocksOfEdges(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void maximumSegmentOption(Reader<Pass>& at, OptionArea& area) {
+    const OptionBlock<Pass> option{at, ""};
+    optionHead<maximumSegment, maximumLength>(at, area, maximumSegmentOctets);
+    read<maximumSize>(at);
+}
+
+template <class Pass> NETFLOOR_INLINE inline void windowScaleOption(Reader<Pass>& at, OptionArea& area) {
+    const OptionBlock<Pass> option{at, ""};
+    optionHead<windowScale, windowScaleLength>(at, area, windowScaleOctets);
+    read<shiftCount>(at);
+}
+
+template <class Pass> NETFLOOR_INLINE inline void sackPermittedOption(Reader<Pass>& at, OptionArea& area) {
+    const OptionBlock<Pass> option{at, ""};
+    optionHead<sackPermitted, permittedLength>(at, area, sackPermittedOctets);
+}
+
+// The limit ends the blocks: the first edge that does not fit in.
+template <class Pass> NETFLOOR_INLINE inline void sackOption(Reader<Pass>& at, OptionArea& area) {
+    const OptionBlock<Pass> option{at, ""};
+    optionHead<sack, sackLength>(at, area);
     while (at.live) {
-        const Block<Pass> block{at, ""};
+        const Block<Pass> edges{at, ""};
         read<leftEdge>(at);
         read<rightEdge>(at);
     }
 }
 
-// The digest is what the option's length leaves, and one octet at least, so that an option without one is cut short.
-template <class Pass> NETFLOOR_INLINE inline void digest(Reader<Pass>& at) {
-    const std::uint32_t octetsLeft = at.left / bitsPerOctet;
-    readRun<md5Digest>(at, static_cast<std::int32_t>(std::clamp(octetsLeft, 1U, md5Digest.place.mostUnits)));
+template <class Pass> NETFLOOR_INLINE inline void timestampsOption(Reader<Pass>& at, OptionArea& area) {
+    const OptionBlock<Pass> option{at, ""};
+    optionHead<timestamps, timestampsLength>(at, area, timestampsOctets);
+    read<timestampValue>(at);
+    read<timestampEcho>(at);
+}
+
+// The digest is what the length leaves, and one octet at least, so that it is cut short where nothing is left.
+template <class Pass> NETFLOOR_INLINE inline void md5SignatureOption(Reader<Pass>& at, OptionArea& area) {
+    const OptionBlock<Pass> option{at, ""};
+    optionHead<md5Signature, md5Length>(at, area);
+    const std::uint32_t digestOctets = std::clamp(at.left / bitsPerOctet, 1U, md5Digest.place.mostUnits);
+    readRun<md5Digest>(at, static_cast<std::int32_t>(digestOctets));
 }
 
 // Takes the option under the cursor, which is of a known kind.
 template <class Pass> NETFLOOR_INLINE inline void option(Reader<Pass>& at, std::uint8_t kind, OptionArea& area) {
     switch (kind) {
-    case 0:
-        return optionOfOneOctet<endOfList>(at, "", area);
-    case 1:
-        return optionOfOneOctet<noOperation>(at, "", area);
-    case 2:
-        return optionWithLength<maximumSegment, maximumLength, maximumSegmentOctets>(
-            at, "", area, [&] { read<maximumSize>(at); });
-    case 3:
-        return optionWithLength<windowScale, windowScaleLength, windowScaleOctets>(
-            at, "", area, [&] { read<shiftCount>(at); });
-    case 4:
-        return optionWithLength<sackPermitted, permittedLength, sackPermittedOctets>(at, "", area, [] {});
-    case 5:
-        return optionWithLength<sack, sackLength>(at, "", area, [&] { blocksOfEdges(at); });
-    case 8:
-        return optionWithLength<timestamps, timestampsLength, timestampsOctets>(at, "", area, [&] {
-            read<timestampValue>(at);
-            read<timestampEcho>(at);
-        });
-    default:
-        return optionWithLength<md5Signature, md5Length>(at, "", area, [&] { digest(at); });
+    case 0: return optionOfOneOctet<endOfList>(at, "", area);
+    case 1: return optionOfOneOctet<noOperation>(at, "", area);
+    case 2: return maximumSegmentOption(at, area);
+    case 3: return windowScaleOption(at, area);
+    case 4: return sackPermittedOption(at, area);
+    case 5: return sackOption(at, area);
+    case 8: return timestampsOption(at, area);
+    default: return md5SignatureOption(at, area);
     }
 }
 
