@@ -33,7 +33,7 @@ namespace netfloor {
 }
 
 // Runs one pass over one layer. Nothing when the pass is refused before it starts.
-template <class Pass, class Grammar> [[gnu::always_inline]] inline std::optional<Outcome> runPass(typename Pass::Context& context) {
+template <class Pass, class Grammar> NETFLOOR_INLINE inline std::optional<Outcome> runPass(typename Pass::Context& context) {
     DecodeState& state = *context.decodeState;
     Pass::variables = {};
     if (!Pass::enter(context)) {

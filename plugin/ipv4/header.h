@@ -54,7 +54,7 @@ inline constexpr std::uint32_t bitsBeforeLimit = 32;
 
 // Runs the production of the payload. A later fragment is data, whatever its protocol; with DF set the offset
 // does not count.
-template <class Pass> [[gnu::always_inline]] inline void dispatch(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void dispatch(Reader<Pass>& at) {
     const auto& variables = at.variables();
     if (variables.fragmentOffset >= 1 && variables.dontFragment == 0) {
         return apart<unknownData<Pass>>(at);
@@ -80,7 +80,7 @@ template <class Pass> [[gnu::always_inline]] inline void dispatch(Reader<Pass>& 
     }
 }
 
-template <class Pass> [[gnu::always_inline]] inline void datagram(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void datagram(Reader<Pass>& at) {
     if (!at.live) {
         return;
     }

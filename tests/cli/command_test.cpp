@@ -1,0 +1,329 @@
+// SPDX-License-Identifier: MIT
+// The command as a user meets it: what comes out on which side, and how it ends.
+#include <algorithm>
+#include <fstream>
+#include <string>
+#include <vector>
+
+#include <gtest/gtest.h>
+
+#include "cli/command.h"
+
+using namespace netfloor::test;
+
+namespace {
+
+const Octets udpPacket = ipv4({.protocol = 17, .payload = udp(40000, 53, hex("61*8"))});
+
+struct Case {
+    const char *line; // of the shell
+    int exitCode;
+    std::vector<std::string> out;    // each stands in the standard output; empty: there is none
+    std::vector<std::string> err;    // likewise
+    std::vector<std::string> not_in; // stands in neither
+    long lines = -1;                 // of standard output, where it matters
+};
+
+void check(const std::vector<Case> &cases) {
+    for (const Case &one : cases) {
+        SCOPED_TRACE(one.line);
+        const Outcome outcome = shell(one.line);
+        EXPECT_EQ(outcome.exitCode, one.exitCode) << outcome.err;
+        EXPECT_EQ(outcome.out.empty(), one.out.empty()) << outcome.out;
+        EXPECT_EQ(outcome.err.empty(), one.err.empty()) << outcome.err;
+        for (const std::string &text : one.out) {
+            EXPECT_NE(outcome.out.find(text), std::string::npos) << "no '" << text << "' in:\n" << outcome.out;
+        }
+        for (const std::string &text : one.err) {
+            EXPECT_NE(outcome.err.find(text), std::string::npos) << "no '" << text << "' in:\n" << outcome.err;
+        }
+        for (const std::string &text : one.not_in) {
+            EXPECT_EQ((outcome.out + outcome.err).find(text), std::string::npos) << text;
+        }
+        if (one.lines >= 0) {
+            EXPECT_EQ(std::count(outcome.out.begin(), outcome.out.end(), '\n'), one.lines) << outcome.out;
+        }
+    }
+}
+
+class Command : public testing::Test {
+protected:
+    static void SetUpTestSuite() {
+        const Octets arp = hex("ff*6 02*6 0806 0001 0800 06 04 0001 02*6 0a000001 00*6 0a000002");
+        const Octets lldp = hex("ff*6 02*6 88cc 00*46");
+        const Octets ethernet = hex("ff*6 02*6 0800") + udpPacket;
+        const Octets file = pcapFile(1, {{ethernet}, {arp}, {ethernet}, {lldp}, {arp}});
+        writeFile("five.pcap", file);
+        writeFile("inPacket.pcap", {file.begin(), file.begin() + 24 + 16 + 50 + 16 + 10});
+        writeFile("inHead.pcap", {file.begin(), file.begin() + 24 + 16 + 50 + 7});
+        writeFile("inFileHead.pcap", {file.begin(), file.begin() + 10});
+        writeFile("headerOnly.pcap", {file.begin(), file.begin() + 24});
+        writeFile("empty.pcap", {});
+        writeFile("foreign.txt", hex("48*300"));
+        writeFile("other.zst", hex("28b52ffd 00*20"));
+        writeFile("cut.pcap", pcapFile(228, {{udpPacket}, {{udpPacket.begin(), udpPacket.begin() + 24}, 36}}));
+        writeFile("withTail.pcap", file + hex("00*3"));
+        const Outcome packed = shell("gzip -k $T/five.pcap && head -c -20 $T/five.pcap.gz > $T/half.pcap.gz");
+        ASSERT_EQ(packed.exitCode, 0) << packed.err;
+    }
+};
+
+TEST_F(Command, shows) {
+    check({
+        // One line a packet, and behind them how many were no IP.
+        {"netfloor $T/five.pcap",
+         0,
+         {" 10.0.0.1 | 192.168.0.2 |", "no IP: ARP", "no IP: LLDP", "5 packets: 2 with IP, 3 without (2 ARP, 1 LLDP)"},
+         {},
+         {"\x1b"},
+         6},
+        {"netfloor summary $T/cut.pcap", 0, {"[cut by the snap length: 24 of 36 octets]"}, {}, {"without"}, 2},
+        {"netfloor --all $T/cut.pcap", 0, {"Normal Throughput"}, {}, {}, 2},
+        {"netfloor --utc $T/five.pcap", 0, {"2001-09-09T01:46:40.000000Z"}, {}, {}, 6},
+        {"netfloor --color always $T/five.pcap", 0, {"\x1b[2mno IP: ARP\x1b[0m"}, {}, {}},
+        {"netfloor detail $T/five.pcap",
+         0,
+         {"Packet 2  1.000000  42 octets, Ethernet\n  no IP: ARP\n", "      Source Address= 10.0.0.1\n",
+          "Data=8 octets"},
+         {},
+         {"["
+          "97-128]"}},
+        {"netfloor --packet 1 detail --bits $T/five.pcap",
+         0,
+         {"Fragment Offset=0 octets  [49-53,57-64]\n"},
+         {},
+         {"ARP"}},
+        {"netfloor detail $T/cut.pcap",
+         0,
+         {"not decoded: octets 4 to 23", "  cut by the snap length: 24 of 36"},
+         {},
+         {}},
+        {"netfloor verify $T/five.pcap", 0, {"  good\n", "verdicts: 2 good\n", "3 without"}, {}, {"DAMAGED"}, 7},
+        {"netfloor keys --column 'Source Address' --column 'UDP Destination Port' $T/five.pcap",
+         0,
+         {"packet,time,octets,note,Source Address,UDP Destination Port\n1,0.000000,50,,10.0.0.1,53\n"
+          "2,1.000000,42,no IP: ARP,,\n"},
+         {},
+         {},
+         6},
+        {"netfloor keys --raw --column 'Source Address' $T/five.pcap", 0, {",0a000001\n"}, {}, {}, 6},
+    });
+}
+
+TEST_F(Command, chooses) {
+    check({
+        {"netfloor --count 1 $T/five.pcap", 0, {"    1  "}, {}, {"ARP"}, 1},
+        {"netfloor $T/five.pcap --filter arp -c 1", 0, {"    2  "}, {}, {"192.168"}, 2},
+        {"netfloor -f 'udp dst port 53 and src host 10.0.0.1' $T/five.pcap", 0, {"    3  "}, {}, {"ARP"}, 2},
+        {"netfloor -f 'udp port 1' $T/five.pcap", 0, {}, {}, {}, 0},
+        {"netfloor --packet 6 $T/five.pcap", 2, {}, {"has only 5 packets"}, {}},
+        {"netfloor --packet 1 -f arp $T/five.pcap", 2, {}, {"does not match the filter"}, {}},
+        {"netfloor -f 'no such' $T/five.pcap", 2, {}, {"pcap-filter"}, {}},
+        {"netfloor keys --column Nothing $T/five.pcap", 2, {}, {"'Nothing'", "'Time to Live'"}, {}},
+        {"netfloor --packet 0 $T/five.pcap", 2, {}, {"--help"}, {}},
+        {"netfloor detail", 2, {}, {"file is required"}, {}},
+        {"netfloor --help", 0, {"Exit codes:"}, {}, {}},
+    });
+}
+
+TEST_F(Command, readsAnyWay) {
+    check({
+        {"cat $T/five.pcap | netfloor -", 0, {"5 packets"}, {}, {}, 6},
+        {"netfloor $T/five.pcap.gz", 0, {"5 packets"}, {}, {}, 6},
+        {"netfloor - < $T/five.pcap.gz", 0, {"5 packets"}, {}, {}, 6},
+        {"cat <(head -c 100 $T/five.pcap | gzip) <(tail -c +101 $T/five.pcap | gzip) | netfloor -",
+         0,
+         {"5 packets"},
+         {},
+         {},
+         6},
+        // A live source shows each packet as it comes.
+        {"{ head -c 90 $T/five.pcap; sleep 5; } | netfloor - | { read -t 3 line; echo \"$line\"; }",
+         0,
+         {"10.0.0.1"},
+         {},
+         {},
+         1},
+    });
+}
+
+TEST_F(Command, endsWithACodeAndASentence) {
+    check({
+        // Cut captures: all whole packets, then the place.
+        {"netfloor $T/inPacket.pcap",
+         4,
+         {"    1  "},
+         {"cut off at octet 116, in packet 2, which begins at octet 90 of the file; the 1 packet in front"},
+         {},
+         1},
+        {"netfloor keys $T/inHead.pcap", 4, {"\n1,0.000000"}, {"at octet 97, in packet 2", "octet 90"}, {}, 2},
+        {"netfloor $T/withTail.pcap", 4, {"5 packets"}, {"in packet 6"}, {}, 6},
+        {"netfloor $T/half.pcap.gz", 4, {"    1  "}, {"packed data end in the middle", "of the unpacked capture"}, {}},
+        {"cat $T/half.pcap.gz | netfloor -", 4, {"    1  "}, {"packed data end in the middle"}, {}},
+        // Files that are no captures.
+        {"netfloor $T/inFileHead.pcap", 3, {}, {"no usable capture header"}, {}},
+        {"netfloor $T/missing.pcap", 3, {}, {"No such file", "Check the path"}, {}},
+        {"netfloor $T/empty.pcap", 3, {}, {"is empty"}, {}},
+        {"netfloor - < /dev/null", 3, {}, {"standard input is empty"}, {}},
+        {"netfloor $T/foreign.txt", 3, {}, {"neither a pcap nor a pcapng", "editcap"}, {}},
+        {"netfloor $T/other.zst", 3, {}, {"zstd -dc FILE | netfloor -"}, {}},
+        {"netfloor $T", 3, {}, {"is a folder"}, {}},
+        {"netfloor $T/headerOnly.pcap", 0, {}, {"holds no packets"}, {}},
+        // The plug-in and the output.
+        {"netfloor --plugin $T/none.so $T/five.pcap", 5, {}, {"none.so"}, {}},
+        {"netfloor --plugin $T/foreign.txt $T/five.pcap", 5, {}, {"foreign.txt"}, {}},
+        {"netfloor $T/five.pcap > /dev/full", 6, {}, {"No space left"}, {}},
+        // The reader of a long output goes away.
+        {"for i in 1 2 3 4 5 6; do netfloor detail $C/udp-tcp-rawip.pcap; done | head -n 1; exit ${PIPESTATUS[0]}",
+         0,
+         {"Packet 1"},
+         {},
+         {},
+         1},
+        {"netfloor detail $C/mixed-pppoe-double-vlan.pcap | head -n 1; exit ${PIPESTATUS[0]}",
+         0,
+         {"Packet 1"},
+         {},
+         {},
+         1},
+    });
+}
+
+TEST_F(Command, findsIpBehindEachLinkLayer) {
+    struct Link {
+        std::uint32_t type;
+        const char *header; // in front of the IP header
+        const char *other;  // what it is if it is no IP
+    };
+    const std::vector<Link> links = {
+        {1, "ff*6 02*6 0800", ""},
+        {1, "ff*6 02*6 8100 0001 0800", ""},
+        {1, "ff*6 02*6 88a8 0001 8100 0002 8100 0003 0800", ""},
+        {1, "ff*6 02*6 8864 11 00 0001 0026 0021", ""},
+        {1, "ff*6 02*6 8100 0001 8864 11 00 0001 0026 0021", ""},
+        {1, "ff*6 02*6 002c aaaa03 000000 0800", ""}, // SNAP
+        {1, "ff*6 02*6 8864 11 00 0001 0026 c021", "PPP LCP"},
+        {1, "ff*6 02*6 8863", "PPPoE discovery"},
+        {1, "ff*6 02*6 0026 4242 03", "spanning tree"},
+        {1, "ff*6 02*6 0026 e0e0 03", "802.3 frame"},
+        {1, "ff*6 02*6 1234", "EtherType 0x1234"},
+        {113, "0000 0001 0006 02*6 0000 0800", ""},
+        {113, "0000 0001 0006 02*6 0000 8100 0001 0800", ""},
+        {113, "0000 0001 0006 02*6 0000 0806", "ARP"},
+        {276, "0800 0000 00000001 0001 00 06 02*8", ""},
+        {276, "88cc 0000 00000001 0001 00 06 02*8", "LLDP"},
+        {101, "", ""},
+        {12, "", ""},
+        {14, "", ""},
+        {228, "", ""},
+        {229, "", ""},
+        {0, "02000000", ""},
+        {0, "00000002", ""},
+        {0, "1e000000", ""},
+        {0, "07000000", "address family 7"},
+        {108, "00000002", ""},
+        {108, "0000001c", ""},
+        {9, "ff03 0021", ""},
+        {9, "0021", ""},
+        {9, "21", ""},
+        {9, "ff03 8021", "PPP IPCP"},
+        {50, "ff03 0021", ""},
+        {50, "0f00 0800", ""},
+        {50, "ff03 8057", "PPP IPv6CP"},
+        {51, "11 00 0001 0026 0021", ""},
+        {166, "00 03 0021", ""},
+        {166, "01 03 c023", "PPP PAP"},
+        {204, "00 ff03 0021", ""},
+        {147, "", "link type"}, // a type for private use
+    };
+    for (const Link &link : links) {
+        SCOPED_TRACE(std::to_string(link.type) + ": " + link.header);
+        writeFile("link.pcap", pcapFile(link.type, {{hex(link.header) + udpPacket}}));
+        const Outcome outcome = shell("netfloor $T/link.pcap");
+        EXPECT_EQ(outcome.exitCode, 0);
+        const std::string expected =
+            *link.other == '\0' ? "| 10.0.0.1 | 192.168.0.2 |" : std::string("no IP: ") + link.other;
+        EXPECT_NE(outcome.out.find(expected), std::string::npos) << outcome.out << outcome.err;
+
+        // Cut anywhere, the header is told to be cut, or what is there is decoded: nothing is read beyond.
+        const Octets whole = hex(link.header);
+        std::vector<PcapPacket> cuts;
+        for (std::size_t size = 0; size <= whole.size(); ++size) {
+            cuts.push_back({Octets(whole.begin(), whole.begin() + static_cast<std::ptrdiff_t>(size)), 100});
+        }
+        writeFile("cuts.pcap", pcapFile(link.type, cuts));
+        const Outcome cut = shell("netfloor $T/cuts.pcap");
+        EXPECT_EQ(cut.exitCode, 0);
+        EXPECT_EQ(cut.err, "");
+    }
+}
+
+TEST_F(Command, readsPcapngWithInterfacesOfDifferentTypes) {
+    const Octets ethernet = hex("ff*6 02*6 0800") + udpPacket;
+    // Interface 1 counts in nanoseconds from 100 s on, interface 2 in 2^-10 s.
+    const Octets first = pcapngSection() + pcapngInterface(1, {}) +
+                         pcapngInterface(228, hex("0009 0001 09 000000 000e 0008 0000000000000064 0000 0000")) +
+                         pcapngInterface(101, hex("0009 0001 8a 000000 0000 0000"));
+    const Octets packets = pcapngPacket(0, 5'000'000, ethernet) + pcapngPacket(1, 2'500'000'000, udpPacket) +
+                           pcapngBlock(5, hex("00*8")) + // statistics
+                           pcapngPacket(2, 5 * 1024 + 512, udpPacket) +
+                           pcapngBlock(3, be32(50) + ethernet); // a packet without a time
+    // The second section knows none of the interfaces of the first.
+    const Octets second = pcapngSection() + pcapngInterface(113, {}) +
+                          pcapngPacket(0, 1'000'000, hex("0000 0001 0006 02*6 0000 0800") + udpPacket);
+    writeFile("good.pcapng", first + packets + second);
+    writeFile("cut.pcapng", [&] {
+        Octets file = first + packets;
+        file.resize(file.size() - 9);
+        return file;
+    }());
+    writeFile("unknown.pcapng", first + packets + pcapngSection() + pcapngPacket(0, 0, udpPacket));
+    Octets broken = first + packets;
+    broken[broken.size() - 1] ^= 0x04; // the second length of the last block
+    writeFile("broken.pcapng", broken);
+    writeFile("noBlock.pcapng", pcapngSection() + hex("00000001 00000004 00000004"));
+
+    check({
+        {"netfloor keys --column 'Source Address' $T/good.pcapng",
+         0,
+         {"1,0.000000,50,,10.0.0.1\n2,97.500000,36,,10.0.0.1\n3,0.500000,36,,10.0.0.1\n4,,50,,10.0.0.1\n"
+          "5,-4.000000,52,,10.0.0.1\n"},
+         {},
+         {},
+         6},
+        {"netfloor -f 'udp port 53' $T/good.pcapng", 0, {"    5  "}, {}, {}, 5},
+        {"netfloor $T/cut.pcapng",
+         4,
+         {"    3  "},
+         {"in packet 4", "the 3 packets in front of it are whole"},
+         {"    4  "},
+         3},
+        {"netfloor $T/unknown.pcapng", 4, {"    4  "}, {"an interface that is not described in packet 5"}, {}, 4},
+        {"netfloor $T/broken.pcapng", 4, {"    3  "}, {"two lengths differ in packet 4"}, {}, 3},
+        {"netfloor $T/noBlock.pcapng", 3, {}, {"a block of 4 octets"}, {}},
+        {"netfloor $C/pcapng-big-endian-two-interfaces.pcapng", 0, {"192.168.1.139"}, {}, {}, 5},
+    });
+}
+
+// All that a capture holds goes through all commands, and no packet is lost.
+TEST_F(Command, decodesRealCaptures) {
+    const Outcome files = shell("ls $C/*.pcap $C/*.pcapng");
+    std::istringstream names(files.out);
+    std::size_t seen = 0;
+    for (std::string name; std::getline(names, name); ++seen) {
+        SCOPED_TRACE(name);
+        const Outcome keys = shell("netfloor keys --column Version '" + name + "'");
+        EXPECT_EQ(keys.exitCode, 0) << keys.err;
+        const auto packets = std::count(keys.out.begin(), keys.out.end(), '\n') - 1;
+        EXPECT_GT(packets, 0);
+        const Outcome verify = shell("netfloor verify '" + name + "'");
+        EXPECT_LE(verify.exitCode, 1) << verify.err;
+        EXPECT_NE(verify.out.find(std::to_string(packets) + " packet"), std::string::npos);
+        const Outcome detail = shell("netfloor detail --bits '" + name + "' | grep -c '^Packet '");
+        EXPECT_EQ(detail.out, std::to_string(packets) + "\n");
+        EXPECT_EQ(keys.err + verify.err + detail.err, "");
+    }
+    EXPECT_GT(seen, 10U);
+}
+
+} // namespace
