@@ -8,6 +8,8 @@
 
 #include <netfloor/records.h>
 
+#include "text.h"
+
 namespace netfloor::cli {
 
 namespace {
@@ -97,12 +99,10 @@ std::string placeText(const Place &place, const Report &detail) {
     }
     std::string text;
     if (place.skippedBits != 0) {
-        const std::uint32_t octets = place.skippedBits / bitsPerOctet;
-        text = ": " + std::to_string(octets) + (octets == 1 ? " octet" : " octets");
+        text = ": " + countText(place.skippedBits / bitsPerOctet, "octet");
     }
-    const auto nameStart = place.behind->name.find_first_not_of(' ');
-    text += " behind '" + (nameStart == std::string::npos ? place.behind->name : place.behind->name.substr(nameStart)) +
-            "' at octet " + std::to_string((lastBitOf(*place.behind) - 1) / bitsPerOctet);
+    text += " behind '" + std::string(withoutLeadingBlanks(place.behind->name)) + "' at octet " +
+            std::to_string((lastBitOf(*place.behind) - 1) / bitsPerOctet);
     if (const std::string path = detail.path(*place.behind); !path.empty()) {
         text += " (" + path + ")";
     }

@@ -42,11 +42,6 @@ std::string octetsText(std::uint32_t firstBit, std::uint32_t lastBit) {
                          : "octets " + std::to_string(first) + " to " + std::to_string(last);
 }
 
-std::string_view withoutLeadingBlanks(std::string_view text) {
-    const auto first = text.find_first_not_of(' ');
-    return first == std::string_view::npos ? std::string_view() : text.substr(first);
-}
-
 bool isOneOctet(const FieldReport &field) {
     return field.ranges.size() == 1 && field.ranges[0].lastBit - field.ranges[0].firstBit + 1 == bitsPerOctet;
 }
@@ -105,7 +100,7 @@ private:
         path_.resize(common);
         for (std::size_t i = common; i < path.size(); ++i) {
             indent();
-            out_.styled(Style::bold, report_.blocks[path[i]].name);
+            out_.styled(Style::bold, withoutLeadingBlanks(report_.blocks[path[i]].name));
             out_ << '\n';
             path_.push_back(path[i]);
         }

@@ -65,10 +65,6 @@ std::vector<std::string> keyFieldNames(Host &host) {
     return host.library().keyFieldNames();
 }
 
-std::string countText(std::uint64_t count, const char *thing) {
-    return std::to_string(count) + " " + thing + (count == 1 ? "" : "s");
-}
-
 std::unique_ptr<Printer> makePrinter(const Options &options, Output &out, Host &host) {
     switch (options.command) {
     case Command::summary: return makeSummaryPrinter(options, out, host);

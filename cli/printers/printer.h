@@ -14,6 +14,7 @@
 #include "netfloor-host/host.h"
 #include "options.h"
 #include "output.h"
+#include "text.h"
 
 namespace netfloor::cli {
 
@@ -66,8 +67,6 @@ private:
 
 // The names in the plug-in's key-field table, row by row.
 [[nodiscard]] std::vector<std::string> keyFieldNames(Host &host);
-
-[[nodiscard]] std::string countText(std::uint64_t count, const char *thing);
 
 [[nodiscard]] std::unique_ptr<Printer> makePrinter(const Options &options, Output &out, Host &host);
 

@@ -1,56 +1,29 @@
 // SPDX-License-Identifier: MIT
 // One line a packet, out of the short texts of the TO pass.
-#include <set>
+#include <algorithm>
 #include <string_view>
-#include <unordered_map>
 
+#include "printers/field_names.h"
 #include "printers/printer.h"
 
 namespace netfloor::cli {
 
 namespace {
 
-// Which display ids belong to key fields, the fields by which a plug-in itself says what matters of a packet.
-// A short text bears no name, so the name behind an id is learned from the MD pass over the same packet,
-// which reports the same fields in the same order.
-class KeyDisplays {
-public:
-    explicit KeyDisplays(Host &host) : host_(host) {}
-
-    // Makes isKey() good for all that `report` shows.
-    void learn(const Report &report, std::span<const std::uint8_t> packet) {
-        bool known = true;
-        for (const DisplayReport &display : report.displays) {
-            known = known && isKey_.contains(display.displayId);
-        }
-        if (known) {
-            return;
-        }
-        if (names_.empty()) {
-            const auto names = keyFieldNames(host_);
-            names_.insert(names.begin(), names.end());
-        }
-        const Report named = host_.run(Pass::md, packet);
-        for (std::size_t i = 0; i < report.displays.size() && i < named.fields.size(); ++i) {
-            isKey_.try_emplace(report.displays[i].displayId, names_.contains(named.fields[i].name));
-        }
-        isKey_[0] = true; // what an owner of a next layer says
+// A text that says nothing without the name of its field: "64", "5f01", "0x1b3", "99(dec)".
+bool isBareNumber(std::string_view text) {
+    if (text.starts_with("0x")) {
+        text.remove_prefix(2);
     }
-
-    [[nodiscard]] bool isKey(std::uint32_t displayId) const {
-        const auto found = isKey_.find(displayId);
-        return found == isKey_.end() || found->second;
+    if (text.ends_with("(dec)")) {
+        text.remove_suffix(5);
     }
-
-private:
-    Host &host_;
-    std::set<std::string, std::less<>> names_;
-    std::unordered_map<std::uint32_t, bool> isKey_;
-};
+    return !text.empty() && text.find_first_not_of("0123456789abcdef") == std::string_view::npos;
+}
 
 class SummaryPrinter final : public Printer {
 public:
-    SummaryPrinter(const Options &options, Output &out, Host &host) : Printer(options, out, host), keys_(host) {}
+    SummaryPrinter(const Options &options, Output &out, Host &host) : Printer(options, out, host), names_(host) {}
 
     void print(const CapturedPacket &packet, const NetworkPart &network, const std::string &time) override {
         printHead(packet, time);
@@ -75,9 +48,7 @@ public:
 private:
     void printTexts(std::span<const std::uint8_t> octets) {
         const Report report = host().run(Pass::to, octets);
-        if (!options().all) {
-            keys_.learn(report, octets);
-        }
+        names_.learn(report, octets);
         bool first = true;
         const auto &displays = report.displays;
         for (std::size_t i = 0; i < displays.size();) {
@@ -85,7 +56,8 @@ private:
             while (end < displays.size() && displays[end].displayId == displays[i].displayId) {
                 ++end;
             }
-            if (options().all || keys_.isKey(displays[i].displayId)) {
+            const bool isShown = names_.find(displays[i].displayId).isKey && !displays[i].text.empty();
+            if (options().all || isShown) {
                 if (!first) {
                     out().styled(Style::dim, " | ");
                 }
@@ -99,22 +71,26 @@ private:
         }
     }
 
-    // Data come octet by octet, each as a field of its own.
+    // Texts of one id: a field that was looked at ahead is reported twice, an address also without a text, and data
+    // come octet by octet.
     void printRun(std::span<const DisplayReport> run) {
         constexpr std::size_t mostShown = 4;
-        const bool all = options().all || run.size() <= mostShown;
-        for (std::size_t i = 0; i < (all ? run.size() : mostShown); ++i) {
-            if (i > 0) {
-                out() << ' ';
-            }
-            out() << run[i].text;
+        if (isBareNumber(run.front().text)) {
+            out() << names_.find(run.front().displayId).name << '=';
         }
-        if (!all) {
+        out() << run.front().text;
+        const std::size_t shown = options().all || run.size() <= mostShown ? run.size() : mostShown;
+        for (std::size_t i = 1; i < shown; ++i) {
+            if (options().all || (!run[i].text.empty() && run[i].text != run[i - 1].text)) {
+                out() << ' ' << run[i].text;
+            }
+        }
+        if (shown < run.size()) {
             out().styled(Style::dim, " ... (" + std::to_string(run.size()) + ")");
         }
     }
 
-    KeyDisplays keys_;
+    FieldNames names_;
 };
 
 } // namespace

@@ -60,7 +60,7 @@ public:
         out() << "verdicts: ";
         bool first = true;
         for (std::size_t i = 0; i < words.size(); ++i) {
-            if (counts_[i] != 0 || i == 0) {
+            if (counts_[i] != 0) {
                 out() << (first ? "" : ", ");
                 out().styled(words[i].style, std::to_string(counts_[i]) + " " + std::string(words[i].total));
                 first = false;

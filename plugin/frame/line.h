@@ -78,7 +78,7 @@ public:
     template <Conversion conversion, std::uint32_t bitCount>
     NETFLOOR_INLINE void appendElements(const BitRange* ranges, std::uint32_t count, std::string_view separator) {
         for (std::uint32_t element = 0; element < count && !full(); ++element) {
-            if (element > 0) {
+            if (element > 0 && !separator.empty()) {
                 std::memcpy(end_, separator.data(), separator.size());
                 end_ += separator.size();
             }

@@ -57,6 +57,9 @@ struct BlockName {
 // Writes a field that was read at `cursor` into the field record.
 using RecordWriter = void (*)(FieldRecord& record, const std::uint8_t* data, std::uint32_t cursor, std::uint32_t units);
 
+// Starts the record of a field whose elements are still to be read.
+using RecordBeginning = void (*)(FieldRecord& record);
+
 template <const Field& field>
 void writeRecord(FieldRecord& record, const std::uint8_t* data, std::uint32_t cursor, std::uint32_t units) {
     beginRecord<field>(record);
@@ -268,14 +271,14 @@ public:
         }
     }
 
-    // Makes room for so many elements. False when the ranges cannot grow.
-    NETFLOOR_INLINE bool roomFor(std::uint32_t elements) {
+    // Makes room for so many elements of a field whose record `begin` starts. False when the ranges cannot grow.
+    NETFLOOR_INLINE bool roomFor(std::uint32_t elements, RecordBeginning begin) {
         if (elements < state->fieldRecord.rangeCapacity) [[likely]] {
             return true;
         }
         // Growth works on a copy, so that the reader itself can stay in registers.
         Reader copy = *this;
-        if (!copy.growRanges(elements)) {
+        if (!copy.growRanges(elements, begin)) {
             end(Outcome::cutOff);
             return false;
         }
@@ -316,9 +319,10 @@ private:
         return true;
     }
 
-    [[gnu::cold, gnu::noinline]] bool growRanges(std::uint32_t elements) {
+    [[gnu::cold, gnu::noinline]] bool growRanges(std::uint32_t elements, RecordBeginning begin) {
         giveState();
         FieldRecord& record = state->fieldRecord;
+        begin(record);
         void* const grown = hs_Realloc(record.ranges, elements * sizeof *record.ranges);
         if (grown == nullptr) {
             state->flags |= NETFLOOR_FLAG_NO_RANGES;

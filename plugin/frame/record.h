@@ -78,6 +78,9 @@ NETFLOOR_INLINE inline std::uint32_t writeElements(FieldRecord& record, const st
         for (std::uint32_t i = 0; i < (place.isRun() ? units : place.count); ++i) {
             octet(i, cursor + i * bitsPerOctet);
         }
+        if constexpr (place.count == 1) {
+            ranges[0].flagWord = 0; // a single octet is one piece, not a row of octets
+        }
     } else if constexpr (place.shape == Shape::octetsBackward) {
         for (std::uint32_t i = 0; i < units; ++i) {
             octet(i, cursor + (units - 1 - i) * bitsPerOctet);

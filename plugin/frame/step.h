@@ -53,7 +53,7 @@ NETFLOOR_INLINE inline void step(Reader<Pass>& at, std::uint32_t units, Store in
     if constexpr (Pass::reports) {
         beginRecord<field>(at.state->fieldRecord);
     }
-    if (!at.roomFor(place.elements(units))) {
+    if (!at.roomFor(place.elements(units), beginRecord<field>)) {
         return;
     }
     const std::uint32_t start = at.cursor;
@@ -112,10 +112,13 @@ NETFLOOR_INLINE inline void readCounted(Reader<Pass>& at, std::int32_t count) {
     }
 }
 
+// A look ahead keeps the record of the field before.
+inline void keepRecord(FieldRecord&) {}
+
 // Looks at the bits of `place` without moving the cursor and without reporting anything; nothing where they
 // are not all left or the run is over. The field record keeps what was seen, under the name of the field before.
 template <class Pass> NETFLOOR_INLINE inline std::optional<std::uint32_t> look(Reader<Pass>& at, const Place& place) {
-    if (at.over() || at.left < place.needs(place.count) || !at.roomFor(place.count)) {
+    if (at.over() || at.left < place.needs(place.count) || !at.roomFor(place.count, keepRecord)) {
         return std::nullopt;
     }
     const bool whole = !place.isPieces();
