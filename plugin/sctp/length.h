@@ -27,19 +27,19 @@ inline constexpr std::int32_t headOctets = 4;
 
 // A type, and a Length.
 inline constexpr std::uint32_t typeBits = 16;
-inline constexpr std::int32_t lengthBits = 16;
+inline constexpr std::uint32_t lengthBits = 16;
 
 // Bits in front of a Length: stepped over where `needs` of them are left.
 struct Stretch {
     std::uint32_t needs;
-    std::int32_t width;
+    std::uint32_t width;
 };
 
 // A Length that lies behind the place where its limited block starts.
 struct LengthAhead {
     std::array<Stretch, 2> stretches; // what lies in front of the Length; a stretch that needs nothing is none
-    bool countsStretches;             // whether the limit covers the stretches as well
-    std::uint32_t outside;            // bits that are added up but lie outside the limit
+    bool addsStretches;               // whether the limit adds the stretches to the Length
+    std::uint32_t takesOff;           // bits that the limit takes off the sum
 };
 
 // The limits of a whole Length are Length * 8 bits, of ABORT Length * 8 - 8. INIT starts behind its Chunk Type,
@@ -59,13 +59,13 @@ template <const LengthAhead& ahead, class Pass, class Store>
     }
     const std::uint32_t cursor = at.cursor;
     const std::uint32_t left = at.left;
-    const auto stepOver = [&at](std::int32_t width) {
-        at.advance() = width;
-        at.cursor += static_cast<std::uint32_t>(width);
-        at.left -= static_cast<std::uint32_t>(width);
+    const auto stepOver = [&at](std::uint32_t width) {
+        at.advance() = static_cast<std::int32_t>(width);
+        at.cursor += width;
+        at.left -= width;
     };
 
-    std::int32_t sum = 0;
+    std::uint32_t sum = 0;
     for (const Stretch& stretch : ahead.stretches) {
         if (stretch.needs == 0) {
             continue;
@@ -73,18 +73,18 @@ template <const LengthAhead& ahead, class Pass, class Store>
         if (at.test(at.left >= stretch.needs)) {
             stepOver(stretch.width);
         }
-        sum += ahead.countsStretches ? at.advance() : 0;
+        sum += ahead.addsStretches ? static_cast<std::uint32_t>(at.advance()) : 0;
     }
     const std::optional<std::uint32_t> length = look(at, octets(2));
     if (at.test(length.has_value())) {
         store(into, *length);
         stepOver(lengthBits);
     }
-    sum += at.advance();
+    sum += static_cast<std::uint32_t>(at.advance()) + length.value_or(0) * bitsPerOctet;
 
     at.cursor = cursor;
     at.left = left;
-    return static_cast<std::uint32_t>(sum) + length.value_or(0) * bitsPerOctet - ahead.outside;
+    return sum - ahead.takesOff;
 }
 
 } // namespace netfloor::sctp
