@@ -1,0 +1,55 @@
+// SPDX-License-Identifier: MIT
+// SCTP packets (RFC 9260) and what was read behind their common header.
+#pragma once
+
+#include <string>
+#include <string_view>
+
+#include "support/runs.h"
+
+namespace netfloor::test {
+
+// Ports 2905 and 2906, so that user data go to the owner of 2906; bit 257 is the first of the chunks.
+inline Octets sctp(const Octets &chunks) {
+    return ipv4({.protocol = 132, .payload = hex("0b 59 0b 5a 00 00 00 2a 00 00 00 00") + chunks});
+}
+
+// A chunk with its Length, and without padding.
+inline Octets chunk(std::uint8_t type, const Octets &value) {
+    return Octets{type, 0} + be16(static_cast<std::uint32_t>(value.size() + 4)) + value;
+}
+
+// The ids of the fields behind the common header; * is what the host took at a hand-off.
+inline std::string chunkIds(const Report &md) {
+    std::string ids;
+    bool behindHeader = false;
+    for (const FieldReport &field : md.fields) {
+        if (behindHeader) {
+            ids += (ids.empty() ? "" : " ") + (field.id == 0 ? "*" : std::to_string(field.id));
+        }
+        behindHeader |= field.id == 798;
+    }
+    return ids;
+}
+
+// One packet, the fields behind `front` and the flags.
+struct SctpCase {
+    const char *what;
+    Octets chunks;
+    std::string_view ids;
+    std::uint32_t mvFlags = 0;
+    std::uint32_t mdFlags = 0; // those that all passes set
+};
+
+inline Runs checkCase(const SctpCase &one, const std::string &front = {}) {
+    SCOPED_TRACE(one.what);
+    Runs runs = runAll(sctp(one.chunks));
+    EXPECT_EQ(chunkIds(runs.md), front + std::string(one.ids));
+    EXPECT_EQ(runs.mv.flags, one.mvFlags);
+    EXPECT_EQ(runs.md.flags, one.mdFlags);
+    EXPECT_EQ(runs.md.ending, Ending::complete);
+    EXPECT_EQ(runs.md.bitsLeft, 0u); // what no field covers is skipped
+    return runs;
+}
+
+} // namespace netfloor::test
