@@ -111,12 +111,11 @@ bool comparable(const std::string &key, const std::map<std::string, std::string>
            (key != "Sequence Number" || is("Protocol", "6"));
 }
 
-// A number in any notation as decimal; other texts as they are.
-std::string normal(const std::string &text, long divisor) {
+// A number in any notation and unit as decimal in octets; other texts as they are.
+std::string normal(const std::string &text, unsigned unit) {
     char *end = nullptr;
     const unsigned long long number = std::strtoull(text.c_str(), &end, 0);
-    return end == text.c_str() || *end != '\0' ? text
-                                               : std::to_string(number / static_cast<unsigned long long>(divisor));
+    return end == text.c_str() || *end != '\0' ? text : std::to_string(number * unit);
 }
 
 class Captures : public testing::TestWithParam<std::string> {};

@@ -1,0 +1,394 @@
+// SPDX-License-Identifier: MIT
+// The tables as a host finds them behind vx_DLLGetPtr and vx_DLLGetTable, word by word.
+#include <array>
+#include <cstring>
+#include <map>
+#include <set>
+#include <string>
+#include <vector>
+
+#include <gtest/gtest.h>
+#include <netfloor/descriptors.h>
+
+#include "support/runs.h"
+
+namespace netfloor::test {
+namespace {
+
+template <typename Row>
+const Row *table(std::int32_t number) {
+    const void *rows = nullptr;
+    EXPECT_EQ(sharedHost().library().getTable()(number, &rows), NETFLOOR_TABLE_FOUND) << number;
+    return static_cast<const Row *>(rows);
+}
+
+// Walks end where the tables say, and a bound keeps a table without an end from being walked for ever.
+constexpr std::size_t bound = 10000;
+
+struct Tables {
+    const FieldDescriptor *fields = table<FieldDescriptor>(NETFLOOR_TABLE_FIELDS);
+    const ValueMapRow *values = table<ValueMapRow>(NETFLOOR_TABLE_VALUES);
+    const std::int32_t *pool = table<std::int32_t>(NETFLOOR_TABLE_POOL);
+    const char *const *texts = table<const char *>(NETFLOOR_TABLE_TEXTS);
+    const std::uint8_t *layouts = table<std::uint8_t>(NETFLOOR_TABLE_LAYOUTS);
+    std::size_t fieldCount = walk([&](std::size_t i) { return fields[i].flags == NETFLOOR_NO_FIELD; });
+    std::size_t valueCount = walk([&](std::size_t i) { return values[i].kind == 0; });
+    std::size_t textCount = walk([&](std::size_t i) { return texts[i] == std::string_view(NETFLOOR_LAST_TEXT); });
+
+    [[nodiscard]] std::span<const FieldDescriptor> rows() const { return {fields, fieldCount}; }
+    [[nodiscard]] const FieldDescriptor &field(std::uint32_t id) const {
+        return *std::ranges::find(rows(), id, &FieldDescriptor::fieldId);
+    }
+
+private:
+    template <typename Ends>
+    static std::size_t walk(Ends ends) {
+        std::size_t count = 0;
+        while (count < bound && !ends(count)) {
+            ++count;
+        }
+        return count;
+    }
+};
+
+const Tables &tables() {
+    static const Tables all;
+    return all;
+}
+
+TEST(Exports, GiveATableOrSayThatThereIsNone) {
+    const PluginLibrary &library = sharedHost().library();
+    const std::set<std::int32_t> pointers = {1, 2, 4, 5};
+    const std::set<std::int32_t> tableNumbers = {1, 2, 4, 5, 6, 7, 8, 9};
+    for (const std::int32_t number : {-2147483647 - 1, -1, 0, 1, 2, 3, 4, 5, 6, 7, 8, 9, 10, 11, 256, 2147483647}) {
+        for (const auto &[get, known] : {std::pair(library.getPtr(), &pointers), {library.getTable(), &tableNumbers}}) {
+            const void *out = &library;
+            EXPECT_EQ(get(number, &out), known->contains(number) ? 0U : 0xd0410001U) << number;
+            EXPECT_EQ(out != nullptr, known->contains(number)) << number;
+        }
+    }
+    const auto pointer = [&](std::int32_t number) {
+        const void *out = nullptr;
+        library.getPtr()(number, &out);
+        return static_cast<const char *>(out);
+    };
+    EXPECT_STREQ(pointer(1), "RW1.02.01");
+    EXPECT_STREQ(table<char>(1), "RW1.02.01");
+    EXPECT_EQ(table<char>(2) - pointer(2), 16);
+    EXPECT_EQ(table<char>(5) - pointer(5), 16);
+}
+
+TEST(Exports, TellWhoThePluginIs) {
+    const void *out = nullptr;
+    sharedHost().library().getPtr()(NETFLOOR_TABLE_IDENTITY, &out);
+    const auto &identity = *static_cast<const ProtocolIdentity *>(out);
+    EXPECT_EQ(std::vector(std::begin(identity.head), std::end(identity.head)), (std::vector<std::uint32_t>{7, 0, 0, 0}));
+    const std::map<std::size_t, std::uintptr_t> numbers = {{16, 0}, {17, 3},      {18, 0},     {21, 0},
+                                                           {22, 0xffff}, {23, 0xffff}, {24, 0}};
+    const char *const texts[] = {"IETF", "IP(Lower)", "IPv4&IPv6(Lower)", "RFC 791& 2460 ", "UMTS",
+                                 "IP layers below GTP", "", "NETFLOOR.CSF", "", "Release VEXTOOLS_A.02.20",
+                                 "Release VEXTOOLS_A.02.20", "2048", "Ethernet Type", "RFC 791 & RFC 2460", "", "",
+                                 "", "", "", "IP", "NETFLOOR.CSF"};
+    for (std::size_t slot = 0; slot < std::size(identity.slots); ++slot) {
+        if (const auto number = numbers.find(slot); number != numbers.end()) {
+            EXPECT_EQ(identity.slots[slot].number, number->second) << slot;
+        } else {
+            EXPECT_STREQ(identity.slots[slot].text, texts[slot]) << slot;
+        }
+    }
+}
+
+Octets le32(std::initializer_list<std::uint32_t> words) {
+    Octets octets;
+    for (const std::uint32_t word : words) {
+        for (unsigned shift = 0; shift < 32; shift += 8) {
+            octets.push_back(static_cast<std::uint8_t>(word >> shift));
+        }
+    }
+    return octets;
+}
+
+Octets text(std::string_view characters, const Octets &behind) {
+    return Octets(characters.begin(), characters.end()) + behind;
+}
+
+TEST(Exports, GiveSamplesOfTheLayoutOfRecords) {
+    constexpr std::uint32_t a = 0xa5a5a5a5;
+    const std::map<std::int32_t, Octets> samples = {
+        {4, le32({4, 124, 92, 60, a, a, a, 1, 0xfffd, 0x106, 0xffff, 0x4b4b4b4b}) + hex("0800 0d00 0100 0300") +
+                text("VEX Protocol Prototype dummy field", hex("00 00")) + le32({16, 36, 20, 32, 24, 32, 44, 56})},
+        {5, le32({5, 220, 172, 60, a, a, a, a, a, 0, 0, a, 0, 0x10000, 1}) +
+                text("test_vex_protocol_DLL.dll", hex("00 3c3c")) + le32({1, 0, 0, 0}) + le32({1}) + hex("00 00 3c 3c") +
+                le32({7}) + hex("00 00 3c 3c") + hex("01 3c 01 00") + le32({8}) + hex("00 3c 00 00") + le32({0, 3}) +
+                hex("00 00 00 3c") + le32({0, 0, 13}) + le32({0, 0, 0, 0}) +
+                le32({16, 88, 20, 104, 24, 120, 28, 156, 32, 164, 44, 112})},
+    };
+    for (const auto &[number, octets] : samples) {
+        const void *out = nullptr;
+        sharedHost().library().getPtr()(number, &out);
+        const auto *const record = static_cast<const std::uint8_t *>(out);
+        EXPECT_EQ(octets.size(), number == 4 ? 124U : 220U);
+        EXPECT_EQ(hexText({record, octets.size()}), hexText(octets)) << number;
+    }
+}
+
+TEST(FieldTable, HasItsRowsInEveryWord) {
+    EXPECT_EQ(tables().fieldCount, 381U);
+    EXPECT_STREQ(tables().fields[0].name, "Version");
+    EXPECT_STREQ(tables().fields[380].name, "Authentication Data");
+    const struct {
+        std::uint32_t id;
+        const char *name;
+        std::uint32_t flags, keyIndex;
+        std::int32_t valueCount, valueStart;
+        std::uint32_t width, displayIndex;
+        const char *format;
+        std::uint32_t layout;
+    } telling[] = {
+        {150, "Version", 0x5010001, 1, 0, -1, 0xffff0004, 0, "Version=%u", 0},
+        {295, "Protocol", 0x5010001, 8, 139, 18, 0xffff0008, 31, "Protocol=%-S", 0x167},
+        {159, "Source Address", 0x5010303, 9, 0, -1, 0xffff0020, 172, R"(Source Address= %-["%u":"."])", 0x187},
+        {384, "TCP Source Port", 0x5010002, 41, 292, 1647, 0xffff0010, 295, "  TCP Source Port=%-S (%u)", 0x269},
+        {478, "MD5 digest", 0x5000004, 0, 0, -1, 0xffffffff, 603, R"(    MD5 digest=%-["%x"])", 0x3b3},
+        {956, "Source IP Address", 0x5000004, 0, 0, -1, 0xffffffff, 792, R"(Source IP Address=%-["%x":"."])", 0x207},
+        {958, "Source IP Address", 0x5010004, 90, 0, -1, 0xffffffff, 209, "", 0x20c},
+    };
+    for (const auto &row : telling) {
+        SCOPED_TRACE(row.id);
+        const FieldDescriptor &field = tables().field(row.id);
+        EXPECT_STREQ(field.name, row.name);
+        EXPECT_STREQ(field.shortName, row.name);
+        EXPECT_STREQ(tables().texts[field.displayIndex], row.format);
+        EXPECT_EQ((std::vector<std::int64_t>{field.flags, static_cast<std::int64_t>(field.keyIndex), field.valueCount,
+                                             field.valueStart, field.width, field.displayIndex, field.templateOffset}),
+                  (std::vector<std::int64_t>{row.flags, row.keyIndex, row.valueCount, row.valueStart, row.width,
+                                             row.displayIndex, row.layout}));
+    }
+    const auto &end = reinterpret_cast<const FieldTableEnd &>(tables().fields[381]);
+    EXPECT_EQ(end.flags, 0xffffffffU);
+    EXPECT_EQ(end.fieldId, 0xffffU);
+    EXPECT_STREQ(end.marker, "$_$LAST_FIELD_$_$");
+    EXPECT_EQ((std::vector<std::uintptr_t>{end.words[0], end.words[1], end.counts[0], end.counts[1], end.width}),
+              (std::vector<std::uintptr_t>{0, 0xffff, 0xffff, 0xffff, 0xffffffff}));
+    EXPECT_TRUE(std::ranges::all_of(end.zero, [](std::uint32_t word) { return word == 0; }));
+}
+
+// Facts that hold in each row, and in so many of them.
+TEST(FieldTable, HoldsTogether) {
+    std::set<std::uint32_t> ids;
+    std::set<std::uint32_t> marked;
+    std::uint32_t keys = 0;
+    std::map<std::string, int> names; // how the two names of a row differ
+    std::size_t nextValue = 0;
+    for (const FieldDescriptor &field : tables().rows()) {
+        SCOPED_TRACE(field.fieldId);
+        EXPECT_TRUE(ids.insert(field.fieldId).second);
+        const bool variable = field.width == 0xffffffff;
+        const std::uint32_t width = field.width & 0xffff;
+        EXPECT_TRUE(variable || (field.width >> 16 == 0xffff && width >= 1));
+        EXPECT_EQ(field.flags & 0xff, variable || width > 32 ? 4U : width > 16 ? 3U : width > 8 ? 2U : 1U);
+        const std::string_view format = tables().texts[field.displayIndex];
+        // Every list of 32 or 128 bits is an address; the other fixed lists have nothing between their elements.
+        EXPECT_EQ(field.flags >> 8 & 0xff, !variable && format.find("\":\"") != format.npos ? 3U : 0U);
+        EXPECT_EQ(field.flags >> 16 & 0xff, field.keyIndex != 0 ? 1U : 0U);
+        EXPECT_TRUE(field.keyIndex == 0 || field.keyIndex == ++keys);
+        if (field.flags >> 24 != 5) {
+            EXPECT_EQ(field.flags >> 24, 6U);
+            marked.insert(field.fieldId);
+        }
+        EXPECT_EQ(field.valueStart, field.valueCount == 0 ? -1 : static_cast<std::int32_t>(nextValue));
+        nextValue += static_cast<std::size_t>(field.valueCount);
+        EXPECT_TRUE(std::ranges::all_of(field.unused1, [](std::int32_t word) { return word == -1; }));
+        EXPECT_TRUE(std::ranges::all_of(field.unused2, [](std::int32_t word) { return word == -1; }));
+        const std::string name = field.name;
+        const std::string brief = field.shortName;
+        ++names[name == brief ? "equal" : name == brief + " " ? "blank behind" : name + "|" + brief];
+        EXPECT_FALSE(name.starts_with(' '));
+    }
+    EXPECT_EQ(keys, 102U);
+    EXPECT_EQ(nextValue, 4539U);
+    EXPECT_EQ(marked, (std::set<std::uint32_t>{396, 398, 399, 400, 401, 402, 403, 404, 405, 406, 407, 408, 489, 490, 848,
+                                               852}));
+    EXPECT_EQ(names, (std::map<std::string, int>{{"equal", 356},
+                                                 {"blank behind", 24},
+                                                 {"unkown option type, discard packet|discard packet", 1}}));
+}
+
+TEST(ValueTables, HaveTheirNumbers) {
+    const Tables &all = tables();
+    ASSERT_EQ(all.valueCount, 4539U);
+    EXPECT_EQ(all.values[4539].poolIndex, 0U);
+    EXPECT_EQ(all.values[4539].displayIndex, 0U);
+    EXPECT_EQ(std::count_if(all.values, all.values + 4539, [](const ValueMapRow &row) { return row.kind == 65536; }), 40);
+
+    // The pool: what each stretch of it holds.
+    for (std::int32_t number = 0; number <= 137; ++number) {
+        EXPECT_EQ(all.pool[number], number);
+    }
+    const auto stretch = [&](std::size_t from, std::size_t to) {
+        return std::vector(all.pool + from, all.pool + to + 1);
+    };
+    using Numbers = std::vector<std::int32_t>;
+    EXPECT_EQ(stretch(138, 139), (Numbers{138, 252}));
+    EXPECT_EQ(stretch(140, 154), (Numbers{5039, 9822, 13809, 19900, 24083, 27618, 30797, 35031, 39544, 44937, 48420, 50539,
+                                          54980, 57909, 61850}));
+    EXPECT_EQ(stretch(155, 156), (Numbers{50, 0}));
+    const Numbers ports = stretch(157, 335);
+    const Numbers carried = stretch(336, 357);
+    EXPECT_EQ((Numbers{ports.front(), ports.back(), carried.front(), carried.back()}), (Numbers{139, 8002, 254, 65535}));
+    EXPECT_TRUE(std::ranges::is_sorted(ports, std::less_equal<>()));
+    EXPECT_TRUE(std::ranges::is_sorted(carried, std::less_equal<>()));
+    EXPECT_EQ(stretch(358, 370),
+              (Numbers{5, 127, 15, 62, 64, 126, 128, 190, 192, 254, 255, 32768, 0}));
+
+    // Each number of the pool but the last is used, and each list stands by rising value with its default in front.
+    std::set<std::uint32_t> used;
+    for (const FieldDescriptor &field : all.rows()) {
+        std::int32_t above = -1;
+        for (std::int32_t i = 0; i < field.valueCount; ++i) {
+            const ValueMapRow &row = all.values[field.valueStart + i];
+            ASSERT_TRUE(row.kind == 1 || row.kind == 65536) << field.fieldId;
+            ASSERT_LT(row.poolIndex, 370U);
+            ASSERT_LT(row.displayIndex, 824U);
+            used.insert(row.poolIndex);
+            if (row.kind == 65536) {
+                used.insert(row.poolIndex + 1);
+            }
+            if (row.kind == 65536 && row.poolIndex == 155) {
+                EXPECT_EQ(i, 0) << field.fieldId;
+                continue;
+            }
+            EXPECT_GT(all.pool[row.poolIndex], above) << field.fieldId;
+            above = all.pool[row.poolIndex + (row.kind == 65536 ? 1 : 0)];
+        }
+    }
+    EXPECT_EQ(used.size(), 370U);
+}
+
+TEST(TextTable, HoldsEachTextOnceInFirstUse) {
+    const Tables &all = tables();
+    ASSERT_EQ(all.textCount, 824U);
+    const std::set<std::string> distinct(all.texts, all.texts + 824);
+    EXPECT_EQ(distinct.size(), 824U);
+    const std::map<std::size_t, const char *> rows = {{2, "Precedence=%-S"}, {3, "Routine"}, {10, "Network Control"},
+                                                      {112, "ISO-IP"},       {209, ""},      {824, "$$_FINAL_STRING_$$"}};
+    for (const auto &[row, words] : rows) {
+        EXPECT_STREQ(all.texts[row], words);
+    }
+    std::uint32_t next = 0;
+    const auto use = [&next](std::uint32_t row) {
+        EXPECT_LE(row, next);
+        next += row == next ? 1 : 0;
+    };
+    for (const FieldDescriptor &field : all.rows()) {
+        use(field.displayIndex);
+        for (std::int32_t i = 0; i < field.valueCount; ++i) {
+            use(all.values[field.valueStart + i].displayIndex);
+        }
+    }
+    EXPECT_EQ(next, 824U);
+
+    // By conversions, those of a list cut down to what stands between "%-[" and "]".
+    std::map<std::string, int> conversions;
+    for (std::size_t row = 0; row < 824; ++row) {
+        std::string found;
+        const std::string_view format = all.texts[row];
+        for (std::size_t at = format.find('%'); at != format.npos; at = format.find('%', at + 1)) {
+            const std::size_t length = format[at + 1] == '-' && format[at + 2] == '[' ? format.find(']', at) - at + 1
+                                       : format[at + 1] == '-'                        ? 3
+                                                                                      : 2;
+            found += (found.empty() ? "" : " ") + std::string(format.substr(at, length));
+            at += length - 1;
+        }
+        ++conversions[found];
+    }
+    EXPECT_EQ(conversions, (std::map<std::string, int>{{"", 597},
+                                                       {"%u", 94},
+                                                       {"%x", 63},
+                                                       {"%-S", 38},
+                                                       {"%-S %u", 4},
+                                                       {R"(%-["%x"])", 12},
+                                                       {R"(%-["%u":"."])", 10},
+                                                       {R"(%-["%x":"."])", 3},
+                                                       {R"(%-["%x":":"])", 1},
+                                                       {"%c", 1},
+                                                       {R"(%-["%c"])", 1}}));
+    const std::map<std::string, int> behind = {{"(dec)", 8}, {" octets", 5}, {"*4 octets", 4}, {" octet(s)", 4},
+                                               {"*8 octet(s)", 2}, {"(th) octet", 1}, {" (msec.)", 1}};
+    for (const auto &[words, count] : behind) {
+        EXPECT_EQ(std::count_if(all.texts, all.texts + 824,
+                                [&](std::string_view format) { return format.ends_with("%u" + words); }),
+                  count)
+            << words;
+    }
+}
+
+// A record as a test writes it: pieces "5-8", count "1", "?" (told by the packet) or "1-16", step.
+Octets layoutRecord(const std::vector<std::pair<int, int>> &pieces, std::pair<int, int> count, int step, int end) {
+    const auto constant = [](int number) { return Octets{0x10, 0, 0, 0, static_cast<std::uint8_t>(number)}; };
+    const auto span = [&](std::pair<int, int> ends) {
+        return ends.first == ends.second ? constant(ends.first)
+                                         : Octets{5} + constant(ends.first) + constant(ends.second);
+    };
+    Octets octets = hex("ff 02 55 01 04") + Octets{static_cast<std::uint8_t>(pieces.size())};
+    for (const auto &piece : pieces) {
+        octets = octets + span(piece);
+    }
+    octets = octets + (count.second == 0 ? hex("08 00 00") : span(count)) + constant(step) +
+             Octets{8, static_cast<std::uint8_t>(end), 0};
+    return Octets{static_cast<std::uint8_t>(octets.size()), 0} + octets;
+}
+
+TEST(LayoutTable, HasItsRecordsAndTheirUsers) {
+    const Tables &all = tables();
+    const std::vector<std::pair<int, int>> octet = {{1, 8}};
+    const struct {
+        std::size_t offset, length;
+        Octets octets;
+        std::uint32_t user; // a field of this layout
+    } telling[] = {
+        {0, 30, layoutRecord({{5, 8}}, {1, 1}, 0, 0), 150},
+        {0x20, 30, layoutRecord({{1, 4}}, {1, 1}, 8, 0), 152},
+        {0x60, 24, layoutRecord({{5, 5}}, {1, 1}, 0, 0), 287},
+        {0xce, 30, layoutRecord(octet, {2, 2}, 8, 0), 153},
+        {0x167, 30, layoutRecord(octet, {1, 1}, 8, 0), 295},
+        {0x187, 30, layoutRecord(octet, {4, 4}, 8, 0), 159},
+        {0x13c, 41, layoutRecord({{1, 5}, {9, 16}}, {1, 1}, 16, 0), 294},
+        {0x269, 41, layoutRecord({{9, 16}, {1, 8}}, {1, 1}, 16, 0), 384},
+        {0x393, 30, layoutRecord({{1, 32}}, {1, 1}, 32, 0), 472},
+        {0x1e7, 30, layoutRecord({{16, 1}}, {8, 8}, 16, 0), 856},
+        {0x4f4, 52, layoutRecord({{9, 12}, {17, 24}, {25, 32}}, {1, 1}, 32, 0), 167},
+        {0x20c, 61, layoutRecord({{1, 4}, {5, 8}, {9, 12}, {13, 16}}, {0, 0}, 16, 1), 958},
+        {0x24b, 28, layoutRecord(octet, {0, 0}, 8, 1), 306},
+        {0x52a, 28, layoutRecord({{1, 4}}, {0, 0}, 4, 1), 229},
+        {0x3b3, 36, layoutRecord(octet, {1, 16}, 8, 0), 478},
+        {0x207, 3, hex("03 00 ff 00 00"), 956},
+    };
+    for (const auto &[offset, length, octets, user] : telling) {
+        EXPECT_EQ(octets.size(), length + 2) << offset;
+        EXPECT_EQ(hexText({all.layouts + offset, octets.size()}), hexText(octets)) << offset;
+        EXPECT_EQ(all.field(user).templateOffset, offset) << user;
+    }
+
+    std::map<std::uint32_t, int> users;
+    std::uint32_t end = 0;
+    for (; all.layouts[end] != 0 || all.layouts[end + 1] != 0; end += 2U + all.layouts[end]) {
+        ASSERT_EQ(all.layouts[end + 1], 0);
+        ASSERT_LT(end, 1453U);
+        users[end] = 0;
+    }
+    EXPECT_EQ(end, 1453U);
+    EXPECT_EQ(users.size(), 44U);
+    std::uint32_t newest = 0;
+    for (const FieldDescriptor &field : all.rows()) {
+        ASSERT_TRUE(users.contains(field.templateOffset)) << field.fieldId;
+        EXPECT_TRUE(users[field.templateOffset]++ != 0 || field.templateOffset >= newest) << field.fieldId;
+        newest = std::max(newest, field.templateOffset);
+    }
+    EXPECT_TRUE(std::ranges::all_of(users, [](const auto &row) { return row.second > 0; }));
+    EXPECT_EQ(users[0x167], 123);
+    EXPECT_EQ(users[0x269], 55);
+}
+
+} // namespace
+} // namespace netfloor::test
