@@ -36,6 +36,30 @@ template <const Field& field, class Pass>
     return at.left >= needs;
 }
 
+// The step of a field that a stretch has made sure of. What the host can see of it is put off.
+template <const Field& field, class Pass, class Store> [[gnu::always_inline]] inline void sureStep(Reader<Pass>& at, Store into) {
+    constexpr const Place& place = field.place;
+    if (!onOctetBorder(at.cursor)) {
+        __builtin_unreachable();
+    }
+    at.showBlock();
+    const std::uint32_t start = at.cursor;
+    if constexpr (!std::is_same_v<Store, Unstored>) {
+        store(into, valueAt<field>(at.data, start, place.count));
+    }
+    at.left -= place.advance;
+    at.cursor += place.advance;
+    at.sureBits -= place.advance;
+    at.unsettled.writer = writeRecord<field>;
+    at.unsettled.cursor = start;
+    at.unsettled.advance = place.advance;
+    Pass::template output<field>(at, start, place.count);
+}
+
+// Whether a stretch can make sure of a field: all of fixed size and tested that move in whole octets.
+template <const Field& field>
+inline constexpr bool canBeSure = !field.place.isRun() && field.place.isTested() && field.place.advance % bitsPerOctet == 0;
+
 // The step of a field of `units` units; see `read` and `readRun`.
 template <const Field& field, class Pass, class Store>
 [[gnu::always_inline]] inline void step(Reader<Pass>& at, std::uint32_t units, Store into) {
@@ -44,6 +68,13 @@ template <const Field& field, class Pass, class Store>
     if (!at.live) {
         return;
     }
+    if constexpr (!Pass::reports && canBeSure<field>) {
+        if (at.sureBits >= neededBits<field>) {
+            return sureStep<field>(at, into);
+        }
+    }
+    at.settle();
+    at.sureBits = 0;
     if (!fits<field>(at, units)) {
         at.live = false;
         return;
@@ -115,6 +146,7 @@ template <const Field& field, class Pass>
 // Looks at the bits of `place` without moving the cursor and without reporting anything; nothing where they
 // are not all left or the run is over. The field record keeps what was seen, under the name of the field before.
 template <class Pass> [[gnu::always_inline]] inline std::optional<std::uint32_t> look(Reader<Pass>& at, const Place& place) {
+    at.settle();
     if (at.over() || at.left < place.needs(place.count) || !at.roomFor(place.count)) {
         return std::nullopt;
     }
@@ -135,6 +167,8 @@ template <class Pass> [[gnu::always_inline]] inline void stepBack(Reader<Pass>& 
     if (at.over()) {
         return;
     }
+    at.settle();
+    at.sureBits = 0;
     at.advance() = -static_cast<std::int32_t>(bitCount);
     if (!at.live || at.cursor < bitCount) {
         at.live = false;
