@@ -30,7 +30,8 @@ std::filesystem::path findPlugin(const std::filesystem::path &asked) {
     }
     std::error_code ignored;
     const auto folder = std::filesystem::read_symlink("/proc/self/exe", ignored).parent_path();
-    const std::array<std::filesystem::path, 2> places = {folder / NETFLOOR_BUILT_PLUGIN, folder / NETFLOOR_INSTALLED_PLUGIN};
+    const std::array<std::filesystem::path, 2> places = {folder / NETFLOOR_BUILT_PLUGIN,
+                                                         folder / NETFLOOR_INSTALLED_PLUGIN};
     for (const auto &place : places) {
         if (std::filesystem::exists(place, ignored)) {
             return place.lexically_normal();

@@ -38,6 +38,18 @@ constexpr std::array usualMarks = {
     UsualMark{NETFLOOR_FLAG_BITS_LEFT_OVER, 490, 490, 32, "a UDP payload of at most 4 octets stays unread"},
 };
 
+// Limits that reach a little further than the length they are taken from: a mark of a packet that ends there, as long
+// as it holds all that the length says.
+struct WideLimit {
+    std::uint32_t lengthFieldId;
+    std::uint32_t bitsInFront; // that the length counts and that stand in front of its field
+    std::string_view text;
+};
+
+constexpr std::array wideLimits = {
+    WideLimit{824, 16, "an SCTP INIT at the end of a packet leaves it, as its limit lies one octet further"},
+};
+
 std::uint32_t lastBitOf(const FieldReport &field) {
     std::uint32_t last = 0;
     for (const ReportedRange &range : field.ranges) {
@@ -85,7 +97,8 @@ std::string placeText(const Place &place, const Report &detail) {
     }
     std::string text;
     if (place.skippedBits != 0) {
-        text = ": " + std::to_string(place.skippedBits / bitsPerOctet) + " octets";
+        const std::uint32_t octets = place.skippedBits / bitsPerOctet;
+        text = ": " + std::to_string(octets) + (octets == 1 ? " octet" : " octets");
     }
     const auto nameStart = place.behind->name.find_first_not_of(' ');
     text += " behind '" + (nameStart == std::string::npos ? place.behind->name : place.behind->name.substr(nameStart)) +
@@ -96,25 +109,52 @@ std::string placeText(const Place &place, const Report &detail) {
     return text;
 }
 
+// Whether the flag that a limit leaves comes from one that is wide, in a packet that is whole.
+const WideLimit *wideLimitOf(const Report &detail) {
+    for (const WideLimit &limit : wideLimits) {
+        for (const FieldReport &field : detail.fields) {
+            if (field.id == limit.lengthFieldId && !field.ranges.empty() &&
+                field.ranges.front().firstBit - limit.bitsInFront + field.value * bitsPerOctet <= detail.cursor) {
+                return &limit;
+            }
+        }
+    }
+    return nullptr;
+}
+
+Mark explain(std::uint32_t flag, const Report &detail) {
+    Mark mark{flag, MarkKind::damage, flagNames(flag).front()};
+    if (flag == NETFLOOR_FLAG_LIMIT_TOO_LONG) {
+        if (const WideLimit *const wide = wideLimitOf(detail)) {
+            return {flag, MarkKind::byDesign, std::string(wide->text)};
+        }
+        return mark;
+    }
+    const bool isGap = flag == NETFLOOR_FLAG_BITS_LEFT_OVER;
+    mark.kind = isGap ? MarkKind::unread : MarkKind::damage;
+    const auto place = isGap ? placeOfGap(detail) : placeOfFlag(flag, detail);
+    if (!place || place->behind == nullptr) {
+        return mark;
+    }
+    const auto *const usual = std::find_if(usualMarks.begin(), usualMarks.end(), [&](const UsualMark &row) {
+        return row.flag == flag && row.firstFieldId <= place->behind->id && place->behind->id <= row.lastFieldId &&
+               place->skippedBits <= row.mostSkippedBits;
+    });
+    if (usual != usualMarks.end()) {
+        return {flag, MarkKind::byDesign, std::string(usual->text)};
+    }
+    mark.text += placeText(*place, detail);
+    return mark;
+}
+
 } // namespace
 
 std::vector<Mark> explainFlags(std::uint32_t flags, const Report &detail) {
     std::vector<Mark> marks;
     for (std::uint32_t flag = 1; flag != 0; flag <<= 1U) {
-        if ((flags & flag) == 0) {
-            continue;
+        if ((flags & flag) != 0) {
+            marks.push_back(explain(flag, detail));
         }
-        const auto place = flag == NETFLOOR_FLAG_BITS_LEFT_OVER ? placeOfGap(detail) : placeOfFlag(flag, detail);
-        Mark mark{flag, false, flagNames(flag).front()};
-        if (place && place->behind != nullptr) {
-            const auto *const usual = std::find_if(usualMarks.begin(), usualMarks.end(), [&](const UsualMark &row) {
-                return row.flag == flag && row.firstFieldId <= place->behind->id &&
-                       place->behind->id <= row.lastFieldId && place->skippedBits <= row.mostSkippedBits;
-            });
-            mark.byDesign = usual != usualMarks.end();
-            mark.text += mark.byDesign ? ": " + std::string(usual->text) : placeText(*place, detail);
-        }
-        marks.push_back(std::move(mark));
     }
     return marks;
 }

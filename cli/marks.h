@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: MIT
-// What the flags of a verdict mean: damage, or a mark that some packets carry by design.
+// What the flags of a verdict mean. A plug-in raises one bit for many reasons, and some packets carry a mark although
+// nothing is wrong with them; where the mark was raised tells one from the other.
 #pragma once
 
 #include <cstdint>
@@ -10,14 +11,20 @@
 
 namespace netfloor::cli {
 
-struct Mark {
-    std::uint32_t flag = 0;
-    bool byDesign = false;
-    std::string text; // what the flag says and where it was raised
+// In the order in which they count: a packet is what the worst of its marks is.
+enum class MarkKind : std::uint8_t {
+    byDesign, // says nothing against the packet
+    unread,   // octets inside a length that the plug-in reads no field from: surplus, or a form that it does not know
+    damage,
 };
 
-// One mark for each bit of the flags of an MV report. `detail` is the MD report of the same packet, which tells
-// where they were raised.
+struct Mark {
+    std::uint32_t flag = 0;
+    MarkKind kind = MarkKind::damage;
+    std::string text; // what the flag says, and where it was raised
+};
+
+// One mark for each bit of the flags of an MV report. `detail` is the MD report of the same packet.
 [[nodiscard]] std::vector<Mark> explainFlags(std::uint32_t flags, const Report &detail);
 
 } // namespace netfloor::cli

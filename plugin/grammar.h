@@ -34,7 +34,7 @@ struct Grammar {
     template <const Field& field> static constexpr std::uint32_t keyRow = keyRowOf(field);
 
     // One packet, from its version on. With a version other than 4 and 6 nothing further is read.
-    template <class Pass> [[gnu::always_inline]] static void packet(Reader<Pass>& at) {
+    template <class Pass> NETFLOOR_INLINE static void packet(Reader<Pass>& at) {
         auto& variables = at.variables();
         const Block<Pass> ip{at, "Ip"};
         const Block<Pass> header{at, "Ip Header"};

@@ -11,8 +11,6 @@
 #include <string>
 #include <vector>
 
-#include <zlib.h>
-
 namespace netfloor::cli {
 
 // The file cannot be used at all. what() is a sentence for the user: what is wrong and what to do.
@@ -25,6 +23,9 @@ class OctetStream {
 public:
     // "-" is standard input. Throws CaptureError.
     explicit OctetStream(const std::string &path);
+    ~OctetStream();
+    OctetStream(const OctetStream &) = delete;
+    OctetStream &operator=(const OctetStream &) = delete;
 
     // The next octets, which stay unread; fewer than `count` at the end of the stream.
     [[nodiscard]] std::span<const std::uint8_t> peek(std::size_t count);
@@ -43,20 +44,24 @@ public:
 
     // Whether the octets come from a program or a user as they are made.
     [[nodiscard]] bool isLive() const { return live_; }
-    [[nodiscard]] bool isPacked() const { return packed_; }
+    [[nodiscard]] bool isPacked() const { return unpacker_ != nullptr; }
 
 private:
+    class Unpacker;
+
     void fill(std::size_t count);
+    [[nodiscard]] std::size_t readFile(std::span<std::uint8_t> octets);
 
     std::string name_;
-    std::unique_ptr<gzFile_s, int (*)(gzFile)> file_;
+    int file_;
     std::vector<std::uint8_t> buffer_;
     std::size_t begin_ = 0; // of what is unread in buffer_
     std::size_t end_ = 0;
     std::uint64_t position_ = 0;
-    std::uint64_t fileOctets_ = 0;
+    std::uint64_t fileOctets_ = 0; // 0 where it is not known
+    std::uint64_t filePosition_ = 0;
     bool live_ = false;
-    bool packed_ = false;
+    std::unique_ptr<Unpacker> unpacker_; // none for a plain file
     std::string error_;
 };
 

@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <array>
 #include <cstdio>
+#include <string_view>
 
 #include "marks.h"
 #include "printers/printer.h"
@@ -14,20 +15,22 @@ namespace {
 // What a packet is found to be. The verdict of the pass tells the first from all others.
 enum class Finding : std::uint8_t {
     good,
-    byDesign, // flags that say nothing against the packet
-    cut,      // flags, in a packet that the capture has cut: they say nothing about the packet on the wire
+    byDesign, // marks that say nothing against the packet
+    unread,   // octets that no field covers
+    cut,      // damage in a packet that the capture has cut: it says nothing about the packet on the wire
     damaged,
 };
 
 struct FindingWords {
-    const char *verdict;
-    const char *total;
+    std::string_view verdict;
+    std::string_view total;
     Style style;
 };
 
-constexpr std::array<FindingWords, 4> words = {{
+constexpr std::array<FindingWords, 5> words = {{
     {"good", "good", Style::good},
     {"good", "good with marks by design", Style::good},
+    {"unread", "with octets unread", Style::warning},
     {"cut", "with marks, but cut by the snap length", Style::warning},
     {"DAMAGED", "damaged", Style::bad},
 }};
@@ -59,7 +62,7 @@ public:
         for (std::size_t i = 0; i < words.size(); ++i) {
             if (counts_[i] != 0 || i == 0) {
                 out() << (first ? "" : ", ");
-                out().styled(words[i].style, std::to_string(counts_[i]) + " " + words[i].total);
+                out().styled(words[i].style, std::to_string(counts_[i]) + " " + std::string(words[i].total));
                 first = false;
             }
         }
@@ -82,6 +85,9 @@ private:
 
         const FindingWords &found = words[static_cast<std::size_t>(finding)];
         out().styled(found.style, found.verdict);
+        if (!marks.empty()) {
+            out().blanks(words.back().verdict.size() - found.verdict.size());
+        }
         if (report.ending == Ending::cutOff) {
             out() << "  the pass was cut off";
         }
@@ -89,7 +95,7 @@ private:
             std::array<char, 16> flag{};
             std::snprintf(flag.data(), flag.size(), "  0x%x ", mark.flag);
             out() << flag.data() << mark.text;
-            if (mark.byDesign) {
+            if (mark.kind == MarkKind::byDesign) {
                 out().styled(Style::dim, " (by design)");
             }
         }
@@ -105,8 +111,14 @@ private:
         if (!report.verdict.fault()) {
             return Finding::good;
         }
-        if (std::all_of(marks.begin(), marks.end(), [](const Mark &mark) { return mark.byDesign; })) {
-            return Finding::byDesign;
+        MarkKind worst = MarkKind::byDesign;
+        for (const Mark &mark : marks) {
+            worst = std::max(worst, mark.kind);
+        }
+        switch (worst) {
+        case MarkKind::byDesign: return Finding::byDesign;
+        case MarkKind::unread: return Finding::unread;
+        case MarkKind::damage: break;
         }
         return isCut ? Finding::cut : Finding::damaged;
     }

@@ -9,12 +9,14 @@
 #include <array>
 #include <cstdint>
 
+#include "frame/inline.h"
+
 namespace netfloor {
 
 inline constexpr std::uint32_t bitsPerOctet = 8;
 
 // Reads the bits `first` to `last`, at most 32, where first is not above last.
-[[nodiscard, gnu::always_inline]] constexpr std::uint32_t bitsAscending(const std::uint8_t* data, std::uint32_t first, std::uint32_t last) {
+[[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t bitsAscending(const std::uint8_t* data, std::uint32_t first, std::uint32_t last) {
     const std::uint32_t low = first - 1;
     const std::uint32_t high = last - 1;
     std::uint64_t gathered = 0;
@@ -35,7 +37,7 @@ inline constexpr std::uint32_t bitsPerOctet = 8;
 }
 
 // Reads the bits between `first` and `last`; where first is above last, in reverse order.
-[[nodiscard, gnu::always_inline]] constexpr std::uint32_t bits(const std::uint8_t* data, std::uint32_t first, std::uint32_t last) {
+[[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t bits(const std::uint8_t* data, std::uint32_t first, std::uint32_t last) {
     if (static_cast<std::int32_t>(first) <= static_cast<std::int32_t>(last)) {
         return bitsAscending(data, first, last);
     }
@@ -43,7 +45,7 @@ inline constexpr std::uint32_t bitsPerOctet = 8;
 }
 
 // True where a bit number is the first of an octet.
-[[nodiscard, gnu::always_inline]] constexpr bool onOctetBorder(std::uint32_t bit) {
+[[nodiscard]] NETFLOOR_INLINE constexpr bool onOctetBorder(std::uint32_t bit) {
     return (bit - 1) % bitsPerOctet == 0;
 }
 
@@ -53,7 +55,7 @@ inline constexpr std::uint32_t bitsPerOctet = 8;
 }
 
 // Reads the 8 bits from bit number `first` on, wherever they lie.
-[[nodiscard, gnu::always_inline]] constexpr std::uint32_t octetAt(const std::uint8_t* data, std::uint32_t first) {
+[[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t octetAt(const std::uint8_t* data, std::uint32_t first) {
     if (onOctetBorder(first)) [[likely]] {
         return data[(first - 1) / bitsPerOctet];
     }
@@ -62,7 +64,7 @@ inline constexpr std::uint32_t bitsPerOctet = 8;
 
 // Reads the bits `low` to `high` behind `cursor`. On an octet border their octets and shifts are constants.
 template <std::uint32_t low, std::uint32_t high>
-[[nodiscard, gnu::always_inline]] constexpr std::uint32_t pieceAt(const std::uint8_t* data, std::uint32_t cursor) {
+[[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t pieceAt(const std::uint8_t* data, std::uint32_t cursor) {
     if (!onOctetBorder(cursor)) [[unlikely]] {
         return bitsAcross(data, cursor + low, cursor + high);
     }
@@ -86,7 +88,7 @@ template <std::uint32_t low, std::uint32_t high>
 }
 
 // Reads `count` octets from bit number `first` on in network order; of more than four the last four stay.
-[[nodiscard, gnu::always_inline]] constexpr std::uint32_t octetsAt(const std::uint8_t* data, std::uint32_t first, std::uint32_t count) {
+[[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t octetsAt(const std::uint8_t* data, std::uint32_t first, std::uint32_t count) {
     if (!onOctetBorder(first)) [[unlikely]] {
         return octetsAcross(data, first, count);
     }

@@ -11,14 +11,14 @@ namespace netfloor {
 // A block.
 template <class Pass> class [[nodiscard]] Block {
 public:
-    [[gnu::always_inline]] Block(Reader<Pass>& reader, BlockName name) : at_(reader), outer_(reader.block) {
+    NETFLOOR_INLINE Block(Reader<Pass>& reader, BlockName name) : at_(reader), outer_(reader.block) {
         at_.block = name;
         if (!at_.over()) {
             at_.openBlock();
         }
     }
 
-    [[gnu::always_inline]] ~Block() {
+    NETFLOOR_INLINE ~Block() {
         at_.block = outer_;
         if (!at_.over()) {
             at_.closeBlock();
@@ -39,7 +39,7 @@ private:
 template <class Pass> class [[nodiscard]] LimitedBlock {
 public:
     // Opens the block; `limit` must follow, once the length is known.
-    [[gnu::always_inline]] LimitedBlock(Reader<Pass>& reader, BlockName name)
+    NETFLOOR_INLINE LimitedBlock(Reader<Pass>& reader, BlockName name)
         : at_(reader), outer_(reader.block), outerLive_(reader.live) {
         at_.block = name;
         if (!at_.over() && at_.openBlock()) {
@@ -48,20 +48,20 @@ public:
     }
 
     // Opens the block with a length in bits.
-    [[gnu::always_inline]] LimitedBlock(Reader<Pass>& reader, BlockName name, std::uint32_t bitCount)
+    NETFLOOR_INLINE LimitedBlock(Reader<Pass>& reader, BlockName name, std::uint32_t bitCount)
         : LimitedBlock(reader, name) {
         limit(bitCount);
     }
 
     // Sets the limit. A length that reaches behind the bits left does not narrow anything: the block is read
     // as far as bits last, and the enclosing production reads no further.
-    [[gnu::always_inline]] void limit(std::uint32_t bitCount) {
+    NETFLOOR_INLINE void limit(std::uint32_t bitCount) {
         if (!at_.over() && !at_.narrow(bitCount)) {
             outerLive_ = false;
         }
     }
 
-    [[gnu::always_inline]] ~LimitedBlock() {
+    NETFLOOR_INLINE ~LimitedBlock() {
         at_.block = outer_;
         if (at_.over()) {
             return;
@@ -86,10 +86,10 @@ private:
 // its end leaves the same as if each link had been a call.
 template <class Pass> class [[nodiscard]] BlockChain {
 public:
-    [[gnu::always_inline]] explicit BlockChain(Reader<Pass>& reader) : at_(reader), outer_(reader.block) {}
+    NETFLOOR_INLINE explicit BlockChain(Reader<Pass>& reader) : at_(reader), outer_(reader.block) {}
 
     // Opens the next block, inside the others.
-    [[gnu::always_inline]] void open(BlockName name) {
+    NETFLOOR_INLINE void open(BlockName name) {
         at_.block = name;
         if (!at_.over() && at_.openBlock()) {
             ++blocks_;
@@ -98,7 +98,7 @@ public:
 
     // Opens the next block with a length in bits, as a LimitedBlock does. Nothing is read behind a chain with
     // such a block, so that no outer live flag is kept.
-    [[gnu::always_inline]] void openLimited(BlockName name, std::uint32_t bitCount) {
+    NETFLOOR_INLINE void openLimited(BlockName name, std::uint32_t bitCount) {
         open(name);
         if (!at_.over()) {
             at_.live = true;
@@ -109,7 +109,7 @@ public:
 
     // Closing a block touches neither cursor nor limit, so that it does not matter which blocks a limit stands
     // between: the limits are swept first, innermost first.
-    [[gnu::always_inline]] ~BlockChain() {
+    NETFLOOR_INLINE ~BlockChain() {
         for (; limits_ > 0 && !at_.over(); --limits_) {
             at_.sweep();
             at_.popLimit();
@@ -140,7 +140,7 @@ template <auto production, class Pass> [[gnu::noinline]] void outOfLine(Reader<P
     reader = at;
 }
 
-template <auto production, class Pass> [[gnu::always_inline]] inline void apart(Reader<Pass>& at) {
+template <auto production, class Pass> NETFLOOR_INLINE inline void apart(Reader<Pass>& at) {
     if (!at.live) {
         return;
     }

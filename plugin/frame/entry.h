@@ -38,7 +38,7 @@ namespace netfloor {
 
 // Clears the variables of a pass, piece by piece: for all at once the compiler takes a string instruction, which
 // starts slowly.
-template <class Variables> [[gnu::always_inline]] inline void clear(Variables& variables) {
+template <class Variables> NETFLOOR_INLINE inline void clear(Variables& variables) {
     static_assert(std::is_trivially_copyable_v<Variables>);
     constexpr std::size_t piece = 32;
     auto* const octets = reinterpret_cast<unsigned char*>(&variables);
@@ -48,7 +48,7 @@ template <class Variables> [[gnu::always_inline]] inline void clear(Variables& v
 }
 
 // Runs one pass over one layer. Nothing when the pass is refused before it starts.
-template <class Pass, class Grammar> [[gnu::always_inline]] inline std::optional<Outcome> runPass(typename Pass::Context& context) {
+template <class Pass, class Grammar> NETFLOOR_INLINE inline std::optional<Outcome> runPass(typename Pass::Context& context) {
     DecodeState& state = *context.decodeState;
     clear(Pass::variables);
     if (!Pass::enter(context)) {

@@ -26,6 +26,7 @@ struct Field {
     std::string_view line;             // the display line, with its conversions
     const ValueNames* names = noNames; // what %-S and %-s take
     std::string_view shortText = asInLine; // the text of the TO pass
+    std::string_view title = {};           // the name in the field table, where it is another one
 
     // The text of the TO pass.
     [[nodiscard]] constexpr std::string_view display() const {
@@ -36,9 +37,15 @@ struct Field {
         return !names->rows.empty();
     }
 
-    // The name as the tables hold it: without its leading blanks.
+    // The name by which fields are told apart: without its leading blanks.
     [[nodiscard]] constexpr std::string_view tableName() const {
         return name.substr(std::min(name.find_first_not_of(' '), name.size()));
+    }
+
+    // The name without the blanks on both sides.
+    [[nodiscard]] constexpr std::string_view bareName() const {
+        const std::string_view trimmed = tableName();
+        return trimmed.substr(0, trimmed.find_last_not_of(' ') + 1);
     }
 };
 

@@ -45,7 +45,7 @@ inline constexpr std::uint32_t signallingPort = 3452;
 
 // Tells the next layer how many octets it has, and how many of the IPv4 datagram stand in front of them. Over
 // IPv6 the latter is the negated payload, as no Total Length was read.
-template <class Pass> [[gnu::always_inline]] inline void tellNextLayer(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void tellNextLayer(Reader<Pass>& at) {
     const auto& variables = at.variables();
     const auto payloadOctets = static_cast<std::uint32_t>(variables.payloadOctets);
     at.state->scratch[NETFLOOR_NEXT_LAYER_OCTETS] = payloadOctets;
@@ -54,7 +54,7 @@ template <class Pass> [[gnu::always_inline]] inline void tellNextLayer(Reader<Pa
 
 // Hands the rest of the packet to the owner of the next layer. The XTR pass ends here; the others come back
 // with the cursor where the next layer left it.
-template <class Pass> [[gnu::always_inline]] inline void handOff(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void handOff(Reader<Pass>& at) {
     if (!at.live) {
         return;
     }

@@ -32,16 +32,16 @@ public:
 
     using Buffer = std::array<char, most + 1 + slack>;
 
-    [[gnu::always_inline]] explicit Line(Buffer& buffer) : text_(buffer.data()), end_(text_) {}
+    NETFLOOR_INLINE explicit Line(Buffer& buffer) : text_(buffer.data()), end_(text_) {}
 
     // Appends a text whose length is known where it is written.
-    template <std::size_t size> [[gnu::always_inline]] void appendLiteral(const char* text) {
+    template <std::size_t size> NETFLOOR_INLINE void appendLiteral(const char* text) {
         std::memcpy(end_, text, size);
         end_ += size;
     }
 
     // Appends a number as a conversion shows it. A zero octet adds no character, as it would end the text.
-    template <Conversion conversion, std::uint32_t bitCount> [[gnu::always_inline]] void appendNumber(std::uint32_t value) {
+    template <Conversion conversion, std::uint32_t bitCount> NETFLOOR_INLINE void appendNumber(std::uint32_t value) {
         if constexpr (conversion == Conversion::character) {
             *end_ = static_cast<char>(value);
             end_ += *end_ == '\0' ? 0 : 1;
@@ -57,7 +57,7 @@ public:
     }
 
     // Appends the name of a value; a name that is a format is filled with the value.
-    template <const ValueNames& names, bool brief> [[gnu::always_inline]] void appendName(std::uint32_t value) {
+    template <const ValueNames& names, bool brief> NETFLOOR_INLINE void appendName(std::uint32_t value) {
         static constexpr Format otherwise = parseFormat(otherName(names, brief));
         static_assert(otherwise.wellFormed && otherwise.conversions <= 1, "the name of other values takes one number at most");
         const std::uint32_t row = rowNumber<names>(value);
@@ -76,7 +76,7 @@ public:
 
     // Appends the elements of a field; stops at the end of the buffer.
     template <Conversion conversion, std::uint32_t bitCount>
-    [[gnu::always_inline]] void appendElements(const BitRange* ranges, std::uint32_t count, std::string_view separator) {
+    NETFLOOR_INLINE void appendElements(const BitRange* ranges, std::uint32_t count, std::string_view separator) {
         for (std::uint32_t element = 0; element < count && !full(); ++element) {
             if (element > 0) {
                 std::memcpy(end_, separator.data(), separator.size());
@@ -86,12 +86,12 @@ public:
         }
     }
 
-    [[nodiscard, gnu::always_inline]] bool full() const {
+    [[nodiscard]] NETFLOOR_INLINE bool full() const {
         return end_ > text_ + most;
     }
 
     // Ends the text, and gives it.
-    [[gnu::always_inline]] const char* terminated() {
+    NETFLOOR_INLINE const char* terminated() {
         text_[std::min<std::size_t>(static_cast<std::size_t>(end_ - text_), most)] = '\0';
         return text_;
     }
@@ -102,7 +102,7 @@ private:
 };
 
 template <const Field& field, const Format& format, std::size_t index>
-[[gnu::always_inline]] inline void appendConversion(Line& line, std::uint32_t value, const FieldRecord& record) {
+NETFLOOR_INLINE inline void appendConversion(Line& line, std::uint32_t value, const FieldRecord& record) {
     constexpr Conversion conversion = format.conversion[index];
     if constexpr (conversion == Conversion::name || conversion == Conversion::briefName) {
         line.appendName<*field.names, conversion == Conversion::briefName>(value);
@@ -116,7 +116,7 @@ template <const Field& field, const Format& format, std::size_t index>
 
 // Builds the text of a field. Behind the elements of a run there may be no room for more.
 template <const Field& field, const Format& format>
-[[gnu::always_inline]] inline void fill(Line& line, std::uint32_t value, const FieldRecord& record) {
+NETFLOOR_INLINE inline void fill(Line& line, std::uint32_t value, const FieldRecord& record) {
     static_assert(format.literal[0].size() <= Line::most, "a field's name fills no line");
     line.appendLiteral<format.literal[0].size()>(format.literal[0].data());
     if constexpr (format.conversions > 0) {

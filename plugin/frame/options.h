@@ -42,7 +42,7 @@ template <const auto& types> inline constexpr auto turnOf = turnsOf(types);
 
 // Looks whose turn, from `turn` on, takes the option under the cursor: types.size() where none does.
 template <const auto& types, class Pass>
-[[nodiscard, gnu::always_inline]] inline std::size_t nextTaker(Reader<Pass>& at, std::size_t turn) {
+[[nodiscard]] NETFLOOR_INLINE inline std::size_t nextTaker(Reader<Pass>& at, std::size_t turn) {
     const std::optional<std::uint32_t> type = look(at, octets(1));
     if (!type || turnOf<types>[*type] < turn) {
         return types.size();
@@ -52,7 +52,7 @@ template <const auto& types, class Pass>
 
 // An option of one octet.
 template <const Field& type, class Pass>
-[[gnu::always_inline]] inline void optionOfOneOctet(Reader<Pass>& at, BlockName name, OptionArea& area) {
+NETFLOOR_INLINE inline void optionOfOneOctet(Reader<Pass>& at, BlockName name, OptionArea& area) {
     const Block<Pass> option{at, name};
     read<type>(at);
     if (at.live) {
@@ -67,7 +67,7 @@ inline constexpr std::int32_t countsByLength = -1;
 // An option with a length, which is read ahead as the block's limit. Only an option whose length reaches behind
 // itself counts as taken. `data` reads what stands behind the length.
 template <const Field& type, const Field& length, std::int32_t counts = countsByLength, class Pass, class Data>
-[[gnu::always_inline]] inline void optionWithLength(Reader<Pass>& at, BlockName name, OptionArea& area, Data data) {
+NETFLOOR_INLINE inline void optionWithLength(Reader<Pass>& at, BlockName name, OptionArea& area, Data data) {
     LimitedBlock<Pass> option{at, name};
     option.limit(look(at, piece(8, 15)).value_or(0) * bitsPerOctet);
     std::int32_t lengthOctets = 0;

@@ -94,7 +94,7 @@ template <class Grammar, std::uint32_t mode> struct PreDecodePass {
 template <class Grammar> struct MdPass : PreDecodePass<Grammar, NETFLOOR_MODE_MD> {
     static inline constinit Line::Buffer buffer{};
 
-    template <const Field& field> [[gnu::always_inline]] static void output(Reader<MdPass>& at, std::uint32_t value) {
+    template <const Field& field> NETFLOOR_INLINE static void output(Reader<MdPass>& at, std::uint32_t value) {
         static constexpr Format format = parseFormat(field.line);
         const FieldRecord& record = at.state->fieldRecord;
         std::uint8_t* const decoded = at.context->fieldRecords + at.context->fieldRecordCount * decodedFieldOctets;
@@ -114,7 +114,7 @@ template <class Grammar> struct MdPass : PreDecodePass<Grammar, NETFLOOR_MODE_MD
 template <class Grammar> struct ToPass : PreDecodePass<Grammar, NETFLOOR_MODE_TO> {
     static inline constinit Line::Buffer buffer{};
 
-    template <const Field& field> [[gnu::always_inline]] static void output(Reader<ToPass>& at, std::uint32_t value) {
+    template <const Field& field> NETFLOOR_INLINE static void output(Reader<ToPass>& at, std::uint32_t value) {
         static constexpr Format format = parseFormat(field.display());
         Line line(buffer);
         fill<field, format>(line, value, at.state->fieldRecord);
@@ -124,7 +124,7 @@ template <class Grammar> struct ToPass : PreDecodePass<Grammar, NETFLOOR_MODE_TO
 
 // MV: the verdict.
 template <class Grammar> struct MvPass : PreDecodePass<Grammar, NETFLOOR_MODE_MV> {
-    template <const Field& field> [[gnu::always_inline]] static void output(Reader<MvPass>& at, std::uint32_t, std::uint32_t) {
+    template <const Field& field> NETFLOOR_INLINE static void output(Reader<MvPass>& at, std::uint32_t, std::uint32_t) {
         at.check();
     }
 };
@@ -168,7 +168,7 @@ template <class Grammar> struct XtrPass {
         return Outcome::stopped;
     }
 
-    template <const Field& field> [[gnu::always_inline]] static void output(Reader<XtrPass>& at, std::uint32_t start, std::uint32_t units) {
+    template <const Field& field> NETFLOOR_INLINE static void output(Reader<XtrPass>& at, std::uint32_t start, std::uint32_t units) {
         constexpr std::uint32_t row = Grammar::template keyRow<field>;
         if constexpr (row != Grammar::noKeyRow) {
             const KeyFieldRow& key = Grammar::keyRows[row];
@@ -185,13 +185,13 @@ template <class Grammar> struct XtrPass {
     }
 
 private:
-    [[gnu::always_inline]] static void markPresent(const XtrContext& context, const KeyFieldRow& row) {
+    NETFLOOR_INLINE static void markPresent(const XtrContext& context, const KeyFieldRow& row) {
         std::uint8_t& presence = context.keyRecord[row.presenceOffset];
         presence = static_cast<std::uint8_t>(presence | row.presenceMask);
     }
 
     template <const Field& field>
-    [[gnu::always_inline]] static void storeNumber(Reader<XtrPass>& at, const KeyFieldRow& row, std::uint32_t start, std::uint32_t units) {
+    NETFLOOR_INLINE static void storeNumber(Reader<XtrPass>& at, const KeyFieldRow& row, std::uint32_t start, std::uint32_t units) {
         constexpr std::uint32_t width = field.place.width();
         static_assert(width > 0 && width <= 32, "a key field is a number of up to 32 bits, or an address");
         using Stored = std::conditional_t<width <= 8, std::uint8_t, std::conditional_t<width <= 16, std::uint16_t, std::uint32_t>>;

@@ -166,6 +166,11 @@ constexpr Place pieces(Piece first, Piece second, Piece third, Piece fourth) {
     return {.shape = Shape::pieces, .count = 4, .pieces = {first, second, third, fourth}};
 }
 
+// Two octets in network order, as two pieces. Unlike octets(2) it has a layout record of its own.
+constexpr Place octetPair() {
+    return pieces({0, 7}, {8, 15}).advancing(16);
+}
+
 // `count` octets in network order.
 constexpr Place octets(std::uint32_t count) {
     return {.shape = Shape::octets, .count = count, .advance = count * bitsPerOctet};

@@ -49,7 +49,7 @@ struct BlockName {
     template <std::size_t octets> consteval BlockName(const char (&literal)[octets]) : text(literal), size(octets - 1) {}
 
     // Copies the name and its terminating zero.
-    [[gnu::always_inline]] void copyTo(char* buffer) const {
+    NETFLOOR_INLINE void copyTo(char* buffer) const {
         std::memcpy(buffer, text, size + 1);
     }
 };
@@ -105,37 +105,37 @@ public:
     std::uint32_t sureBlocks = 0; // blocks that there is room for
     Unsettled unsettled = {};
 
-    [[gnu::always_inline]] explicit Reader(Context& passContext) : context(&passContext), state(passContext.decodeState) {
+    NETFLOOR_INLINE explicit Reader(Context& passContext) : context(&passContext), state(passContext.decodeState) {
         takeState();
     }
 
-    [[gnu::always_inline]] static typename Pass::Variables& variables() {
+    NETFLOOR_INLINE static typename Pass::Variables& variables() {
         return Pass::variables;
     }
 
     // The last condition of the grammar, and the bits of its last step. They live in the state.
-    [[nodiscard, gnu::always_inline]] std::uint8_t& condition() {
+    [[nodiscard]] NETFLOOR_INLINE std::uint8_t& condition() {
         return state->condition;
     }
 
-    [[nodiscard, gnu::always_inline]] std::int32_t& advance() {
+    [[nodiscard]] NETFLOOR_INLINE std::int32_t& advance() {
         return state->advance;
     }
 
     // Keeps a condition of the grammar as the last one, and gives it back.
-    [[gnu::always_inline]] bool test(bool holds) {
+    NETFLOOR_INLINE bool test(bool holds) {
         if (!over()) {
             state->condition = holds ? 1 : 0;
         }
         return holds;
     }
 
-    [[gnu::always_inline]] static LastRead& last() {
+    NETFLOOR_INLINE static LastRead& last() {
         return Pass::last;
     }
 
     // Raises a mark, if the pass does.
-    [[gnu::always_inline]] void mark(Mark found) {
+    NETFLOOR_INLINE void mark(Mark found) {
         if (over() || !Pass::raises(found)) {
             return;
         }
@@ -146,25 +146,25 @@ public:
     }
 
     // The verdict check: a flag that is set becomes the verdict, in the pass that gives one.
-    [[gnu::always_inline]] void check() {
+    NETFLOOR_INLINE void check() {
         if (unchecked) {
             Pass::giveVerdict(*context);
             unchecked = false;
         }
     }
 
-    [[nodiscard, gnu::always_inline]] bool over() const {
+    [[nodiscard]] NETFLOOR_INLINE bool over() const {
         return outcome != Outcome::on;
     }
 
     // Ends the run: nothing has an effect from here on.
-    [[gnu::always_inline]] void end(Outcome how) {
+    NETFLOOR_INLINE void end(Outcome how) {
         live = false;
         outcome = how;
     }
 
     // Takes over what the state says: at the entry, and behind a hand-off.
-    [[gnu::always_inline]] void takeState() {
+    NETFLOOR_INLINE void takeState() {
         data = state->data;
         cursor = state->cursor;
         left = state->bitsLeft;
@@ -177,7 +177,7 @@ public:
     }
 
     // Writes what a stretch has put off.
-    [[gnu::always_inline]] void settle() {
+    NETFLOOR_INLINE void settle() {
         if (unsettled.writer != nullptr) {
             condition() = 1;
             advance() = static_cast<std::int32_t>(unsettled.advance);
@@ -192,14 +192,14 @@ public:
     }
 
     // What was sure is no longer: the reader comes from elsewhere, where all was settled.
-    [[gnu::always_inline]] void forget() {
+    NETFLOOR_INLINE void forget() {
         sureBits = 0;
         sureBlocks = 0;
         unsettled = {};
     }
 
     // Gives the state all that the reader holds: wherever the host can look.
-    [[gnu::always_inline]] void giveState() {
+    NETFLOOR_INLINE void giveState() {
         settle();
         writeLastRead();
         if (!Pass::reports && shown.text != nullptr) {
@@ -210,13 +210,13 @@ public:
         givePosition();
     }
 
-    [[gnu::always_inline]] void givePosition() {
+    NETFLOOR_INLINE void givePosition() {
         state->cursor = cursor;
         state->bitsLeft = left;
     }
 
     // Brings the field record up to date: before the packet's working copy or the record changes.
-    [[gnu::always_inline]] void writeLastRead() {
+    NETFLOOR_INLINE void writeLastRead() {
         if (Pass::reports) {
             return;
         }
@@ -232,7 +232,7 @@ public:
     }
 
     // What a look ahead leaves in the field record: value and elements, under the name of the field before.
-    [[gnu::always_inline]] std::uint32_t writeSeen(std::uint32_t first, std::uint32_t pieceCount, std::uint32_t width) {
+    NETFLOOR_INLINE std::uint32_t writeSeen(std::uint32_t first, std::uint32_t pieceCount, std::uint32_t width) {
         FieldRecord& record = state->fieldRecord;
         record.value = 0;
         for (std::uint32_t i = 0; i < pieceCount; ++i) {
@@ -248,7 +248,7 @@ public:
     }
 
     // Names the innermost open block in `blockName`.
-    [[gnu::always_inline]] void showBlock() {
+    NETFLOOR_INLINE void showBlock() {
         if (Pass::reports) {
             block.copyTo(state->blockName);
         } else {
@@ -257,7 +257,7 @@ public:
     }
 
     // Opens the block that `block` names. False when the stack cannot grow.
-    [[gnu::always_inline]] bool openBlock() {
+    NETFLOOR_INLINE bool openBlock() {
         showBlock();
         if (sureBlocks != 0) {
             --sureBlocks;
@@ -274,7 +274,7 @@ public:
         return true;
     }
 
-    [[gnu::always_inline]] void closeBlock() {
+    NETFLOOR_INLINE void closeBlock() {
         check();
         --blockDepth;
         if (Pass::reports) {
@@ -283,7 +283,7 @@ public:
     }
 
     // Opens a limit of so many bits. False where it reaches behind the bits left, and so narrows nothing.
-    [[gnu::always_inline]] bool narrow(std::uint32_t bitCount) {
+    NETFLOOR_INLINE bool narrow(std::uint32_t bitCount) {
         const bool narrows = bitCount <= left;
         settle();
         sureBits = 0;
@@ -297,7 +297,7 @@ public:
         return narrows;
     }
 
-    [[gnu::always_inline]] void popLimit() {
+    NETFLOOR_INLINE void popLimit() {
         --limitDepth;
         if (Pass::reports) {
             --state->limits.top;
@@ -306,7 +306,7 @@ public:
     }
 
     // Skips what is left of the innermost limit.
-    [[gnu::always_inline]] void sweep() {
+    NETFLOOR_INLINE void sweep() {
         if (left != 0) {
             cursor += left;
             left = 0;
@@ -315,7 +315,7 @@ public:
     }
 
     // Makes room for so many elements. False when the ranges cannot grow.
-    [[gnu::always_inline]] bool roomFor(std::uint32_t elements) {
+    NETFLOOR_INLINE bool roomFor(std::uint32_t elements) {
         if (elements < state->fieldRecord.rangeCapacity) [[likely]] {
             return true;
         }
@@ -329,7 +329,7 @@ public:
     }
 
 private:
-    [[gnu::always_inline]] bool push(BitStack& stack, std::uint32_t& depth, std::uint32_t bit) {
+    NETFLOOR_INLINE bool push(BitStack& stack, std::uint32_t& depth, std::uint32_t bit) {
         ++depth;
         stack.count = depth;
         if (Pass::reports) {

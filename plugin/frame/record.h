@@ -13,24 +13,24 @@
 namespace netfloor {
 
 // Calls `visit` with the number of each piece, as a constant.
-template <std::uint32_t count, class Visit> [[gnu::always_inline]] inline void forEachPiece(Visit visit) {
-    [&]<std::size_t... i>(std::index_sequence<i...>) __attribute__((always_inline)) {
+template <std::uint32_t count, class Visit> NETFLOOR_INLINE inline void forEachPiece(Visit visit) {
+    [&]<std::size_t... i>(std::index_sequence<i...>) NETFLOOR_INLINE {
         (visit.template operator()<i>(), ...);
     }(std::make_index_sequence<count>{});
 }
 
 // A value with a further piece of so many bits behind it.
-[[nodiscard, gnu::always_inline]] constexpr std::uint32_t joined(std::uint32_t value, std::uint32_t piece, std::uint32_t width) {
+[[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t joined(std::uint32_t value, std::uint32_t piece, std::uint32_t width) {
     return width == 32 ? piece : value << width | piece;
 }
 
 // The value of a field that lies at `cursor`, before it is scaled.
 template <const Field& field>
-[[nodiscard, gnu::always_inline]] inline std::uint32_t valueAt(const std::uint8_t* data, std::uint32_t cursor, std::uint32_t units) {
+[[nodiscard]] NETFLOOR_INLINE inline std::uint32_t valueAt(const std::uint8_t* data, std::uint32_t cursor, std::uint32_t units) {
     constexpr const Place& place = field.place;
     std::uint32_t value = 0;
     if constexpr (place.isPieces()) {
-        forEachPiece<place.count>([&]<std::uint32_t i>() __attribute__((always_inline)) {
+        forEachPiece<place.count>([&]<std::uint32_t i>() NETFLOOR_INLINE {
             constexpr Piece piece = place.pieces[i];
             value = joined(value, pieceAt<piece.low, piece.high>(data, cursor), piece.width());
         });
@@ -47,16 +47,16 @@ template <const Field& field>
 // Writes the elements and the value of a field that lies at `cursor`, and its id. There is room for the
 // elements. Gives the value.
 template <const Field& field>
-[[gnu::always_inline]] inline std::uint32_t writeElements(FieldRecord& record, const std::uint8_t* data, std::uint32_t cursor, std::uint32_t units) {
+NETFLOOR_INLINE inline std::uint32_t writeElements(FieldRecord& record, const std::uint8_t* data, std::uint32_t cursor, std::uint32_t units) {
     constexpr const Place& place = field.place;
     BitRange* const ranges = record.ranges;
     std::uint32_t value = 0;
-    const auto element = [&](std::uint32_t index, std::uint32_t first, std::uint32_t last) __attribute__((always_inline)) {
+    const auto element = [&](std::uint32_t index, std::uint32_t first, std::uint32_t last) NETFLOOR_INLINE {
         ranges[index].firstBit = first;
         ranges[index].lastBit = last;
         return ranges[index].value = bits(data, first, last);
     };
-    const auto octet = [&](std::uint32_t index, std::uint32_t first) __attribute__((always_inline)) {
+    const auto octet = [&](std::uint32_t index, std::uint32_t first) NETFLOOR_INLINE {
         ranges[index].firstBit = first;
         ranges[index].lastBit = first + bitsPerOctet - 1;
         ranges[index].value = octetAt(data, first);
@@ -66,7 +66,7 @@ template <const Field& field>
     std::uint32_t outputElements = elements;
 
     if constexpr (place.shape == Shape::pieces) {
-        forEachPiece<place.count>([&]<std::uint32_t i>() __attribute__((always_inline)) {
+        forEachPiece<place.count>([&]<std::uint32_t i>() NETFLOOR_INLINE {
             constexpr Piece piece = place.pieces[i];
             ranges[i].firstBit = cursor + piece.low;
             ranges[i].lastBit = cursor + piece.high;
@@ -125,7 +125,7 @@ template <const Field& field>
 }
 
 // Resets the record for a field and gives it the field's name.
-template <const Field& field> [[gnu::always_inline]] inline void beginRecord(FieldRecord& record) {
+template <const Field& field> NETFLOOR_INLINE inline void beginRecord(FieldRecord& record) {
     record.value = 0;
     record.rangeCount = 0;
     record.valueText[0] = '\0';

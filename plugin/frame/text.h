@@ -37,7 +37,7 @@ inline constexpr std::size_t mostDigits = 10;
 
 // Writes a number in hexadecimal without leading zeros, and gives the place behind it. Up to eight
 // characters are written, so there must be room for them.
-[[gnu::always_inline]] inline char* writeHexadecimal(char* to, std::uint32_t value) {
+NETFLOOR_INLINE inline char* writeHexadecimal(char* to, std::uint32_t value) {
     const auto digits = static_cast<std::uint32_t>(value == 0 ? 1 : (35 - std::countl_zero(value)) / 4);
     std::array<char, 8> all;
     for (std::uint32_t octet = 0; octet < 4; ++octet) {
@@ -55,7 +55,7 @@ inline constexpr std::size_t mostDigits = 10;
 }
 
 // How many digits a number has in decimal.
-[[nodiscard, gnu::always_inline]] constexpr std::uint32_t decimalDigits(std::uint32_t value) {
+[[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t decimalDigits(std::uint32_t value) {
     std::uint32_t digits = 1;
     for (; value >= 10000; value /= 10000) {
         digits += 4;
@@ -64,7 +64,7 @@ inline constexpr std::size_t mostDigits = 10;
 }
 
 // Writes a number in decimal without leading zeros, and gives the place behind it.
-[[gnu::always_inline]] inline char* writeDecimal(char* to, std::uint32_t value) {
+NETFLOOR_INLINE inline char* writeDecimal(char* to, std::uint32_t value) {
     char* const end = to + decimalDigits(value);
     char* place = end;
     for (; value >= 100; value /= 100) {

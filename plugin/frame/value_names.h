@@ -8,6 +8,8 @@
 #include <span>
 #include <string_view>
 
+#include "frame/inline.h"
+
 namespace netfloor {
 
 // The name of one value, or of all values from `from` to `to`.
@@ -55,7 +57,7 @@ inline constexpr std::uint32_t directIndexMost = 8191;
 template <const ValueNames& names> inline constexpr auto valueIndex = directIndex<indexedValues(names)>(names);
 
 // The number, from 1, of the row that names `value`; 0 where none does.
-template <const ValueNames& names> [[nodiscard, gnu::always_inline]] constexpr std::uint32_t rowNumber(std::uint32_t value) {
+template <const ValueNames& names> [[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t rowNumber(std::uint32_t value) {
     constexpr std::size_t indexed = indexedValues(names);
     if (value < indexed) {
         return valueIndex<names>[value];

@@ -111,7 +111,7 @@ inline constexpr std::int32_t octetsBehindType = 7;
 
 // What stands behind the type: `fixed` are the fields of the header's second word.
 template <const Field& code, const Field& checksum, const Field& data, const Field&... fixed, class Pass>
-[[gnu::always_inline]] inline void body(Reader<Pass>& at) {
+NETFLOOR_INLINE inline void body(Reader<Pass>& at) {
     auto& variables = at.variables();
     const Block<Pass> block{at, ""};
     read<code>(at);
@@ -123,7 +123,7 @@ template <const Field& code, const Field& checksum, const Field& data, const Fie
     readCounted<data>(at, variables.payloadOctets);
 }
 
-template <class Pass> [[gnu::always_inline]] inline void bodyOf(Reader<Pass>& at, std::uint32_t type) {
+template <class Pass> NETFLOOR_INLINE inline void bodyOf(Reader<Pass>& at, std::uint32_t type) {
     switch (type) {
     case typeUnreachable:
         return body<unreachableCode, unreachableChecksum, unreachablePacket, unreachableUnused>(at);
@@ -144,7 +144,7 @@ template <class Pass> [[gnu::always_inline]] inline void bodyOf(Reader<Pass>& at
     }
 }
 
-template <class Pass> [[gnu::always_inline]] inline void message(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void message(Reader<Pass>& at) {
     if (!at.live) {
         return;
     }

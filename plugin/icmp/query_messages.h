@@ -26,46 +26,46 @@ namespace netfloor::icmp {
 
 // clang-format off
 inline constexpr Field echoCode              {542, "Code",                 octets(1), "Code=%x"};
-inline constexpr Field echoChecksum          {543, "Checksum",             octets(2), "  Checksum=%x"};
-inline constexpr Field echoIdentifier        {544, "Identifier",           octets(2), "  Identifier=%x"};
-inline constexpr Field echoSequence          {545, "ICMP Sequence Number", octets(2), "  ICMP Sequence Number=%u"};
+inline constexpr Field echoChecksum          {543, "Checksum",             octetPair(), "  Checksum=%x"};
+inline constexpr Field echoIdentifier        {544, "Identifier",           octetPair(), "  Identifier=%x"};
+inline constexpr Field echoSequence          {545, "ICMP Sequence Number", octetPair(), "  ICMP Sequence Number=%u"};
 inline constexpr Field echoData              {547, "  Message Data",       octets(1), "  Message Data=%c"};
 
 inline constexpr Field timestampCode         {576, "Code",                 octets(1), "Code=%x"};
-inline constexpr Field timestampChecksum     {577, "Checksum",             octets(2), "  Checksum=%x"};
-inline constexpr Field timestampIdentifier   {578, "Identifier",           octets(2), "  Identifier=%x"};
-inline constexpr Field timestampSequence     {579, "ICMP Sequence Number", octets(2), "  ICMP Sequence Number=%u"};
+inline constexpr Field timestampChecksum     {577, "Checksum",             octetPair(), "  Checksum=%x"};
+inline constexpr Field timestampIdentifier   {578, "Identifier",           octetPair(), "  Identifier=%x"};
+inline constexpr Field timestampSequence     {579, "ICMP Sequence Number", octetPair(), "  ICMP Sequence Number=%u"};
 inline constexpr Field originateTimestamp    {580, "Originate Timestamp",  octets(4), "  Originate Timestamp=%x"};
 inline constexpr Field receiveTimestamp      {581, "Receive Timestamp",    octets(4), "  Receive Timestamp=%x"};
 inline constexpr Field transmitTimestamp     {582, "Transmit Timestamp",   octets(4), "  Transmit Timestamp=%x"};
 
 inline constexpr Field informationCode       {583, "Code",                 octets(1), "Code=%x"};
-inline constexpr Field informationChecksum   {584, "Checksum",             octets(2), "  Checksum=%x"};
-inline constexpr Field informationIdentifier {585, "Identifier",           octets(2), "  Identifier=%x"};
-inline constexpr Field informationSequence   {586, "ICMP Sequence Number", octets(2), "  ICMP Sequence Number=%u"};
+inline constexpr Field informationChecksum   {584, "Checksum",             octetPair(), "  Checksum=%x"};
+inline constexpr Field informationIdentifier {585, "Identifier",           octetPair(), "  Identifier=%x"};
+inline constexpr Field informationSequence   {586, "ICMP Sequence Number", octetPair(), "  ICMP Sequence Number=%u"};
 
 inline constexpr Field advertisementCode     {587, "Code",                 octets(1), "Code=%x"};
-inline constexpr Field advertisementChecksum {588, "Checksum",             octets(2), "  Checksum=%x"};
+inline constexpr Field advertisementChecksum {588, "Checksum",             octetPair(), "  Checksum=%x"};
 inline constexpr Field routers               {589, "Num Addr",             octets(1), "  Num Addr=%u"};
 inline constexpr Field routerEntrySize       {590, "Addr Entry Size",      octets(1), "  Addr Entry Size=%u"};
-inline constexpr Field routerLifetime        {591, "Lifetime",             octets(2), "  Lifetime=%x"};
+inline constexpr Field routerLifetime        {591, "Lifetime",             octetPair(), "  Lifetime=%x"};
 inline constexpr Field routerAddress         {595, "Router Address",       octets(4), "  Router Address=%x"};
 inline constexpr Field routerPreference      {596, "Preference Level",     octets(4), "  Preference Level=%x"};
 
 inline constexpr Field solicitationCode      {597, "Code",                 octets(1), "Code=%x"};
-inline constexpr Field solicitationChecksum  {598, "Checksum",             octets(2), "  Checksum=%x"};
+inline constexpr Field solicitationChecksum  {598, "Checksum",             octetPair(), "  Checksum=%x"};
 inline constexpr Field solicitationReserved  {599, "Reserved",             octets(4), "  Reserved=%x"};
 
 inline constexpr Field addressMaskCode       {600, "Code",                 octets(1), "Code=%x"};
-inline constexpr Field addressMaskChecksum   {601, "Checksum",             octets(2), "  Checksum=%x"};
-inline constexpr Field addressMaskIdentifier {602, "Identifier",           octets(2), "  Identifier=%x"};
-inline constexpr Field addressMaskSequence   {603, "ICMP Sequence Number", octets(2), "  ICMP Sequence Number=%u"};
+inline constexpr Field addressMaskChecksum   {601, "Checksum",             octetPair(), "  Checksum=%x"};
+inline constexpr Field addressMaskIdentifier {602, "Identifier",           octetPair(), "  Identifier=%x"};
+inline constexpr Field addressMaskSequence   {603, "ICMP Sequence Number", octetPair(), "  ICMP Sequence Number=%u"};
 inline constexpr Field addressMask           {604, "Address Mask",         octets(4), "  Address Mask=%x"};
 // clang-format on
 
 inline constexpr std::int32_t echoHeaderOctets = 8;
 
-template <class Pass> [[gnu::always_inline]] inline void echo(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void echo(Reader<Pass>& at) {
     if (!at.live) {
         return;
     }
@@ -84,7 +84,7 @@ template <class Pass> [[gnu::always_inline]] inline void echo(Reader<Pass>& at) 
     }
 }
 
-template <class Pass> [[gnu::always_inline]] inline void timestamp(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void timestamp(Reader<Pass>& at) {
     if (!at.live) {
         return;
     }
@@ -98,7 +98,7 @@ template <class Pass> [[gnu::always_inline]] inline void timestamp(Reader<Pass>&
     read<transmitTimestamp>(at);
 }
 
-template <class Pass> [[gnu::always_inline]] inline void information(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void information(Reader<Pass>& at) {
     if (!at.live) {
         return;
     }
@@ -110,7 +110,7 @@ template <class Pass> [[gnu::always_inline]] inline void information(Reader<Pass
 }
 
 // An entry is 8 octets, whatever the size of an entry says. One that is cut short counts as seen.
-template <class Pass> [[gnu::always_inline]] inline void routerAdvertisement(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void routerAdvertisement(Reader<Pass>& at) {
     if (!at.live) {
         return;
     }
@@ -132,7 +132,7 @@ template <class Pass> [[gnu::always_inline]] inline void routerAdvertisement(Rea
     }
 }
 
-template <class Pass> [[gnu::always_inline]] inline void routerSolicitation(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void routerSolicitation(Reader<Pass>& at) {
     if (!at.live) {
         return;
     }
@@ -142,7 +142,7 @@ template <class Pass> [[gnu::always_inline]] inline void routerSolicitation(Read
     read<solicitationReserved>(at);
 }
 
-template <class Pass> [[gnu::always_inline]] inline void addressMaskMessage(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void addressMaskMessage(Reader<Pass>& at) {
     if (!at.live) {
         return;
     }

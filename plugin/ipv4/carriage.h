@@ -11,7 +11,7 @@ namespace netfloor {
 
 // Reads the variant for the protocol of the outermost header.
 template <const Field& inIpInIp, const Field& inMinimalEncapsulation, const Field& other, class Pass, class Store = Unstored>
-[[gnu::always_inline]] inline void readByCarriage(Reader<Pass>& at, Store into = {}) {
+NETFLOOR_INLINE inline void readByCarriage(Reader<Pass>& at, Store into = {}) {
     switch (at.variables().outerProtocol) {
     case protocolIpInIp:
         return read<inIpInIp>(at, into);

@@ -55,7 +55,7 @@ inline constexpr std::uint32_t bitsBeforeLimit = 32;
 
 // Runs the production of the payload. A later fragment is data, whatever its protocol; with DF set the offset
 // does not count.
-template <class Pass> [[gnu::always_inline]] inline void dispatch(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void dispatch(Reader<Pass>& at) {
     const auto& variables = at.variables();
     if (variables.fragmentOffset >= 1 && variables.dontFragment == 0) {
         return apart<unknownData<Pass>>(at);
@@ -81,14 +81,14 @@ template <class Pass> [[gnu::always_inline]] inline void dispatch(Reader<Pass>& 
     }
 }
 
-template <class Pass> [[gnu::always_inline]] inline void upToTotalLength(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void upToTotalLength(Reader<Pass>& at) {
     auto& variables = at.variables();
     read<headerLength>(at, [&](std::uint32_t words) { variables.ipHeaderOctets = words * 4; });
     typeOfService(at);
     read<totalLength>(at, &variables.ipTotalLength);
 }
 
-template <class Pass> [[gnu::always_inline]] inline void behindTotalLength(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void behindTotalLength(Reader<Pass>& at) {
     auto& variables = at.variables();
     read<identification>(at);
     flagAndFragmentOffset(at);
@@ -105,7 +105,7 @@ template <class Pass> [[gnu::always_inline]] inline void behindTotalLength(Reade
     read<destinationAddress>(at);
 }
 
-template <class Pass> [[gnu::always_inline]] inline void datagram(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void datagram(Reader<Pass>& at) {
     if (!at.live) {
         return;
     }

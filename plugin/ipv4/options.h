@@ -204,7 +204,7 @@ template <class Pass> void optionArea(Reader<Pass>& at) {
 }
 
 // The options in an area of so many octets. A header without options costs no more than its block.
-template <class Pass> [[gnu::always_inline]] inline void options(Reader<Pass>& at, std::int32_t areaOctets) {
+template <class Pass> NETFLOOR_INLINE inline void options(Reader<Pass>& at, std::int32_t areaOctets) {
     if (!at.live) {
         return;
     }
@@ -216,7 +216,7 @@ template <class Pass> [[gnu::always_inline]] inline void options(Reader<Pass>& a
 }
 
 // The options of the header whose length was read last.
-template <class Pass> [[gnu::always_inline]] inline void options(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void options(Reader<Pass>& at) {
     options(at, static_cast<std::int32_t>(at.variables().ipHeaderOctets) - fixedHeaderOctets);
 }
 

@@ -51,7 +51,7 @@ struct FragmentVariables {
     std::uint32_t fragmentOffset; // in units of 8 octets, as on the wire
 };
 
-template <class Pass> [[gnu::always_inline]] inline void typeOfService(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void typeOfService(Reader<Pass>& at) {
     if (!at.live) {
         return;
     }
@@ -63,7 +63,7 @@ template <class Pass> [[gnu::always_inline]] inline void typeOfService(Reader<Pa
     read<serviceReserved>(at);
 }
 
-template <class Pass> [[gnu::always_inline]] inline void flagAndFragmentOffset(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void flagAndFragmentOffset(Reader<Pass>& at) {
     if (!at.live) {
         return;
     }

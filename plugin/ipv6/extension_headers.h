@@ -83,14 +83,14 @@ inline constexpr std::uint32_t fragmentHeaderOctets = 8;
 inline constexpr std::uint32_t securityHeaderOctets = 8;
 
 // Counts a header off the payload.
-template <class Pass> [[gnu::always_inline]] inline void countOff(Reader<Pass>& at, std::uint32_t octetCount) {
+template <class Pass> NETFLOOR_INLINE inline void countOff(Reader<Pass>& at, std::uint32_t octetCount) {
     if (at.live) {
         at.variables().payloadOctets -= static_cast<std::int32_t>(octetCount);
     }
 }
 
 // Gives the length as it stands in the header.
-template <class Pass> [[nodiscard, gnu::always_inline]] inline std::uint32_t headerLength(Reader<Pass>& at) {
+template <class Pass> [[nodiscard]] NETFLOOR_INLINE inline std::uint32_t headerLength(Reader<Pass>& at) {
     std::uint32_t length = 0;
     if (at.live) {
         const Block<Pass> block{at, "Header Extention Length"};
@@ -102,7 +102,7 @@ template <class Pass> [[nodiscard, gnu::always_inline]] inline std::uint32_t hea
 // The links of the chain. Their blocks stay open in `chain`; each gives whether the chain goes on behind it.
 
 template <class Pass>
-[[nodiscard, gnu::always_inline]] inline bool optionsHeader(Reader<Pass>& at, BlockChain<Pass>& chain,
+[[nodiscard]] NETFLOOR_INLINE inline bool optionsHeader(Reader<Pass>& at, BlockChain<Pass>& chain,
                                                             BlockName name) {
     chain.open(name);
     nextHeader(at);
@@ -111,7 +111,7 @@ template <class Pass>
 }
 
 // "Sgmt Left" does not steer the addresses: all that the length has room for are read.
-template <class Pass> [[gnu::always_inline]] inline void type0Routing(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void type0Routing(Reader<Pass>& at) {
     nextHeader(at);
     const std::uint32_t length = headerLength(at);
     read<routingType>(at);
@@ -124,7 +124,7 @@ template <class Pass> [[gnu::always_inline]] inline void type0Routing(Reader<Pas
 }
 
 // The header is read up to 4 octets in front of its end, and that is where the next one is looked for.
-template <class Pass> [[gnu::always_inline]] inline void unknownRouting(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void unknownRouting(Reader<Pass>& at) {
     nextHeader(at);
     const std::uint32_t length = headerLength(at);
     readRun<spare>(at, static_cast<std::int32_t>(length * 8 + 2));
@@ -133,7 +133,7 @@ template <class Pass> [[gnu::always_inline]] inline void unknownRouting(Reader<P
 
 // A header of an unknown type that is not through with its segments is left unread, and ends the chain.
 template <class Pass>
-[[nodiscard, gnu::always_inline]] inline bool routingHeader(Reader<Pass>& at, BlockChain<Pass>& chain) {
+[[nodiscard]] NETFLOOR_INLINE inline bool routingHeader(Reader<Pass>& at, BlockChain<Pass>& chain) {
     std::uint32_t type = 0;
     chain.open("Ipv6 Routing Header");
     read<routingTypeAhead>(at, &type);
@@ -157,7 +157,7 @@ template <class Pass>
 
 // The offset steers nothing: what a later fragment holds is read as the next header all the same.
 template <class Pass>
-[[nodiscard, gnu::always_inline]] inline bool fragmentHeader(Reader<Pass>& at, BlockChain<Pass>& chain) {
+[[nodiscard]] NETFLOOR_INLINE inline bool fragmentHeader(Reader<Pass>& at, BlockChain<Pass>& chain) {
     chain.open("IPv6 Fragment Header");
     nextHeader(at);
     read<fragmentReserved>(at);
@@ -170,7 +170,7 @@ template <class Pass>
 }
 
 template <class Pass>
-[[nodiscard, gnu::always_inline]] inline bool authenticationHeader(Reader<Pass>& at, BlockChain<Pass>& chain) {
+[[nodiscard]] NETFLOOR_INLINE inline bool authenticationHeader(Reader<Pass>& at, BlockChain<Pass>& chain) {
     auto& variables = at.variables();
     std::uint32_t words = 0;
     chain.open("IP Authentication Header");
@@ -196,7 +196,7 @@ template <class Pass> void securityPayload(Reader<Pass>& at) {
 }
 
 // A protocol that ends the chain. The tunnels of IPv4 are not followed from here.
-template <class Pass> [[gnu::always_inline]] inline void upperProtocol(Reader<Pass>& at, std::uint32_t protocol) {
+template <class Pass> NETFLOOR_INLINE inline void upperProtocol(Reader<Pass>& at, std::uint32_t protocol) {
     switch (protocol) {
     case protocolIcmp:
     case protocolIcmpv6:
@@ -217,7 +217,7 @@ template <class Pass> [[gnu::always_inline]] inline void upperProtocol(Reader<Pa
 }
 
 template <class Pass>
-[[nodiscard, gnu::always_inline]] inline bool link(Reader<Pass>& at, BlockChain<Pass>& chain, std::uint32_t protocol) {
+[[nodiscard]] NETFLOOR_INLINE inline bool link(Reader<Pass>& at, BlockChain<Pass>& chain, std::uint32_t protocol) {
     switch (protocol) {
     case protocolHopByHop:
     case protocolDestinationOptions:
@@ -239,7 +239,7 @@ template <class Pass>
 }
 
 // A packet: its IPv6 header, and what that leads to.
-template <class Pass> [[gnu::always_inline]] inline void datagram(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void datagram(Reader<Pass>& at) {
     const auto& variables = at.variables();
     BlockChain<Pass> chain{at};
     bool goesOn = link(at, chain, protocolIpv6);

@@ -28,7 +28,7 @@ inline constexpr Field actionAhead         {235, "highest-order 2 bits", ahead(6
 inline constexpr Field unknownOptionType   {238, "Option Type",          octets(1),   " Option Type=Unknown", noNames, "%u"};
 inline constexpr Field unknownOptionLength {239, "Opt Data Length",      octets(1),   " Opt Data Length=%u Octet(s)", noNames, "%u"};
 inline constexpr Field skippedOctet        {240, "Skip",                 octets(1),   "Skip=%x"};
-inline constexpr Field discardedOptionType {243, "discard packet",       octets(1),   "unkown option type, discard packet", noNames, "%u"};
+inline constexpr Field discardedOptionType {243, "discard packet",       octets(1),   "unkown option type, discard packet", noNames, "%u", "unkown option type, discard packet"};
 // clang-format on
 
 struct OptionVariables {
@@ -42,14 +42,14 @@ inline constexpr std::uint32_t actionSkip = 0;
 
 inline constexpr std::int32_t nibblesPerOctet = 2;
 
-template <class Pass> [[gnu::always_inline]] inline void padN(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void padN(Reader<Pass>& at) {
     auto& variables = at.variables();
     read<padNType>(at);
     read<padNLength>(at, &variables.optionLength);
     readRun<paddingData>(at, variables.optionLength * nibblesPerOctet);
 }
 
-template <class Pass> [[gnu::always_inline]] inline void skippedOption(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void skippedOption(Reader<Pass>& at) {
     auto& variables = at.variables();
     read<unknownOptionType>(at);
     read<unknownOptionLength>(at, &variables.optionLength);
@@ -57,7 +57,7 @@ template <class Pass> [[gnu::always_inline]] inline void skippedOption(Reader<Pa
 }
 
 // The option forbids to go on. Its length is not read: all behind its type is data.
-template <class Pass> [[gnu::always_inline]] inline void discardedOption(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void discardedOption(Reader<Pass>& at) {
     read<discardedOptionType>(at);
     if (at.variables().payloadOctets >= 1) {
         apart<unknownData<Pass>>(at);
@@ -66,7 +66,7 @@ template <class Pass> [[gnu::always_inline]] inline void discardedOption(Reader<
 
 // Reads an option, whose blocks stay open in `chain`. Gives whether the chain goes on behind it.
 template <class Pass>
-[[nodiscard, gnu::always_inline]] inline bool option(Reader<Pass>& at, BlockChain<Pass>& chain) {
+[[nodiscard]] NETFLOOR_INLINE inline bool option(Reader<Pass>& at, BlockChain<Pass>& chain) {
     std::uint32_t type = 0;
     chain.open("Options");
     read<optionTypeAhead>(at, &type);

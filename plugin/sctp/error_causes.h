@@ -54,21 +54,21 @@ inline constexpr ValueNames causeCodeNames{.rows = causeCodeRows, .otherwise = "
 
 // Each cause has an id of its own for its Length: that is how the host tells the causes apart.
 constexpr Field causeLengthField(std::uint32_t id) {
-    return {id, "      Length", octets(2), "      Length=%u"};
+    return {id, "      Length", octetPair(), "      Length=%u"};
 }
 
 constexpr Field longCauseLengthField(std::uint32_t id) {
-    return {id, "      Cause Length", octets(2), "      Cause Length=%u"};
+    return {id, "      Cause Length", octetPair(), "      Cause Length=%u"};
 }
 
 // clang-format off
-inline constexpr Field causeCode                 {912, "    Cause Code",                           octets(2), "    Cause Code=%-S", &causeCodeNames};
+inline constexpr Field causeCode                 {912, "    Cause Code",                           octetPair(), "    Cause Code=%-S", &causeCodeNames};
 inline constexpr Field invalidStreamLength       = causeLengthField(914);
-inline constexpr Field invalidStream             {915, "        Stream Identifier",                octets(2), "        Stream Identifier=%u"};
-inline constexpr Field invalidStreamReserved     {916, "        Reserved",                         octets(2), "        Reserved=%u"};
+inline constexpr Field invalidStream             {915, "        Stream Identifier",                octetPair(), "        Stream Identifier=%u"};
+inline constexpr Field invalidStreamReserved     {916, "        Reserved",                         octetPair(), "        Reserved=%u"};
 inline constexpr Field missingLength             = causeLengthField(917);
 inline constexpr Field missingNumber             {918, "        Number of missing params",         octets(4), "        Number of missing params=%u"};
-inline constexpr Field missingType               {920, "        Missing Parameters Type",          octets(2), "        Missing Parameters Type=%u"};
+inline constexpr Field missingType               {920, "        Missing Parameters Type",          octetPair(), "        Missing Parameters Type=%u"};
 inline constexpr Field staleCookieLength         = longCauseLengthField(921);
 inline constexpr Field staleness                 {922, "        Measure of staleness (usec.)",     octets(4), "        Measure of staleness (usec.)=%u"};
 inline constexpr Field outOfResourceLength       = longCauseLengthField(923);

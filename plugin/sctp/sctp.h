@@ -97,7 +97,7 @@ inline constexpr Field laterChunkType  {805, "SCTP  Chunk Type",             oct
 
 inline constexpr std::int32_t commonHeaderOctets = 12;
 
-template <class Pass> [[gnu::always_inline]] inline void commonHeader(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void commonHeader(Reader<Pass>& at) {
     auto& variables = at.variables();
     const Block<Pass> block{at, "Common Header"};
     read<sourcePort>(at, &variables.sourcePort);
@@ -109,7 +109,7 @@ template <class Pass> [[gnu::always_inline]] inline void commonHeader(Reader<Pas
     }
 }
 
-template <class Pass> [[gnu::always_inline]] inline std::uint32_t readChunkType(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline std::uint32_t readChunkType(Reader<Pass>& at) {
     std::uint32_t& chunksSeen = at.variables().chunksSeen;
     std::uint32_t type = 0;
     if (at.test(chunksSeen == 0)) {
@@ -121,7 +121,7 @@ template <class Pass> [[gnu::always_inline]] inline std::uint32_t readChunkType(
     return type;
 }
 
-template <class Pass> [[gnu::always_inline]] inline void chunkBody(Reader<Pass>& at, std::uint32_t type) {
+template <class Pass> NETFLOOR_INLINE inline void chunkBody(Reader<Pass>& at, std::uint32_t type) {
     switch (type) {
     case dataType:
         return data(at);
@@ -160,7 +160,7 @@ template <class Pass> [[gnu::always_inline]] inline void chunkBody(Reader<Pass>&
 
 // Each round reads one Chunk Type octet at least, or ends the walk, whatever the Lengths say and whatever a next layer
 // that led back into this pass has left in the variables.
-template <class Pass> [[gnu::always_inline]] inline void chunks(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void chunks(Reader<Pass>& at) {
     auto& variables = at.variables();
     BlockChain<Pass> chain{at};
     while (at.live) {

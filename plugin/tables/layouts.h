@@ -77,15 +77,31 @@ inline constexpr std::uint32_t variableLength = 1; // reference at the end
     return place.shape != Shape::ahead && place.shape != Shape::groups;
 }
 
+// The pieces of which a field is made, and how often they repeat. Nibbles that come again in the next octet are
+// listed once.
+[[nodiscard]] constexpr std::uint32_t distinctPieces(const Place& place) {
+    const bool repeats = place.count == 4 && place.pieces[2].low == place.pieces[0].low + bitsPerOctet &&
+                         place.pieces[3].low == place.pieces[1].low + bitsPerOctet;
+    return repeats ? 2 : place.count;
+}
+
+// Two whole octets are listed with the second one first, although the passes read the first one first.
+[[nodiscard]] constexpr bool isOctetPair(const Place& place) {
+    return place.count == 2 && place.pieces[0].width() == bitsPerOctet && place.pieces[1].width() == bitsPerOctet;
+}
+
 // The pieces of one unit.
 constexpr void addPieces(LayoutRecord& record, const Place& place) {
     switch (place.shape) {
-    case Shape::pieces:
-        record.add({place.count});
-        for (std::uint32_t i = 0; i < place.count; ++i) {
-            record.addPiece(place.pieces[i].low + 1, place.pieces[i].high + 1);
+    case Shape::pieces: {
+        const std::uint32_t count = distinctPieces(place);
+        record.add({count});
+        for (std::uint32_t i = 0; i < count; ++i) {
+            const Piece& piece = place.pieces[isOctetPair(place) ? count - 1 - i : i];
+            record.addPiece(piece.low + 1, piece.high + 1);
         }
         return;
+    }
     case Shape::addressNibbles:
         record.add({nibblesPerGroup});
         for (std::uint32_t nibble = 0; nibble < nibblesPerGroup; ++nibble) {
@@ -100,6 +116,16 @@ constexpr void addPieces(LayoutRecord& record, const Place& place) {
         record.add({1});
         record.addPiece(1, place.unitBits());
     }
+}
+
+// How often the pieces of a fixed field repeat, and the bits from one repeat to the next. A field of octets is laid
+// out octet by octet also where the cursor stays in front of it.
+[[nodiscard]] constexpr std::uint32_t repeats(const Place& place) {
+    return place.shape == Shape::pieces ? place.count / distinctPieces(place) : place.count;
+}
+
+[[nodiscard]] constexpr std::uint32_t stepBits(const Place& place) {
+    return place.shape == Shape::pieces ? place.advance / repeats(place) : place.unitBits();
 }
 
 [[nodiscard]] constexpr LayoutRecord layoutOf(const Place& place) {
@@ -117,9 +143,9 @@ constexpr void addPieces(LayoutRecord& record, const Place& place) {
     } else if (place.isRun()) {
         record.addRange(1, place.mostUnits);
     } else {
-        record.addConstant(place.shape == Shape::pieces ? 1 : place.count);
+        record.addConstant(repeats(place));
     }
-    record.addConstant(place.shape == Shape::pieces || place.isRun() ? place.advance : place.advance / place.count);
+    record.addConstant(stepBits(place));
     record.addReference(byPacket ? variableLength : fixedLength);
     record.finish();
     return record;

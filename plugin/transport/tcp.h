@@ -36,10 +36,10 @@
 namespace netfloor::tcp {
 
 // clang-format off
-inline constexpr Field sourcePort              {384, "TCP Source Port",        octets(2),                "  TCP Source Port=%-S (%u)",      &portNames, "TCP - %-s (%u)"};
-inline constexpr Field destinationPortIpInIp   {387, "TCP Destination Port",   octets(2),                "  TCP Destination Port=%-S (%u)", &portNames, "IPinIP - TCP - %-s (%u)"};
-inline constexpr Field destinationPortMinimal  {391, "TCP Destination Port",   octets(2),                "  TCP Destination Port=%-S (%u)", &portNames, "MIPinIP - TCP - %-s (%u)"};
-inline constexpr Field destinationPort         {393, "TCP Destination Port",   octets(2),                "  TCP Destination Port=%-S (%u)", &portNames, "TCP - %-s (%u)"};
+inline constexpr Field sourcePort              {384, "TCP Source Port",        octetPair(),                "  TCP Source Port=%-S (%u)",      &portNames, "TCP - %-s (%u)"};
+inline constexpr Field destinationPortIpInIp   {387, "TCP Destination Port",   octetPair(),                "  TCP Destination Port=%-S (%u)", &portNames, "IPinIP - TCP - %-s (%u)"};
+inline constexpr Field destinationPortMinimal  {391, "TCP Destination Port",   octetPair(),                "  TCP Destination Port=%-S (%u)", &portNames, "MIPinIP - TCP - %-s (%u)"};
+inline constexpr Field destinationPort         {393, "TCP Destination Port",   octetPair(),                "  TCP Destination Port=%-S (%u)", &portNames, "TCP - %-s (%u)"};
 inline constexpr Field sequenceNumber          {394, "Sequence Number",        octets(4),                "Sequence Number=%u(dec)"};
 inline constexpr Field acknowledgementNumber   {395, "Acknowledgement Number", octets(4),                "Acknowledgement Number=%u(dec)"};
 inline constexpr Field reservedBesideDataOffset{396, "Reserved",               piece(0, 3),              "  Reserved=%u"};
@@ -52,9 +52,9 @@ inline constexpr Field push                    {402, "PSH",                    b
 inline constexpr Field reset                   {403, "RST",                    bit(2),                   "  RST=%u"};
 inline constexpr Field synchronize             {404, "SYN",                    bit(1),                   "  SYN=%u"};
 inline constexpr Field finish                  {405, "FIN",                    bit(0).advancing(8),      "  FIN=%u"};
-inline constexpr Field windowSize              {406, "Window Size",            octets(2),                "  Window Size=%u(dec)", noNames, "%u"};
-inline constexpr Field checksum                {407, "Checksum",               octets(2),                "  Checksum=%x"};
-inline constexpr Field urgentPointer           {408, "Urgent Pointer",         octets(2),                "  Urgent Pointer=%x"};
+inline constexpr Field windowSize              {406, "Window Size",            octetPair(),                "  Window Size=%u(dec)", noNames, "%u"};
+inline constexpr Field checksum                {407, "Checksum",               octetPair(),                "  Checksum=%x"};
+inline constexpr Field urgentPointer           {408, "Urgent Pointer",         octetPair(),                "  Urgent Pointer=%x"};
 // clang-format on
 
 struct TcpVariables {
@@ -69,7 +69,7 @@ inline constexpr std::uint32_t bitsPerWord = 32;
 
 // Reads the header from the Data Offset on and gives its length in octets. A Data Offset of 3 or 4 has no room for the
 // fixed header: the header then counts for as many octets, not words, and what is behind its block for payload.
-template <class Pass> [[gnu::always_inline]] inline std::int32_t limitedPart(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline std::int32_t limitedPart(Reader<Pass>& at) {
     LimitedBlock<Pass> block{at, "INLINE BLOCK"};
     const std::uint32_t words = look(at, dataOffset.place).value_or(0);
     // Below three words this wraps to a huge number, which is more than any packet holds.
@@ -94,7 +94,7 @@ template <class Pass> [[gnu::always_inline]] inline std::int32_t limitedPart(Rea
 }
 
 // Takes the header off the payload. Once one was longer than its payload, no later one of the packet is taken off.
-template <class Pass> [[gnu::always_inline]] inline void accountFor(Reader<Pass>& at, std::int32_t headerOctets) {
+template <class Pass> NETFLOOR_INLINE inline void accountFor(Reader<Pass>& at, std::int32_t headerOctets) {
     auto& variables = at.variables();
     if (variables.payloadOctets < headerOctets) {
         variables.tcpLengthShort = 1;
@@ -105,7 +105,7 @@ template <class Pass> [[gnu::always_inline]] inline void accountFor(Reader<Pass>
     }
 }
 
-template <class Pass> [[gnu::always_inline]] inline void segment(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void segment(Reader<Pass>& at) {
     if (!at.live) {
         return;
     }

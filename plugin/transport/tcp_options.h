@@ -32,7 +32,7 @@ inline constexpr Field noOperation       {444, "TCP Option Kind",    octets(1), 
 
 inline constexpr Field maximumSegment    {447, "TCP Option Kind",    octets(1),                  "TCP Option Kind=%u (Maximum Segment Size)"};
 inline constexpr Field maximumLength     {448, "Length",             octets(1),                  "  Length=%u octet(s)"};
-inline constexpr Field maximumSize       {451, "max seg size",       octets(2),                  "  max seg size=%u"};
+inline constexpr Field maximumSize       {451, "max seg size",       octetPair(),                  "  max seg size=%u"};
 
 inline constexpr Field windowScale       {452, "TCP Option Kind",    octets(1),                  "TCP Option Kind=%u (Window Scale Option)"};
 inline constexpr Field windowScaleLength {453, "Length",             octets(1),                  "  Length=%u octet(s)"};
@@ -68,7 +68,7 @@ inline constexpr std::int32_t windowScaleOctets = 3;
 inline constexpr std::int32_t sackPermittedOctets = 2;
 inline constexpr std::int32_t timestampsOctets = 10;
 
-template <class Pass> [[gnu::always_inline]] inline void blocksOfEdges(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void blocksOfEdges(Reader<Pass>& at) {
     while (at.live) {
         const Block<Pass> block{at, ""};
         read<leftEdge>(at);
@@ -77,13 +77,13 @@ template <class Pass> [[gnu::always_inline]] inline void blocksOfEdges(Reader<Pa
 }
 
 // The digest is what the option's length leaves, and one octet at least, so that an option without one is cut short.
-template <class Pass> [[gnu::always_inline]] inline void digest(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void digest(Reader<Pass>& at) {
     const std::uint32_t octetsLeft = at.left / bitsPerOctet;
     readRun<md5Digest>(at, static_cast<std::int32_t>(std::clamp(octetsLeft, 1U, md5Digest.place.mostUnits)));
 }
 
 // Takes the option under the cursor, which is of a known kind.
-template <class Pass> [[gnu::always_inline]] inline void option(Reader<Pass>& at, std::uint8_t kind, OptionArea& area) {
+template <class Pass> NETFLOOR_INLINE inline void option(Reader<Pass>& at, std::uint8_t kind, OptionArea& area) {
     switch (kind) {
     case 0:
         return optionOfOneOctet<endOfList>(at, "", area);
@@ -109,7 +109,7 @@ template <class Pass> [[gnu::always_inline]] inline void option(Reader<Pass>& at
     }
 }
 
-template <class Pass> [[gnu::always_inline]] inline void padding(Reader<Pass>& at, OptionArea& area) {
+template <class Pass> NETFLOOR_INLINE inline void padding(Reader<Pass>& at, OptionArea& area) {
     const Block<Pass> block{at, "Padding"};
     readRun<optionPadding>(at, area.octets);
     if (at.live) {
@@ -118,7 +118,7 @@ template <class Pass> [[gnu::always_inline]] inline void padding(Reader<Pass>& a
 }
 
 // Once the area is used up no kind takes an option any more.
-template <class Pass> [[gnu::always_inline]] inline void optionRound(Reader<Pass>& at, OptionArea& area) {
+template <class Pass> NETFLOOR_INLINE inline void optionRound(Reader<Pass>& at, OptionArea& area) {
     area.taken = false;
     for (std::size_t turn = 0; at.live && turn < optionKinds.size(); ++turn) {
         std::size_t taker = nextTaker<optionKinds>(at, turn);
@@ -145,7 +145,7 @@ template <class Pass> [[gnu::always_inline]] inline void optionRound(Reader<Pass
 
 // The options stand in the block that the Data Offset limits, and their live flag is that block's: an option that
 // reaches past the header ends the list, but not the segment, whose payload starts where the Data Offset says.
-template <class Pass> [[gnu::always_inline]] inline void options(Reader<Pass>& at, std::int32_t areaOctets) {
+template <class Pass> NETFLOOR_INLINE inline void options(Reader<Pass>& at, std::int32_t areaOctets) {
     if (!at.live) {
         return;
     }

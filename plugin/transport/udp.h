@@ -22,12 +22,12 @@
 namespace netfloor::udp {
 
 // clang-format off
-inline constexpr Field sourcePort                {479, "UDP Source Port",      octets(2), "  UDP Source Port=%-S (%u)",      &portNames, "UDP - %-s (%u)"};
-inline constexpr Field destinationPortIpInIp     {482, "UDP Destination Port", octets(2), "  UDP Destination Port=%-S (%u)", &portNames, "IPinIP - UDP - %-s (%u)"};
-inline constexpr Field destinationPortMinimal    {486, "UDP Destination Port", octets(2), "  UDP Destination Port=%-S (%u)", &portNames, "MIPinIP - UDP - %-s (%u)"};
-inline constexpr Field destinationPort           {488, "UDP Destination Port", octets(2), "  UDP Destination Port=%-S (%u)", &portNames, "UDP - %-s (%u)"};
-inline constexpr Field length                    {489, "UDP Length",           octets(2), "  UDP Length=%u octet(s)"};
-inline constexpr Field checksum                  {490, "Checksum",             octets(2), "  Checksum=%x"};
+inline constexpr Field sourcePort                {479, "UDP Source Port",      octetPair(), "  UDP Source Port=%-S (%u)",      &portNames, "UDP - %-s (%u)"};
+inline constexpr Field destinationPortIpInIp     {482, "UDP Destination Port", octetPair(), "  UDP Destination Port=%-S (%u)", &portNames, "IPinIP - UDP - %-s (%u)"};
+inline constexpr Field destinationPortMinimal    {486, "UDP Destination Port", octetPair(), "  UDP Destination Port=%-S (%u)", &portNames, "MIPinIP - UDP - %-s (%u)"};
+inline constexpr Field destinationPort           {488, "UDP Destination Port", octetPair(), "  UDP Destination Port=%-S (%u)", &portNames, "UDP - %-s (%u)"};
+inline constexpr Field length                    {489, "UDP Length",           octetPair(), "  UDP Length=%u octet(s)"};
+inline constexpr Field checksum                  {490, "Checksum",             octetPair(), "  Checksum=%x"};
 // clang-format on
 
 inline constexpr std::int32_t headerOctets = 8;
@@ -36,7 +36,7 @@ inline constexpr std::int32_t headerOctets = 8;
     return port == 1812 || port == 1813;
 }
 
-template <class Pass> [[gnu::always_inline]] inline void datagram(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void datagram(Reader<Pass>& at) {
     if (!at.live) {
         return;
     }

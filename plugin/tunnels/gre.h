@@ -63,9 +63,9 @@ inline constexpr Field keyPresent      {694, "Key Present",             bit(5), 
 inline constexpr Field sequencePresent {695, "Sequence Number Present", bit(4),                     "Sequence Number Present=%-S", &presenceNames};
 inline constexpr Field reserved0       {696, "Reserved0",               pieces({0, 3}, {11, 15}),   "Reserved0=%u"};
 inline constexpr Field version         {697, "Version",                 piece(8, 10).advancing(16), "Version=%u"};
-inline constexpr Field protocol        {698, "GRE Protocol",            octets(2),                  "GRE Protocol=%-S",            &carriedProtocolNames};
-inline constexpr Field checksum        {702, "CheckSum (hex)",          octets(2),                  "CheckSum (hex)=%x"};
-inline constexpr Field reserved1       {703, "Reserved1",               octets(2),                  "Reserved1=%u"};
+inline constexpr Field protocol        {698, "GRE Protocol",            octetPair(),                  "GRE Protocol=%-S",            &carriedProtocolNames};
+inline constexpr Field checksum        {702, "CheckSum (hex)",          octetPair(),                  "CheckSum (hex)=%x"};
+inline constexpr Field reserved1       {703, "Reserved1",               octetPair(),                  "Reserved1=%u"};
 inline constexpr Field key             {707, "GRE Key",                 octets(4),                  "GRE Key=%u"};
 inline constexpr Field sequence        {711, "Sequence Number",         octets(4),                  "Sequence Number=%u"};
 inline constexpr Field openingFlag     {716, "HDLC Flag",               octets(1),                  "HDLC Flag=0x%x"};
@@ -80,13 +80,13 @@ inline constexpr std::int32_t partOctets = 4;
 inline constexpr std::uint32_t hdlcFlag = 0x7e;
 
 // Takes octets that were read off the payload.
-template <class Pass> [[gnu::always_inline]] inline void account(const Reader<Pass>& at, std::int32_t octetCount) {
+template <class Pass> NETFLOOR_INLINE inline void account(const Reader<Pass>& at, std::int32_t octetCount) {
     if (at.live) {
         at.variables().payloadOctets -= octetCount;
     }
 }
 
-template <class Pass> [[gnu::always_inline]] inline void header(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void header(Reader<Pass>& at) {
     std::uint32_t greChecksumPresent = 0;
     std::uint32_t greKeyPresent = 0;
     std::uint32_t greSequencePresent = 0;
@@ -113,13 +113,13 @@ template <class Pass> [[gnu::always_inline]] inline void header(Reader<Pass>& at
     }
 }
 
-template <class Pass> [[gnu::always_inline]] inline bool flagAhead(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline bool flagAhead(Reader<Pass>& at) {
     return look(at, octets(1)) == hdlcFlag;
 }
 
 // The frame from its opening flag on, which stands under the cursor. A frame that the payload ends before its closing
 // flag just stops; one that the packet ends is a fault.
-template <class Pass> [[gnu::always_inline]] inline void frame(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void frame(Reader<Pass>& at) {
     const auto& variables = at.variables();
     const Block<Pass> block{at, "HDLC Data"};
     read<openingFlag>(at);
@@ -140,7 +140,7 @@ template <class Pass> [[gnu::always_inline]] inline void frame(Reader<Pass>& at)
     account(at, 1);
 }
 
-template <class Pass> [[gnu::always_inline]] inline void packet(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void packet(Reader<Pass>& at) {
     if (!at.live) {
         return;
     }

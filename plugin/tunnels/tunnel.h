@@ -19,7 +19,7 @@
 namespace netfloor::tunnel {
 
 // Runs the production of the payload. GRE is known behind IP in IP only; ICMPv6 and SCTP are not.
-template <class Pass> [[gnu::always_inline]] inline void payload(Reader<Pass>& at, std::uint32_t innermostTunnel) {
+template <class Pass> NETFLOOR_INLINE inline void payload(Reader<Pass>& at, std::uint32_t innermostTunnel) {
     switch (at.variables().ipProtocol) {
     case protocolIcmp: return apart<icmp::message<Pass>>(at);
     case protocolTcp: return apart<tcp::segment<Pass>>(at);
@@ -31,7 +31,7 @@ template <class Pass> [[gnu::always_inline]] inline void payload(Reader<Pass>& a
 }
 
 // Reads the tunnel that the protocol says, and all tunnels inside it.
-template <class Pass> [[gnu::always_inline]] inline void packet(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void packet(Reader<Pass>& at) {
     const auto& variables = at.variables();
     BlockChain<Pass> levels{at};
     std::uint32_t tunnel = variables.ipProtocol;

@@ -63,7 +63,8 @@ protected:
         writeFile("other.zst", hex("28b52ffd 00*20"));
         writeFile("cut.pcap", pcapFile(228, {{udpPacket}, {{udpPacket.begin(), udpPacket.begin() + 24}, 36}}));
         writeFile("withTail.pcap", file + hex("00*3"));
-        shell("gzip -k $T/five.pcap; head -c 150 $T/five.pcap.gz > $T/half.pcap.gz");
+        const Outcome packed = shell("gzip -k $T/five.pcap && head -c -20 $T/five.pcap.gz > $T/half.pcap.gz");
+        ASSERT_EQ(packed.exitCode, 0) << packed.err;
     }
 };
 
@@ -130,7 +131,12 @@ TEST_F(Command, readsAnyWay) {
         {"cat $T/five.pcap | netfloor -", 0, {"5 packets"}, {}, {}, 6},
         {"netfloor $T/five.pcap.gz", 0, {"5 packets"}, {}, {}, 6},
         {"netfloor - < $T/five.pcap.gz", 0, {"5 packets"}, {}, {}, 6},
-        {"cat $T/five.pcap.gz $T/empty.pcap | netfloor -c 4 -", 0, {"    4  "}, {}, {"    5  "}, 5},
+        {"cat <(head -c 100 $T/five.pcap | gzip) <(tail -c +101 $T/five.pcap | gzip) | netfloor -",
+         0,
+         {"5 packets"},
+         {},
+         {},
+         6},
         // A live source shows each packet as it comes.
         {"{ head -c 90 $T/five.pcap; sleep 5; } | netfloor - | { read -t 3 line; echo \"$line\"; }",
          0,

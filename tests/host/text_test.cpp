@@ -8,7 +8,7 @@
 
 #include <gtest/gtest.h>
 
-#include "netfloor-host/text.h"
+#include "netfloor-host/host.h"
 #include "support/packets.h"
 
 namespace netfloor::test {
@@ -69,6 +69,33 @@ TEST(Text, FindsIpv6AddressesByTheirRanges) {
     scattered.ranges[3].firstBit += 16;
     scattered.ranges[3].lastBit += 16;
     EXPECT_EQ(ipv6Address(scattered, packet), std::nullopt);
+}
+
+// What the plug-in shows as groups in its own digit order, and stores with exchanged nibbles.
+TEST(Text, ShowsTheAddressesOfAnIpv6Packet) {
+    Host host(PluginLibrary::open(NETFLOOR_PLUGIN));
+    const Octets packet = ipv6({.nextHeader = 17, .payload = udp(40000, 40001)});
+    const Report fields = host.run(Pass::md, packet);
+    const Report keys = host.run(Pass::xtr, packet);
+    const std::pair<std::string_view, std::string_view> cases[] = {
+        {"Source IP Address", "2001:db8::1"},
+        {"Destination IP Address", "2001:db8::2"},
+    };
+    for (const auto &[name, text] : cases) {
+        ASSERT_NE(fields.field(name), nullptr);
+        EXPECT_EQ(ipv6Text(ipv6Address(*fields.field(name), packet).value()), text);
+        EXPECT_EQ(keyText(*keys.key(name)), text);
+    }
+    for (const FieldReport &field : fields.fields) {
+        EXPECT_EQ(ipv6Address(field, packet).has_value(), field.name.ends_with("IP Address")) << field.name;
+    }
+
+    RunOptions narrow;
+    narrow.byteAreaSize = 16;
+    const Report cutOff = host.run(Pass::xtr, packet, narrow);
+    EXPECT_EQ(cutOff.ending, Ending::cutOff) << "an address needs room for 17 octets";
+    EXPECT_EQ(cutOff.key("Source IP Address")->octets, Octets());
+    EXPECT_EQ(cutOff.key("Source IP Address")->number >> 31, 1U);
 }
 
 TEST(Text, ShowsKeyFieldsByTheirTypes) {
