@@ -68,6 +68,10 @@ inline constexpr std::int32_t windowScaleOctets = 3;
 inline constexpr std::int32_t sackPermittedOctets = 2;
 inline constexpr std::int32_t timestampsOctets = 10;
 
+struct OptionVariables {
+    std::int32_t tcpOptionOctets; // of the area behind the fixed header
+};
+
 template <class Pass> NETFLOOR_INLINE inline void blocksOfEdges(Reader<Pass>& at) {
     while (at.live) {
         const Block<Pass> block{at, ""};
@@ -91,21 +95,21 @@ template <class Pass> NETFLOOR_INLINE inline void option(Reader<Pass>& at, std::
         return optionOfOneOctet<noOperation>(at, "", area);
     case 2:
         return optionWithLength<maximumSegment, maximumLength, maximumSegmentOctets>(
-            at, "", area, [&] { read<maximumSize>(at); });
+            at, "", area, [&]() NETFLOOR_INLINE { read<maximumSize>(at); });
     case 3:
         return optionWithLength<windowScale, windowScaleLength, windowScaleOctets>(
-            at, "", area, [&] { read<shiftCount>(at); });
+            at, "", area, [&]() NETFLOOR_INLINE { read<shiftCount>(at); });
     case 4:
         return optionWithLength<sackPermitted, permittedLength, sackPermittedOctets>(at, "", area, [] {});
     case 5:
-        return optionWithLength<sack, sackLength>(at, "", area, [&] { blocksOfEdges(at); });
+        return optionWithLength<sack, sackLength>(at, "", area, [&]() NETFLOOR_INLINE { blocksOfEdges(at); });
     case 8:
-        return optionWithLength<timestamps, timestampsLength, timestampsOctets>(at, "", area, [&] {
+        return optionWithLength<timestamps, timestampsLength, timestampsOctets>(at, "", area, [&]() NETFLOOR_INLINE {
             read<timestampValue>(at);
             read<timestampEcho>(at);
         });
     default:
-        return optionWithLength<md5Signature, md5Length>(at, "", area, [&] { digest(at); });
+        return optionWithLength<md5Signature, md5Length>(at, "", area, [&]() NETFLOOR_INLINE { digest(at); });
     }
 }
 
@@ -145,11 +149,11 @@ template <class Pass> NETFLOOR_INLINE inline void optionRound(Reader<Pass>& at, 
 
 // The options stand in the block that the Data Offset limits, and their live flag is that block's: an option that
 // reaches past the header ends the list, but not the segment, whose payload starts where the Data Offset says.
-template <class Pass> NETFLOOR_INLINE inline void options(Reader<Pass>& at, std::int32_t areaOctets) {
+template <class Pass> NETFLOOR_INLINE inline void options(Reader<Pass>& at) {
     if (!at.live) {
         return;
     }
-    OptionArea area{areaOctets};
+    OptionArea area{at.variables().tcpOptionOctets};
     BlockChain<Pass> rounds{at};
     do {
         rounds.open("options");
