@@ -134,7 +134,9 @@ private:
 // registers, and so can the production's own.
 template <auto production, class Pass> [[gnu::noinline]] void outOfLine(Reader<Pass>& reader) {
     Reader<Pass> at = reader;
+    at.forget();
     production(at);
+    at.settle();
     reader = at;
 }
 
@@ -142,9 +144,11 @@ template <auto production, class Pass> NETFLOOR_INLINE inline void apart(Reader<
     if (!at.live) {
         return;
     }
+    at.settle();
     Reader<Pass> copy = at;
     outOfLine<production>(copy);
     at = copy;
+    at.forget();
 }
 
 } // namespace netfloor

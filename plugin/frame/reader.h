@@ -77,6 +77,14 @@ struct LastRead {
     std::uint32_t seenWidth = 0;
 };
 
+// What a stretch of fields has left to be written behind it: only what its last field and last block leave can be seen.
+struct Unsettled {
+    RecordWriter writer = nullptr; // of the last field; null: there was none
+    std::uint32_t cursor = 0;
+    std::uint32_t advance = 0;
+    std::uint32_t blocks = 0; // on the stack behind the last push; 0: there was none
+};
+
 template <class Pass> class Reader {
 public:
     using Context = typename Pass::Context;
@@ -94,6 +102,11 @@ public:
     std::uint32_t bitOrder = 0;
     BlockName block = {}; // name of the innermost open block
     BlockName shown = {}; // the name that `blockName` is to hold, in the passes that report nothing
+
+    // What is known in a stretch (see stretch.h): constants where the compiler looks, and 0 outside.
+    std::uint32_t sureBits = 0;   // bits that are left, from an octet border on, and ranges for their fields
+    std::uint32_t sureBlocks = 0; // blocks that there is room for
+    Unsettled unsettled = {};
 
     NETFLOOR_INLINE explicit Reader(Context& passContext) : context(&passContext), state(passContext.decodeState) {
         takeState();
@@ -166,8 +179,31 @@ public:
         unchecked = state->flags != 0;
     }
 
+    // Writes what a stretch has put off.
+    NETFLOOR_INLINE void settle() {
+        if (unsettled.writer != nullptr) {
+            condition() = 1;
+            advance() = static_cast<std::int32_t>(unsettled.advance);
+            last().writer = unsettled.writer;
+            last().cursor = unsettled.cursor;
+            last().seenPieces = 0;
+        }
+        if (unsettled.blocks != 0) {
+            state->blockStarts.count = unsettled.blocks;
+        }
+        unsettled = {};
+    }
+
+    // What was sure is no longer: the reader comes from elsewhere, where all was settled.
+    NETFLOOR_INLINE void forget() {
+        sureBits = 0;
+        sureBlocks = 0;
+        unsettled = {};
+    }
+
     // Gives the state all that the reader holds: wherever the host can look.
     NETFLOOR_INLINE void giveState() {
+        settle();
         writeLastRead();
         if (!Pass::reports && shown.text != nullptr) {
             shown.copyTo(state->blockName);
@@ -226,8 +262,16 @@ public:
     // Opens the block that `block` names. False when the stack cannot grow.
     NETFLOOR_INLINE bool openBlock() {
         showBlock();
-        if (!push(state->blockStarts, blockDepth, cursor)) {
-            return false;
+        if (sureBlocks != 0) {
+            --sureBlocks;
+            ++blockDepth;
+            unsettled.blocks = blockDepth;
+            state->blockStarts.base[blockDepth] = cursor;
+        } else {
+            unsettled.blocks = 0;
+            if (!push(state->blockStarts, blockDepth, cursor)) {
+                return false;
+            }
         }
         check();
         return true;
@@ -244,6 +288,8 @@ public:
     // Opens a limit of so many bits. False where it reaches behind the bits left, and so narrows nothing.
     NETFLOOR_INLINE bool narrow(std::uint32_t bitCount) {
         const bool narrows = bitCount <= left;
+        settle();
+        sureBits = 0;
         advance() = static_cast<std::int32_t>(bitCount);
         if (narrows) {
             left = bitCount;

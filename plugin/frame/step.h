@@ -36,6 +36,30 @@ template <const Field& field, class Pass>
     return at.left >= needs;
 }
 
+// The step of a field that a stretch has made sure of. What the host can see of it is put off.
+template <const Field& field, class Pass, class Store> NETFLOOR_INLINE inline void sureStep(Reader<Pass>& at, Store into) {
+    constexpr const Place& place = field.place;
+    if (!onOctetBorder(at.cursor)) {
+        __builtin_unreachable();
+    }
+    at.showBlock();
+    const std::uint32_t start = at.cursor;
+    if constexpr (!std::is_same_v<Store, Unstored>) {
+        store(into, valueAt<field>(at.data, start, place.count));
+    }
+    at.left -= place.advance;
+    at.cursor += place.advance;
+    at.sureBits -= place.advance;
+    at.unsettled.writer = writeRecord<field>;
+    at.unsettled.cursor = start;
+    at.unsettled.advance = place.advance;
+    Pass::template output<field>(at, start, place.count);
+}
+
+// Whether a stretch can make sure of a field: all of fixed size and tested that move in whole octets.
+template <const Field& field>
+inline constexpr bool canBeSure = !field.place.isRun() && field.place.isTested() && field.place.advance % bitsPerOctet == 0;
+
 // The step of a field of `units` units; see `read` and `readRun`.
 template <const Field& field, class Pass, class Store>
 NETFLOOR_INLINE inline void step(Reader<Pass>& at, std::uint32_t units, Store into) {
@@ -44,6 +68,13 @@ NETFLOOR_INLINE inline void step(Reader<Pass>& at, std::uint32_t units, Store in
     if (!at.live) {
         return;
     }
+    if constexpr (!Pass::reports && canBeSure<field>) {
+        if (at.sureBits >= neededBits<field>) {
+            return sureStep<field>(at, into);
+        }
+    }
+    at.settle();
+    at.sureBits = 0;
     if (!fits<field>(at, units)) {
         at.live = false;
         return;
@@ -118,6 +149,7 @@ inline void keepRecord(FieldRecord&) {}
 // Looks at the bits of `place` without moving the cursor and without reporting anything; nothing where they
 // are not all left or the run is over. The field record keeps what was seen, under the name of the field before.
 template <class Pass> NETFLOOR_INLINE inline std::optional<std::uint32_t> look(Reader<Pass>& at, const Place& place) {
+    at.settle();
     if (at.over() || at.left < place.needs(place.count) || !at.roomFor(place.count, keepRecord)) {
         return std::nullopt;
     }
@@ -138,6 +170,8 @@ template <class Pass> NETFLOOR_INLINE inline void stepBack(Reader<Pass>& at, std
     if (at.over()) {
         return;
     }
+    at.settle();
+    at.sureBits = 0;
     at.advance() = -static_cast<std::int32_t>(bitCount);
     if (!at.live || at.cursor < bitCount) {
         at.live = false;

@@ -24,6 +24,7 @@
 #include "frame/block.h"
 #include "frame/field.h"
 #include "frame/step.h"
+#include "frame/stretch.h"
 #include "icmp/icmpv6.h"
 #include "icmp/icmp.h"
 #include "ipv4/options.h"
@@ -70,7 +71,7 @@ template <class Pass> NETFLOOR_INLINE inline void dispatch(Reader<Pass>& at) {
     case protocolTcp:
         return apart<tcp::segment<Pass>>(at);
     case protocolUdp:
-        return udp::datagram(at);
+        return stretch<64, udp::datagram<Pass>>(at);
     case protocolIcmpv6:
         return apart<icmpv6::message<Pass>>(at);
     case protocolSctp:
@@ -80,22 +81,15 @@ template <class Pass> NETFLOOR_INLINE inline void dispatch(Reader<Pass>& at) {
     }
 }
 
-template <class Pass> NETFLOOR_INLINE inline void datagram(Reader<Pass>& at) {
-    if (!at.live) {
-        return;
-    }
+template <class Pass> NETFLOOR_INLINE inline void upToTotalLength(Reader<Pass>& at) {
     auto& variables = at.variables();
-    const Block<Pass> header{at, "IPv4 Header"};
     read<headerLength>(at, [&](std::uint32_t words) { variables.ipHeaderOctets = words * 4; });
     typeOfService(at);
     read<totalLength>(at, &variables.ipTotalLength);
+}
 
-    // A Total Length below 4 wraps to a huge number, which is more than any packet holds.
-    const std::uint32_t limit = variables.ipTotalLength * bitsPerOctet - bitsBeforeLimit;
-    if (!at.live || limit > at.left) {
-        return;
-    }
-    const LimitedBlock<Pass> extra{at, "Extra", limit};
+template <class Pass> NETFLOOR_INLINE inline void behindTotalLength(Reader<Pass>& at) {
+    auto& variables = at.variables();
     read<identification>(at);
     flagAndFragmentOffset(at);
     read<timeToLive>(at);
@@ -109,6 +103,23 @@ template <class Pass> NETFLOOR_INLINE inline void datagram(Reader<Pass>& at) {
     read<headerChecksum>(at);
     read<sourceAddress>(at);
     read<destinationAddress>(at);
+}
+
+template <class Pass> NETFLOOR_INLINE inline void datagram(Reader<Pass>& at) {
+    if (!at.live) {
+        return;
+    }
+    auto& variables = at.variables();
+    const Block<Pass> header{at, "IPv4 Header"};
+    stretch<32, upToTotalLength<Pass>>(at);
+
+    // A Total Length below 4 wraps to a huge number, which is more than any packet holds.
+    const std::uint32_t limit = variables.ipTotalLength * bitsPerOctet - bitsBeforeLimit;
+    if (!at.live || limit > at.left) {
+        return;
+    }
+    const LimitedBlock<Pass> extra{at, "Extra", limit};
+    stretch<128, behindTotalLength<Pass>>(at);
     options(at);
     if (at.live) {
         variables.payloadOctets = static_cast<std::int32_t>(variables.ipTotalLength - variables.ipHeaderOctets);

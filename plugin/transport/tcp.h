@@ -29,6 +29,7 @@
 #include "frame/field.h"
 #include "frame/hand_off.h"
 #include "frame/step.h"
+#include "frame/stretch.h"
 #include "ipv4/carriage.h"
 #include "tables/port_names.h"
 #include "transport/tcp_options.h"
@@ -57,7 +58,7 @@ inline constexpr Field checksum                 {407, "Checksum",               
 inline constexpr Field urgentPointer            {408, "Urgent Pointer",         octetPair(),              "  Urgent Pointer=%x"};
 // clang-format on
 
-struct TcpVariables {
+struct TcpVariables : OptionVariables {
     std::uint32_t tcpLengthShort; // a header was longer than the payload of its datagram
 };
 
@@ -67,13 +68,8 @@ inline constexpr std::int32_t fixedHeaderOctets = 20;
 inline constexpr std::uint32_t wordsBeforeLimit = 3;
 inline constexpr std::uint32_t bitsPerWord = 32;
 
-// Reads the header from the Data Offset on and gives its length in octets. A Data Offset of 3 or 4 has no room for the
-// fixed header: the header then counts for as many octets, not words, and what is behind its block for payload.
-template <class Pass> NETFLOOR_INLINE inline std::int32_t limitedPart(Reader<Pass>& at) {
-    LimitedBlock<Pass> block{at, "INLINE BLOCK"};
-    const std::uint32_t words = look(at, dataOffset.place).value_or(0);
-    // Below three words this wraps to a huge number, which is more than any packet holds.
-    block.limit((words - wordsBeforeLimit) * bitsPerWord);
+// The fields that stand in the limited block.
+template <class Pass> NETFLOOR_INLINE inline void fromDataOffset(Reader<Pass>& at) {
     read<dataOffset>(at);
     read<reservedBesideFlags>(at);
     read<urgent>(at);
@@ -85,11 +81,22 @@ template <class Pass> NETFLOOR_INLINE inline std::int32_t limitedPart(Reader<Pas
     read<windowSize>(at);
     read<checksum>(at);
     read<urgentPointer>(at);
+}
+
+// Reads the header from the Data Offset on and gives its length in octets. A Data Offset of 3 or 4 has no room for the
+// fixed header: the header then counts for as many octets, not words, and what is behind its block for payload.
+template <class Pass> NETFLOOR_INLINE inline std::int32_t limitedPart(Reader<Pass>& at) {
+    LimitedBlock<Pass> block{at, "INLINE BLOCK"};
+    const std::uint32_t words = look(at, dataOffset.place).value_or(0);
+    // Below three words this wraps to a huge number, which is more than any packet holds.
+    block.limit((words - wordsBeforeLimit) * bitsPerWord);
+    stretch<64, fromDataOffset<Pass>>(at);
     if (!at.live) {
         return static_cast<std::int32_t>(words);
     }
     const auto headerOctets = static_cast<std::int32_t>(words * bitsPerWord / bitsPerOctet);
-    options(at, headerOctets - fixedHeaderOctets);
+    at.variables().tcpOptionOctets = headerOctets - fixedHeaderOctets;
+    apart<options<Pass>>(at);
     return headerOctets;
 }
 
@@ -105,17 +112,21 @@ template <class Pass> NETFLOOR_INLINE inline void accountFor(Reader<Pass>& at, s
     }
 }
 
-template <class Pass> NETFLOOR_INLINE inline void segment(Reader<Pass>& at) {
-    if (!at.live) {
-        return;
-    }
+template <class Pass> NETFLOOR_INLINE inline void upToDataOffset(Reader<Pass>& at) {
     auto& variables = at.variables();
-    const Block<Pass> header{at, "Transmission Control Protocol"};
     read<sourcePort>(at, &variables.sourcePort);
     readByCarriage<destinationPortIpInIp, destinationPortMinimal, destinationPort>(at, &variables.destinationPort);
     read<sequenceNumber>(at);
     read<acknowledgementNumber>(at);
     read<reservedBesideDataOffset>(at);
+}
+
+template <class Pass> NETFLOOR_INLINE inline void segment(Reader<Pass>& at) {
+    if (!at.live) {
+        return;
+    }
+    const Block<Pass> header{at, "Transmission Control Protocol"};
+    stretch<100, upToDataOffset<Pass>>(at);
     if (!at.live) {
         return;
     }

@@ -68,6 +68,10 @@ inline constexpr std::int32_t windowScaleOctets = 3;
 inline constexpr std::int32_t sackPermittedOctets = 2;
 inline constexpr std::int32_t timestampsOctets = 10;
 
+struct OptionVariables {
+    std::int32_t tcpOptionOctets; // of the area behind the fixed header
+};
+
 template <class Pass> NETFLOOR_INLINE inline void maximumSegmentOption(Reader<Pass>& at, OptionArea& area) {
     const OptionBlock<Pass> option{at, ""};
     optionHead<maximumSegment, maximumLength>(at, area, maximumSegmentOctets);
@@ -161,11 +165,11 @@ template <class Pass> NETFLOOR_INLINE inline void optionRound(Reader<Pass>& at, 
 
 // The options stand in the block that the Data Offset limits, and their live flag is that block's: an option that
 // reaches past the header ends the list, but not the segment, whose payload starts where the Data Offset says.
-template <class Pass> NETFLOOR_INLINE inline void options(Reader<Pass>& at, std::int32_t areaOctets) {
+template <class Pass> NETFLOOR_INLINE inline void options(Reader<Pass>& at) {
     if (!at.live) {
         return;
     }
-    OptionArea area{areaOctets};
+    OptionArea area{at.variables().tcpOptionOctets};
     BlockChain<Pass> rounds{at};
     do {
         rounds.open("options");

@@ -38,10 +38,10 @@ TEST(Sctp, headerAndSecondChunk) {
         797 "0xdeadbeef"
         543 "0xc0d"
         802 "SCTP - COOKIE ACK (11)"
-        892 "a5"
+        884 "a5"
         808 "4"
         805 "Cookie Acknowledgement (COOKIE ACK)"
-        892 "0"
+        884 "0"
         808 "4"
     )x"));
     EXPECT_EQ(linesFrom(lines(runs.xtr), "row 84"), expected(R"(
@@ -321,20 +321,20 @@ TEST(SctpChunk, everyFieldInEveryPass) {
         EXPECT_EQ(behindType(lines(runs.md), "802"), expected(body.md));
         EXPECT_EQ(behindType(lines(runs.to), "802"), expected(body.to));
         EXPECT_EQ(behindType(lines(runs.xtr), "row 86"), expected(body.keys));
-        EXPECT_EQ(verdictLine(runs.mv), body.mvFlags == 0 ? "verdict 0 flags 0x0\n" : "verdict -52 flags 0x8\n");
+        EXPECT_EQ(runs.mv.flags, body.mvFlags);
     }
 }
 
 TEST(SctpChunk, bitsWithNames) {
-    const std::vector<std::string> pieces = {
-        "Middle piece of a fragmented user message", "Last piece of a fragmented user message",
-        "First piece of a fragmented user message", "Unfragmented Message"};
+    const std::vector<std::string> pieces = {"Middle piece of a fragmented user message",
+                                             "Last piece of a fragmented user message",
+                                             "First piece of a fragmented user message", "Unfragmented Message"};
     for (std::uint8_t flags = 0; flags < 8; ++flags) {
         const Report md = runPass(Pass::md, sctp(Octets{0, flags}));
-        EXPECT_EQ(md.field("  Unordered Data Chunk(U) Bit")->value, flags / 4u);
+        EXPECT_EQ(md.field("  Unordered Data Chunk(U) Bit")->text,
+                  flags < 4 ? "  Unordered Data Chunk(U) Bit=FALSE" : "  Unordered Data Chunk(U) Bit=TRUE");
         EXPECT_EQ(md.field("  BE bits")->text, "  BE bits=" + pieces[flags % 4]);
     }
-    EXPECT_EQ(runPass(Pass::md, sctp(hex("00 00"))).fields[24].text, "  Unordered Data Chunk(U) Bit=FALSE");
     EXPECT_EQ(runPass(Pass::md, sctp(hex("06 00 00 04"))).field("  T bit")->text, "  T bit=Sender TCB");
     EXPECT_EQ(runPass(Pass::md, sctp(hex("0e 01"))).field("  T bit")->text, "  T bit=no sender TCB");
 }
@@ -348,15 +348,13 @@ TEST(SctpWalk, lengthsAndFields) {
         {"a type alone", hex("0b"), "802"},
         {"Length 0 takes nothing", hex("08 00 00 00  0b 00 00 04"), "802 887 888 805 892 808"},
         {"Length above the packet ends the walk", hex("0b 00 ff ff  0b 00 00 04"), "802 892 808", 0x10},
-        {"SACK's Length is taken once more behind ABORT",
-         hex("03 00 00 10 00*12  06 00 00 04  0b 00 00 04"),
+        {"SACK's Length is taken once more behind ABORT", hex("03 00 00 10 00*12  06 00 00 04  0b 00 00 04"),
          "802 873 874 875 876 877 878 805 944 945 946", 0x10},
-        {"nothing to take behind an ABORT in front", hex("06 00 00 04  0b 00 00 04"),
-         "802 944 945 946 805 892 808"},
+        {"nothing to take behind an ABORT in front", hex("06 00 00 04  0b 00 00 04"), "802 944 945 946 805 892 808"},
         {"padding of a cookie reads as DATA", hex("0a 00 00 09 01 02 03 04 05  00 00 00  0b 00 00 04"),
          "802 893 808 895 805 814 815 816 808", 0x10},
-        {"the rest of a long SHUTDOWN is the next chunk",
-         hex("07 00 00 0c 00 00 00 2a  0b 00 00 04  0e 00 00 04"), "802 884 885 886 805 892 808", 0x10},
+        {"the rest of a long SHUTDOWN is the next chunk", hex("07 00 00 0c 00 00 00 2a  0b 00 00 04  0e 00 00 04"),
+         "802 884 885 886 805 892 808", 0x10},
         {"COOKIE ECHO of Length 4", hex("0a 00 00 04"), "802 893 808 895"},
         {"COOKIE ECHO of Length 3", hex("0a 00 00 03 0b 00 00 04"), "802 893 808", 0x10},
         {"COOKIE ECHO takes 4 octets less", hex("0a 00 00 06 01 02  0b 00 00 04  0b 00 00 04"),
@@ -371,10 +369,11 @@ TEST(SctpWalk, lengthsAndFields) {
         {"reserved, cut short", hex("ff 00 00 06 61"), "802 809 808", 0x10},
         {"DATA without user data", hex("00 03 00 10 00*12  0b 00 00 04"), data + " 805 892 808"},
         {"DATA cut in front of its user data", hex("00 03 00 40 00*11"), "802 814 815 816 808 817 818 819", 0x10},
-        {"INIT's limit takes the next octet", hex("01 00 00 14 00*16  0b 00 00 04"),
-         initAlone + " 805 814 815 816", 0x10},
+        {"INIT's limit takes the next octet", hex("01 00 00 14 00*16  0b 00 00 04"), initAlone + " 805 814 815 816",
+         0x10},
         {"INIT cut in front of its Length", hex("01 00 00"), "802 823", 0x18},
-        {"INIT ACK without parameters", hex("02 00 00 14 00*16  00*3"), "802 835 836 837 838 839 840 841 805 814 815 816"},
+        {"INIT ACK without parameters", hex("02 00 00 14 00*16  00*3"),
+         "802 835 836 837 838 839 840 841 805 814 815 816", 0x10},
     };
     for (const SctpCase &one : cases) {
         checkCase(one);
@@ -392,7 +391,7 @@ TEST(SctpChunk, listsOfSackGoByTheirCounts) {
         {"three gaps, room for one", sack("00 03 00 00", "00 01 00 02"), " 881 882", 0x2},
         {"half a gap", sack("00 02 00 00", "00 01 00 02 00 03"), " 881 882 881"},
         {"two duplicates, room for one and a half", sack("00 00 00 02", "00 00 00 07 00 00"), " 883", 0x10},
-        {"all there", sack("00 01 00 02", "00 01 00 02 00 00 00 07 00 00 00 08"), " 881 882 883 883", 0x10},
+        {"all there", sack("00 01 00 02", "00 01 00 02 00 00 00 07 00 00 00 08"), " 881 882 883 883"},
     };
     for (const SctpCase &one : cases) {
         checkCase(one, head);
@@ -409,7 +408,7 @@ TEST(SctpChunk, heartbeatInformation) {
         {"no room for its own Length", hex("04 00 00 08  00 01 00 03"), " 941", 0x10},
         {"longer than the packet", hex("04 00 00 0c  00 01 00 09 aa bb cc dd"), " 941 942", 0x18},
         {"shorter than the chunk", hex("04 00 00 0c  00 01 00 06 aa bb cc dd"), " 941 942 943", 0x10},
-        {"without a Length", hex("04 00 00 06  00 01"), " 941", 0x8},
+        {"without a Length: as if it were 0", hex("04 00 00 06  00 01"), "", 0x10},
     };
     for (const SctpCase &one : cases) {
         checkCase(one, head);
@@ -424,27 +423,30 @@ TEST(SctpData, handsOnAndGoesOn) {
         00 03 00 12  00 00 00 02  00 00 00 00  00 00 00 03  62 63 00 00   # DATA of two
         0b 00 00 04                                                       # COOKIE ACK
     )");
-    const Runs runs = checkCase({"bundle", bundle, R"(802 814 815 816 808 817 818 819 820 * )"
-                                                   "805 873 874 875 876 877 878 "
-                                                   "805 814 815 816 808 817 818 819 820 * 805 892 808"});
+    const Runs runs = checkCase({"bundle", bundle,
+                                 "802 814 815 816 808 817 818 819 820 * "
+                                 "805 873 874 875 876 877 878 "
+                                 "805 814 815 816 808 817 818 819 820 * 805 892 808"});
     EXPECT_EQ(handOffLines(runs.md), expected(R"(
         hand-off key 2906 protocol 132 port 2906 at 385 bits 352 octets 0 preceding 0
         hand-off key 2906 protocol 132 port 2906 at 673 bits 64 octets 0 preceding 0
     )"));
     EXPECT_EQ(layerLines(runs.md), expected(R"(
         layer 1 of 1: 1-384
-        layer 2 of 0: 385-392
+        layer 2 of 0: 385-416
         layer 2 of 1: 417-672
-        layer 3 of 0: 673-688
+        layer 3 of 0: 673-704
         layer 3 of 1: 705-736
     )"));
     EXPECT_EQ(runs.xtr.key("TSN")->number, 1u); // the key pass ends at the first hand-off
     EXPECT_EQ(runs.xtr.bitsLeft, 352u);
     EXPECT_EQ(runs.xtr.key("Cumulative TSN Ack"), nullptr);
 
-    const Runs last = runAll(sctp(hex("03 00 00 10 00*12") + hex("00 03 00 10 00*4 00*4 00*4")));
-    EXPECT_EQ(last.xtr.key("TSN")->number, 0u); // without user data the keys of all chunks are there
-    EXPECT_EQ(last.xtr.key("Cumulative TSN Ack")->number, 0u);
+    // Without user data the keys of all chunks are there, and the last one wins.
+    const Runs last =
+        runAll(sctp(hex("00 03 00 10 00 00 00 07 00*8  03 00 00 10 00 00 00 2a 00*8  07 00 00 08 00 00 00 2b")));
+    EXPECT_EQ(last.xtr.key("TSN")->number, 7u);
+    EXPECT_EQ(last.xtr.key("Cumulative TSN Ack")->number, 43u);
 }
 
 TEST(SctpData, ownerRefuses) {
@@ -470,11 +472,7 @@ TEST(SctpData, ownerLeadsBack) {
     for (unsigned depth = 0; depth < 40; ++depth) {
         tunnel = sctp(chunk(0, hex("00*12") + tunnel) + hex("0b 00 00 04  00 03 00 18 00*12 45 00 00 14 ff ff ff ff"));
     }
-    const Octets sameAgain = hex("00 03 00 14 00*12 61 62 63 64");
-    Octets many;
-    for (unsigned count = 0; count < 300; ++count) {
-        many = many + sameAgain;
-    }
+    const Octets many = repeated("00 03 00 14 00*12 61 62 63 64", 6000);
     const std::vector<Octets> packets = {
         tunnel,
         sctp(many),
@@ -486,13 +484,12 @@ TEST(SctpData, ownerLeadsBack) {
         const Runs runs = runAll(packet, {}, host);
         EXPECT_EQ(runs.md.ending, Ending::complete);
         EXPECT_LE(runs.md.cursor, packet.size() * 8 + 1);
-        EXPECT_LE(calls, 5 * packet.size()); // five runs of a pass
-        EXPECT_GE(calls, 5u);
+        EXPECT_GE(calls, 4u);
+        EXPECT_LE(calls, 4 * packet.size() / 16);
     }
 }
 
 TEST(SctpChunk, longOctetStrings) {
-    const Octets cookie = sctp(chunk(10, hex("ff*1000")));
     for (const char *type : {"0a", "ff", "0c"}) {
         const Octets packet = sctp(hex(type) + hex("00 03 ec") + hex("ff*1000"));
         const Runs runs = runAll(packet);
@@ -510,10 +507,7 @@ TEST(SctpChunk, longOctetStrings) {
     }
     RunOptions narrow;
     narrow.state.allowGrowth = [](std::size_t) { return false; };
-    const Report stack = runPass(Pass::md, sctp(hex("0b 00 00 04*1") + hex("0b000004 0b000004 0b000004 0b000004 0b000004"
-                                                                            "0b000004 0b000004 0b000004 0b000004 0b000004"
-                                                                            "0b000004 0b000004 0b000004 0b000004 0b000004")),
-                                 narrow);
+    const Report stack = runPass(Pass::md, sctp(repeated("0b 00 00 04", 64)), narrow);
     EXPECT_EQ(stack.flags, 0x20000000u);
     EXPECT_EQ(stack.ending, Ending::cutOff);
 }
@@ -540,14 +534,6 @@ TEST(SctpWalk, overIpv6) {
 
 // 65535 octets with a chunk, or what else the walk goes round for, in every four of them.
 TEST(SctpWalk, longestPacketsOnASmallStack) {
-    const auto repeated = [](const char *octets, std::size_t room) {
-        const Octets unit = hex(octets);
-        Octets all;
-        while (all.size() + unit.size() <= room) {
-            all.insert(all.end(), unit.begin(), unit.end());
-        }
-        return all;
-    };
     constexpr std::size_t most = 65535 - 32;
     const std::vector<std::pair<Octets, std::size_t>> packets = {
         {repeated("0b 00 00 04", most), 3 * (most / 4)},

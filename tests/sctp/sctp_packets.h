@@ -3,7 +3,6 @@
 #pragma once
 
 #include <string>
-#include <string_view>
 
 #include "support/runs.h"
 
@@ -17,6 +16,16 @@ inline Octets sctp(const Octets &chunks) {
 // A chunk with its Length, and without padding.
 inline Octets chunk(std::uint8_t type, const Octets &value) {
     return Octets{type, 0} + be16(static_cast<std::uint32_t>(value.size() + 4)) + value;
+}
+
+// As many of `octets` as have room.
+inline Octets repeated(const char *octets, std::size_t room) {
+    const Octets unit = hex(octets);
+    Octets all;
+    while (all.size() + unit.size() <= room) {
+        all.insert(all.end(), unit.begin(), unit.end());
+    }
+    return all;
 }
 
 // The ids of the fields behind the common header; * is what the host took at a hand-off.
@@ -36,7 +45,7 @@ inline std::string chunkIds(const Report &md) {
 struct SctpCase {
     const char *what;
     Octets chunks;
-    std::string_view ids;
+    std::string ids;
     std::uint32_t mvFlags = 0;
     std::uint32_t mdFlags = 0; // those that all passes set
 };
@@ -44,7 +53,7 @@ struct SctpCase {
 inline Runs checkCase(const SctpCase &one, const std::string &front = {}) {
     SCOPED_TRACE(one.what);
     Runs runs = runAll(sctp(one.chunks));
-    EXPECT_EQ(chunkIds(runs.md), front + std::string(one.ids));
+    EXPECT_EQ(chunkIds(runs.md), front + one.ids);
     EXPECT_EQ(runs.mv.flags, one.mvFlags);
     EXPECT_EQ(runs.md.flags, one.mdFlags);
     EXPECT_EQ(runs.md.ending, Ending::complete);

@@ -1,0 +1,379 @@
+// SPDX-License-Identifier: MIT
+// ICMP messages (RFC 792, 950, 1256).
+#include <algorithm>
+#include <array>
+#include <string>
+#include <vector>
+
+#include <gtest/gtest.h>
+
+#include "support/runs.h"
+
+namespace netfloor::test {
+namespace {
+
+constexpr std::size_t ipv4Fields = 18;
+
+Octets icmp(const Octets &message) {
+    return ipv4({.protocol = 1, .payload = message});
+}
+
+// Of an IPv4 header without options, which an error message quotes.
+const Octets &quotedHeader() {
+    static const Octets header = hex("45 00 00 54 12 34 40 00 40 11 00 00 0a 00 00 01 c0 a8 00 02");
+    return header;
+}
+
+struct MessageCase {
+    const char *name;
+    Octets message;
+    const char *md, *to, *keys; // from the type on, keys from row 36 on
+};
+
+TEST(Icmp, everyFieldOfEachMessage) {
+    const std::vector<MessageCase> cases = {
+        {"echo", hex("08 00 ab cd 00 0a 00 64 41 00"), R"(
+            537 |5 ICMP Message Type| "ICMP Message Type" "ICMP Message Type=Echo Message" 161-168
+            542 |6 | "Code" "Code=0" 169-176
+            543 |6 | "Checksum" "  Checksum=abcd" 177-192/8
+            544 |6 | "Identifier" "  Identifier=a" 193-208/8
+            545 |6 | "ICMP Sequence Number" "  ICMP Sequence Number=100" 209-224/8
+            547 |6 | "  Message Data" "  Message Data=A" 225-232
+            547 |6 | "  Message Data" "  Message Data=" 233-240
+        )",
+         R"x(
+            531 "ICMP - EM (8)"
+            542 "0"
+            543 "abcd"
+            544 "a"
+            545 "100"
+            547 "A"
+            547 ""
+        )x",
+         "row 36 Code=0\nrow 37 ICMP Sequence Number=100\nrow 77 ICMP Message Type=8\n"},
+        {"timestamp reply", hex("0e 00 00 01 00 02 ff ff 00 00 00 0a 80 00 00 00 00 12 34 56"), R"(
+            537 |5 ICMP Message Type| "ICMP Message Type" "ICMP Message Type=Timestamp Reply Message" 161-168
+            576 |6 | "Code" "Code=0" 169-176
+            577 |6 | "Checksum" "  Checksum=1" 177-192/8
+            578 |6 | "Identifier" "  Identifier=2" 193-208/8
+            579 |6 | "ICMP Sequence Number" "  ICMP Sequence Number=65535" 209-224/8
+            580 |6 | "Originate Timestamp" "  Originate Timestamp=a" 225-256/8
+            581 |6 | "Receive Timestamp" "  Receive Timestamp=80000000" 257-288/8
+            582 |6 | "Transmit Timestamp" "  Transmit Timestamp=123456" 289-320/8
+        )",
+         R"x(
+            531 "ICMP - TRM (14)"
+            542 "0"
+            543 "1"
+            544 "2"
+            545 "65535"
+            580 "a"
+            581 "80000000"
+            582 "123456"
+        )x",
+         "row 36 Code=0\nrow 37 ICMP Sequence Number=65535\nrow 77 ICMP Message Type=14\n"},
+        {"information request", hex("0f 00 00 01 00 02 00 03"), R"(
+            537 |5 ICMP Message Type| "ICMP Message Type" "ICMP Message Type=Information Request Message" 161-168
+            583 |6 | "Code" "Code=0" 169-176
+            584 |6 | "Checksum" "  Checksum=1" 177-192/8
+            585 |6 | "Identifier" "  Identifier=2" 193-208/8
+            586 |6 | "ICMP Sequence Number" "  ICMP Sequence Number=3" 209-224/8
+        )",
+         R"x(
+            531 "ICMP - IReqM (15)"
+            542 "0"
+            543 "1"
+            544 "2"
+            545 "3"
+        )x",
+         "row 36 Code=0\nrow 37 ICMP Sequence Number=3\nrow 77 ICMP Message Type=15\n"},
+        // Entries take 8 octets, whatever their size is said to be.
+        {"router advertisement", hex("09 00 00 01 02 04 07 08 0a 00 00 01 00 00 00 05 0a 00 00 02 80 00 00 00"), R"(
+            537 |5 ICMP Message Type| "ICMP Message Type" "ICMP Message Type=ICMP Router Advertisement Message" 161-168
+            587 |6 | "Code" "Code=0" 169-176
+            588 |6 | "Checksum" "  Checksum=1" 177-192/8
+            589 |6 | "Num Addr" "  Num Addr=2" 193-200
+            590 |6 | "Addr Entry Size" "  Addr Entry Size=4" 201-208
+            591 |6 | "Lifetime" "  Lifetime=708" 209-224/8
+            595 |7 | "Router Address" "  Router Address=a000001" 225-256/8
+            596 |7 | "Preference Level" "  Preference Level=5" 257-288/8
+            595 |7 | "Router Address" "  Router Address=a000002" 289-320/8
+            596 |7 | "Preference Level" "  Preference Level=80000000" 321-352/8
+        )",
+         R"x(
+            531 "ICMP - IRAM (9)"
+            542 "0"
+            543 "1"
+            589 "2"
+            590 "4"
+            591 "708"
+            595 "a000001"
+            596 "5"
+            595 "a000002"
+            596 "80000000"
+        )x",
+         "row 36 Code=0\nrow 77 ICMP Message Type=9\n"},
+        {"router solicitation", hex("0a 00 00 01 00 00 00 1f"), R"(
+            537 |5 ICMP Message Type| "ICMP Message Type" "ICMP Message Type=ICMP Router Solicitation Message" 161-168
+            597 |6 | "Code" "Code=0" 169-176
+            598 |6 | "Checksum" "  Checksum=1" 177-192/8
+            599 |6 | "Reserved" "  Reserved=1f" 193-224/8
+        )",
+         R"x(
+            531 "ICMP - RSM (10)"
+            542 "0"
+            543 "1"
+            290 "1f"
+        )x",
+         "row 36 Code=0\nrow 77 ICMP Message Type=10\n"},
+        {"address mask reply", hex("12 00 00 01 00 02 00 03 ff ff ff 00"), R"(
+            537 |5 ICMP Message Type| "ICMP Message Type" "ICMP Message Type=Address Mask Reply Message" 161-168
+            600 |6 | "Code" "Code=0" 169-176
+            601 |6 | "Checksum" "  Checksum=1" 177-192/8
+            602 |6 | "Identifier" "  Identifier=2" 193-208/8
+            603 |6 | "ICMP Sequence Number" "  ICMP Sequence Number=3" 209-224/8
+            604 |6 | "Address Mask" "  Address Mask=ffffff00" 225-256/8
+        )",
+         R"x(
+            531 "ICMP - MRep (18)"
+            542 "0"
+            543 "1"
+            544 "2"
+            545 "3"
+            604 "ffffff00"
+        )x",
+         "row 36 Code=0\nrow 37 ICMP Sequence Number=3\nrow 38 Address Mask=255.255.255.0\n"
+         "row 77 ICMP Message Type=18\n"},
+        {"a type without a message", hex("02 0a ff"), R"(
+            537 |5 ICMP Message Type| "ICMP Message Type" "ICMP Message Type=Reserved" 161-168
+            541 |7 | "ICMP Reserved Data" "ICMP Reserved Data=a" 169-176
+            541 |7 | "ICMP Reserved Data" "ICMP Reserved Data=ff" 177-184
+        )",
+         R"x(
+            531 "ICMP - Rsvd (2)"
+            541 "a"
+            541 "ff"
+        )x",
+         ""},
+    };
+    for (const MessageCase &one : cases) {
+        SCOPED_TRACE(one.name);
+        const Runs runs = runAll(icmp(one.message));
+        EXPECT_EQ(linesFrom(lines(runs.md), "537"), expected(one.md));
+        EXPECT_EQ(linesFrom(lines(runs.to), "531"), expected(one.to));
+        EXPECT_EQ(linesFrom(lines(runs.xtr), "row 36"), one.keys);
+        EXPECT_EQ(runs.xtr.key("ICMP Message Type")->number, one.message[0]);
+        EXPECT_EQ(verdictLine(runs.mv), "verdict 0 flags 0x0\n");
+    }
+}
+
+struct ErrorCase {
+    const char *name;
+    Octets head;
+    const char *md; // without the quoted header
+    std::vector<const char *> to;
+};
+
+TEST(Icmp, everyFieldOfEachErrorMessage) {
+    // Eight octets of the datagram and five more, which only one of the messages takes, last octet first.
+    const Octets data = hex("01 02 03 0a 00 0b 0c ff e1 e2 e3 e4 e5");
+    const std::vector<ErrorCase> cases = {
+        {"unreachable",
+         hex("03 03 00 0a 00 00 00 01"),
+         R"(
+            537 |5 ICMP Message Type| "ICMP Message Type" "ICMP Message Type=Destination Unreachable Message" 161-168
+            548 |6 Destination Unreachable Message| "Code" "  Code=Port unreachable" 169-176
+            549 |6 Destination Unreachable Message| "Checksum" "  Checksum=a" 177-192/8
+            550 |6 Destination Unreachable Message| "Unused" "  Unused=1" 193-224/8
+            551 |6 Destination Unreachable Message| "64-bit Original Data Datagram" "  64-bit Original Data Datagram=123a0bcff" 385-448/8
+            555 |6 Destination Unreachable Message| "" "" 481-488 473-480 465-472 457-464 449-456
+         )",
+         {"531 \"ICMP - DUM (3)\"", "542 \"Port unreachable\"", "543 \"a\"", "550 \"1\"", "551 \"b0cff\"",
+          "555 \"e4e3e2e1\""}},
+        {"source quench",
+         hex("04 00 00 0a 00 00 00 01"),
+         R"(
+            537 |5 ICMP Message Type| "ICMP Message Type" "ICMP Message Type=Source Quench Message" 161-168
+            556 |6 Source Quench Message| "Code" "Code=0" 169-176
+            557 |6 Source Quench Message| "Checksum" "  Checksum=a" 177-192/8
+            558 |6 Source Quench Message| "Unused" "  Unused=1" 193-224/8
+            559 |6 Source Quench Message| "64-bit Original Data Datagram" "  64-bit Original Data Datagram=123a0bcff" 385-448/8
+         )",
+         {"531 \"ICMP - SQM (4)\"", "542 \"0\"", "543 \"a\"", "550 \"1\"", "551 \"b0cff\""}},
+        {"redirect",
+         hex("05 01 00 0a 0a 00 ff 01"),
+         R"(
+            537 |5 ICMP Message Type| "ICMP Message Type" "ICMP Message Type=Redirect Message" 161-168
+            560 |6 Redirect Message| "Code" "  Code=Redirect datagram for the host" 169-176
+            561 |6 Redirect Message| "Checksum" "  Checksum=a" 177-192/8
+            564 |6 Redirect Message| "Gateway Internet Address" "  Gateway Internet Address=10.0.255.1" 193-224/8
+            566 |6 Redirect Message| "64-bit Original Data Datagram" "  64-bit Original Data Datagram=123a0bcff" 385-448/8
+         )",
+         {"531 \"ICMP - RM (5)\"", "542 \"Redirect datagram for the host\"", "543 \"a\"", "564 \"10.0.255.1\"",
+          "551 \"b0cff\""}},
+        {"time exceeded",
+         hex("0b 00 00 0a 00 00 00 01"),
+         R"(
+            537 |5 ICMP Message Type| "ICMP Message Type" "ICMP Message Type=Time Exceeded Message" 161-168
+            567 |6 Time Exceeded Message| "Code" "  Code=Time to live exceeded in transmit" 169-176
+            568 |6 Time Exceeded Message| "Checksum" "  Checksum=a" 177-192/8
+            569 |6 Time Exceeded Message| "Unused" "  Unused=1" 193-224/8
+            570 |6 Time Exceeded Message| "64-bit Original Data Datagram" "  64-bit Original Data Datagram=123a0bcff" 385-448/8
+         )",
+         {"531 \"ICMP - TEM (11)\"", "542 \"Time to live exceeded in transmit\"", "543 \"a\"", "550 \"1\"",
+          "551 \"b0cff\""}},
+        {"parameter problem",
+         hex("0c 00 00 0a 14 00 00 01"),
+         R"(
+            537 |5 ICMP Message Type| "ICMP Message Type" "ICMP Message Type=Parameter Problem Message" 161-168
+            571 |6 Parameter Problem Message| "Code" "  Code=Pointer Indicates the error" 169-176
+            572 |6 Parameter Problem Message| "Checksum" "  Checksum=a" 177-192/8
+            573 |6 Parameter Problem Message| "Pointer" "  Pointer=14" 193-200
+            574 |6 Parameter Problem Message| "Unused" "  Unused=1" 201-224/8
+            575 |6 Parameter Problem Message| "64-bit Original Data Datagram" "  64-bit Original Data Datagram=123a0bcff" 385-448/8
+         )",
+         {"531 \"ICMP - PPM (12)\"", "542 \"Pointer Indicates the error\"", "543 \"a\"", "333 \"14\"", "550 \"1\"",
+          "551 \"b0cff\""}},
+    };
+    for (const ErrorCase &one : cases) {
+        SCOPED_TRACE(one.name);
+        const Runs runs = runAll(icmp(one.head + quotedHeader() + data));
+        const std::string all = linesFrom(lines(runs.md), "537");
+        std::string others;
+        for (std::size_t at = 0; at < all.size(); at = all.find('\n', at) + 1) {
+            const std::string line = all.substr(at, all.find('\n', at) + 1 - at);
+            if (line.find(" |7 ") == std::string::npos && line.find(" |8 ") == std::string::npos) {
+                others += line;
+            }
+        }
+        EXPECT_EQ(others, expected(one.md));
+        const std::string texts = linesFrom(lines(runs.to), "531");
+        for (const char *line : one.to) {
+            EXPECT_NE(texts.find(std::string(line) + '\n'), std::string::npos) << line << " is not in\n" << texts;
+        }
+        const bool takesAll = one.head[0] == 3;
+        EXPECT_EQ(std::ranges::count(texts, '\n'), static_cast<std::ptrdiff_t>(one.to.size() + 18));
+        EXPECT_EQ(runs.xtr.key("Code")->number, one.head[1]);
+        EXPECT_EQ(runs.xtr.key("Code")->row, 36u);
+        EXPECT_EQ(runs.md.flags, 0u);
+        EXPECT_EQ(runs.mv.flags, takesAll ? 0u : 0x10u);
+    }
+}
+
+struct TypeNames {
+    const char *md = "Reserved";
+    const char *to = "Rsvd";
+};
+
+TEST(Icmp, nameOfEachType) {
+    std::array<TypeNames, 256> names{};
+    names[0] = {"Echo Reply Message", "ERM"};
+    names[3] = {"Destination Unreachable Message", "DUM"};
+    names[4] = {"Source Quench Message", "SQM"};
+    names[5] = {"Redirect Message", "RM"};
+    names[8] = {"Echo Message", "EM"};
+    names[9] = {"ICMP Router Advertisement Message", "IRAM"};
+    names[10] = {"ICMP Router Solicitation Message", "RSM"};
+    names[11] = {"Time Exceeded Message", "TEM"};
+    names[12] = {"Parameter Problem Message", "PPM"};
+    names[13] = {"Timestamp Message", "TM"};
+    names[14] = {"Timestamp Reply Message", "TRM"};
+    names[15] = {"Information Request Message", "IReqM"};
+    names[16] = {"Information Reply Message", "IRepM"};
+    names[17] = {"Address Mask Request Message", "MReq"};
+    names[18] = {"Address Mask Reply Message", "MRep"};
+    for (unsigned type = 0; type < names.size(); ++type) {
+        const Runs runs = runAll(icmp({static_cast<std::uint8_t>(type)}));
+        EXPECT_EQ(runs.md.fields.back().text, std::string("ICMP Message Type=") + names[type].md);
+        EXPECT_EQ(runs.to.displays.back().text,
+                  std::string("ICMP - ") + names[type].to + " (" + std::to_string(type) + ')');
+    }
+}
+
+TEST(Icmp, nameOfEachCode) {
+    const std::vector<std::pair<std::uint8_t, std::vector<std::string>>> types = {
+        {3,
+         {"Net unreachable", "Host unreachable", "Protocol unreachable", "Port unreachable",
+          "Fragmentation needed and DF set", "Source Route Failed", "", ""}},
+        {5,
+         {"Redirect datagram for the network", "Redirect datagram for the host",
+          "Redirect datagram for the Type of Service and Network", "Redirect datagram for the Type of Service and Host",
+          ""}},
+        {11, {"Time to live exceeded in transmit", "Fragment reassembly time exceeded", ""}},
+        {12, {"Pointer Indicates the error", "", ""}},
+    };
+    for (const auto &[type, names] : types) {
+        for (std::uint8_t code = 0; code < names.size(); ++code) {
+            const Runs runs = runAll(icmp({type, code}));
+            EXPECT_EQ(runs.md.fields.back().text, "  Code=" + names[code]);
+            EXPECT_EQ(linesWith(lines(runs.to), "542"), "542 \"" + names[code] + "\"\n");
+            EXPECT_EQ(runs.mv.flags, 0u);
+        }
+    }
+}
+
+// Messages that know one code only: with another one, or none, they are not read.
+TEST(Icmp, messagesWithCodeZeroOnly) {
+    for (const std::uint8_t type : hex("00 04 08 09 0a 0d 0e 0f 10 11 12")) {
+        SCOPED_TRACE(int{type});
+        const Runs otherCode = runAll(icmp(Octets{type} + hex("01 00*30")));
+        EXPECT_EQ(otherCode.md.fields.size(), ipv4Fields + 1);
+        EXPECT_EQ(otherCode.md.flags, 2u);
+        EXPECT_EQ(otherCode.mv.flags, 0x12u);
+        const Runs none = runAll(icmp({type}));
+        EXPECT_EQ(none.md.fields.size(), ipv4Fields + 1);
+        EXPECT_EQ(none.mv.flags, 2u);
+        const Runs whole = runAll(icmp(Octets{type} + hex("00 00*6")));
+        EXPECT_GT(whole.md.fields.size(), ipv4Fields + 3);
+        EXPECT_EQ(whole.md.flags, 0u);
+    }
+    EXPECT_EQ(runAll(icmp(hex("03"))).mv.flags, 0u); // has other codes
+}
+
+struct CountCase {
+    const char *name;
+    Octets packet;
+    const char *id;
+    std::ptrdiff_t fields; // of this id
+    std::uint32_t flagsOfMv;
+};
+
+Octets inTunnel(std::uint16_t innerLength, const Octets &message) {
+    return ipv4({.protocol = 4, .payload = ipv4({.protocol = 1, .payload = message, .totalLength = innerLength})});
+}
+
+TEST(Icmp, countsOfOctetsAndEntries) {
+    const Octets echo = hex("08 00 00 00 00 01 00 02");
+    const Octets advertisement = hex("09 00 00 00 03 02 00 00");
+    const Octets error = hex("0b 00 00 00 00 00 00 00") + quotedHeader();
+    const std::vector<CountCase> cases = {
+        {"echo without data", icmp(echo), "547", 0, 0},
+        {"echo with less data than the header length leaves",
+         ipv4({.protocol = 1, .payload = echo + hex("41 42"), .headerWords = 4}), "547", 2, 0},
+        {"echo in a shorter datagram", inTunnel(24, echo), "547", 0, 2},
+        {"the same with data", inTunnel(24, echo + hex("41")), "547", 0, 0x12},
+        {"echo in a datagram that ends in its data", inTunnel(29, echo + hex("41 42")), "547", 1, 0x10},
+        {"other type in a shorter datagram", inTunnel(20, hex("02 01")), "541", 0, 0x12},
+        {"other type with less data than the header length leaves",
+         ipv4({.protocol = 1, .payload = hex("02 01"), .headerWords = 4}), "541", 1, 0},
+        {"no router", icmp(hex("09 00 00 00 00 02 00 00")), "595", 0, 0},
+        {"cut behind the first of three routers", icmp(advertisement + hex("01*8")), "595", 1, 2},
+        {"cut inside the second router", icmp(advertisement + hex("01*12")), "595", 2, 2},
+        {"cut behind the second router", icmp(advertisement + hex("01*16")), "595", 2, 0},
+        {"cut inside the third router", icmp(advertisement + hex("01*20")), "595", 3, 0},
+        {"more than the routers", icmp(advertisement + hex("01*25")), "595", 3, 0x10},
+        {"seven octets of the datagram", icmp(error + hex("61*7")), "570", 0, 0x10},
+        {"eight octets of the datagram", icmp(error + hex("61*8")), "570", 1, 0},
+        {"none behind the datagram", icmp(hex("03 01 00*6") + quotedHeader() + hex("61*8")), "555", 0, 0},
+    };
+    for (const CountCase &one : cases) {
+        SCOPED_TRACE(one.name);
+        const Runs runs = runAll(one.packet);
+        EXPECT_EQ(std::ranges::count(linesWith(lines(runs.md), one.id), '\n'), one.fields);
+        EXPECT_EQ(runs.md.flags, 0u);
+        EXPECT_EQ(runs.mv.flags, one.flagsOfMv);
+    }
+}
+
+} // namespace
+} // namespace netfloor::test

@@ -1,0 +1,13 @@
+// SPDX-License-Identifier: MIT
+// Packets that between them hold every field of the plug-in.
+#pragma once
+
+#include <vector>
+
+#include "support/packets.h"
+
+namespace netfloor::test {
+
+[[nodiscard]] std::vector<Octets> packetsOfAllFields();
+
+} // namespace netfloor::test

@@ -1,0 +1,226 @@
+// SPDX-License-Identifier: MIT
+// The two views of a field agree: what the MD pass reports of it is what a reader of the tables works out.
+#include <algorithm>
+#include <filesystem>
+#include <fstream>
+#include <iterator>
+#include <map>
+#include <set>
+#include <string>
+#include <vector>
+
+#include <gtest/gtest.h>
+
+#include "support/runs.h"
+#include "tables/corpus.h"
+
+namespace netfloor::test {
+namespace {
+
+const FieldTables &tables() {
+    static const FieldTables all(PluginLibrary::open(NETFLOOR_PLUGIN));
+    return all;
+}
+
+// The pass keeps a display line in a buffer of 256 octets.
+constexpr std::size_t longestText = 255;
+
+// Bits first to last, the later octet the more significant one, straight from the numbering of bits.
+std::uint32_t bits(const Octets &packet, std::uint32_t first, std::uint32_t last) {
+    std::uint32_t value = 0;
+    for (std::uint32_t bit = last; bit >= first; --bit) {
+        value = value << 1 | (packet.at((bit - 1) / 8) >> ((bit - 1) % 8) & 1u);
+    }
+    return value;
+}
+
+// What the tables do not tell, and the grammar does.
+const std::set<std::uint32_t> scaledByEight = {294, 619};
+const std::set<std::uint32_t> readBackward = {201, 208, 209, 215, 216, 555, 895, 925, 927}; // last octet first
+constexpr std::uint32_t secondOctetFirst = 0x269; // so the layout lists two octets that are read in network order
+
+// Compares report after report with the tables, and keeps what it has seen.
+class Comparison {
+public:
+    void add(const Octets &packet) {
+        const Report report = sharedHost().run(Pass::md, packet);
+        for (std::size_t i = 0; i < report.fields.size() && !failed_; ++i) {
+            if (const FieldReport &field = report.fields[i]; field.id != 0) {
+                compare(packet, field, i + 1 < report.fields.size() ? &report.fields[i + 1] : nullptr);
+            }
+        }
+    }
+
+    [[nodiscard]] const std::map<std::uint32_t, std::set<std::uint32_t>> &values() const { return values_; }
+    [[nodiscard]] const std::set<std::uint32_t> &followed() const { return followed_; }
+    [[nodiscard]] const std::set<std::uint32_t> &moved() const { return moved_; }
+    [[nodiscard]] const std::set<std::uint32_t> &reversed() const { return reversed_; }
+    [[nodiscard]] std::uint64_t reports() const { return reports_; }
+
+private:
+    void compare(const Octets &packet, const FieldReport &report, const FieldReport *next) {
+        ++reports_;
+        const FieldDescription *const known = find(report.id);
+        if (known == nullptr) {
+            return fail(packet, report, "no such field in the tables");
+        }
+        const std::string_view name = std::string_view(report.name).substr(report.name.find_first_not_of(' ') + 1 == 0
+                                                                               ? report.name.size()
+                                                                               : report.name.find_first_not_of(' '));
+        if (name != known->name && name != known->shortName) {
+            return fail(packet, report, "named " + std::string(known->name));
+        }
+        const std::vector<std::uint32_t> elements = elementsOf(packet, report, *known);
+        if (const std::string text = known->display(report.value, elements).substr(0, longestText); report.text != text) {
+            return fail(packet, report, "shown as " + text);
+        }
+        if (known->layout.kind != FieldLayout::Kind::none) {
+            comparePlace(packet, report, *known, next);
+        }
+        if (std::set<std::uint32_t> &seen = values_[report.id]; known->width.value_or(99) <= 16) {
+            seen.insert(report.value);
+        }
+    }
+
+    void comparePlace(const Octets &packet, const FieldReport &report, const FieldDescription &known,
+                      const FieldReport *next) {
+        std::vector<BitSpan> spans;
+        std::uint32_t value = 0;
+        std::uint32_t width = 0;
+        for (const ReportedRange &range : report.ranges) {
+            spans.push_back({range.firstBit, range.lastBit});
+            const std::uint32_t rangeWidth = range.lastBit - range.firstBit + 1;
+            if (range.value != elementAt(packet, range, known)) {
+                return fail(packet, report, "other bits at " + std::to_string(range.firstBit));
+            }
+            value = (rangeWidth == 32 ? 0 : value << rangeWidth) | range.value;
+            width += rangeWidth;
+        }
+        const auto repeats = static_cast<std::uint32_t>(spans.size() / known.layout.pieces.size());
+        const std::uint32_t cursor = cursorOf(spans, known);
+        std::vector<BitSpan> expected = known.layOut(cursor, repeats);
+        if (spans != expected) {
+            std::ranges::reverse(expected);
+            reversed_.insert(report.id);
+        }
+        const bool fits = repeats >= known.layout.leastCount &&
+                          (known.layout.mostCount == 0 || repeats <= known.layout.mostCount);
+        if (spans != expected || !fits || (known.width && *known.width != width)) {
+            return fail(packet, report, "elsewhere");
+        }
+        if (value * (scaledByEight.contains(report.id) ? 8 : 1) != report.value) {
+            return fail(packet, report, "value " + std::to_string(value));
+        }
+        if (const FieldDescription *const nextKnown = next == nullptr ? nullptr : find(next->id);
+            nextKnown != nullptr && nextKnown->layout.kind != FieldLayout::Kind::none && !next->ranges.empty()) {
+            std::vector<BitSpan> nextSpans;
+            for (const ReportedRange &range : next->ranges) {
+                nextSpans.push_back({range.firstBit, range.lastBit});
+            }
+            followed_.insert(report.id);
+            if (cursorOf(nextSpans, *nextKnown) == cursor + known.layout.advance(repeats)) {
+                moved_.insert(report.id);
+            }
+        }
+    }
+
+    static std::uint32_t cursorOf(const std::vector<BitSpan> &spans, const FieldDescription &known) {
+        const auto lowest = [](const std::vector<BitSpan> &all) {
+            return std::ranges::min(all, {}, &BitSpan::first).first;
+        };
+        return spans.empty() ? 1 : lowest(spans) - lowest(known.layOut(1, 1)) + 1;
+    }
+
+    static std::uint32_t elementAt(const Octets &packet, const ReportedRange &range, const FieldDescription &known) {
+        const bool bitsReversed = known.layout.pieces.front().first > known.layout.pieces.front().last;
+        if (!bitsReversed) {
+            return bits(packet, range.firstBit, range.lastBit);
+        }
+        // Of octets whose bits are reversed, read backward: they come out in network order.
+        return bits(packet, range.firstBit, range.firstBit + 7) << 8 | bits(packet, range.lastBit - 7, range.lastBit);
+    }
+
+    // The elements of a list. A field that is shown by groups reports one stretch of bits for all of them.
+    static std::vector<std::uint32_t> elementsOf(const Octets &packet, const FieldReport &report,
+                                                 const FieldDescription &known) {
+        std::vector<std::uint32_t> elements;
+        if (known.layout.kind == FieldLayout::Kind::none && report.ranges.size() == 1 &&
+            known.format.find("%-[") != std::string_view::npos) {
+            for (std::uint32_t bit = report.ranges.front().firstBit; bit < report.ranges.front().lastBit; bit += 16) {
+                std::uint32_t group = 0;
+                for (std::uint32_t nibble = bit; nibble < bit + 16; nibble += 4) {
+                    group = group << 4 | bits(packet, nibble, nibble + 3);
+                }
+                elements.push_back(group);
+            }
+            return elements;
+        }
+        for (const ReportedRange &range : report.ranges) {
+            elements.push_back(range.value);
+        }
+        return elements;
+    }
+
+    const FieldDescription *find(std::uint32_t id) {
+        const auto [found, isNew] = byId_.try_emplace(id, nullptr);
+        if (isNew) {
+            found->second = tables().find(id);
+        }
+        return found->second;
+    }
+
+    void fail(const Octets &packet, const FieldReport &report, const std::string &why) {
+        failed_ = true;
+        ADD_FAILURE() << report.id << " \"" << report.name << "\" \"" << report.text << "\" value " << report.value
+                      << ": by the tables " << why << "\n"
+                      << hexText(packet);
+    }
+
+    std::map<std::uint32_t, const FieldDescription *> byId_;
+    std::map<std::uint32_t, std::set<std::uint32_t>> values_; // by id, of fields of up to 16 bits
+    std::set<std::uint32_t> followed_;                        // another field with a layout followed
+    std::set<std::uint32_t> moved_;                           // and stood where the advance leads
+    std::set<std::uint32_t> reversed_;                        // reported in the other order than the layout's
+    std::uint64_t reports_ = 0;
+    bool failed_ = false;
+};
+
+Comparison &comparison() {
+    static Comparison all;
+    return all;
+}
+
+std::string idsText(const std::set<std::uint32_t> &ids) {
+    std::string text;
+    for (const std::uint32_t id : ids) {
+        text += (text.empty() ? "" : " ") + std::to_string(id);
+    }
+    return text;
+}
+
+TEST(Views, AgreeOnEveryField) {
+    Comparison all;
+    for (const Octets &packet : packetsOfAllFields()) {
+        all.add(packet);
+    }
+    std::set<std::uint32_t> missing;
+    std::set<std::uint32_t> backward = readBackward;
+    for (const FieldDescription &field : tables().fields()) {
+        if (!all.values().contains(field.id)) {
+            missing.insert(field.id);
+        }
+        if (field.layoutOffset == secondOctetFirst) {
+            backward.insert(field.id);
+        }
+    }
+    EXPECT_EQ(idsText(missing), "");
+    EXPECT_EQ(idsText(all.reversed()), idsText(backward));
+    std::set<std::uint32_t> unmoved;
+    for (const auto& [id, v] : all.values()) if (!all.moved().contains(id)) unmoved.insert(id);
+    std::cout << idsText(all.followed())<<"\n";
+    for (auto id : unmoved) if (all.followed().contains(id)) std::cout << id << " F\n";
+    EXPECT_EQ(idsText(unmoved), "");
+}
+
+} // namespace
+} // namespace netfloor::test
