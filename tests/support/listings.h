@@ -1,0 +1,43 @@
+// SPDX-License-Identifier: MIT
+// Dense forms of what MD and TO reported, for tests of many fields.
+#pragma once
+
+#include <cstdint>
+#include <sstream>
+#include <string>
+
+#include "support/runs.h"
+
+namespace netfloor::test {
+
+// One line a field, behind the first field of id `behind`: the line of MD, then that of TO.
+//     542 |6 | "Code" "Code=0" 169-176 > 542 "0"
+inline std::string fieldLines(const Runs &runs, std::uint32_t behind) {
+    const std::string start = std::to_string(behind) + ' ';
+    std::istringstream md(lines(runs.md));
+    std::istringstream to(lines(runs.to));
+    std::string result;
+    bool found = false;
+    for (std::string long_, short_; std::getline(md, long_) && std::getline(to, short_);) {
+        if (found) {
+            result += long_ + " > " + short_ + '\n';
+        }
+        found = found || long_.starts_with(start);
+    }
+    return result;
+}
+
+// Id and value in hexadecimal, of the fields behind the first one of id `behind`: "447=2 448=4 451=5b4".
+inline std::string fieldValues(const Report &md, std::uint32_t behind) {
+    std::ostringstream out;
+    bool found = false;
+    for (const FieldReport &field : md.fields) {
+        if (found && field.id != 0) {
+            out << (out.tellp() > 0 ? " " : "") << std::dec << field.id << '=' << std::hex << field.value;
+        }
+        found = found || field.id == behind;
+    }
+    return out.str();
+}
+
+} // namespace netfloor::test
