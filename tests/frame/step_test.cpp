@@ -114,8 +114,10 @@ TEST(FieldStep, whatStaysBehindARun) {
 
 // Elements are used again and again, and keep what a field wrote until another field needs them: behind the two
 // elements of the last field stands the end of the destination address.
+// The other two passes write the record for the last field alone: what earlier fields would have left in the elements
+// above its own is nobody's to read.
 TEST(FieldStep, elementsKeepWhatWasReadIntoThem) {
-    for (const Pass pass : allPasses) {
+    for (const Pass pass : {Pass::md, Pass::to}) {
         BareRun run(examplePacket(), seeded());
         EXPECT_EQ(run.enter(pass), 1);
         run.state().fieldRecord.rangeCount = 5;
