@@ -1,30 +1,25 @@
 // SPDX-License-Identifier: MIT
 #include "printers/field_names.h"
 
-#include <algorithm>
-#include <utility>
+#include <set>
+#include <string_view>
 
-#include "printers/printer.h"
+#include "netfloor-host/field_tables.h"
 
 namespace netfloor::cli {
 
-void FieldNames::learn(const Report &report, std::span<const std::uint8_t> packet) {
-    const bool known = std::all_of(report.displays.begin(), report.displays.end(),
-                                   [this](const DisplayReport &display) { return names_.contains(display.displayId); });
-    if (known) {
-        return;
+FieldNames::FieldNames(const PluginLibrary &library) {
+    const FieldTables tables(library);
+    // A display id stands for all fields of one name, and any of them may be the one with the key.
+    std::set<std::string_view> keyNames;
+    for (const FieldDescription &field : tables.fields()) {
+        if (field.keyIndex != 0) {
+            keyNames.insert(field.name);
+        }
     }
-    if (names_.empty()) {
-        const auto names = keyFieldNames(host_);
-        keyNames_.insert(names.begin(), names.end());
-        names_[0] = {}; // what an owner of a next layer says
-    }
-    const Report named = host_.run(Pass::md, packet);
-    for (std::size_t i = 0; i < report.displays.size() && i < named.fields.size(); ++i) {
-        std::string name(withoutLeadingBlanks(named.fields[i].name));
-        const bool isKey = keyNames_.contains(name);
-        name.resize(name.find_last_not_of(' ') + 1);
-        names_.try_emplace(report.displays[i].displayId, DisplayName{std::move(name), isKey});
+    for (const FieldDescription &field : tables.fields()) {
+        const std::string_view name = field.name.substr(0, field.name.find_last_not_of(' ') + 1);
+        names_.try_emplace(field.id, DisplayName{std::string(name), keyNames.contains(field.name)});
     }
 }
 

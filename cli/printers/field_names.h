@@ -1,14 +1,12 @@
 // SPDX-License-Identifier: MIT
-// What is behind the display ids of the TO pass.
+// What is behind the display ids of the TO pass, whose texts bear no names.
 #pragma once
 
 #include <cstdint>
-#include <set>
-#include <span>
 #include <string>
 #include <unordered_map>
 
-#include "netfloor-host/host.h"
+#include "netfloor-host/plugin_library.h"
 
 namespace netfloor::cli {
 
@@ -17,20 +15,15 @@ struct DisplayName {
     bool isKey = true; // one of the key fields, by which the plug-in itself says what matters of a packet
 };
 
-// A short text bears no name, so the name behind an id is learned from the MD pass over the same packet, which
-// reports the same fields in the same order.
 class FieldNames {
 public:
-    explicit FieldNames(Host &host) : host_(host) {}
+    // Throws PluginError when the plug-in does not give its tables.
+    explicit FieldNames(const PluginLibrary &library);
 
-    // Makes find() good for all that the TO report `report` of `packet` shows.
-    void learn(const Report &report, std::span<const std::uint8_t> packet);
-
+    // What an owner of a next layer says, whose id is 0, counts like a key field.
     [[nodiscard]] const DisplayName &find(std::uint32_t displayId) const;
 
 private:
-    Host &host_;
-    std::set<std::string, std::less<>> keyNames_;
     std::unordered_map<std::uint32_t, DisplayName> names_;
 };
 

@@ -48,6 +48,14 @@ std::string rawText(const KeyValue &key) {
     return keyText(key);
 }
 
+// The names in the plug-in's key-field table, row by row.
+std::vector<std::string> keyFieldNames(Host &host) {
+    // The plug-in hands its table over in its first XTR pass, whatever the packet.
+    constexpr std::array<std::uint8_t, 1> noPacket = {0};
+    (void)host.run(Pass::xtr, noPacket);
+    return host.library().keyFieldNames();
+}
+
 class KeysPrinter final : public Printer {
 public:
     KeysPrinter(const Options &options, Output &out, Host &host) : Printer(options, out, host) {

@@ -2,7 +2,6 @@
 #include "printers/printer.h"
 
 #include <algorithm>
-#include <array>
 #include <utility>
 #include <vector>
 
@@ -56,13 +55,6 @@ std::string cutText(const CapturedPacket &packet) {
     }
     return "cut by the snap length: " + std::to_string(packet.octets.size()) + " of " +
            std::to_string(packet.wireOctets) + " octets";
-}
-
-std::vector<std::string> keyFieldNames(Host &host) {
-    // The plug-in hands its table over in its first XTR pass, whatever the packet.
-    constexpr std::array<std::uint8_t, 1> noPacket = {0};
-    (void)host.run(Pass::xtr, noPacket);
-    return host.library().keyFieldNames();
 }
 
 std::unique_ptr<Printer> makePrinter(const Options &options, Output &out, Host &host) {

@@ -6,7 +6,6 @@
 #include <map>
 #include <memory>
 #include <string>
-#include <vector>
 
 #include "capture/capture.h"
 #include "exit_code.h"
@@ -64,9 +63,6 @@ private:
 
 // "cut by the snap length: 96 of 1514 octets", or empty.
 [[nodiscard]] std::string cutText(const CapturedPacket &packet);
-
-// The names in the plug-in's key-field table, row by row.
-[[nodiscard]] std::vector<std::string> keyFieldNames(Host &host);
 
 [[nodiscard]] std::unique_ptr<Printer> makePrinter(const Options &options, Output &out, Host &host);
 

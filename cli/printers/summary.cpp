@@ -23,7 +23,8 @@ bool isBareNumber(std::string_view text) {
 
 class SummaryPrinter final : public Printer {
 public:
-    SummaryPrinter(const Options &options, Output &out, Host &host) : Printer(options, out, host), names_(host) {}
+    SummaryPrinter(const Options &options, Output &out, Host &host)
+        : Printer(options, out, host), names_(host.library()) {}
 
     void print(const CapturedPacket &packet, const NetworkPart &network, const std::string &time) override {
         printHead(packet, time);
@@ -48,7 +49,6 @@ public:
 private:
     void printTexts(std::span<const std::uint8_t> octets) {
         const Report report = host().run(Pass::to, octets);
-        names_.learn(report, octets);
         bool first = true;
         const auto &displays = report.displays;
         for (std::size_t i = 0; i < displays.size();) {

@@ -189,6 +189,60 @@ TEST_F(Command, endsWithACodeAndASentence) {
     });
 }
 
+// What every packet of a kind leaves by design is told apart from damage, and only damage makes the exit code.
+TEST_F(Command, tellsMarksByDesignFromDamage) {
+    const Octets tcpHead = hex("0050 9c40 00000001 00000000");
+    const Octets init = hex("0b59 0b59 00000000 00000000  01 00 0014 00000001 00010000 000a 000a 00000001");
+    Octets longInit = init;
+    longInit[15] = 0x20; // the length says 12 octets more
+    struct Row {
+        Octets packet;
+        std::uint32_t wireOctets;
+        const char *expected;
+        int exitCode;
+    };
+    const std::vector<Row> rows = {
+        {udpPacket, 0, "good\n", 0},
+        {ipv4({.protocol = 6, .payload = tcpHead + hex("5002 0100 0000 0000")}), 0, "good     0x2 every TCP header", 0},
+        {ipv4({.protocol = 6, .payload = tcpHead + hex("5002 0100 0000 0000 61*4")}), 0, "at most 4 octets", 0},
+        {ipv4({.protocol = 17, .payload = udp(1, 2, hex("61*4"))}), 0, "good     0x10 a UDP payload", 0},
+        {ipv4({.protocol = 47, .payload = hex("0000 0800 45*20")}), 0, "good     0x2 every GRE payload", 0},
+        {ipv4({.protocol = 132, .payload = init}), 0, "good     0x8 an SCTP INIT", 0},
+        {ipv4({.protocol = 17, .payload = hex("0001 0002 0010")}), 0,
+         "unread   0x10 bits left over inside a length: 2 octets behind 'UDP Destination Port' at octet 23", 0},
+        {ipv4({.protocol = 6, .payload = tcpHead + hex("f002 0100 0000 0000")}), 0, "DAMAGED  0x2 every TCP header", 1},
+        {ipv4({.protocol = 132, .payload = longInit}), 0, "DAMAGED  0x8 length reaches behind the bits left", 1},
+        {ipv4({.protocol = 1, .payload = hex("08 01 0000 0001 0001")}), 0,
+         "DAMAGED  0x2 expectation not met behind 'ICMP Message Type' at octet 20", 1},
+        // The capture, not the sender, has cut the first.
+        {ipv4({.protocol = 132, .payload = longInit}), 60, "cut      0x8", 0},
+        {shortened(udpPacket, 10), 0, "unread", 0},
+    };
+    for (const Row &row : rows) {
+        SCOPED_TRACE(row.expected);
+        writeFile("one.pcap", pcapFile(228, {{row.packet, row.wireOctets}}));
+        const Outcome outcome = shell("netfloor verify $T/one.pcap");
+        EXPECT_NE(outcome.out.find(row.expected), std::string::npos) << outcome.out;
+        EXPECT_EQ(outcome.exitCode, row.exitCode);
+        EXPECT_EQ(outcome.err, "");
+    }
+}
+
+TEST_F(Command, showsIpv6AddressesInTheirUsualForm) {
+    writeFile("ipv6.pcap", pcapFile(229, {{ipv6({.nextHeader = 17, .payload = udp(40000, 53, hex("61*8"))})}}));
+    check({
+        {"netfloor detail $T/ipv6.pcap", 0, {"Source IP Address=210.d08b.0.0.0.0.0.10  (2001:db8::1)\n"}, {}, {}},
+        {"netfloor keys --column 'Source IP Address' $T/ipv6.pcap", 0, {",2001:db8::1\n"}, {}, {}, 2},
+        {"netfloor keys --raw --column 'Source IP Address' $T/ipv6.pcap",
+         0,
+         {",0210d08b000000000000000000000010\n"},
+         {},
+         {},
+         2},
+        {"netfloor $T/ipv6.pcap", 0, {"Version=6 | 16 octets | UDP | 210.d08b.0.0.0.0.0.10 | "}, {}, {}, 1},
+    });
+}
+
 TEST_F(Command, findsIpBehindEachLinkLayer) {
     struct Link {
         std::uint32_t type;

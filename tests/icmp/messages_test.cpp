@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
 // ICMP messages (RFC 792, 950, 1256).
 #include <algorithm>
-#include <array>
+#include <map>
 #include <sstream>
 #include <string>
 #include <vector>
@@ -23,13 +23,12 @@ const Octets &quotedHeader() {
     return header;
 }
 
-struct MessageCase {
-    Octets message;
-    std::string keys;  // but for the type
-    const char *lines; // behind the type
-};
-
 TEST(Icmp, everyFieldOfEachMessage) {
+    struct MessageCase {
+        Octets message;
+        std::string keys;  // but for the type
+        const char *lines; // behind the type
+    };
     const std::vector<MessageCase> cases = {
         {hex("08 00 ab cd 00 0a 00 64 41 00"), "row 36 Code=0\nrow 37 ICMP Sequence Number=100\n", R"(
             542 |6 | "Code" "Code=0" 169-176 > 542 "0"
@@ -39,7 +38,8 @@ TEST(Icmp, everyFieldOfEachMessage) {
             547 |6 | "  Message Data" "  Message Data=A" 225-232 > 547 "A"
             547 |6 | "  Message Data" "  Message Data=" 233-240 > 547 ""
         )"},
-        {hex("0e 00 00 01 00 02 ff ff 00 00 00 0a 80 00 00 00 00 12 34 56"), "row 36 Code=0\nrow 37 ICMP Sequence Number=65535\n", R"(
+        {hex("0e 00 00 01 00 02 ff ff 00 00 00 0a 80 00 00 00 00 12 34 56"),
+         "row 36 Code=0\nrow 37 ICMP Sequence Number=65535\n", R"(
             576 |6 | "Code" "Code=0" 169-176 > 542 "0"
             577 |6 | "Checksum" "  Checksum=1" 177-192/8 > 543 "1"
             578 |6 | "Identifier" "  Identifier=2" 193-208/8 > 544 "2"
@@ -71,7 +71,8 @@ TEST(Icmp, everyFieldOfEachMessage) {
             598 |6 | "Checksum" "  Checksum=1" 177-192/8 > 543 "1"
             599 |6 | "Reserved" "  Reserved=1f" 193-224/8 > 290 "1f"
         )"},
-        {hex("12 00 00 01 00 02 00 03 ff ff ff 00"), "row 36 Code=0\nrow 37 ICMP Sequence Number=3\nrow 38 Address Mask=255.255.255.0\n", R"(
+        {hex("12 00 00 01 00 02 00 03 ff ff ff 00"),
+         "row 36 Code=0\nrow 37 ICMP Sequence Number=3\nrow 38 Address Mask=255.255.255.0\n", R"(
             600 |6 | "Code" "Code=0" 169-176 > 542 "0"
             601 |6 | "Checksum" "  Checksum=1" 177-192/8 > 543 "1"
             602 |6 | "Identifier" "  Identifier=2" 193-208/8 > 544 "2"
@@ -148,33 +149,31 @@ TEST(Icmp, everyFieldOfEachErrorMessage) {
     }
 }
 
-struct TypeNames {
-    const char *md = "Reserved";
-    const char *to = "Rsvd";
-};
-
 TEST(Icmp, nameOfEachType) {
-    std::array<TypeNames, 256> names{};
-    names[0] = {"Echo Reply Message", "ERM"};
-    names[3] = {"Destination Unreachable Message", "DUM"};
-    names[4] = {"Source Quench Message", "SQM"};
-    names[5] = {"Redirect Message", "RM"};
-    names[8] = {"Echo Message", "EM"};
-    names[9] = {"ICMP Router Advertisement Message", "IRAM"};
-    names[10] = {"ICMP Router Solicitation Message", "RSM"};
-    names[11] = {"Time Exceeded Message", "TEM"};
-    names[12] = {"Parameter Problem Message", "PPM"};
-    names[13] = {"Timestamp Message", "TM"};
-    names[14] = {"Timestamp Reply Message", "TRM"};
-    names[15] = {"Information Request Message", "IReqM"};
-    names[16] = {"Information Reply Message", "IRepM"};
-    names[17] = {"Address Mask Request Message", "MReq"};
-    names[18] = {"Address Mask Reply Message", "MRep"};
-    for (unsigned type = 0; type < names.size(); ++type) {
+    const std::map<unsigned, std::pair<std::string, std::string>> names = {
+        {0, {"Echo Reply Message", "ERM"}},
+        {3, {"Destination Unreachable Message", "DUM"}},
+        {4, {"Source Quench Message", "SQM"}},
+        {5, {"Redirect Message", "RM"}},
+        {8, {"Echo Message", "EM"}},
+        {9, {"ICMP Router Advertisement Message", "IRAM"}},
+        {10, {"ICMP Router Solicitation Message", "RSM"}},
+        {11, {"Time Exceeded Message", "TEM"}},
+        {12, {"Parameter Problem Message", "PPM"}},
+        {13, {"Timestamp Message", "TM"}},
+        {14, {"Timestamp Reply Message", "TRM"}},
+        {15, {"Information Request Message", "IReqM"}},
+        {16, {"Information Reply Message", "IRepM"}},
+        {17, {"Address Mask Request Message", "MReq"}},
+        {18, {"Address Mask Reply Message", "MRep"}},
+    };
+    for (unsigned type = 0; type < 256; ++type) {
+        const auto found = names.find(type);
+        const auto &[md, to] =
+            found == names.end() ? std::pair<std::string, std::string>("Reserved", "Rsvd") : found->second;
         const Runs runs = runAll(icmp({static_cast<std::uint8_t>(type)}));
-        EXPECT_EQ(runs.md.fields.back().text, std::string("ICMP Message Type=") + names[type].md);
-        EXPECT_EQ(runs.to.displays.back().text,
-                  std::string("ICMP - ") + names[type].to + " (" + std::to_string(type) + ')');
+        EXPECT_EQ(runs.md.fields.back().text, "ICMP Message Type=" + md);
+        EXPECT_EQ(runs.to.displays.back().text, "ICMP - " + to + " (" + std::to_string(type) + ')');
     }
 }
 

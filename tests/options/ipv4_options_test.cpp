@@ -7,7 +7,6 @@
 #include <gtest/gtest.h>
 
 #include "support/listings.h"
-#include "support/memory.h"
 
 namespace netfloor::test {
 namespace {
@@ -185,17 +184,6 @@ TEST(Ipv4Options, packetThatEndsInThem) {
     const Runs runs = runAll(ipv4({.payload = hex("61*39"), .headerWords = 15}));
     EXPECT_EQ(runs.md.fields.size(), ipv4Fields); // neither padding nor payload
     EXPECT_EQ(verdictLine(runs.mv), "verdict -52 flags 0x10\n");
-}
-
-TEST(Ipv4Options, roundsOnASmallStack) {
-    onSmallStack([] {
-        const Runs runs = runAll(ipv4({.payload = hex("61"), .options = hex("01*40")}));
-        EXPECT_EQ(runs.md.fields.size(), ipv4Fields + 40 + 1);
-        // Each round stands in the one before.
-        EXPECT_NE(lines(runs.md).find("318 |46 Type1| \"Type1, No Operation\" \"Type1, No Operation\" 473-480\n"),
-                  std::string::npos);
-        EXPECT_EQ(runs.mv.flags, 0u);
-    });
 }
 
 } // namespace

@@ -33,120 +33,71 @@ TEST(SctpCauses, everyCauseInEveryPass) {
             914 |10 Invalid Stream Identifier| "      Length" "      Length=8" 305-320/8
             915 |10 Invalid Stream Identifier| "        Stream Identifier" "        Stream Identifier=7" 321-336/8
             916 |10 Invalid Stream Identifier| "        Reserved" "        Reserved=65534" 337-352/8)",
-         R"(
-            912 "Invalid Stream Identifier"
-            322 "8"
-            915 "7"
-            290 "65534")",
-         0x8},
+         R"(912 "Invalid Stream Identifier"; 322 "8"; 915 "7"; 290 "65534")", 0x8},
         {"00 02 00 0c  00 00 00 02  00 05 00 06", R"(
             912 |9 Error Causes| "    Cause Code" "    Cause Code=Missing Mandatory Parameter" 289-304/8
             917 |10 Missing Mandatory Parameter| "      Length" "      Length=12" 305-320/8
             918 |10 Missing Mandatory Parameter| "        Number of missing params" "        Number of missing params=2" 321-352/8
             920 |11 INLINE BLOCK| "        Missing Parameters Type" "        Missing Parameters Type=5" 353-368/8
             920 |11 INLINE BLOCK| "        Missing Parameters Type" "        Missing Parameters Type=6" 369-384/8)",
-         R"(
-            912 "Missing Mandatory Parameter"
-            322 "12"
-            918 "2"
-            920 "5"
-            920 "6")",
-         0x8},
+         R"(912 "Missing Mandatory Parameter"; 322 "12"; 918 "2"; 920 "5"; 920 "6")", 0x8},
         {"00 03 00 08  00 00 03 e8", R"x(
             912 |9 Error Causes| "    Cause Code" "    Cause Code=Stale Cookie Error" 289-304/8
             921 |10 Stale Cookie Error| "      Cause Length" "      Cause Length=8" 305-320/8
             922 |10 Stale Cookie Error| "        Measure of staleness (usec.)" "        Measure of staleness (usec.)=1000" 321-352/8)x",
-         R"(
-            912 "Stale Cookie Error"
-            921 "8"
-            922 "1000")",
-         0x8},
+         R"(912 "Stale Cookie Error"; 921 "8"; 922 "1000")", 0x8},
         {"00 04 00 04", R"(
             912 |9 Error Causes| "    Cause Code" "    Cause Code=Out Of Resource" 289-304/8
             923 |10 Out Of Resource| "      Cause Length" "      Cause Length=4" 305-320/8)",
-         R"(
-            912 "Out Of Resource"
-            921 "4")",
-         0x8},
+         R"(912 "Out Of Resource"; 921 "4")", 0x8},
         // The address and the chunk go from the last octet to the first.
         {"00 05 00 0c  00 05 00 08  0a 00 00 01", R"(
             912 |9 Error Causes| "    Cause Code" "    Cause Code=Unresolvable Address" 289-304/8
             924 |10 Unresolvable Address| "      Length" "      Length=12" 305-320/8
             925 |10 Unresolvable Address| "        Unrecognized Address" "        Unrecognized Address=100a8050" 377-384 369-376 361-368 353-360 345-352 337-344 329-336 321-328)",
-         R"(
-            912 "Unresolvable Address"
-            322 "12"
-            925 "100a8050")",
-         0x8},
+         R"(912 "Unresolvable Address"; 322 "12"; 925 "100a8050")", 0x8},
         {"00 06 00 08  0f 00 00 04", R"(
             912 |9 Error Causes| "    Cause Code" "    Cause Code=Unrecognized Chunk Type" 289-304/8
             926 |10 Unrecognized Chunk Type| "      Length" "      Length=8" 305-320/8
             927 |10 Unrecognized Chunk Type| "        Unrecognized Chunk" "        Unrecognized Chunk=400f" 345-352 337-344 329-336 321-328)",
-         R"(
-            912 "Unrecognized Chunk Type"
-            322 "8"
-            927 "400f")",
-         0x8},
+         R"(912 "Unrecognized Chunk Type"; 322 "8"; 927 "400f")", 0x8},
         {"00 07 00 04", R"(
             912 |9 Error Causes| "    Cause Code" "    Cause Code=Invalid Mandatory Parameter" 289-304/8
             928 |10 Invalid Mandatory Parameter| "      Length" "      Length=4" 305-320/8)",
-         R"(
-            912 "Invalid Mandatory Parameter"
-            322 "4")",
-         0x8},
+         R"(912 "Invalid Mandatory Parameter"; 322 "4")", 0x8},
         {"00 08 00 0c  c0 00 00 08 00 00 01 02", R"x(
             912 |9 Error Causes| "    Cause Code" "    Cause Code=Unrecognized Parameters" 289-304/8
             929 |10 Unrecognized Parameters| "      Length" "      Length=12" 305-320/8
             863 |12 Unrecogonized Parameters| "        Unrecoginzed Parameter Type" "        Unrecoginzed Parameter Type=49152" 321-336/8
             864 |12 Unrecogonized Parameters| "        Length" "        Length=8 octet(s)" 337-352/8
             865 |12 Unrecogonized Parameters| "                Value" "                Value" 353-384/8)x",
-         R"x(
-            912 "Unrecognized Parameters"
-            322 "12"
-            863 "49152"
-            322 "8 octet(s)"
-            865 "0x102")x",
-         0},
+         R"x(912 "Unrecognized Parameters"; 322 "12"; 863 "49152"; 322 "8 octet(s)"; 865 "0x102")x", 0},
         {"00 09 00 08  00 00 00 2a", R"(
             912 |9 Error Causes| "    Cause Code" "    Cause Code=No User Data" 289-304/8
             932 |10 No User Data| "      Length" "      Length=8" 305-320/8
             933 |10 No User Data| "        TSN value" "        TSN value=42" 321-352/8)",
-         R"(
-            912 "No User Data"
-            322 "8"
-            933 "42")",
-         0x8},
+         R"(912 "No User Data"; 322 "8"; 933 "42")", 0x8},
         {"00 0a 00 04", R"(
             912 |9 Error Causes| "    Cause Code" "    Cause Code=Cookie Rcvd While Shutting Down" 289-304/8
             934 |10 Cookie Rcvd While Shutting Down| "      Length" "      Length=4" 305-320/8)",
-         R"(
-            912 "Cookie Rcvd While Shutting Down"
-            322 "4")",
-         0},
+         R"(912 "Cookie Rcvd While Shutting Down"; 322 "4")", 0},
         // Six octets: the number is that of the last four.
         {"00 63 00 0a  01 02 03 04 05 06", R"(
             912 |9 Error Causes| "    Cause Code" "    Cause Code=UNKNOWN" 289-304/8
             935 |10 Unknown Cause Code| "      Length" "      Length=10" 305-320/8
             938 |10 Unknown Cause Code| "      Unknown Cause" "      Unknown Cause=3040506" 321-368/8)",
-         R"(
-            912 "UNKNOWN"
-            322 "10"
-            938 "3040506")",
-         0x8},
+         R"(912 "UNKNOWN"; 322 "10"; 938 "3040506")", 0x8},
         {"00 00 00 04", R"(
             912 |9 Error Causes| "    Cause Code" "    Cause Code=UNKNOWN" 289-304/8
             935 |10 Unknown Cause Code| "      Length" "      Length=4" 305-320/8)",
-         R"(
-            912 "UNKNOWN"
-            322 "4")",
-         0},
+         R"(912 "UNKNOWN"; 322 "4")", 0},
     };
     for (const Cause &cause : causes) {
         for (const Octets &chunk : {abortChunk(cause.octets), errorChunk(cause.octets)}) {
             SCOPED_TRACE(hexText(chunk));
             const Runs runs = runAll(sctp(chunk));
             EXPECT_EQ(linesFrom(lines(runs.md), "912"), expected(cause.md));
-            EXPECT_EQ(linesFrom(lines(runs.to), "912"), expected(cause.to));
+            EXPECT_EQ(oneLine(linesFrom(lines(runs.to), "912")), cause.to);
             EXPECT_EQ(runs.mv.flags, cause.mvFlags);
             EXPECT_EQ(runs.md.flags, 0u);
         }
@@ -161,6 +112,7 @@ TEST(SctpCauses, limitsOfAbort) {
          " 912 914 915 916 805 892 808", 0x8},
         {"half a cause code", abortChunk("00"), "", 0x10},
         {"a cause code alone", abortChunk("00 07"), " 912"},
+        {"an unknown one alone: what limits it counts as its octets", abortChunk("00 63"), " 912", 0x8},
         {"a Length alone where more should be", abortChunk("00 03 00 08"), " 912 921"},
         {"two types wanted, one there", abortChunk("00 02 00 0a 00 00 00 02 00 05"), " 912 917 918 920"},
         {"three wanted, one there", abortChunk("00 02 00 0a 00 00 00 03 00 05"), " 912 917 918 920", 0xa},

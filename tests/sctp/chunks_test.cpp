@@ -32,18 +32,9 @@ TEST(Sctp, headerAndSecondChunk) {
         892 |10 Cookie Acknowledge| "  Chunk flags" "  Chunk flags=0" 297-304
         808 |11 Length| "  Chunk Length" "  Chunk Length=4" 305-320/8
     )x"));
-    EXPECT_EQ(linesFrom(lines(runs.to), "795"), expected(R"x(
-        795 "2905"
-        796 "2906"
-        797 "0xdeadbeef"
-        543 "0xc0d"
-        802 "SCTP - COOKIE ACK (11)"
-        884 "a5"
-        808 "4"
-        805 "Cookie Acknowledgement (COOKIE ACK)"
-        884 "0"
-        808 "4"
-    )x"));
+    EXPECT_EQ(oneLine(linesFrom(lines(runs.to), "795")),
+              R"x(795 "2905"; 796 "2906"; 797 "0xdeadbeef"; 543 "0xc0d"; 802 "SCTP - COOKIE ACK (11)"; 884 "a5"; )x"
+              R"x(808 "4"; 805 "Cookie Acknowledgement (COOKIE ACK)"; 884 "0"; 808 "4")x");
     EXPECT_EQ(linesFrom(lines(runs.xtr), "row 84"), expected(R"(
         row 84 SCTP Source Port Number=2905
         row 85 SCTP Destination Port Number=2906
@@ -74,31 +65,29 @@ struct TypeNames {
 };
 
 TEST(Sctp, nameOfEachChunkType) {
-    const std::vector<TypeNames> names = {
-        {0, "Payload Data (DATA)", "DATA"},
-        {1, "Initiation (INIT)", "INIT"},
-        {2, "Initiation Acknowledgement (INIT ACK)", "INIT ACK"},
-        {3, "Selective Acknowledgement (SACK)", "SACK"},
-        {4, "Heartbeat Request (HEARTBEAT)", "HEARTBEAT"},
-        {5, "Heartbeat Acknowledgement (HEARTBEAT ACK)", "HEARTBEAT ACK"},
-        {6, "Abort (ABORT)", "ABORT"},
-        {7, "Shutdown (SHUTDOWN)", "SHUTDOWN"},
-        {8, "Shutdown Acknowledgement (SHUTDOWN ACK)", "SHUTDOWN ACK"},
-        {9, "Operation Error (ERROR)", "ERROR"},
-        {10, "Cookie Echo (COOKIE ECHO)", "COOKIE ECHO"},
-        {11, "Cookie Acknowledgement (COOKIE ACK)", "COOKIE ACK"},
-        {12, "Reserved for Explicit Congestion Notification Echo (ECNE)", "ECNE"},
-        {13, "Reserved for Congestion Window Reduced (CWR)", "CWR"},
-        {14, "Shutdown Complete (SHUTDOWN COMPLETE)", "SHUTDOWN COMPLETE"},
-        {62, "reserved by IETF", "RESERVED"},
-        {63, "IETF-defined Chunk Extensions", "IETF DEFINED"},
-        {126, "reserved by IETF", "RESERVED"},
-        {127, "IETF-defined Chunk Extensions", "IETF DEFINED"},
-        {190, "reserved by IETF", "RESERVEDF"},
-        {191, "IETF-defined Chunk Extensions", "IETF DEFINED"},
-        {254, "reserved by IETF", "RESERVED"},
-        {255, "IETF-defined Chunk Extensions", "IETF DEFINED"},
-    };
+    const std::vector<TypeNames> names = {{0, "Payload Data (DATA)", "DATA"},
+                                          {1, "Initiation (INIT)", "INIT"},
+                                          {2, "Initiation Acknowledgement (INIT ACK)", "INIT ACK"},
+                                          {3, "Selective Acknowledgement (SACK)", "SACK"},
+                                          {4, "Heartbeat Request (HEARTBEAT)", "HEARTBEAT"},
+                                          {5, "Heartbeat Acknowledgement (HEARTBEAT ACK)", "HEARTBEAT ACK"},
+                                          {6, "Abort (ABORT)", "ABORT"},
+                                          {7, "Shutdown (SHUTDOWN)", "SHUTDOWN"},
+                                          {8, "Shutdown Acknowledgement (SHUTDOWN ACK)", "SHUTDOWN ACK"},
+                                          {9, "Operation Error (ERROR)", "ERROR"},
+                                          {10, "Cookie Echo (COOKIE ECHO)", "COOKIE ECHO"},
+                                          {11, "Cookie Acknowledgement (COOKIE ACK)", "COOKIE ACK"},
+                                          {12, "Reserved for Explicit Congestion Notification Echo (ECNE)", "ECNE"},
+                                          {13, "Reserved for Congestion Window Reduced (CWR)", "CWR"},
+                                          {14, "Shutdown Complete (SHUTDOWN COMPLETE)", "SHUTDOWN COMPLETE"},
+                                          {62, "reserved by IETF", "RESERVED"},
+                                          {63, "IETF-defined Chunk Extensions", "IETF DEFINED"},
+                                          {126, "reserved by IETF", "RESERVED"},
+                                          {127, "IETF-defined Chunk Extensions", "IETF DEFINED"},
+                                          {190, "reserved by IETF", "RESERVEDF"},
+                                          {191, "IETF-defined Chunk Extensions", "IETF DEFINED"},
+                                          {254, "reserved by IETF", "RESERVED"},
+                                          {255, "IETF-defined Chunk Extensions", "IETF DEFINED"}};
     unsigned type = 0;
     for (const TypeNames &name : names) {
         for (; type <= name.last; ++type) {
@@ -121,10 +110,9 @@ TEST(Sctp, nameOfEachChunkType) {
 
 struct Body {
     const char *chunk, *md, *to, *keys;
-    std::uint32_t mvFlags = 0;
 };
 
-// Each kind of chunk as the only one of its packet: what stands behind its type.
+// Each kind of chunk but INIT and INIT ACK, as the only one of its packet: what stands behind its type.
 TEST(SctpChunk, everyFieldInEveryPass) {
     const std::vector<Body> bodies = {
         {"00 fe 00 14  00 00 00 2a  00 03 00 04  00 00 00 2e  61 62 63 64", R"(
@@ -136,55 +124,13 @@ TEST(SctpChunk, everyFieldInEveryPass) {
             818 |8 Data| "    Stream Indetifier S" "    Stream Indetifier S=3" 321-336/8
             819 |8 Data| "    Stream Sequence Number n" "    Stream Sequence Number n=4" 337-352/8
             820 |8 Data| "    Payload Protocol Identifier" "    Payload Protocol Identifier=0x2e" 353-384/8)",
-         R"(
-            290 "1f"
-            815 "TRUE"
-            816 "First piece of a fragmented user message"
-            808 "20"
-            817 "0x2a"
-            818 "3"
-            819 "4"
-            820 "0x2e")",
+         R"(290 "1f"; 815 "TRUE"; 816 "First piece of a fragmented user message"; 808 "20"; 817 "0x2a"; )"
+         R"(818 "3"; 819 "4"; 820 "0x2e")",
          R"(
             row 87 TSN=42
             row 88 Stream Indetifier S=3
             row 89 Stream Sequence Number n=4
             row 90 Payload Protocol Identifier=46)"},
-        // INIT's limit reaches one octet further than the chunk.
-        {"01 00 00 14  00 00 00 ff  00 01 90 00  00 0a 00 0b  80 00 00 00", R"x(
-            823 |8 INIT| "  Chunk Flags" "  Chunk Flags=0x0" 265-272
-            824 |8 INIT| "  Length" "  Length=20" 273-288/8
-            825 |8 INIT| "    Initiate Tag" "    Initiate Tag=0xff" 289-320/8
-            826 |8 INIT| "    Advertised Receiver Window Credit (a_rwnd)" "    Advertised Receiver Window Credit (a_rwnd)=102400(dec)" 321-352/8
-            827 |8 INIT| "    Number of Outbound Streams" "    Number of Outbound Streams=10(dec)" 353-368/8
-            828 |8 INIT| "    Number of Inbound Streams" "    Number of Inbound Streams=11(dec)" 369-384/8
-            829 |8 INIT| "    Initial Transmission Sequence Number(I_TSN)" "    Initial Transmission Sequence Number(I_TSN)=2147483648" 385-416/8)x",
-         R"x(
-            823 "0x0"
-            322 "20"
-            825 "0xff"
-            826 "102400(dec)"
-            827 "10(dec)"
-            828 "11(dec)"
-            829 "2147483648")x",
-         "row 92 Initial Transmission Sequence Number(I_TSN)=2147483648", 0x8},
-        {"02 01 00 14  00 00 00 ff  00 01 90 00  00 0a 00 0b  80 00 00 00", R"x(
-            835 |8 Init Ack| "  Chunk Flags" "  Chunk Flags=0x1" 265-272
-            836 |8 Init Ack| "  Length" "  Length=20" 273-288/8
-            837 |8 Init Ack| "    Initiate Tag" "    Initiate Tag=0xff" 289-320/8
-            838 |8 Init Ack| "    Advertised Receiver Window Credit (a_rwnd)" "    Advertised Receiver Window Credit (a_rwnd)=102400(dec)" 321-352/8
-            839 |8 Init Ack| "    Number of Outbound Streams" "    Number of Outbound Streams=10(dec)" 353-368/8
-            840 |8 Init Ack| "    Number of Inbound Streams" "    Number of Inbound Streams=11(dec)" 369-384/8
-            841 |8 Init Ack| "    Initial Transmission Sequence Number(I_TSN)" "    Initial Transmission Sequence Number(I_TSN)=2147483648" 385-416/8)x",
-         R"x(
-            823 "0x1"
-            322 "20"
-            825 "0xff"
-            826 "102400(dec)"
-            827 "10(dec)"
-            828 "11(dec)"
-            829 "2147483648")x",
-         "row 92 Initial Transmission Sequence Number(I_TSN)=2147483648"},
         {"03 00 00 18  00 00 00 2a  00 01 00 00  00 01 00 01  00 02 00 05  00 00 00 07", R"x(
             873 |8 Selective Acknowledgement| "  Chunk Flags" "  Chunk Flags=0x0" 265-272
             874 |8 Selective Acknowledgement| "  Length" "  Length=24" 273-288/8
@@ -195,16 +141,8 @@ TEST(SctpChunk, everyFieldInEveryPass) {
             881 |9 Gap Ack Block| "    Gap Ack Block Start" "    Gap Ack Block Start=2" 385-400/8
             882 |9 Gap Ack Block| "    Gap Ack Block End" "    Gap Ack Block End=5" 401-416/8
             883 |9 Duplicate TSN| "    Duplicate TSN" "    Duplicate TSN=0x7" 417-448/8)x",
-         R"x(
-            823 "0x0"
-            322 "24"
-            875 "0x2a"
-            826 "65536(dec)"
-            877 "1(dec)"
-            878 "1(dec)"
-            881 "2"
-            882 "5"
-            883 "0x7")x",
+         R"x(823 "0x0"; 322 "24"; 875 "0x2a"; 826 "65536(dec)"; 877 "1(dec)"; 878 "1(dec)"; 881 "2"; )x"
+         R"(882 "5"; 883 "0x7")",
          "row 94 Cumulative TSN Ack=42"},
         {"04 01 00 0c  00 01 00 08  0a b0 00 01", R"(
             939 |8 Heartbeat Request| "  Chunk Flags" "  Chunk Flags=0x1" 265-272
@@ -212,104 +150,58 @@ TEST(SctpChunk, everyFieldInEveryPass) {
             941 |9 Heartbeat Information TLV| "    Heartbeat Info Type" "    Heartbeat Info Type=1" 289-304/8
             942 |9 Heartbeat Information TLV| "      HB Info length" "      HB Info length=8" 305-320/8
             943 |9 Heartbeat Information TLV| "        Sender-specific HB Info" "        Sender-specific HB Info=ab001" 321-352/8)",
-         R"(
-            823 "0x1"
-            808 "12"
-            941 "1"
-            942 "8"
-            943 "ab001")",
-         ""},
+         R"(823 "0x1"; 808 "12"; 941 "1"; 942 "8"; 943 "ab001")", ""},
         {"05 00 00 08  00 01 00 04", R"(
             940 |8 Heartbeat Acknowledgement| "  Chunk Flags" "  Chunk Flags=0x0" 265-272
             808 |9 Length| "  Chunk Length" "  Chunk Length=8" 273-288/8
             941 |9 Heartbeat Information TLV| "    Heartbeat Info Type" "    Heartbeat Info Type=1" 289-304/8
             942 |9 Heartbeat Information TLV| "      HB Info length" "      HB Info length=4" 305-320/8
             943 |9 Heartbeat Information TLV| "        Sender-specific HB Info" "        Sender-specific HB Info=")",
-         R"(
-            823 "0x0"
-            808 "8"
-            941 "1"
-            942 "4"
-            943 "")",
-         ""},
+         R"(823 "0x0"; 808 "8"; 941 "1"; 942 "4"; 943 "")", ""},
         {"06 ff 00 04", R"(
             944 |8 Abort Association| "  Reserved" "  Reserved=7f" 266-272
             945 |8 Abort Association| "  T bit" "  T bit=no sender TCB" 265-265
             946 |8 Abort Association| "  Chunk Length" "  Chunk Length=4" 273-288/8)",
-         R"(
-            290 "7f"
-            945 "no sender TCB"
-            808 "4")",
-         ""},
+         R"(290 "7f"; 945 "no sender TCB"; 808 "4")", ""},
         {"07 a1 00 08  00 00 00 2a", R"(
             884 |8 Shutdown| "  Chunk flags" "  Chunk flags=a1" 265-272
             885 |8 Shutdown| "  Length" "  Length=8" 273-288/8
             886 |8 Shutdown| "    Cumulative TSN Ack" "    Cumulative TSN Ack=42" 289-320/8)",
-         R"(
-            884 "a1"
-            322 "8"
-            875 "42")",
-         "row 94 Cumulative TSN Ack=42"},
+         R"(884 "a1"; 322 "8"; 875 "42")", "row 94 Cumulative TSN Ack=42"},
         {"08 00 00 04", R"(
             887 |8 Shutdown Acknowledge| "  Chunk flags" "  Chunk flags=0" 265-272
             888 |8 Shutdown Acknowledge| "  Length" "  Length=4" 273-288/8)",
-         R"(
-            884 "0"
-            322 "4")",
-         ""},
+         R"(884 "0"; 322 "4")", ""},
         {"09 00 00 04", R"(
             909 |8 Error| "  Chunk flags" "  Chunk flags=0" 265-272
             910 |8 Error| "  Chunk Length" "  Chunk Length=4" 273-288/8)",
-         R"(
-            884 "0"
-            808 "4")",
-         ""},
+         R"(884 "0"; 808 "4")", ""},
         // A cookie goes from its last octet to its first.
         {"0a 00 00 08  0a b0 00 01", R"(
             893 |8 Cookie Echo| "  Chunk flags" "  Chunk flags=0" 265-272
             808 |9 Length| "  Chunk Length" "  Chunk Length=8" 273-288/8
             895 |8 Cookie Echo| "    Cookie" "    Cookie=10b0a" 313-320 305-312 297-304 289-296)",
-         R"(
-            884 "0"
-            808 "8"
-            895 "10b0a")",
-         ""},
+         R"(884 "0"; 808 "8"; 895 "10b0a")", ""},
         {"0c 00 00 0a  de ad 00 00 00 2a", R"(
             899 |8 ECNE| "  Chunk Flags" "  Chunk Flags=0x0" 265-272
             808 |9 Length| "  Chunk Length" "  Chunk Length=10" 273-288/8
             903 |8 ECNE| "    Reserved" "    Reserved" 289-336/8)",
-         R"(
-            823 "0x0"
-            808 "10"
-            290 "2a")",
-         ""},
+         R"(823 "0x0"; 808 "10"; 290 "2a")", ""},
         {"0d 00 00 05  ff", R"(
             904 |8 CWR| "  Chunk Flags" "  Chunk Flags=0x0" 265-272
             808 |9 Length| "  Chunk Length" "  Chunk Length=5" 273-288/8
             908 |8 CWR| "    Reserved" "    Reserved" 289-296)",
-         R"(
-            823 "0x0"
-            808 "5"
-            290 "ff")",
-         ""},
+         R"(823 "0x0"; 808 "5"; 290 "ff")", ""},
         {"0e 00 00 04", R"(
             889 |8 Shutdown Complete| "  Reserved" "  Reserved=0" 266-272
             890 |8 Shutdown Complete| "  T bit" "  T bit=Sender TCB destroyed" 265-265
             891 |8 Shutdown Complete| "  Length" "  Length=4" 273-288/8)",
-         R"(
-            290 "0"
-            945 "Sender TCB destroyed"
-            322 "4")",
-         ""},
+         R"(290 "0"; 945 "Sender TCB destroyed"; 322 "4")", ""},
         {"c0 10 00 07  0a b0 00", R"(
             809 |8 Reserved chunks| "  Chunk Flags" "  Chunk Flags=0x10" 265-272
             808 |9 Length| "  Chunk Length" "  Chunk Length=7" 273-288/8
             813 |8 Reserved chunks| "    Reserved contents" "    Reserved contents=ab00" 289-312/8)",
-         R"(
-            823 "0x10"
-            808 "7"
-            813 "ab00")",
-         ""},
+         R"(823 "0x10"; 808 "7"; 813 "ab00")", ""},
     };
     const auto behindType = [](const std::string &text, const char *type) {
         const std::string rest = linesFrom(text, type);
@@ -319,9 +211,9 @@ TEST(SctpChunk, everyFieldInEveryPass) {
         SCOPED_TRACE(body.chunk);
         const Runs runs = runAll(sctp(hex(body.chunk)));
         EXPECT_EQ(behindType(lines(runs.md), "802"), expected(body.md));
-        EXPECT_EQ(behindType(lines(runs.to), "802"), expected(body.to));
+        EXPECT_EQ(oneLine(behindType(lines(runs.to), "802")), body.to);
         EXPECT_EQ(behindType(lines(runs.xtr), "row 86"), expected(body.keys));
-        EXPECT_EQ(runs.mv.flags, body.mvFlags);
+        EXPECT_EQ(runs.mv.flags, 0u);
     }
 }
 
@@ -391,6 +283,8 @@ TEST(SctpChunk, listsOfSackGoByTheirCounts) {
         {"three gaps, room for one", sack("00 03 00 00", "00 01 00 02"), " 881 882", 0x2},
         {"half a gap", sack("00 02 00 00", "00 01 00 02 00 03"), " 881 882 881"},
         {"two duplicates, room for one and a half", sack("00 00 00 02", "00 00 00 07 00 00"), " 883", 0x10},
+        {"the count of the SACK before, where its own is missing",
+         sack("00 01 00 00", "00 01 00 02") + hex("03 00 00 10 00*4 00*3"), " 881 882 805 873 874 875", 0x12},
         {"all there", sack("00 01 00 02", "00 01 00 02 00 00 00 07 00 00 00 08"), " 881 882 883 883"},
     };
     for (const SctpCase &one : cases) {
@@ -449,16 +343,6 @@ TEST(SctpData, handsOnAndGoesOn) {
     EXPECT_EQ(last.xtr.key("Cumulative TSN Ack")->number, 43u);
 }
 
-TEST(SctpData, ownerRefuses) {
-    Host host = freshHost();
-    host.owners().setDefault([](NextLayer &) { return Handled::refused; });
-    host.owners().addProtocol(132, [](NextLayer &) { return Handled::refused; });
-    const Report md = runPass(Pass::md, sctp(hex("00 03 00 14 00*16  0b 00 00 04")), {}, host);
-    EXPECT_EQ(md.ending, Ending::cutOff);
-    EXPECT_EQ(md.flags, 0u);
-    EXPECT_EQ(chunkIds(md), "802 814 815 816 808 817 818 819 820");
-}
-
 // An owner that leads back into the plug-in leaves its own variables to the walk, which still ends with the bits.
 TEST(SctpData, ownerLeadsBack) {
     Host host = freshHost();
@@ -490,7 +374,7 @@ TEST(SctpData, ownerLeadsBack) {
 }
 
 TEST(SctpChunk, longOctetStrings) {
-    for (const char *type : {"0a", "ff", "0c"}) {
+    for (const char *type : {"0a", "ff", "0c"}) { // the first two show all their octets
         const Octets packet = sctp(hex(type) + hex("00 03 ec") + hex("ff*1000"));
         const Runs runs = runAll(packet);
         EXPECT_EQ(runs.md.fields.back().ranges.size(), 1000u);

@@ -2,13 +2,12 @@
 // The TCP header (RFC 9293).
 #include <algorithm>
 #include <string>
+#include <tuple>
 #include <vector>
 
 #include <gtest/gtest.h>
 
 #include "support/listings.h"
-#include "support/memory.h"
-#include "support/runs.h"
 
 namespace netfloor::test {
 namespace {
@@ -88,18 +87,6 @@ TEST(Tcp, everyFieldInEveryPass) {
     EXPECT_EQ(verdictLine(runs.mv), "verdict -52 flags 0x2\n");
 }
 
-TEST(Tcp, eachFlagBit) {
-    for (unsigned bit = 0; bit < 8; ++bit) {
-        Octets segment = tcp(5);
-        segment[13] = static_cast<std::uint8_t>(1u << bit);
-        const auto value = [bit](unsigned of) { return std::to_string(bit == of ? 1 : 0); };
-        EXPECT_EQ(fieldValues(runAll(overIpv4(segment)).md, 398),
-                  "399=" + std::to_string(bit < 6 ? 0 : bit - 5) + " 400=" + value(5) + " 401=" + value(4) +
-                      " 402=" + value(3) + " 403=" + value(2) + " 404=" + value(1) + " 405=" + value(0) +
-                      " 406=2000 407=0 408=0");
-    }
-}
-
 struct HeaderCase {
     const char *name;
     Octets packet;
@@ -163,45 +150,26 @@ TEST(Tcp, segmentThatEndsEarly) {
         EXPECT_EQ(runs.md.flags, whole ? 2u : 0u);
         EXPECT_EQ(runs.mv.flags, (whole ? 2u : octets > 12 ? 8u : 0u) | (swept ? 0x10u : 0u));
     }
+    cutEverywhere(withUsualOptions());
 }
-
-struct CarriageCase {
-    const char *name;
-    Octets packet;
-    std::uint32_t id;
-    const char *text;
-};
 
 TEST(Tcp, destinationPortTellsTheCarriage) {
     const Octets segment = tcp(5);
     const Octets inner = overIpv4(segment);
-    const std::vector<CarriageCase> cases = {
-        {"IPv4", inner, 393, "TCP -  (40000)"},
-        {"IPv6", ipv6({.nextHeader = 6, .payload = segment}), 393, "TCP -  (40000)"},
-        {"IP in IP", ipv4({.protocol = 4, .payload = inner}), 387, "IPinIP - TCP -  (40000)"},
-        {"minimal encapsulation", ipv4({.protocol = 55, .payload = hex("06 00 00 00 0a 00 00 01") + segment}), 391,
-         "MIPinIP - TCP -  (40000)"},
-        {"both, the second outside", ipv4({.protocol = 55, .payload = hex("04 00 00 00 0a 00 00 01") + inner}), 391,
-         "MIPinIP - TCP -  (40000)"},
+    const Octets minimal = hex("06 00 00 00 0a 00 00 01");
+    const std::vector<std::tuple<Octets, std::uint32_t, std::string>> cases = {
+        {inner, 393, ""},
+        {ipv6({.nextHeader = 6, .payload = segment}), 393, ""},
+        {ipv4({.protocol = 4, .payload = inner}), 387, "IPinIP - "},
+        {ipv4({.protocol = 4, .payload = ipv4({.protocol = 55, .payload = minimal + segment})}), 387, "IPinIP - "},
+        {ipv4({.protocol = 55, .payload = minimal + segment}), 391, "MIPinIP - "},
     };
-    for (const CarriageCase &one : cases) {
-        SCOPED_TRACE(one.name);
-        const Runs runs = runAll(one.packet);
-        EXPECT_EQ(runs.md.field("TCP Destination Port")->id, one.id);
+    for (const auto &[packet, id, carriage] : cases) {
+        const Runs runs = runAll(packet);
+        EXPECT_EQ(runs.md.field("TCP Destination Port")->id, id);
         EXPECT_EQ(linesWith(lines(runs.to), "384"), "384 \"TCP - DOMAIN (53)\"\n");
-        EXPECT_EQ(linesWith(lines(runs.to), "387"), std::string("387 \"") + one.text + "\"\n");
+        EXPECT_EQ(linesWith(lines(runs.to), "387"), "387 \"" + carriage + "TCP -  (40000)\"\n");
     }
-}
-
-TEST(Tcp, cutAtEveryOctet) {
-    cutEverywhere(withUsualOptions());
-}
-
-TEST(Tcp, roundsOfOptionsOnASmallStack) {
-    onSmallStack([] {
-        const Runs runs = runAll(overIpv4(tcp(15, hex("01*40"))));
-        EXPECT_EQ(runs.md.fields.size(), ipv4Fields + 16 + 40);
-    });
 }
 
 } // namespace

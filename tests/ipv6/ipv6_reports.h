@@ -1,0 +1,52 @@
+// SPDX-License-Identifier: MIT
+// What was read behind the first IPv6 header, in short.
+#pragma once
+
+#include <algorithm>
+#include <string>
+#include <string_view>
+
+#include "support/runs.h"
+
+namespace netfloor::test {
+
+constexpr std::size_t ipv6Fields = 11; // of a header, its version and both readings of each address
+
+// The ids of the fields behind the first header.
+inline std::string idsBehindHeader(const Report &md) {
+    std::string ids;
+    for (std::size_t at = ipv6Fields; at < md.fields.size(); ++at) {
+        ids += (ids.empty() ? "" : " ") + std::to_string(md.fields[at].id);
+    }
+    return ids;
+}
+
+// Lines in one: 246 "Error Message"; 531 ""
+inline std::string oneLine(std::string_view lines) {
+    std::string result;
+    for (const char letter : lines.substr(0, lines.size() - (lines.empty() ? 0 : 1))) {
+        result += letter == '\n' ? std::string("; ") : std::string(1, letter);
+    }
+    return result;
+}
+
+// One payload, the fields behind the header and the flags of the MV pass; the others set none.
+struct Ipv6Case {
+    const char *what;
+    std::uint8_t nextHeader;
+    Octets payload;
+    std::string ids;
+    std::uint32_t mvFlags = 0;
+};
+
+inline void checkCase(const Ipv6Case &one) {
+    SCOPED_TRACE(one.what);
+    const Runs runs = runAll(ipv6({.nextHeader = one.nextHeader, .payload = one.payload}));
+    EXPECT_EQ(idsBehindHeader(runs.md), one.ids);
+    EXPECT_EQ(runs.mv.flags, one.mvFlags);
+    EXPECT_EQ(runs.md.flags, 0u);
+    EXPECT_EQ(runs.md.ending, Ending::complete);
+    EXPECT_EQ(runs.md.bitsLeft, 0u); // what no field covers is skipped
+}
+
+} // namespace netfloor::test
