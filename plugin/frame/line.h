@@ -34,10 +34,12 @@ public:
 
     NETFLOOR_INLINE explicit Line(Buffer& buffer) : text_(buffer.data()), end_(text_) {}
 
-    // Appends a text whose length is known where it is written.
+    // Appends a text whose length is known where it is written. One of no length may be null.
     template <std::size_t size> NETFLOOR_INLINE void appendLiteral(const char* text) {
-        std::memcpy(end_, text, size);
-        end_ += size;
+        if constexpr (size > 0) {
+            std::memcpy(end_, text, size);
+            end_ += size;
+        }
     }
 
     // Appends a number as a conversion shows it. A zero octet adds no character, as it would end the text.

@@ -160,8 +160,8 @@ template <class Pass> void causeOf(Reader<Pass>& at, std::uint32_t code) {
     return name;
 }
 
-// The list goes on as long as its rounds end with the condition true, that is, with a field that did fit, whether or not
-// anything is left. It ordinarily ends with a limit that is longer than what is left.
+// The list goes on as long as its rounds end with the condition true, mostly with a field that did fit, whether or
+// not anything is left. It ordinarily ends with a limit that is longer than what is left.
 template <class Pass> void errorCauses(Reader<Pass>& at) {
     at.test(true);
     while (at.live && at.condition() != 0) {

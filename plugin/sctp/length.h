@@ -47,7 +47,7 @@ struct LengthAhead {
 // walk over the chunks ends; where it is there, it is skipped.
 inline constexpr LengthAhead initLengthAhead{{{{8, 8}}}, true, 24};
 inline constexpr LengthAhead abortLengthAhead{{{{8, 0}, {8, 8}}}, false, 24};
-inline constexpr LengthAhead valueLengthAhead{{{{typeBits, typeBits}}}, true, 32}; // of a parameter, of heartbeat information
+inline constexpr LengthAhead valueLengthAhead{{{{typeBits, typeBits}}}, true, 32}; // parameter, heartbeat information
 
 // Reads a Length ahead of its turn, and gives the bits of the limit that it sets. Nothing is reported, and the
 // cursor comes back. What does not fit adds the advance of the step before instead of its own: behind the last

@@ -44,7 +44,7 @@ template <class Pass> void congestionWindowReduced(Reader<Pass>& at) {
     congestionChunk<cwrFlags, cwrReserved>(at, "CWR");
 }
 
-// `chunkOctets` stays without the head where there are contents, so that the walk takes four octets fewer than the Length.
+// `chunkOctets` stays without the head where there are contents: the walk takes four octets fewer than the Length.
 template <class Pass> void reservedChunk(Reader<Pass>& at) {
     std::int32_t& chunkOctets = at.variables().chunkOctets;
     const Block<Pass> block{at, "Reserved chunks"};

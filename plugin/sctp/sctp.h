@@ -16,8 +16,8 @@
 //   +---------------------------------------------------------------+
 //
 // Nothing is tested that SCTP itself would test. Nor does a chunk have a border, except in INIT and ABORT: the next
-// Chunk Type is read where the last field of the chunk before ended. So padding, and whatever a body does not read, show
-// as chunks of their own. `payloadOctets`, which ends the walk, follows the Lengths and not the cursor; where the two
+// Chunk Type is read where the last field of the chunk before ended. So padding, and whatever a body does not read,
+// show as chunks of their own. `payloadOctets`, which ends the walk, follows the Lengths and not the cursor; where the two
 // part, the walk ends with the bits.
 #pragma once
 
