@@ -71,7 +71,7 @@ template <class Pass> NETFLOOR_INLINE inline void dispatch(Reader<Pass>& at) {
     case protocolTcp:
         return apart<tcp::segment<Pass>>(at);
     case protocolUdp:
-        return stretch<64, udp::datagram<Pass>>(at);
+        return udp::datagram(at);
     case protocolIcmpv6:
         return apart<icmpv6::message<Pass>>(at);
     case protocolSctp:

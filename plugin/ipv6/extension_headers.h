@@ -204,7 +204,7 @@ template <class Pass> NETFLOOR_INLINE inline void upperProtocol(Reader<Pass>& at
     case protocolTcp:
         return apart<tcp::segment<Pass>>(at);
     case protocolUdp:
-        return udp::datagram(at);
+        return apart<udp::datagram<Pass>>(at);
     case protocolGre:
         return apart<gre::packet<Pass>>(at);
     case protocolSctp:

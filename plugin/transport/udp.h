@@ -16,6 +16,7 @@
 #include "frame/field.h"
 #include "frame/hand_off.h"
 #include "frame/step.h"
+#include "frame/stretch.h"
 #include "ipv4/carriage.h"
 #include "tables/port_names.h"
 
@@ -36,7 +37,7 @@ inline constexpr std::int32_t headerOctets = 8;
     return port == 1812 || port == 1813;
 }
 
-template <class Pass> NETFLOOR_INLINE inline void datagram(Reader<Pass>& at) {
+template <class Pass> NETFLOOR_INLINE inline void headerAndPayload(Reader<Pass>& at) {
     if (!at.live) {
         return;
     }
@@ -61,6 +62,10 @@ template <class Pass> NETFLOOR_INLINE inline void datagram(Reader<Pass>& at) {
     if (at.left > handOffAbove) {
         handOff(at);
     }
+}
+
+template <class Pass> NETFLOOR_INLINE inline void datagram(Reader<Pass>& at) {
+    stretch<64, headerAndPayload<Pass>>(at);
 }
 
 } // namespace netfloor::udp
