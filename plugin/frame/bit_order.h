@@ -24,7 +24,13 @@ public:
             at_.bitOrder = bitsPerOctet;
         }
         at_.writeLastRead();
-        reverseOctets(at_.data, at_.cursor, at_.state->totalBits);
+        start_ = (at_.cursor - 1) / bitsPerOctet;
+        end_ = at_.state->totalBits / bitsPerOctet;
+        if (!Pass::reports) {
+            // Nobody looks at the working copy meanwhile: what is read is enough, off an octet border one octet more.
+            end_ = std::min(end_, start_ + addressBits / bitsPerOctet + 1);
+        }
+        reverseOctets(at_.data, at_.cursor, end_ * bitsPerOctet);
     }
 
     // Behind the stretch the cursor stands on a whole octet, counted from the start of the innermost block.
@@ -33,7 +39,9 @@ public:
             return;
         }
         at_.writeLastRead();
-        std::memcpy(at_.data, at_.state->sourceData, at_.state->totalBits / bitsPerOctet);
+        if (start_ < end_) {
+            std::memcpy(at_.data + start_, at_.state->sourceData + start_, end_ - start_);
+        }
         const std::uint32_t blockStart = at_.state->blockStarts.base[at_.blockDepth];
         if (const std::uint32_t odd = (at_.cursor - blockStart) % bitsPerOctet; odd != 0) {
             const std::uint32_t rest = std::min(bitsPerOctet - odd, at_.left);
@@ -49,6 +57,8 @@ public:
 private:
     Reader<Pass>& at_;
     std::uint32_t outerOrder_;
+    std::uint32_t start_ = 0; // the octets that are reversed
+    std::uint32_t end_ = 0;
 };
 
 } // namespace netfloor
