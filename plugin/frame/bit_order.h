@@ -10,7 +10,8 @@
 
 namespace netfloor {
 
-// Reverses the working copy from the cursor on as long as it lives, and restores it then. In the form that
+// Reverses the working copy from the cursor on as long as it lives, and restores it then; in the passes that report
+// nothing, where no host has a field to look at meanwhile, no more of it than the one address that is read. In the form that
 // tells the host, fields are reported with a bit order of 8.
 template <class Pass> class [[nodiscard]] ReversedBits {
 public:
@@ -23,11 +24,12 @@ public:
         if (report == Report::toldToHost) {
             at_.bitOrder = bitsPerOctet;
         }
+        at_.settle();
         at_.writeLastRead();
         start_ = (at_.cursor - 1) / bitsPerOctet;
         end_ = at_.state->totalBits / bitsPerOctet;
         if (!Pass::reports) {
-            // Nobody looks at the working copy meanwhile: what is read is enough, off an octet border one octet more.
+            // Off an octet border an address reaches into one octet more.
             end_ = std::min(end_, start_ + addressBits / bitsPerOctet + 1);
         }
         reverseOctets(at_.data, at_.cursor, end_ * bitsPerOctet);
@@ -38,10 +40,10 @@ public:
         if (at_.over()) {
             return;
         }
+        at_.settle();
         at_.writeLastRead();
-        if (start_ < end_) {
-            std::memcpy(at_.data + start_, at_.state->sourceData + start_, end_ - start_);
-        }
+        const std::uint32_t from = Pass::reports ? 0 : std::min(start_, end_);
+        std::memcpy(at_.data + from, at_.state->sourceData + from, end_ - from);
         const std::uint32_t blockStart = at_.state->blockStarts.base[at_.blockDepth];
         if (const std::uint32_t odd = (at_.cursor - blockStart) % bitsPerOctet; odd != 0) {
             const std::uint32_t rest = std::min(bitsPerOctet - odd, at_.left);

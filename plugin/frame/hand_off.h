@@ -2,7 +2,6 @@
 // The hand-off: chooses by the ports who owns the payload, and gives control back to the host.
 #pragma once
 
-#include <algorithm>
 #include <cstdint>
 
 #include "frame/block.h"

@@ -15,14 +15,6 @@
 
 namespace netfloor {
 
-// The most characters of one number.
-[[nodiscard]] constexpr std::size_t longestNumber(Conversion conversion, std::uint32_t bitCount) {
-    if (conversion == Conversion::character) {
-        return 1;
-    }
-    return conversion == Conversion::decimal && bitCount <= bitsPerOctet ? 3 : mostDigits;
-}
-
 // A zero-terminated text of at most 255 characters; what does not fit is dropped. Most formats are known to fit,
 // and are built without a test; they may write whole words behind their end.
 class Line {

@@ -204,13 +204,15 @@ private:
     static bool storeAddress(XtrContext& context, const KeyFieldRow& row, const std::uint8_t* data, std::uint32_t start) {
         constexpr std::uint32_t octetCount = addressBits / bitsPerOctet;
         std::uint8_t* const place = context.keyRecord + row.valueOffset;
+        const std::array<std::uint16_t, 2> lengthAndPlace = {addressBits, context.byteAreaOffset};
+        std::memcpy(place, lengthAndPlace.data(), sizeof lengthAndPlace);
         if (octetCount >= context.byteAreaSize) {
-            const std::uint32_t failed = 0x80000000;
+            std::uint32_t failed = 0;
+            std::memcpy(&failed, place, sizeof failed);
+            failed |= 0x80000000;
             std::memcpy(place, &failed, sizeof failed);
             return false;
         }
-        const std::array<std::uint16_t, 2> lengthAndPlace = {addressBits, context.byteAreaOffset};
-        std::memcpy(place, lengthAndPlace.data(), sizeof lengthAndPlace);
         std::uint8_t* const area = context.keyRecord + context.byteAreaOffset;
         for (std::uint32_t octet = 0; octet < octetCount; ++octet) {
             const std::uint32_t value = octetAt(data, start + octet * bitsPerOctet);

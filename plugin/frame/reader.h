@@ -16,7 +16,6 @@
 #include <cstddef>
 #include <cstdint>
 #include <cstring>
-#include <type_traits>
 
 #include "frame/field.h"
 #include "frame/record.h"
@@ -118,17 +117,19 @@ public:
 
     // The last condition of the grammar, and the bits of its last step. They live in the state.
     [[nodiscard]] NETFLOOR_INLINE std::uint8_t& condition() {
+        settle();
         return state->condition;
     }
 
     [[nodiscard]] NETFLOOR_INLINE std::int32_t& advance() {
+        settle();
         return state->advance;
     }
 
     // Keeps a condition of the grammar as the last one, and gives it back.
     NETFLOOR_INLINE bool test(bool holds) {
         if (!over()) {
-            state->condition = holds ? 1 : 0;
+            condition() = holds ? 1 : 0;
         }
         return holds;
     }
@@ -177,13 +178,14 @@ public:
         last().writer = nullptr;
         last().seenPieces = 0;
         unchecked = state->flags != 0;
+        forget();
     }
 
     // Writes what a stretch has put off.
     NETFLOOR_INLINE void settle() {
         if (unsettled.writer != nullptr) {
-            condition() = 1;
-            advance() = static_cast<std::int32_t>(unsettled.advance);
+            state->condition = 1;
+            state->advance = static_cast<std::int32_t>(unsettled.advance);
             last().writer = unsettled.writer;
             last().cursor = unsettled.cursor;
             last().seenPieces = 0;
@@ -268,7 +270,7 @@ public:
             unsettled.blocks = blockDepth;
             state->blockStarts.base[blockDepth] = cursor;
         } else {
-            unsettled.blocks = 0;
+            settle();
             if (!push(state->blockStarts, blockDepth, cursor)) {
                 return false;
             }

@@ -24,6 +24,11 @@ template <std::uint32_t count, class Visit> NETFLOOR_INLINE inline void forEachP
     return width == 32 ? piece : value << width | piece;
 }
 
+// Whether a field has a number that a variable can take: an address and a run of nibbles have none.
+[[nodiscard]] constexpr bool hasStoredValue(const Place& place) {
+    return place.isPieces() || place.shape == Shape::octets || place.shape == Shape::octetsBackward;
+}
+
 // The value of a field that lies at `cursor`, before it is scaled.
 template <const Field& field>
 [[nodiscard]] NETFLOOR_INLINE inline std::uint32_t valueAt(const std::uint8_t* data, std::uint32_t cursor, std::uint32_t units) {

@@ -64,6 +64,7 @@ inline constexpr bool canBeSure = !field.place.isRun() && field.place.isTested()
 template <const Field& field, class Pass, class Store>
 NETFLOOR_INLINE inline void step(Reader<Pass>& at, std::uint32_t units, Store into) {
     static_assert(consistent(field), "the declaration of this field contradicts itself");
+    static_assert(std::is_same_v<Store, Unstored> || hasStoredValue(field.place), "this field has no number to store");
     constexpr const Place& place = field.place;
     if (!at.live) {
         return;
@@ -104,13 +105,18 @@ NETFLOOR_INLINE inline void step(Reader<Pass>& at, std::uint32_t units, Store in
         if constexpr (place.isRun()) {
             at.last().units = units;
         }
+        if constexpr (place.shape == Shape::groups) {
+            // No other field writes these, so that they would be lost behind the next one.
+            at.state->fieldRecord.wideStart = 0;
+            at.state->fieldRecord.wideBits = place.width();
+        }
         at.last().seenPieces = 0;
         Pass::template output<field>(at, start, units);
     }
 }
 
 // Reads a field of fixed size. `into` takes its value: a pointer to a variable, or a function of the value.
-// A field that does not fit clears the live flag and changes nothing else.
+// A field that does not fit clears the live flag and the condition, and changes nothing else.
 template <const Field& field, class Pass, class Store = Unstored>
 NETFLOOR_INLINE inline void read(Reader<Pass>& at, Store into = {}) {
     static_assert(!field.place.isRun(), "a run needs its number of units");

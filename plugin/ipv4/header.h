@@ -113,9 +113,13 @@ template <class Pass> NETFLOOR_INLINE inline void datagram(Reader<Pass>& at) {
     const Block<Pass> header{at, "IPv4 Header"};
     stretch<32, upToTotalLength<Pass>>(at);
 
+    if (!at.live) {
+        return;
+    }
     // A Total Length below 4 wraps to a huge number, which is more than any packet holds.
     const std::uint32_t limit = variables.ipTotalLength * bitsPerOctet - bitsBeforeLimit;
-    if (!at.live || limit > at.left) {
+    at.advance() = static_cast<std::int32_t>(limit);
+    if (limit > at.left) {
         return;
     }
     const LimitedBlock<Pass> extra{at, "Extra", limit};

@@ -30,15 +30,15 @@ inline constexpr std::uint32_t typeBits = 16;
 inline constexpr std::uint32_t lengthBits = 16;
 
 // Bits in front of a Length: stepped over where `needs` of them are left.
-struct Stretch {
+struct Skipped {
     std::uint32_t needs;
     std::uint32_t width;
 };
 
 // A Length that lies behind the place where its limited block starts.
 struct LengthAhead {
-    std::array<Stretch, 2> stretches; // what lies in front of the Length; a stretch that needs nothing is none
-    bool addsStretches;               // whether the limit adds the stretches to the Length
+    std::array<Skipped, 2> stretches; // what lies in front of the Length; a stretch that needs nothing is none
+    bool addsSkippedes;               // whether the limit adds the stretches to the Length
     std::uint32_t takesOff;           // bits that the limit takes off the sum
 };
 
@@ -66,14 +66,14 @@ template <const LengthAhead& ahead, class Pass, class Store>
     };
 
     std::uint32_t sum = 0;
-    for (const Stretch& stretch : ahead.stretches) {
+    for (const Skipped& stretch : ahead.stretches) {
         if (stretch.needs == 0) {
             continue;
         }
         if (at.test(at.left >= stretch.needs)) {
             stepOver(stretch.width);
         }
-        sum += ahead.addsStretches ? static_cast<std::uint32_t>(at.advance()) : 0;
+        sum += ahead.addsSkippedes ? static_cast<std::uint32_t>(at.advance()) : 0;
     }
     const std::optional<std::uint32_t> length = look(at, octets(2));
     if (at.test(length.has_value())) {
