@@ -37,8 +37,8 @@ struct Skipped {
 
 // A Length that lies behind the place where its limited block starts.
 struct LengthAhead {
-    std::array<Skipped, 2> stretches; // what lies in front of the Length; a stretch that needs nothing is none
-    bool addsSkippedes;               // whether the limit adds the stretches to the Length
+    std::array<Skipped, 2> skipped; // what lies in front of the Length; one that needs nothing is none
+    bool addsSkipped;               // whether the limit adds them to the Length
     std::uint32_t takesOff;           // bits that the limit takes off the sum
 };
 
@@ -66,14 +66,14 @@ template <const LengthAhead& ahead, class Pass, class Store>
     };
 
     std::uint32_t sum = 0;
-    for (const Skipped& stretch : ahead.stretches) {
-        if (stretch.needs == 0) {
+    for (const Skipped& part : ahead.skipped) {
+        if (part.needs == 0) {
             continue;
         }
-        if (at.test(at.left >= stretch.needs)) {
-            stepOver(stretch.width);
+        if (at.test(at.left >= part.needs)) {
+            stepOver(part.width);
         }
-        sum += ahead.addsSkippedes ? static_cast<std::uint32_t>(at.advance()) : 0;
+        sum += ahead.addsSkipped ? static_cast<std::uint32_t>(at.advance()) : 0;
     }
     const std::optional<std::uint32_t> length = look(at, octets(2));
     if (at.test(length.has_value())) {
