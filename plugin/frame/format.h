@@ -38,14 +38,10 @@ struct Format {
 
 [[nodiscard]] constexpr Conversion numberConversion(char letter) {
     switch (letter) {
-    case 'u':
-        return Conversion::decimal;
-    case 'x':
-        return Conversion::hexadecimal;
-    case 'c':
-        return Conversion::character;
-    default:
-        return Conversion::none;
+    case 'u': return Conversion::decimal;
+    case 'x': return Conversion::hexadecimal;
+    case 'c': return Conversion::character;
+    default: return Conversion::none;
     }
 }
 

@@ -13,26 +13,30 @@
 namespace netfloor {
 
 // Calls `visit` with the number of each piece, as a constant.
-template <std::uint32_t count, class Visit> NETFLOOR_INLINE inline void forEachPiece(Visit visit) {
+template <std::uint32_t count, class Visit>
+NETFLOOR_INLINE inline void forEachPiece(Visit visit) {
     [&]<std::size_t... i>(std::index_sequence<i...>) NETFLOOR_INLINE {
         (visit.template operator()<i>(), ...);
-    }(std::make_index_sequence<count>{});
+    }
+    (std::make_index_sequence<count>{});
 }
 
 // A value with a further piece of so many bits behind it.
-[[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t joined(std::uint32_t value, std::uint32_t piece, std::uint32_t width) {
+[[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t joined(std::uint32_t value, std::uint32_t piece,
+                                                             std::uint32_t width) {
     return width == 32 ? piece : value << width | piece;
 }
 
 // Whether a field has a number that a variable can take: an address and a run of nibbles have none.
-[[nodiscard]] constexpr bool hasStoredValue(const Place& place) {
+[[nodiscard]] constexpr bool hasStoredValue(const Place &place) {
     return place.isPieces() || place.shape == Shape::octets || place.shape == Shape::octetsBackward;
 }
 
 // The value of a field that lies at `cursor`, before it is scaled.
-template <const Field& field>
-[[nodiscard]] NETFLOOR_INLINE inline std::uint32_t valueAt(const std::uint8_t* data, std::uint32_t cursor, std::uint32_t units) {
-    constexpr const Place& place = field.place;
+template <const Field &field>
+[[nodiscard]] NETFLOOR_INLINE inline std::uint32_t valueAt(const std::uint8_t *data, std::uint32_t cursor,
+                                                           std::uint32_t units) {
+    constexpr const Place &place = field.place;
     std::uint32_t value = 0;
     if constexpr (place.isPieces()) {
         forEachPiece<place.count>([&]<std::uint32_t i>() NETFLOOR_INLINE {
@@ -51,10 +55,11 @@ template <const Field& field>
 
 // Writes the elements and the value of a field that lies at `cursor`, and its id. There is room for the
 // elements. Gives the value.
-template <const Field& field>
-NETFLOOR_INLINE inline std::uint32_t writeElements(FieldRecord& record, const std::uint8_t* data, std::uint32_t cursor, std::uint32_t units) {
-    constexpr const Place& place = field.place;
-    BitRange* const ranges = record.ranges;
+template <const Field &field>
+NETFLOOR_INLINE inline std::uint32_t writeElements(FieldRecord &record, const std::uint8_t *data, std::uint32_t cursor,
+                                                   std::uint32_t units) {
+    constexpr const Place &place = field.place;
+    BitRange *const ranges = record.ranges;
     std::uint32_t value = 0;
     const auto nibble = [&](std::uint32_t index, std::uint32_t first) NETFLOOR_INLINE {
         ranges[index].firstBit = first;
@@ -132,7 +137,8 @@ NETFLOOR_INLINE inline std::uint32_t writeElements(FieldRecord& record, const st
 }
 
 // Resets the record for a field and gives it the field's name.
-template <const Field& field> NETFLOOR_INLINE inline void beginRecord(FieldRecord& record) {
+template <const Field &field>
+NETFLOOR_INLINE inline void beginRecord(FieldRecord &record) {
     record.value = 0;
     record.rangeCount = 0;
     record.valueText[0] = '\0';

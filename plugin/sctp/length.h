@@ -17,7 +17,7 @@ namespace netfloor::sctp {
 inline constexpr std::int32_t headOctets = 4;
 
 // Stores a Length as the octets behind the head. Of a Length below 4 the number is negative, and nothing fits.
-[[nodiscard]] constexpr auto octetsBehindHead(std::int32_t& octets) {
+[[nodiscard]] constexpr auto octetsBehindHead(std::int32_t &octets) {
     return [&octets](std::uint32_t length) { octets = static_cast<std::int32_t>(length) - headOctets; };
 }
 
@@ -39,7 +39,7 @@ struct Skipped {
 struct LengthAhead {
     std::array<Skipped, 2> skipped; // what lies in front of the Length; one that needs nothing is none
     bool addsSkipped;               // whether the limit adds them to the Length
-    std::uint32_t takesOff;           // bits that the limit takes off the sum
+    std::uint32_t takesOff;         // bits that the limit takes off the sum
 };
 
 // The limits of a whole Length are Length * 8 bits, of ABORT Length * 8 - 8. INIT starts behind its Chunk Type,
@@ -52,8 +52,8 @@ inline constexpr LengthAhead valueLengthAhead{{{{typeBits, typeBits}}}, true, 32
 // Reads a Length ahead of its turn, and gives the bits of the limit that it sets. Nothing is reported, and the
 // cursor comes back. What does not fit adds the advance of the step before instead of its own: behind the last
 // parameter of a list that makes a limit which holds no parameter.
-template <const LengthAhead& ahead, class Pass, class Store>
-[[nodiscard]] std::uint32_t limitFromLength(Reader<Pass>& at, Store into) {
+template <const LengthAhead &ahead, class Pass, class Store>
+[[nodiscard]] std::uint32_t limitFromLength(Reader<Pass> &at, Store into) {
     if (at.over()) {
         return 0;
     }
@@ -66,7 +66,7 @@ template <const LengthAhead& ahead, class Pass, class Store>
     };
 
     std::uint32_t sum = 0;
-    for (const Skipped& part : ahead.skipped) {
+    for (const Skipped &part : ahead.skipped) {
         if (part.needs == 0) {
             continue;
         }
