@@ -40,7 +40,7 @@ template <const Field &field>
     std::uint32_t value = 0;
     if constexpr (place.isPieces()) {
         forEachPiece<place.count>([&]<std::uint32_t i>() NETFLOOR_INLINE {
-            constexpr Piece piece = place.pieces[i];
+            constexpr Piece piece = field.place.pieces[i];
             value = joined(value, pieceAt<piece.low, piece.high>(data, cursor), piece.width());
         });
     } else if constexpr (place.shape == Shape::octets) {
@@ -49,6 +49,36 @@ template <const Field &field>
         for (std::uint32_t octet = units; octet-- > 0;) {
             value = value << bitsPerOctet | octetAt(data, cursor + octet * bitsPerOctet);
         }
+    }
+    return value;
+}
+
+// An address for the eye. Only the values of the later groups are kept: the first element stands for the whole address.
+inline void writeGroups(FieldRecord &record, const std::uint8_t *data, std::uint32_t cursor, std::uint32_t groups) {
+    for (std::uint32_t group = 0; group < groups; ++group) {
+        std::uint32_t digits = 0;
+        for (std::uint32_t digit = 0; digit < nibblesPerGroup; ++digit) {
+            digits = digits << nibbleBits | nibbleAt(data, cursor + group * groupBits + digit * nibbleBits);
+        }
+        record.ranges[group].value = digits;
+    }
+    record.wideStart = 0;
+    record.wideBits = groups * groupBits;
+    record.ranges[0].firstBit = cursor;
+    record.ranges[0].lastBit = cursor + record.wideBits - 1;
+}
+
+// An address in a stretch of reversed bits. Gives the value, of which the last two groups stay.
+[[nodiscard]] inline std::uint32_t writeReversedGroups(BitRange *ranges, const std::uint8_t *data, std::uint32_t cursor,
+                                                       std::uint32_t groups) {
+    std::uint32_t value = 0;
+    for (std::uint32_t group = 0; group < groups; ++group) {
+        const std::uint32_t first = cursor + group * groupBits;
+        const std::uint32_t last = first + groupBits - 1;
+        ranges[group].firstBit = first;
+        ranges[group].lastBit = last;
+        ranges[group].value = bits(data, last, first);
+        value = value << groupBits | ranges[group].value;
     }
     return value;
 }
@@ -78,7 +108,7 @@ NETFLOOR_INLINE inline std::uint32_t writeElements(FieldRecord &record, const st
 
     if constexpr (place.shape == Shape::pieces) {
         forEachPiece<place.count>([&]<std::uint32_t i>() NETFLOOR_INLINE {
-            constexpr Piece piece = place.pieces[i];
+            constexpr Piece piece = field.place.pieces[i];
             ranges[i].firstBit = cursor + piece.low;
             ranges[i].lastBit = cursor + piece.high;
             ranges[i].value = pieceAt<piece.low, piece.high>(data, cursor);
@@ -97,28 +127,10 @@ NETFLOOR_INLINE inline std::uint32_t writeElements(FieldRecord &record, const st
             octet(i, cursor + (units - 1 - i) * bitsPerOctet);
         }
     } else if constexpr (place.shape == Shape::groups) {
-        // Only the values of the later groups are kept: the first element stands for the whole address.
-        for (std::uint32_t group = 0; group < units; ++group) {
-            std::uint32_t digits = 0;
-            for (std::uint32_t digit = 0; digit < nibblesPerGroup; ++digit) {
-                digits = digits << nibbleBits | nibbleAt(data, cursor + group * groupBits + digit * nibbleBits);
-            }
-            ranges[group].value = digits;
-        }
-        record.wideStart = 0;
-        record.wideBits = units * groupBits;
-        ranges[0].firstBit = cursor;
-        ranges[0].lastBit = cursor + record.wideBits - 1;
+        writeGroups(record, data, cursor, units);
         outputElements = 1;
     } else if constexpr (place.shape == Shape::reversedGroups) {
-        for (std::uint32_t group = 0; group < units; ++group) {
-            const std::uint32_t first = cursor + group * groupBits;
-            const std::uint32_t last = first + groupBits - 1;
-            ranges[group].firstBit = first;
-            ranges[group].lastBit = last;
-            ranges[group].value = bits(data, last, first);
-            value = value << groupBits | ranges[group].value;
-        }
+        value = writeReversedGroups(ranges, data, cursor, units);
     } else if constexpr (place.shape == Shape::nibbles || place.shape == Shape::addressNibbles) {
         for (std::uint32_t i = 0; i < elements; ++i) {
             nibble(i, cursor + i * nibbleBits);

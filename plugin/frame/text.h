@@ -40,7 +40,7 @@ inline constexpr std::size_t mostDigits = 10;
 NETFLOOR_INLINE inline char *writeHexadecimal(char *to, std::uint32_t value) {
     const auto digits = static_cast<std::uint32_t>(value == 0 ? 1 : (35 - std::countl_zero(value)) / 4);
     std::array<char, 8> all;
-    for (std::uint32_t octet = 0; octet < 4; ++octet) {
+    for (std::size_t octet = 0; octet < 4; ++octet) {
         std::memcpy(&all[octet * 2], &hexadecimalPairs[value >> (24 - octet * 8) & 0xff], 2);
     }
     std::uint64_t text = 0;
