@@ -95,12 +95,12 @@ struct FieldTable {
 };
 
 template <std::size_t index>
-[[nodiscard]] constexpr FieldDescriptor descriptorOf(std::uintptr_t keyIndex) {
+[[nodiscard]] constexpr FieldDescriptor descriptorOf() {
     constexpr const Field &field = *catalogue[index];
     return {
         .flags = flagsOf(field),
         .fieldId = field.id,
-        .keyIndex = keyIndex,
+        .keyIndex = 0, // counted over all rows
         .name = field.title.empty() ? field.tableName().data() : field.title.data(),
         .shortName = shortNameOf<index>(),
         .valueCount = static_cast<std::int32_t>(valueRowCount(field)),
@@ -114,16 +114,18 @@ template <std::size_t index>
 }
 
 inline constexpr FieldTable fieldTable = []<std::size_t... index>(std::index_sequence<index...>) {
-    FieldTable table{};
+    FieldTable table{.rows = {descriptorOf<index>()...},
+                     .end = {.flags = NETFLOOR_NO_FIELD,
+                             .fieldId = 0xffff,
+                             .marker = NETFLOOR_LAST_FIELD,
+                             .words = {0, 0xffff},
+                             .counts = {0xffff, 0xffff},
+                             .width = 0xffffffff,
+                             .zero = {}}};
     std::uintptr_t keys = 0;
-    ((table.rows[index] = descriptorOf<index>(isKeyField(*catalogue[index]) ? ++keys : 0)), ...);
-    table.end = {.flags = NETFLOOR_NO_FIELD,
-                 .fieldId = 0xffff,
-                 .marker = NETFLOOR_LAST_FIELD,
-                 .words = {0, 0xffff},
-                 .counts = {0xffff, 0xffff},
-                 .width = 0xffffffff,
-                 .zero = {}};
+    for (std::size_t row = 0; row < catalogue.size(); ++row) {
+        table.rows[row].keyIndex = isKeyField(*catalogue[row]) ? ++keys : 0;
+    }
     return table;
 }
 (std::make_index_sequence<catalogue.size()>{});
