@@ -67,10 +67,8 @@ private:
         if (known == nullptr) {
             return fail(packet, report, "no such field in the tables");
         }
-        const std::string_view name =
-            std::string_view(report.name)
-                .substr(report.name.find_first_not_of(' ') + 1 == 0 ? report.name.size()
-                                                                    : report.name.find_first_not_of(' '));
+        std::string_view name = report.name;
+        name.remove_prefix(std::min(name.find_first_not_of(' '), name.size()));
         if (name != known->name && name != known->shortName) {
             return fail(packet, report, "named " + std::string(known->name));
         }
@@ -336,7 +334,7 @@ TEST(Views, NameValues) {
     }
     EXPECT_EQ(tables().find("Version"), tables().find(150));
     EXPECT_EQ(tables().find("discard packet"), tables().find(243)); // a short name
-    EXPECT_EQ(tables().named("Length").size(), tables().named("Length").back()->id == 0 ? 0U : 19U);
+    EXPECT_EQ(tables().named("TCP Destination Port").size(), 3U);
     EXPECT_EQ(tables().find("No Such Field"), nullptr);
     EXPECT_EQ(tables().find(151), nullptr);
 }
