@@ -2,6 +2,7 @@
 // The command as a user meets it: what comes out on which side, and how it ends.
 #include <algorithm>
 #include <fstream>
+#include <sstream>
 #include <string>
 #include <vector>
 
@@ -357,6 +358,27 @@ TEST_F(Command, readsPcapngWithInterfacesOfDifferentTypes) {
         {"netfloor $T/noBlock.pcapng", 3, {}, {"a block of 4 octets"}, {}},
         {"netfloor $C/pcapng-big-endian-two-interfaces.pcapng", 0, {"192.168.1.139"}, {}, {}, 5},
     });
+}
+
+// The examples of the README are what the command prints.
+TEST_F(Command, printsWhatTheReadmeShows) {
+    std::ifstream readme(NETFLOOR_CAPTURES "/../../README.md");
+    const std::string prompt = "    $ ./netfloor ";
+    std::size_t seen = 0;
+    for (std::string line; std::getline(readme, line);) {
+        if (!line.starts_with(prompt)) {
+            continue;
+        }
+        SCOPED_TRACE(line);
+        const Outcome outcome = shell("cd $C/../..; netfloor " + line.substr(prompt.size()));
+        std::istringstream printed(outcome.out);
+        for (std::string expected; std::getline(printed, expected) && !expected.empty();) {
+            std::getline(readme, line);
+            EXPECT_EQ(line, "    " + expected);
+        }
+        ++seen;
+    }
+    EXPECT_EQ(seen, 3U);
 }
 
 // All that a capture holds goes through all commands, and no packet is lost.

@@ -212,11 +212,11 @@ Octets withValue(Octets packet, const FieldReport &field, std::uint32_t value) {
 // neighbours and samples.
 std::set<std::uint32_t> valuesToTry(const FieldDescription &field) {
     constexpr std::uint32_t mostSamples = 61;
-    const std::set<std::uint32_t> ports = {393, 479};
+    constexpr std::uint32_t udpSourcePort = 479;
     std::set<std::uint32_t> values;
     const std::uint32_t width = std::min(field.width.value_or(0), 32u);
     const std::uint32_t most = width == 32 ? 0xffffffff : (1u << width) - 1;
-    const std::uint32_t step = width <= 8 || ports.contains(field.id) ? 1 : most / mostSamples;
+    const std::uint32_t step = width <= 8 || field.id == udpSourcePort ? 1 : most / mostSamples;
     for (std::uint64_t value = 0; value <= most; value += step) {
         values.insert(static_cast<std::uint32_t>(value));
     }
@@ -274,10 +274,8 @@ TEST(Views, AgreeOnEveryField) {
     EXPECT_EQ(idsText(all.reversed()), idsText(backward));
     EXPECT_EQ(idsText(elsewhere), "168"); // is read a second time
     EXPECT_GE(all.followed().size(), 340U);
-    EXPECT_GE(all.reports(), 150000U);
-    for (const std::uint32_t port : {393, 479}) {
-        EXPECT_EQ(all.values().at(port).size(), 65536U) << port;
-    }
+    EXPECT_GE(all.reports(), 100000U);
+    EXPECT_EQ(all.values().at(479).size(), 65536U); // ports
 }
 
 // Whatever else stands in a packet: octets changed at random, and all that looks like a packet in the captures.
