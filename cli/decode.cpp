@@ -5,7 +5,6 @@
 #include <cstdio>
 #include <cstdlib>
 #include <ctime>
-#include <filesystem>
 #include <iostream>
 #include <memory>
 #include <string>
@@ -16,30 +15,13 @@
 #include "capture/capture.h"
 #include "filter.h"
 #include "output.h"
+#include "plugin_path.h"
 #include "printers/printer.h"
 #include "progress.h"
 
 namespace netfloor::cli {
 
 namespace {
-
-// The plug-in that belongs to this command: in the build tree beside it, or where it is installed.
-std::filesystem::path findPlugin(const std::filesystem::path &asked) {
-    if (!asked.empty()) {
-        return asked;
-    }
-    std::error_code ignored;
-    const auto folder = std::filesystem::read_symlink("/proc/self/exe", ignored).parent_path();
-    const std::array<std::filesystem::path, 2> places = {folder / NETFLOOR_BUILT_PLUGIN,
-                                                         folder / NETFLOOR_INSTALLED_PLUGIN};
-    for (const auto &place : places) {
-        if (std::filesystem::exists(place, ignored)) {
-            return place.lexically_normal();
-        }
-    }
-    throw PluginError("the plug-in was found neither at " + places[0].lexically_normal().string() + " nor at " +
-                      places[1].lexically_normal().string() + ". Build it, or name it with --plugin PATH.");
-}
 
 bool wantsColour(Colour colour) {
     if (colour != Colour::automatic) {

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// netfloor: decodes the packets of a capture file.
+// netfloor: decodes the packets of a capture file, and lists what it can tell of them.
 #include <csignal>
 #include <exception>
 #include <iostream>
@@ -8,6 +8,7 @@
 #include "capture/capture.h"
 #include "decode.h"
 #include "exit_code.h"
+#include "fields/fields.h"
 #include "netfloor-host/host.h"
 #include "options.h"
 #include "output.h"
@@ -33,7 +34,12 @@ int runCommand(int argumentCount, char **arguments) {
         if (const auto *const answered = std::get_if<ExitCode>(&parsed)) {
             return number(*answered);
         }
-        return number(decodeCapture(std::get<Options>(parsed)));
+        const auto &options = std::get<Options>(parsed);
+        if (options.command == Command::fields) {
+            showFields(options);
+            return number(ExitCode::good);
+        }
+        return number(decodeCapture(options));
     } catch (const OutputClosed &) {
         return number(ExitCode::good);
     } catch (const UsageError &error) {

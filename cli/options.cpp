@@ -23,6 +23,7 @@ constexpr std::array commandNames = {
     CommandName{Command::detail, "detail", "Every field of each packet, as a tree of layers and blocks"},
     CommandName{Command::verify, "verify", "A verdict on each packet, and a total"},
     CommandName{Command::keys, "keys", "The key fields of each packet, as CSV"},
+    CommandName{Command::fields, "fields", "The fields that the plug-in can report; takes no capture"},
 };
 
 constexpr const char *footer = R"(
@@ -38,6 +39,7 @@ Exit codes:
 Examples:
   netfloor capture.pcap                          what is in it
   netfloor detail --packet 7 --bits capture.pcap one packet, with the bits of each field
+  netfloor fields Protocol                       what a field is, and what its values are called
   netfloor verify --filter 'tcp port 80' c.pcapng
   netfloor keys --column 'Source Address' --column 'Destination Address' c.pcap
   tcpdump -w - | netfloor -)";
@@ -50,9 +52,29 @@ public:
             return CLI::Formatter::make_usage(app, name);
         }
         return "Usage: netfloor [summary|detail|verify|keys] [OPTIONS] FILE\n"
+               "       netfloor fields [OPTIONS] [NAME|ID]\n"
                "       netfloor detail --help    tells the options of a command\n";
     }
 };
+
+void addPluginOption(CLI::App &app, Options &options) {
+    app.add_option("--plugin", options.plugin,
+                   "The plug-in to decode with (default: the one that belongs to this command)")
+        ->type_name("PATH");
+}
+
+void addFieldsOptions(CLI::App &app, Options &options) {
+    app.add_option("field", options.field, "Name or id of a field: with its values and its bits (default: all fields)")
+        ->type_name("NAME|ID");
+    CLI::Option *const json = app.add_flag_callback(
+        "--json", [&options] { options.form = FieldsForm::json; }, "As JSON (RFC 8259)");
+    app.add_flag_callback(
+           "--markdown", [&options] { options.form = FieldsForm::markdown; },
+           "As a page of reference, all fields by protocol")
+        ->excludes(json)
+        ->excludes("field");
+    addPluginOption(app, options);
+}
 
 void addOptions(CLI::App &app, Options &options) {
     app.add_option("file", options.file, "Capture file (pcap or pcapng, gzip or not); '-' for standard input")
@@ -65,9 +87,7 @@ void addOptions(CLI::App &app, Options &options) {
         ->type_name("N")
         ->check(CLI::PositiveNumber);
     app.add_flag("--utc", options.utc, "Date and time of day (UTC) instead of seconds since the first packet");
-    app.add_option("--plugin", options.plugin,
-                   "The plug-in to decode with (default: the one that belongs to this command)")
-        ->type_name("PATH");
+    addPluginOption(app, options);
     const std::map<std::string, Colour> colours = {
         {"auto", Colour::automatic}, {"always", Colour::always}, {"never", Colour::never}};
     app.add_option("--color", options.colour, "auto (default: on a terminal, if NO_COLOR is not set), always, never")
@@ -90,7 +110,8 @@ void addOwnOptions(CLI::App &app, Command command, Options &options) {
             ->allow_extra_args(false);
         app.add_flag("--raw", options.raw, "Addresses as the plug-in stores them, in hexadecimal");
         break;
-    case Command::verify: break;
+    case Command::verify:
+    case Command::fields: break;
     }
 }
 
@@ -124,8 +145,12 @@ std::variant<Options, ExitCode> parseOptions(int argumentCount, char **arguments
     app.require_subcommand(1);
     for (const CommandName &row : commandNames) {
         CLI::App *const sub = app.add_subcommand(row.name, row.help);
-        addOptions(*sub, options);
-        addOwnOptions(*sub, row.command, options);
+        if (row.command == Command::fields) {
+            addFieldsOptions(*sub, options);
+        } else {
+            addOptions(*sub, options);
+            addOwnOptions(*sub, row.command, options);
+        }
         sub->callback([&options, &row] { options.command = row.command; });
     }
 

@@ -13,7 +13,9 @@
 
 namespace netfloor::cli {
 
-enum class Command : std::uint8_t { summary, detail, verify, keys };
+enum class Command : std::uint8_t { summary, detail, verify, keys, fields };
+
+enum class FieldsForm : std::uint8_t { text, json, markdown };
 
 enum class Colour : std::uint8_t { automatic, always, never };
 
@@ -30,6 +32,8 @@ struct Options {
     bool bits = false;                // detail: bit ranges
     bool raw = false;                 // keys: addresses as the plug-in stores them
     std::vector<std::string> columns; // keys: these key fields only
+    std::string field;                // fields: those of this name, or of this id; empty: all
+    FieldsForm form = FieldsForm::text;
 };
 
 // The options, or the code to end with when the command line has been answered: --help, or a mistake.

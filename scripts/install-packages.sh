@@ -6,8 +6,8 @@
 #   scripts/install-packages.sh all       that, and what the tests, the checks and the benchmarks need
 set -eu
 
-decode="g++ cmake ninja-build pkg-config libpcap-dev libcli11-dev zlib1g-dev"
-all="$decode libgtest-dev libbenchmark-dev libtins-dev nlohmann-json3-dev clang clang-format clang-tidy tshark"
+decode="g++ cmake ninja-build pkg-config libpcap-dev libcli11-dev zlib1g-dev nlohmann-json3-dev"
+all="$decode libgtest-dev libbenchmark-dev libtins-dev clang clang-format clang-tidy tshark"
 
 case "${1:-all}" in
 decode) wanted=$decode ;;

@@ -10,21 +10,30 @@
 
 namespace netfloor {
 
-// Reverses the working copy from the cursor on as long as it lives, and restores it then. In the form that
-// tells the host, fields are reported with a bit order of 8.
-template <class Pass> class [[nodiscard]] ReversedBits {
+// Reverses the working copy from the cursor on as long as it lives, and restores it then; in the passes that report
+// nothing, where no host has a field to look at meanwhile, no more of it than the one address that is read. In the form
+// that tells the host, fields are reported with a bit order of 8.
+template <class Pass>
+class [[nodiscard]] ReversedBits {
 public:
     enum class Report : bool { plain, toldToHost };
 
-    ReversedBits(Reader<Pass>& reader, Report report) : at_(reader), outerOrder_(reader.bitOrder) {
+    ReversedBits(Reader<Pass> &reader, Report report) : at_(reader), outerOrder_(reader.bitOrder) {
         if (at_.over()) {
             return;
         }
         if (report == Report::toldToHost) {
             at_.bitOrder = bitsPerOctet;
         }
+        at_.settle();
         at_.writeLastRead();
-        reverseOctets(at_.data, at_.cursor, at_.state->totalBits);
+        start_ = (at_.cursor - 1) / bitsPerOctet;
+        end_ = at_.state->totalBits / bitsPerOctet;
+        if (!Pass::reports) {
+            // Off an octet border an address reaches into one octet more.
+            end_ = std::min(end_, start_ + addressBits / bitsPerOctet + 1);
+        }
+        reverseOctets(at_.data, at_.cursor, end_ * bitsPerOctet);
     }
 
     // Behind the stretch the cursor stands on a whole octet, counted from the start of the innermost block.
@@ -32,8 +41,10 @@ public:
         if (at_.over()) {
             return;
         }
+        at_.settle();
         at_.writeLastRead();
-        std::memcpy(at_.data, at_.state->sourceData, at_.state->totalBits / bitsPerOctet);
+        const std::uint32_t from = Pass::reports ? 0 : std::min(start_, end_);
+        std::memcpy(at_.data + from, at_.state->sourceData + from, end_ - from);
         const std::uint32_t blockStart = at_.state->blockStarts.base[at_.blockDepth];
         if (const std::uint32_t odd = (at_.cursor - blockStart) % bitsPerOctet; odd != 0) {
             const std::uint32_t rest = std::min(bitsPerOctet - odd, at_.left);
@@ -43,12 +54,14 @@ public:
         at_.bitOrder = outerOrder_;
     }
 
-    ReversedBits(const ReversedBits&) = delete;
-    ReversedBits& operator=(const ReversedBits&) = delete;
+    ReversedBits(const ReversedBits &) = delete;
+    ReversedBits &operator=(const ReversedBits &) = delete;
 
 private:
-    Reader<Pass>& at_;
+    Reader<Pass> &at_;
     std::uint32_t outerOrder_;
+    std::uint32_t start_ = 0; // the octets that are reversed
+    std::uint32_t end_ = 0;
 };
 
 } // namespace netfloor

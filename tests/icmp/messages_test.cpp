@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
 // ICMP messages (RFC 792, 950, 1256).
 #include <algorithm>
-#include <map>
+#include <array>
 #include <sstream>
 #include <string>
 #include <vector>
@@ -150,30 +150,24 @@ TEST(Icmp, everyFieldOfEachErrorMessage) {
 }
 
 TEST(Icmp, nameOfEachType) {
-    const std::map<unsigned, std::pair<std::string, std::string>> names = {
-        {0, {"Echo Reply Message", "ERM"}},
-        {3, {"Destination Unreachable Message", "DUM"}},
-        {4, {"Source Quench Message", "SQM"}},
-        {5, {"Redirect Message", "RM"}},
-        {8, {"Echo Message", "EM"}},
-        {9, {"ICMP Router Advertisement Message", "IRAM"}},
-        {10, {"ICMP Router Solicitation Message", "RSM"}},
-        {11, {"Time Exceeded Message", "TEM"}},
-        {12, {"Parameter Problem Message", "PPM"}},
-        {13, {"Timestamp Message", "TM"}},
-        {14, {"Timestamp Reply Message", "TRM"}},
-        {15, {"Information Request Message", "IReqM"}},
-        {16, {"Information Reply Message", "IRepM"}},
-        {17, {"Address Mask Request Message", "MReq"}},
-        {18, {"Address Mask Reply Message", "MRep"}},
-    };
-    for (unsigned type = 0; type < 256; ++type) {
-        const auto found = names.find(type);
-        const auto &[md, to] =
-            found == names.end() ? std::pair<std::string, std::string>("Reserved", "Rsvd") : found->second;
+    std::array<std::string, 256> names; // short and long
+    names.fill("Rsvd Reserved");
+    std::istringstream list(
+        "0 ERM Echo Reply Message|3 DUM Destination Unreachable Message|4 SQM Source Quench Message|"
+        "5 RM Redirect Message|8 EM Echo Message|9 IRAM ICMP Router Advertisement Message|"
+        "10 RSM ICMP Router Solicitation Message|11 TEM Time Exceeded Message|"
+        "12 PPM Parameter Problem Message|13 TM Timestamp Message|14 TRM Timestamp Reply Message|"
+        "15 IReqM Information Request Message|16 IRepM Information Reply Message|"
+        "17 MReq Address Mask Request Message|18 MRep Address Mask Reply Message");
+    for (std::size_t type = 0; list >> type;) {
+        std::getline(list >> std::ws, names[type], '|');
+    }
+    for (unsigned type = 0; type < names.size(); ++type) {
+        const std::size_t blank = names[type].find(' ');
         const Runs runs = runAll(icmp({static_cast<std::uint8_t>(type)}));
-        EXPECT_EQ(runs.md.fields.back().text, "ICMP Message Type=" + md);
-        EXPECT_EQ(runs.to.displays.back().text, "ICMP - " + to + " (" + std::to_string(type) + ')');
+        EXPECT_EQ(runs.md.fields.back().text, "ICMP Message Type=" + names[type].substr(blank + 1));
+        EXPECT_EQ(runs.to.displays.back().text,
+                  "ICMP - " + names[type].substr(0, blank) + " (" + std::to_string(type) + ')');
     }
 }
 

@@ -2,9 +2,10 @@
 // What was read behind the first IPv6 header, in short.
 #pragma once
 
-#include <algorithm>
 #include <string>
 #include <string_view>
+
+#include <gtest/gtest.h>
 
 #include "support/runs.h"
 

@@ -1,6 +1,5 @@
 // SPDX-License-Identifier: MIT
 // The common header of SCTP (RFC 9260, 3.1), the walk over the chunks, and their bodies.
-#include <algorithm>
 #include <string>
 #include <vector>
 

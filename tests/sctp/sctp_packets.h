@@ -5,6 +5,8 @@
 #include <string>
 #include <string_view>
 
+#include <gtest/gtest.h>
+
 #include "support/runs.h"
 
 namespace netfloor::test {

@@ -5,6 +5,9 @@
 #include <cstdint>
 #include <sstream>
 #include <string>
+#include <vector>
+
+#include <gtest/gtest.h>
 
 #include "support/runs.h"
 
@@ -38,6 +41,24 @@ inline std::string fieldValues(const Report &md, std::uint32_t behind) {
         found = found || field.id == behind;
     }
     return out.str();
+}
+
+// A packet, the values of its fields behind a certain one, and the flags that it leaves.
+struct ValuesCase {
+    const char *name;
+    Octets packet;
+    const char *values;
+    std::uint32_t flagsOfMd, flagsOfMv;
+};
+
+inline void expectValues(std::uint32_t behind, const std::vector<ValuesCase> &cases) {
+    for (const ValuesCase &one : cases) {
+        SCOPED_TRACE(one.name);
+        const Runs runs = runAll(one.packet);
+        EXPECT_EQ(fieldValues(runs.md, behind), one.values);
+        EXPECT_EQ(runs.md.flags, one.flagsOfMd);
+        EXPECT_EQ(runs.mv.flags, one.flagsOfMv);
+    }
 }
 
 } // namespace netfloor::test

@@ -51,23 +51,25 @@ void addIcmp(std::vector<Octets> &packets) {
                                       "0a 00 abcd 00000000", "11 00 abcd 0007 0009 ffffff00", "2a 01 02 03"}) {
         packets.push_back(ipv4({.protocol = 1, .payload = hex(message)}));
     }
-    for (const char *const message : {"01 04 abcd 00000000 60 00", "02 00 abcd 00000500 60 00", "03 01 abcd 00000000 60 00",
-                                      "04 02 abcd 00000028 60 00", "80 00 abcd 0007 0009 61 62",
-                                      "81 00 abcd 0007 0009 61 62"}) {
+    for (const char *const message :
+         {"01 04 abcd 00000000 60 00", "02 00 abcd 00000500 60 00", "03 01 abcd 00000000 60 00",
+          "04 02 abcd 00000028 60 00", "80 00 abcd 0007 0009 61 62", "81 00 abcd 0007 0009 61 62"}) {
         packets.push_back(ipv6({.nextHeader = 58, .payload = hex(message)}));
     }
 }
 
 void addTransports(std::vector<Octets> &packets) {
     addCarried(packets, 17, udp(53, 40000, hex("61 62")));
-    addCarried(packets, 6, tcp(hex("00 01 020405b4 030307 0402 050a0000000100000002 080a1122334455667788 fe00000000"), {}));
+    addCarried(packets, 6,
+               tcp(hex("00 01 020405b4 030307 0402 050a0000000100000002 080a1122334455667788 fe00000000"), {}));
     packets.push_back(ipv4({.protocol = 6, .payload = tcp(hex("1312 00 01*15 01 01"), hex("61 62"))}));
 }
 
 void addTunnels(std::vector<Octets> &packets) {
     const Octets gre = hex("b5 15 880b abcd 0003 00000007 00000009 7e 21 22 7e 31 32");
     packets.push_back(ipv4({.protocol = 47, .payload = gre}));
-    packets.push_back(ipv4({.protocol = 4, .payload = ipv4({.protocol = 47, .payload = gre, .options = hex("01 00 00 00")})}));
+    packets.push_back(
+        ipv4({.protocol = 4, .payload = ipv4({.protocol = 47, .payload = gre, .options = hex("01 00 00 00")})}));
 }
 
 void addSctp(std::vector<Octets> &packets) {
@@ -94,9 +96,10 @@ void addSctp(std::vector<Octets> &packets) {
         packets.push_back(sctp(hex(chunk)));
     }
     // The causes of an ABORT; the last ones stand in an ERROR.
-    for (const char *const cause : {"0001 0008 0007 0000", "0002 000a 00000001 0009", "0003 0008 00000005", "0004 0004",
-                                    "0005 0008 01020304", "0006 0008 01020304", "0007 0004", "0008 000c c000 0008 01020304",
-                                    "0009 0008 00000005", "000a 0004", "0063 0008 01020304"}) {
+    for (const char *const cause :
+         {"0001 0008 0007 0000", "0002 000a 00000001 0009", "0003 0008 00000005", "0004 0004", "0005 0008 01020304",
+          "0006 0008 01020304", "0007 0004", "0008 000c c000 0008 01020304", "0009 0008 00000005", "000a 0004",
+          "0063 0008 01020304"}) {
         const Octets octets = hex(cause);
         const Octets length = be16(static_cast<std::uint32_t>(4 + octets.size()));
         for (const char *const head : {"06 ff", "09 07"}) {
@@ -108,14 +111,14 @@ void addSctp(std::vector<Octets> &packets) {
 void addIpv6(std::vector<Octets> &packets) {
     for (const auto &[nextHeader, headers] : {std::pair<std::uint8_t, const char *>{0, "3b 00 01 04 01020304"}, // PadN
                                               {0, "3b 00 00 00*5"},                                             // Pad1
-                                              {60, "3b 00 1e 04 01020304"},                                     // skipped
-                                              {60, "3b 00 9e 04 01020304"},                                     // discarded
-                                              {43, "3b 02 00 01 00000000 20010db8 00*11 01"},                   // type 0
-                                              {43, "3b 00 04 00 01020304 0506"},                                // unknown
-                                              {43, "3b 00 04 01 01020304"},                                     // not through
-                                              {44, "3b 00 abcd 01020304 61"},                                   // fragment
-                                              {50, "01020304 00000005 61 62"},                                  // security
-                                              {51, "3b 02 0000 01020304 00000005 61626364 71"}}) {              // authentication
+                                              {60, "3b 00 1e 04 01020304"},                        // skipped
+                                              {60, "3b 00 9e 04 01020304"},                        // discarded
+                                              {43, "3b 02 00 01 00000000 20010db8 00*11 01"},      // type 0
+                                              {43, "3b 00 04 00 01020304 0506"},                   // unknown
+                                              {43, "3b 00 04 01 01020304"},                        // not through
+                                              {44, "3b 00 abcd 01020304 61"},                      // fragment
+                                              {50, "01020304 00000005 61 62"},                     // security
+                                              {51, "3b 02 0000 01020304 00000005 61626364 71"}}) { // authentication
         packets.push_back(extended(nextHeader, headers));
     }
 }

@@ -84,13 +84,31 @@ TEST(Exports, TellWhoThePluginIs) {
     const void *out = nullptr;
     sharedHost().library().getPtr()(NETFLOOR_TABLE_IDENTITY, &out);
     const auto &identity = *static_cast<const ProtocolIdentity *>(out);
-    EXPECT_EQ(std::vector(std::begin(identity.head), std::end(identity.head)), (std::vector<std::uint32_t>{7, 0, 0, 0}));
-    const std::map<std::size_t, std::uintptr_t> numbers = {{16, 0}, {17, 3},      {18, 0},     {21, 0},
+    EXPECT_EQ(std::vector(std::begin(identity.head), std::end(identity.head)),
+              (std::vector<std::uint32_t>{7, 0, 0, 0}));
+    const std::map<std::size_t, std::uintptr_t> numbers = {{16, 0},      {17, 3},      {18, 0}, {21, 0},
                                                            {22, 0xffff}, {23, 0xffff}, {24, 0}};
-    const char *const texts[] = {"IETF", "IP(Lower)", "IPv4&IPv6(Lower)", "RFC 791& 2460 ", "UMTS",
-                                 "IP layers below GTP", "", "NETFLOOR.CSF", "", "Release VEXTOOLS_A.02.20",
-                                 "Release VEXTOOLS_A.02.20", "2048", "Ethernet Type", "RFC 791 & RFC 2460", "", "",
-                                 "", "", "", "IP", "NETFLOOR.CSF"};
+    const char *const texts[] = {"IETF",
+                                 "IP(Lower)",
+                                 "IPv4&IPv6(Lower)",
+                                 "RFC 791& 2460 ",
+                                 "UMTS",
+                                 "IP layers below GTP",
+                                 "",
+                                 "NETFLOOR.CSF",
+                                 "",
+                                 "Release VEXTOOLS_A.02.20",
+                                 "Release VEXTOOLS_A.02.20",
+                                 "2048",
+                                 "Ethernet Type",
+                                 "RFC 791 & RFC 2460",
+                                 "",
+                                 "",
+                                 "",
+                                 "",
+                                 "",
+                                 "IP",
+                                 "NETFLOOR.CSF"};
     for (std::size_t slot = 0; slot < std::size(identity.slots); ++slot) {
         if (const auto number = numbers.find(slot); number != numbers.end()) {
             EXPECT_EQ(identity.slots[slot].number, number->second) << slot;
@@ -120,9 +138,9 @@ TEST(Exports, GiveSamplesOfTheLayoutOfRecords) {
         {4, le32({4, 124, 92, 60, a, a, a, 1, 0xfffd, 0x106, 0xffff, 0x4b4b4b4b}) + hex("0800 0d00 0100 0300") +
                 text("VEX Protocol Prototype dummy field", hex("00 00")) + le32({16, 36, 20, 32, 24, 32, 44, 56})},
         {5, le32({5, 220, 172, 60, a, a, a, a, a, 0, 0, a, 0, 0x10000, 1}) +
-                text("test_vex_protocol_DLL.dll", hex("00 3c3c")) + le32({1, 0, 0, 0}) + le32({1}) + hex("00 00 3c 3c") +
-                le32({7}) + hex("00 00 3c 3c") + hex("01 3c 01 00") + le32({8}) + hex("00 3c 00 00") + le32({0, 3}) +
-                hex("00 00 00 3c") + le32({0, 0, 13}) + le32({0, 0, 0, 0}) +
+                text("test_vex_protocol_DLL.dll", hex("00 3c3c")) + le32({1, 0, 0, 0}) + le32({1}) +
+                hex("00 00 3c 3c") + le32({7}) + hex("00 00 3c 3c") + hex("01 3c 01 00") + le32({8}) +
+                hex("00 3c 00 00") + le32({0, 3}) + hex("00 00 00 3c") + le32({0, 0, 13}) + le32({0, 0, 0, 0}) +
                 le32({16, 88, 20, 104, 24, 120, 28, 156, 32, 164, 44, 112})},
     };
     for (const auto &[number, octets] : samples) {
@@ -213,11 +231,11 @@ TEST(FieldTable, HoldsTogether) {
     EXPECT_EQ(nextValue, 4539U);
     EXPECT_EQ(lists[292], 8);  // ports
     EXPECT_EQ(lists[139], 14); // protocols
-    EXPECT_EQ(marked, (std::set<std::uint32_t>{396, 398, 399, 400, 401, 402, 403, 404, 405, 406, 407, 408, 489, 490, 848,
-                                               852}));
-    EXPECT_EQ(names, (std::map<std::string, int>{{"equal", 356},
-                                                 {"blank behind", 24},
-                                                 {"unkown option type, discard packet|discard packet", 1}}));
+    EXPECT_EQ(marked, (std::set<std::uint32_t>{396, 398, 399, 400, 401, 402, 403, 404, 405, 406, 407, 408, 489, 490,
+                                               848, 852}));
+    EXPECT_EQ(names,
+              (std::map<std::string, int>{
+                  {"equal", 356}, {"blank behind", 24}, {"unkown option type, discard packet|discard packet", 1}}));
 }
 
 TEST(ValueTables, HaveTheirNumbers) {
@@ -225,7 +243,8 @@ TEST(ValueTables, HaveTheirNumbers) {
     ASSERT_EQ(all.valueCount, 4539U);
     EXPECT_EQ(all.values[4539].poolIndex, 0U);
     EXPECT_EQ(all.values[4539].displayIndex, 0U);
-    EXPECT_EQ(std::count_if(all.values, all.values + 4539, [](const ValueMapRow &row) { return row.kind == 65536; }), 40);
+    EXPECT_EQ(std::count_if(all.values, all.values + 4539, [](const ValueMapRow &row) { return row.kind == 65536; }),
+              40);
 
     // The pool: what each stretch of it holds.
     for (std::int32_t number = 0; number <= 137; ++number) {
@@ -236,16 +255,16 @@ TEST(ValueTables, HaveTheirNumbers) {
     };
     using Numbers = std::vector<std::int32_t>;
     EXPECT_EQ(stretch(138, 139), (Numbers{138, 252}));
-    EXPECT_EQ(stretch(140, 154), (Numbers{5039, 9822, 13809, 19900, 24083, 27618, 30797, 35031, 39544, 44937, 48420, 50539,
-                                          54980, 57909, 61850}));
+    EXPECT_EQ(stretch(140, 154), (Numbers{5039, 9822, 13809, 19900, 24083, 27618, 30797, 35031, 39544, 44937, 48420,
+                                          50539, 54980, 57909, 61850}));
     EXPECT_EQ(stretch(155, 156), (Numbers{50, 0}));
     const Numbers ports = stretch(157, 335);
     const Numbers carried = stretch(336, 357);
-    EXPECT_EQ((Numbers{ports.front(), ports.back(), carried.front(), carried.back()}), (Numbers{139, 8002, 254, 65535}));
+    EXPECT_EQ((Numbers{ports.front(), ports.back(), carried.front(), carried.back()}),
+              (Numbers{139, 8002, 254, 65535}));
     EXPECT_EQ(std::ranges::adjacent_find(ports, std::greater_equal<>()), ports.end());
     EXPECT_EQ(std::ranges::adjacent_find(carried, std::greater_equal<>()), carried.end());
-    EXPECT_EQ(stretch(358, 370),
-              (Numbers{5, 127, 15, 62, 64, 126, 128, 190, 192, 254, 255, 32768, 0}));
+    EXPECT_EQ(stretch(358, 370), (Numbers{5, 127, 15, 62, 64, 126, 128, 190, 192, 254, 255, 32768, 0}));
 
     // Each number of the pool but the last is used, and each list stands by rising value with its default in front.
     std::set<std::uint32_t> used;
@@ -276,8 +295,9 @@ TEST(TextTable, HoldsEachTextOnceInFirstUse) {
     ASSERT_EQ(all.textCount, 824U);
     const std::set<std::string> distinct(all.texts, all.texts + 824);
     EXPECT_EQ(distinct.size(), 824U);
-    const std::map<std::size_t, const char *> rows = {{2, "Precedence=%-S"}, {3, "Routine"}, {10, "Network Control"},
-                                                      {112, "ISO-IP"},       {209, ""},      {824, "$$_FINAL_STRING_$$"}};
+    const std::map<std::size_t, const char *> rows = {
+        {2, "Precedence=%-S"}, {3, "Routine"}, {10, "Network Control"},
+        {112, "ISO-IP"},       {209, ""},      {824, "$$_FINAL_STRING_$$"}};
     for (const auto &[row, words] : rows) {
         EXPECT_STREQ(all.texts[row], words);
     }
@@ -319,8 +339,9 @@ TEST(TextTable, HoldsEachTextOnceInFirstUse) {
                                                        {R"(%-["%x":":"])", 1},
                                                        {"%c", 1},
                                                        {R"(%-["%c"])", 1}}));
-    const std::map<std::string, int> behind = {{"(dec)", 8}, {" octets", 5}, {"*4 octets", 4}, {" octet(s)", 4},
-                                               {"*8 octet(s)", 2}, {"(th) octet", 1}, {" (msec.)", 1}};
+    const std::map<std::string, int> behind = {{"(dec)", 8},     {" octets", 5},     {"*4 octets", 4},
+                                               {" octet(s)", 4}, {"*8 octet(s)", 2}, {"(th) octet", 1},
+                                               {" (msec.)", 1}};
     for (const auto &[words, count] : behind) {
         EXPECT_EQ(std::count_if(all.texts, all.texts + 824,
                                 [&](std::string_view format) { return format.ends_with("%u" + words); }),

@@ -113,39 +113,29 @@ TEST(Tunnels, dispatch) {
     EXPECT_EQ(type(tunnel(55, minimal(4, tunnel(1, message)))), "531 \"MIPinIP - ICMP - EM (8)\"\n");
 }
 
-struct LengthCase {
-    const char *name;
-    Octets packet;
-    const char *values; // behind the inner destination address
-    std::uint32_t flagsOfMv;
-};
-
 TEST(Tunnels, lengthsOfHeadersAndPayload) {
     const Octets three = hex("61 62 63");
     const auto inner = [&](std::uint8_t words, std::uint16_t length) {
         return ipv4({.payload = three, .totalLength = length, .headerWords = words});
     };
     const Octets withOptions = ipv4({.protocol = 55, .payload = minimal(253, three), .options = hex("01 01 01 00")});
-    const std::vector<LengthCase> cases = {
-        {"inner length below its header", tunnel(4, inner(5, 19)), "", 0x10},
-        {"inner length of the header", tunnel(4, inner(5, 20)), "", 0x10},
-        {"inner length above what there is", tunnel(4, inner(5, 99)), "285=61 285=62 285=63", 2},
-        {"short inner header", tunnel(4, inner(4, 22)), "285=61 285=62 285=63", 2},
-        {"inner options beyond the end", tunnel(4, inner(15, 99)), "", 0x10},
-        {"options of the outer header only", ipv4({.protocol = 4, .payload = inner(5, 23), .options = hex("00*4")}),
-         "285=61 285=62 285=63", 0},
-        {"no options behind minimal encapsulation", withOptions, "285=61 285=62 285=63", 0},
-        {"nor in a tunnel with options", tunnel(4, withOptions),
-         "318=1 318=1 318=1 381=0 640=fd 641=0 642=0 643=0 646=a000001 285=61 285=62 285=63", 0},
-        {"without the source address that it announces", tunnel(55, hex("fd 80 00 00 0a 00 00 01 61 62")), "", 0x10},
-    };
-    for (const LengthCase &one : cases) {
-        SCOPED_TRACE(one.name);
-        const Runs runs = runAll(one.packet);
-        EXPECT_EQ(fieldValues(runs.md, runs.md.field("IPinIP Protocol") != nullptr ? 637 : 646), one.values);
-        EXPECT_EQ(runs.md.flags, 0u);
-        EXPECT_EQ(runs.mv.flags, one.flagsOfMv);
-    }
+    expectValues(
+        637, {
+                 {"inner length below its header", tunnel(4, inner(5, 19)), "", 0, 0x10},
+                 {"inner length of the header", tunnel(4, inner(5, 20)), "", 0, 0x10},
+                 {"inner length above what there is", tunnel(4, inner(5, 99)), "285=61 285=62 285=63", 0, 2},
+                 {"short inner header", tunnel(4, inner(4, 22)), "285=61 285=62 285=63", 0, 2},
+                 {"inner options beyond the end", tunnel(4, inner(15, 99)), "", 0, 0x10},
+                 {"options of the outer header only",
+                  ipv4({.protocol = 4, .payload = inner(5, 23), .options = hex("00*4")}), "285=61 285=62 285=63", 0, 0},
+                 {"options of a tunnel in front of minimal encapsulation", tunnel(4, withOptions),
+                  "318=1 318=1 318=1 381=0 640=fd 641=0 642=0 643=0 646=a000001 285=61 285=62 285=63", 0, 0},
+             });
+    expectValues(
+        646, {
+                 {"no options behind minimal encapsulation", withOptions, "285=61 285=62 285=63", 0, 0},
+                 {"source address announced, not there", tunnel(55, hex("fd 80 00 00 0a 00 00 01 61 62")), "", 0, 0x10},
+             });
 }
 
 TEST(Tunnels, cutAtEveryOctet) {

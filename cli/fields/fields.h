@@ -1,0 +1,30 @@
+// SPDX-License-Identifier: MIT
+// 'netfloor fields': what the plug-in says of its fields in its own tables.
+#pragma once
+
+#include <string>
+#include <vector>
+
+#include "netfloor-host/field_tables.h"
+#include "options.h"
+
+namespace netfloor::cli {
+
+// Throws PluginError, UsageError, OutputClosed, OutputError.
+void showFields(const Options &options);
+
+using Fields = std::vector<const FieldDescription *>;
+
+// The forms of the output.
+[[nodiscard]] std::string listText(const Fields &fields);
+[[nodiscard]] std::string detailText(const FieldDescription &field);
+[[nodiscard]] std::string jsonText(const Fields &fields);
+[[nodiscard]] std::string referenceText(const Fields &fields);
+
+// "4", "variable".
+[[nodiscard]] std::string widthText(const FieldDescription &field);
+
+// "6", "5-127", "other".
+[[nodiscard]] std::string valuesText(const NamedValue &row);
+
+} // namespace netfloor::cli

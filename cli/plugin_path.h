@@ -1,0 +1,13 @@
+// SPDX-License-Identifier: MIT
+// Where the plug-in is.
+#pragma once
+
+#include <filesystem>
+
+namespace netfloor::cli {
+
+// The plug-in that was asked for, or else the one that belongs to this command: in the build tree beside it, or where
+// it is installed. Throws PluginError.
+[[nodiscard]] std::filesystem::path findPlugin(const std::filesystem::path &asked);
+
+} // namespace netfloor::cli
