@@ -21,17 +21,23 @@ void Figures::ReportRuns(const std::vector<Run> &runs) {
             std::fprintf(stderr, "not measured: %s %s\n", name.c_str(), run.error_message.c_str());
             continue;
         }
-        if (run.aggregate_name == "median") {
-            medians_[{name.substr(0, bar), name.substr(bar + 1)}] = run.GetAdjustedCPUTime() / packets->second;
+        const FigureKey key = {name.substr(0, bar), name.substr(bar + 1)};
+        const double figure = run.GetAdjustedCPUTime() / packets->second;
+        if (run.run_type == Run::RT_Iteration) {
+            const auto [place, first] = fastest_.try_emplace(key, figure);
+            place->second = std::min(place->second, figure);
+        } else if (run.aggregate_name == "median") {
+            medians_[key] = figure;
         } else if (run.aggregate_name == "cv") {
             spread_ = std::max(spread_, run.cpu_accumulated_time);
         }
     }
 }
 
-double Figures::of(std::string_view set, std::string_view what) const {
-    const auto found = medians_.find({std::string(set), std::string(what)});
-    return found == medians_.end() ? 0 : found->second;
+double Figures::of(Statistic statistic, std::string_view set, std::string_view what) const {
+    const auto &figures = statistic == Statistic::median ? medians_ : fastest_;
+    const auto found = figures.find({std::string(set), std::string(what)});
+    return found == figures.end() ? 0 : found->second;
 }
 
 bool runAll(int argc, char **argv, Figures &figures) {

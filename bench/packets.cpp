@@ -57,9 +57,10 @@ std::vector<Octets> mix() {
     };
 }
 
+// One option fills each header, as only the first of a header is read as an option.
 Octets hopByHopAndDestinationOptions() {
     return hex(R"(
-        3c 00 05 02 00 00 01 00   # hop by hop: destination options follow; router alert, PadN
+        3c 00 01 04 00 00 00 00   # hop by hop: destination options follow; PadN
         06 00 01 04 00 00 00 00   # destination options: TCP follows; PadN
     )");
 }

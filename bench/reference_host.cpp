@@ -45,7 +45,7 @@ void runAndPrint(int argc, char **argv) {
     for (const PacketSet &set : packetSets()) {
         std::printf("\n%-38s", set.name.data());
         for (const NamedPass &named : passes) {
-            printFigure(figures.of(set.name, named.name), 0);
+            printFigure(figures.of(Statistic::median, set.name, named.name), 0);
         }
     }
     std::printf("\n");
