@@ -1,0 +1,37 @@
+// SPDX-License-Identifier: MIT
+// How to write a new output over the fields: one file that walks the catalogue. It touches no protocol, and nothing
+// has to know of it. This one lists id, name and display line, and the test compares it with the loaded plug-in.
+#include <string>
+
+#include <gtest/gtest.h>
+
+#include "netfloor-host/field_tables.h"
+#include "tables/catalogue.h"
+
+namespace netfloor::test {
+namespace {
+
+std::string line(std::uint32_t id, std::string_view name, std::string_view display) {
+    return std::to_string(id) + '\t' + std::string(name) + '\t' + std::string(display) + '\n';
+}
+
+// The output.
+std::string listOfFields() {
+    std::string list;
+    for (const Field *const field : catalogue) {
+        list += line(field->id, field->bareName(), field->line);
+    }
+    return list;
+}
+
+TEST(NewOutput, IsOneFileOverTheCatalogue) {
+    const FieldTables published(PluginLibrary::open(NETFLOOR_PLUGIN));
+    std::string expected;
+    for (const FieldDescription &field : published.fields()) {
+        expected += line(field.id, field.shortName, field.format);
+    }
+    EXPECT_EQ(listOfFields(), expected);
+}
+
+} // namespace
+} // namespace netfloor::test
