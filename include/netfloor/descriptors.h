@@ -1,15 +1,24 @@
 /* SPDX-License-Identifier: MIT */
 /*
- * The tables with which the plug-in describes itself: who it is, which fields it reports, how wide
- * each is and where its bits lie, what its values are called and how it is shown.
+ * The tables with which the plug-in describes itself: who it is, which fields it reports, how wide each is and where
+ * its bits lie, what its values are called and how it is shown.
  *
- * A host gets them by number from vx_DLLGetPtr and vx_DLLGetTable, at any time and from any thread.
- * They are constant, belong to the plug-in and live as long as it is loaded.
+ * A host asks for each table by its number; no packet and no set-up is needed:
  *
- * To find the name of a value in a field's list: take the `valueCount` rows from `valueStart` on; of
- * the rows of one value, the one whose number in the value pool is the value; else, of the ranges,
- * the one that holds it; else the default row, if there is one; else the name is empty. A name
- * such as "%u" is itself a format for the value.
+ *     const void *table;
+ *     if (vx_DLLGetTable(NETFLOOR_TABLE_FIELDS, &table) == NETFLOOR_TABLE_FOUND) {
+ *         for (const FieldDescriptor *row = table; row->flags != NETFLOOR_NO_FIELD; ++row) { ... }
+ *     }
+ *
+ * The tables are constant and belong to the plug-in: they stay where they are until it is unloaded, may be read from
+ * any thread, and are neither changed nor freed by a host. Texts are ASCII and zero-terminated. Words stand in the byte
+ * order of the machine, numbers in the layouts and probes in little-endian order. Indices count from 0, bits from 1.
+ *
+ * Three things only the grammar knows, and a host that wants them takes them from the reports of the MD pass:
+ *
+ *   - which field follows which, and under what condition;
+ *   - the order of octets in a value, see "Layouts" below;
+ *   - that the values of the ids 294 and 619 (Fragment Offset) are those of their bits times 8.
  */
 #ifndef NETFLOOR_DESCRIPTORS_H
 #define NETFLOOR_DESCRIPTORS_H
@@ -20,16 +29,16 @@
 extern "C" {
 #endif
 
-/* Numbers of the tables. */
+/* Numbers of the tables, and what the two exports give for each. There is none for any other number. */
 enum {
-    NETFLOOR_TABLE_VERSION = 1,  /* text: the version of this interface */
-    NETFLOOR_TABLE_IDENTITY = 2, /* Ptr: ProtocolIdentity; Table: its slots */
-    NETFLOOR_TABLE_FIELDS = 4,   /* Table: FieldDescriptor rows, and a row that ends them; Ptr: a probe */
-    NETFLOOR_TABLE_SAMPLE = 5,   /* Ptr: a probe; Table: its body */
-    NETFLOOR_TABLE_VALUES = 6,   /* Table: ValueMapRow rows, ended by a row of zeros */
-    NETFLOOR_TABLE_POOL = 7,     /* Table: int32_t numbers, which the value rows refer to */
-    NETFLOOR_TABLE_TEXTS = 8,    /* Table: const char* texts, ended by NETFLOOR_LAST_TEXT */
-    NETFLOOR_TABLE_LAYOUTS = 9   /* Table: octets, records of bit places, ended by a zero length */
+    NETFLOOR_TABLE_VERSION = 1,  /* both: a text, the version of this interface */
+    NETFLOOR_TABLE_IDENTITY = 2, /* Ptr: the ProtocolIdentity; Table: its slots, 16 octets behind */
+    NETFLOOR_TABLE_FIELDS = 4,   /* Ptr: a probe; Table: FieldDescriptor rows, ended by a FieldTableEnd */
+    NETFLOOR_TABLE_SAMPLE = 5,   /* Ptr: a probe; Table: its body, 16 octets behind */
+    NETFLOOR_TABLE_VALUES = 6,   /* Ptr: none; Table: ValueMapRow rows, ended by a row of zeros */
+    NETFLOOR_TABLE_POOL = 7,     /* Ptr: none; Table: int32_t numbers of the value rows, without an end mark */
+    NETFLOOR_TABLE_TEXTS = 8,    /* Ptr: none; Table: const char * texts, ended by NETFLOOR_LAST_TEXT */
+    NETFLOOR_TABLE_LAYOUTS = 9   /* Ptr: none; Table: octets, records of bit places, ended by a length of 0 */
 };
 
 /* Results of the two exports. */
@@ -41,13 +50,13 @@ enum {
 #define NETFLOOR_LAST_TEXT "$$_FINAL_STRING_$$"
 #define NETFLOOR_NO_FIELD 0xffffffffu
 
-/* Width of a field whose length the packet tells. */
+/* Width of a field whose length the packet tells, and of an IPv6 address that is read in groups or nibbles. */
 #define NETFLOOR_WIDTH_VARIABLE 0xffffffffu
 
 /* Kinds of a value row. */
 enum {
-    NETFLOOR_VALUE_ONE = 1,      /* one value */
-    NETFLOOR_VALUE_RANGE = 65536 /* two numbers of the pool: from, to; from above to: any other value */
+    NETFLOOR_VALUE_ONE = 1,      /* one value: pool[poolIndex] */
+    NETFLOOR_VALUE_RANGE = 65536 /* pool[poolIndex] to pool[poolIndex + 1]; from above to: any other value */
 };
 
 /* Who the plug-in is: a head, then slots that hold a text or a number. */
@@ -56,23 +65,36 @@ typedef struct ProtocolIdentity {
     union {
         const char *text;
         uintptr_t number;
-    } slots[25]; /* texts, but for the numbers in 16 to 18 and 21 to 24 */
+    } slots[25]; /* 0 to 5: the standards' body, the protocol in short, in full, its standards, the network, what is
+                    covered; 7, 20: the description of the grammar; 9, 10: release of its tools; 11 to 13: a value, the
+                    name of the field that has it, a standards text; 19: the protocol's short name; 6, 8, 14, 15: empty
+                    texts; 16 to 18 and 21 to 24: numbers, whose meaning is not published */
 } ProtocolIdentity;
 
-/* One field. */
+/*
+ * One field. Rows stand in the order of the grammar; the ids do not rise.
+ *
+ * Flags, from the low octet up:
+ *
+ *   0   size class: 1 for up to 8 bits, 2 for up to 16, 3 for up to 32, 4 for more or NETFLOOR_WIDTH_VARIABLE
+ *   1   3 for an address of fixed width, shown as a list of its elements, else 0
+ *   2   1 for a key field, else 0
+ *   3   5, but 6 for 396 and 398 to 408 (the TCP header from its 13th octet on), 489 and 490 (UDP length and checksum),
+ *       848 and 852 (lengths of SCTP parameters); what it says is not published, and no reader needs it
+ */
 typedef struct FieldDescriptor {
-    uint32_t flags;          /* octet 0: size class 1 to 4 (up to 8, 16, 32 bits, more or variable); octet 1:
-                                3 for an address of fixed width, shown as a list; octet 2: 1 for a key field */
-    uint32_t fieldId;        /* the id under which the MD pass reports it */
-    uintptr_t keyIndex;      /* number among the key fields, from 1; 0 for the others */
-    const char *name;        /* name of the field, without the blanks in front */
-    const char *shortName;   /* the same without the blanks behind, or a shorter one */
+    uint32_t flags;          /* four octets, see "Flags" below; NETFLOOR_NO_FIELD in the row that ends the table */
+    uint32_t fieldId;        /* the id under which the MD pass reports it, in one row only */
+    uintptr_t keyIndex;      /* 1, 2, 3... for the key fields, 0 for the others; no index of a KeyFieldRow */
+    const char *name;        /* as the MD pass reports it, without blanks in front; several fields may bear one name,
+                                and the TO pass reports all of them under the id of the first */
+    const char *shortName;   /* the same without a blank behind; for 243 a shorter one, which the passes report */
     int32_t valueCount;      /* rows of its list of value names; 0: none */
     int32_t valueStart;      /* index of the first of them; -1: none */
-    uint32_t width;          /* 0xffff0000 plus the bits, or NETFLOOR_WIDTH_VARIABLE */
-    uint32_t displayIndex;   /* index of its display line among the texts */
+    uint32_t width;          /* 0xffff0000 plus the bits of its pieces times their count, or NETFLOOR_WIDTH_VARIABLE */
+    uint32_t displayIndex;   /* index of its display line among the texts, see "Texts" below */
     int32_t unused1[6];      /* -1 */
-    uint32_t templateOffset; /* octets from the start of the layouts to its record */
+    uint32_t templateOffset; /* octets from the start of the layouts to its record; fields of one layout share it */
     int32_t unused2[3];      /* -1 */
 } FieldDescriptor;
 
@@ -87,12 +109,61 @@ typedef struct FieldTableEnd {
     uint32_t zero[11];  /* 0 */
 } FieldTableEnd;
 
-/* One name of one value, or of a range of values, of one field. */
+/*
+ * One name of one value, or of a range of values, of one field. Each field has a list of its own: its default row, if
+ * it has one, and the others by ascending value. The name of a value, in the `valueCount` rows from `valueStart` on:
+ *
+ *   1. of the rows of kind NETFLOOR_VALUE_ONE the one whose number is the value;
+ *   2. else the range that holds the value, ends included;
+ *   3. else the default row, a range from above to (50 to 0);
+ *   4. else the value has no name, and the name is empty.
+ *
+ * A name such as "%u", which some default rows have, is itself a format for the value.
+ */
 typedef struct ValueMapRow {
     uint32_t kind;         /* NETFLOOR_VALUE_ONE, NETFLOOR_VALUE_RANGE; 0 ends the table */
-    uint32_t poolIndex;    /* index of its number, or of the first of two, in the value pool */
+    uint32_t poolIndex;    /* index of its number, or of the first of two, in the value pool; not the value itself */
     uint32_t displayIndex; /* index of the name among the texts */
 } ValueMapRow;
+
+/*
+ * Texts: each distinct display line and value name once. A display line is that of the MD pass, blanks in front
+ * included. Its conversions, besides which all is literal ("%u*4 octets" shows the value as it is):
+ *
+ *   %u %x %c        the value in decimal, in hexadecimal without leading zeros, as one character
+ *   %-S             the name of the value
+ *   %-["%x":"."]    a list: each element of the field in %u, %x or %c, with what the second quotes hold between them
+ *   %-["%x"]        a list with nothing between its elements
+ *
+ * An element is a BitRange of the report. Where an address is shown in groups it is a group of 16 bits, its digits for
+ * each octet the low nibble and then the high one.
+ *
+ * Layouts: where the bits of a field lie, a record each, one behind the other without padding:
+ *
+ *   length      two octets: octets behind them
+ *   head        ff 02 55 01 04
+ *   number      one octet: number of pieces, 1 to 4
+ *   pieces      each a range, or for a single bit a constant: bits, of which 1 is the bit at the cursor
+ *   count       how often the pieces repeat: a constant; a range, from least to most; a reference, as the packet tells
+ *   step        a constant: bits from one repeat to the next, and from the last one to where the cursor goes
+ *   end         a reference: 1 where the count is a reference, else 0
+ *
+ *   constant    10 00 00 00 v: the number v
+ *   range       05, and two constants: from, to; of a piece from above to: its bits are read in reverse order
+ *   reference   08 n 00
+ *
+ * A record of length 3, ff 00 00, tells no place: its fields are shown ahead of their turn, or are addresses in groups.
+ * The cursor moves on by the count times the step; but not for id 168, which is shown ahead, whatever its record says.
+ *
+ * Pieces and repeats are read in the order of the record, and the first read counts most in the value, with these
+ * exceptions: of the pieces 9 to 16 and 1 to 8 the second is read first; the ids 201, 208, 209, 215, 216, 555, 895, 925
+ * and 927 are read from the last octet to the first; in a piece of several octets (325, 472, 473) the last counts most.
+ *
+ * Probes: two records of known contents, by which a host with 32-bit pointers checks how the plug-in lays out records.
+ * A head of four words (number of the table; size of the record in octets; offset of the pairs from its start; 60, the
+ * octet that fills padding), a body with 0xa5a5a5a5 or 0x4b4b4b4b in each slot for a pointer, and to the end pairs of
+ * words: offset of a slot, and of what it would point to.
+ */
 
 #if UINTPTR_MAX == 0xffffffffu
 NETFLOOR_RECORD_SIZE(FieldDescriptor, 76);
@@ -105,8 +176,8 @@ _Static_assert(sizeof(FieldTableEnd) == sizeof(FieldDescriptor), "the last row i
 #endif
 
 /*
- * Stores the address of a table at `out`. Returns NETFLOOR_TABLE_FOUND, or NETFLOOR_TABLE_UNKNOWN with
- * null stored when there is no table of this number.
+ * Store the address of a table at `out`, which must not be null, and return NETFLOOR_TABLE_FOUND; or store null and
+ * return NETFLOOR_TABLE_UNKNOWN when there is no table of this number. They may be called at any time, in any order.
  */
 uint32_t NETFLOOR_CDECL vx_DLLGetPtr(int32_t index, const void **out);
 uint32_t NETFLOOR_CDECL vx_DLLGetTable(int32_t index, const void **out);
