@@ -25,14 +25,7 @@ const Row *tableOf(const PluginLibrary &library, std::int32_t number) {
     return static_cast<const Row *>(table);
 }
 
-// Reads a layout, which is written in a small code of octets:
-//
-//   record     length (16 bits), ff 02 55 01 04, number of pieces, pieces, count, step, reference
-//   constant   10 00 00 00 v
-//   range      05, and two constants: from, to
-//   reference  08 n 00, for what the packet tells
-//
-// A record that is shorter than any of these has no layout.
+// Reads a layout in the code that netfloor/descriptors.h describes.
 class LayoutReader {
 public:
     explicit LayoutReader(const std::uint8_t *record) : at_(record) {}

@@ -26,6 +26,9 @@
 
 namespace netfloor::ipv6 {
 
+// The Payload Length is shown ahead (168), for the limit, and again inside the limit (171). The published tables do not
+// tell the two apart: both have the layout of two octets that the cursor moves over.
+//
 // clang-format off
 inline constexpr Field trafficClass       {166, "Traffic Class",          pieces({0, 3}, {12, 15}),                          "Traffic Class=%u"};
 inline constexpr Field flowLabel          {167, "Flow Label",             pieces({8, 11}, {16, 23}, {24, 31}).advancing(32), "Flow Label=%u"};

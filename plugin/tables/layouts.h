@@ -1,13 +1,6 @@
 // SPDX-License-Identifier: MIT
-// The published layouts: where the bits of a field lie, in a small code of octets. Fields of one layout share a
-// record; records stand in the order of first use.
-//
-//   record     length (16 bits), ff 02 55 01 04, number of pieces, pieces, count, step, reference
-//   piece      a range, or for one bit a constant
-//   count      how often the pieces repeat: a constant, a range, or a reference where the packet tells
-//   constant   10 00 00 00 v
-//   range      05, from, to; from above to means that the bits are read in reverse
-//   reference  08 n 00
+// The published layouts: where the bits of a field lie, in the code that netfloor/descriptors.h describes. Fields of
+// one layout share a record; records stand in the order of first use.
 #pragma once
 
 #include <array>
@@ -112,8 +105,9 @@ constexpr void addPieces(LayoutRecord &record, const Place &place) {
     }
 }
 
-// How often the pieces of a fixed field repeat, and the bits from one repeat to the next. A field of octets is laid
-// out octet by octet also where the cursor stays in front of it.
+// How often the pieces of a fixed field repeat, and the bits from one repeat to the next. The step of octets is also
+// that of ipv6::payloadLengthAhead, which leaves the cursor where it is: it shares the record of "Total Length", and a
+// reader of the tables alone expects the field behind it two octets further on.
 [[nodiscard]] constexpr std::uint32_t repeats(const Place &place) {
     return place.shape == Shape::pieces ? place.count / distinctPieces(place) : place.count;
 }

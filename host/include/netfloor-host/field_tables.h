@@ -54,7 +54,7 @@ struct FieldLayout {
     std::uint32_t mostCount = 0;  // 0: no bound
     std::uint32_t step = 0;       // bits from one repeat to the next, and behind the last one
 
-    // Bits that the cursor moves on behind `count` repeats.
+    // Bits that the cursor moves on behind `count` repeats, as the tables have it: id 168, which is shown ahead, stays.
     [[nodiscard]] std::uint32_t advance(std::uint32_t count) const { return count * step; }
 };
 
