@@ -18,8 +18,7 @@ FieldNames::FieldNames(const PluginLibrary &library) {
         }
     }
     for (const FieldDescription &field : tables.fields()) {
-        const std::string_view name = field.name.substr(0, field.name.find_last_not_of(' ') + 1);
-        names_.try_emplace(field.id, DisplayName{std::string(name), keyNames.contains(field.name)});
+        names_.try_emplace(field.id, DisplayName{std::string(field.shortName), keyNames.contains(field.name)});
     }
 }
 
