@@ -44,6 +44,19 @@ Examples:
   netfloor keys --column 'Source Address' --column 'Destination Address' c.pcap
   tcpdump -w - | netfloor -)";
 
+constexpr const char *fieldsFooter = R"(
+In a display line, %u is the value in decimal, %x in hexadecimal, %c as a character, %-S its name, and %-["%u":"."] a
+list of the field's elements with what stands between them.
+
+Bits count from 1 where the field starts, and within an octet from the least significant bit up. A bit picture has the
+most significant bit of each octet on the left, as RFCs do. The place of a field is not told where it is shown ahead of
+its turn, or is an address in groups.
+
+Examples:
+  netfloor fields Protocol        what a field is, and what its values are called
+  netfloor fields 384             the same, by its id
+  netfloor fields tcp             the fields of TCP)";
+
 // The word for the command may be left out, which CLI11's own usage line does not say.
 class UsageFormatter : public CLI::Formatter {
 public:
@@ -64,8 +77,16 @@ void addPluginOption(CLI::App &app, Options &options) {
 }
 
 void addFieldsOptions(CLI::App &app, Options &options) {
-    app.add_option("field", options.field, "Name or id of a field: with its values and its bits (default: all fields)")
+    app.add_option_function<std::vector<std::string>>(
+           "field",
+           [&options](const std::vector<std::string> &words) {
+               for (const std::string &word : words) {
+                   options.field += (options.field.empty() ? "" : " ") + word;
+               }
+           },
+           "Name or id: the field with its values and bits; part of names, or a protocol: a list (default: all fields)")
         ->type_name("NAME|ID");
+    app.footer(fieldsFooter);
     CLI::Option *const json = app.add_flag_callback(
         "--json", [&options] { options.form = FieldsForm::json; }, "As JSON (RFC 8259)");
     app.add_flag_callback(

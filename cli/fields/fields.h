@@ -3,6 +3,7 @@
 #pragma once
 
 #include <string>
+#include <string_view>
 #include <vector>
 
 #include "netfloor-host/field_tables.h"
@@ -13,11 +14,19 @@ namespace netfloor::cli {
 // Throws PluginError, UsageError, OutputClosed, OutputError.
 void showFields(const Options &options);
 
-using Fields = std::vector<const FieldDescription *>;
+// A field, and the part of the grammar in which it stands: "TCP options".
+struct ListedField {
+    const FieldDescription *field;
+    std::string_view section;
+};
+
+using Fields = std::vector<ListedField>;
+
+[[nodiscard]] Fields listFields(const FieldTables &tables);
 
 // The forms of the output.
 [[nodiscard]] std::string listText(const Fields &fields);
-[[nodiscard]] std::string detailText(const FieldDescription &field);
+[[nodiscard]] std::string detailsText(Fields fields); // those that differ in nothing but id, section and key as one
 [[nodiscard]] std::string jsonText(const Fields &fields);
 [[nodiscard]] std::string referenceText(const Fields &fields);
 

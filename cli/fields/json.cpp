@@ -39,9 +39,10 @@ Json layoutJson(const FieldLayout &layout) {
     return json;
 }
 
-Json fieldJson(const FieldDescription &field) {
+Json fieldJson(const FieldDescription &field, std::string_view section) {
     Json json;
     json["id"] = field.id;
+    json["protocol"] = section;
     json["name"] = field.name;
     json["shortName"] = field.shortName;
     json["bits"] = field.width ? Json(*field.width) : Json();
@@ -58,11 +59,13 @@ Json fieldJson(const FieldDescription &field) {
 } // namespace
 
 std::string jsonText(const Fields &fields) {
-    std::string text = "[\n";
-    for (const FieldDescription *const field : fields) {
-        text += fieldJson(*field).dump() + (field == fields.back() ? "\n" : ",\n");
+    std::string text = "[";
+    for (const auto &[field, section] : fields) {
+        // Another plug-in's texts may be anything.
+        text += (text.size() == 1 ? "\n" : ",\n") +
+                fieldJson(*field, section).dump(-1, ' ', false, Json::error_handler_t::replace);
     }
-    return text + "]\n";
+    return text + "\n]\n";
 }
 
 } // namespace netfloor::cli

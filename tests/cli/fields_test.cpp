@@ -18,45 +18,68 @@ TEST(Fields, ShowWhatAFieldIs) {
         const char *line;
         const char *out;
     } cases[] = {
-        {"netfloor fields Version | head -13", // by name: all of that name
-         R"(Version (id 150)
+        // By name, in any case: fields that differ in their ids alone stand together.
+        {"netfloor fields VERSION | head -n 14",
+         R"(Version
+  id       150, IPv4, key field 1
+  id       605, ICMP
+  id       629, IP in IP
   bits     4
-  key      1
   display  Version=%u
   place    5-8
-      0
-      0 1 2 3 4 5 6 7
+      8 7 6 5 4 3 2 1
      +-+-+-+-+-+-+-+-+
-     |a a a a|. . . .|
+     |x x x x|. . . .|
      +-+-+-+-+-+-+-+-+
 
-Version (id 605)
-  bits     4
+Version
+  id       697, GRE
 )"},
-        {"netfloor fields 167", // pieces, by their rank in the value
-         R"(Flow Label (id 167)
+        {"netfloor fields 167", // pieces in several octets
+         R"(Flow Label
+  id       167, IPv6
   bits     20
   display  Flow Label=%u
   place    9-12, 17-24, 25-32
-      0                   1                   2                   3
-      0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1
+                      1 1 1 1 1 1 1   2 2 2 2 2 1 1 1 3 3 3 2 2 2 2 2
+      8 7 6 5 4 3 2 1 6 5 4 3 2 1 0 9 4 3 2 1 0 9 8 7 2 1 0 9 8 7 6 5
      +-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+
-     |. . . . . . . . . . . .|a a a a|b b b b b b b b|c c c c c c c c|
+     |. . . . . . . . . . . .|x x x x|x x x x x x x x|x x x x x x x x|
      +-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+-+
 )"},
-        {"netfloor fields 229 | head -9; netfloor fields 478 | grep place; netfloor fields 177 | tail -n 2",
-         R"(Padding Data (id 229)
-  bits     variable
+        {"netfloor fields 856 | tail -n +5 | grep -v '+'", // more than a line, its groups reversed
+         R"(  place    16-1, 8 times, 16 bits apart
+                      1 1 1 1 1 1 1   2 2 2 2 2 1 1 1 3 3 3 2 2 2 2 2
+      8 7 6 5 4 3 2 1 6 5 4 3 2 1 0 9 4 3 2 1 0 9 8 7 2 1 0 9 8 7 6 5
+     |x x x x x x x x x x x x x x x x|x x x x x x x x x x x x x x x x|
+     |x x x x x x x x x x x x x x x x|x x x x x x x x x x x x x x x x|
+     |x x x x x x x x x x x x x x x x|x x x x x x x x x x x x x x x x|
+     |x x x x x x x x x x x x x x x x|x x x x x x x x x x x x x x x x|
+)"},
+        {"netfloor fields 229 | tail -n +3", // nibbles, as many as there are
+         R"(  bits     variable
   display  Padding Data=%-["%x"] (Hex)
-  place    1-4, as often as the packet tells, 4 bits apart
-      0
-      0 1 2 3 4 5 6 7
+  place    from 1 on, nibble by nibble, as far as the packet tells
+      8 7 6 5 4 3 2 1
      +-+-+-+-+-+-+-+-+
-     |. . . .|a a a a|
+     |x x x x|x x x x|
      +-+-+-+-+-+-+-+-+
-  place    1-8, 1 to 16 times, 8 bits apart
-  display  Routing Type=%x
+)"},
+        {"for id in 153 478 643 958 177; do netfloor fields $id | grep place; done",
+         R"(  place    1-16, octet by octet
+  place    from 1 up to 128, octet by octet
+  place    5-8, 1-4, 2 times, 8 bits apart
+  place    1-4, 5-8, 9-12, 13-16, as often as the packet tells, 16 bits apart
   place    not told
+)"},
+        {"netfloor fields 555 | head -n 4; netfloor fields discard packet | head -n 3", // names that are missing, short
+         R"((no name)
+  id       555, ICMP
+  bits     variable
+  display  nothing
+unkown option type, discard packet
+  id       243, IPv6 extensions
+  names    "unkown option type, discard packet", short "discard packet"
 )"},
         {"netfloor fields 247 | tail -n 7; netfloor fields 'UDP Source Port' | grep -A 1 values", // ranges, a default
          R"(    1       Destination Unreachable
@@ -69,6 +92,13 @@ Version (id 605)
   values
     other   %u
 )"},
+        {"netfloor fields port number; netfloor fields tcp | tail -n 1", // a part of names, a protocol: to choose from
+         R"(  id      bits   key  protocol               name                                         display
+ 795        16    76  SCTP                   SCTP Source Port Number                      SCTP Source Port Number=%u
+ 796        16    77  SCTP                   SCTP Destination Port Number                 SCTP Destination Port Number=%u
+2 fields, 2 key fields among them
+40 fields, 10 key fields among them
+)"},
     };
     for (const auto &[line, out] : cases) {
         const Outcome outcome = shell(line);
@@ -80,7 +110,7 @@ Version (id 605)
 TEST(Fields, AreListedInEachForm) {
     const Outcome list = shell("netfloor fields");
     EXPECT_EQ(std::ranges::count(list.out, '\n'), 383);
-    EXPECT_NE(list.out.find("\n 384        16    41  TCP Source Port "), std::string::npos);
+    EXPECT_NE(list.out.find("\n 384        16    41  TCP                    TCP Source Port "), std::string::npos);
     EXPECT_NE(list.out.find("\n381 fields, 102 key fields among them\n"), std::string::npos);
 
     const auto all = nlohmann::json::parse(shell("netfloor fields --json").out);
@@ -88,6 +118,7 @@ TEST(Fields, AreListedInEachForm) {
     const auto protocol = nlohmann::json::parse(shell("netfloor fields --json 295").out);
     EXPECT_EQ(protocol.size(), 1U);
     EXPECT_EQ(protocol[0], *std::ranges::find_if(all, [](const auto &field) { return field["id"] == 295; }));
+    EXPECT_EQ(protocol[0]["protocol"], "IPv4");
     EXPECT_EQ(protocol[0]["values"].back(), nlohmann::json({{"from", 138}, {"to", 252}, {"name", "Unassigned"}}));
     EXPECT_EQ(protocol[0]["layout"], nlohmann::json({{"pieces", {{1, 8}}}, {"count", 1}, {"step", 8}}));
 
