@@ -212,13 +212,14 @@ std::vector<BitSpan> FieldDescription::layOut(std::uint32_t cursor, std::optiona
 FieldTables::FieldTables(PluginLibrary library) : library_(std::move(library)) {
     const Tables tables(library_);
     for (const FieldDescriptor *row = tables.rows; row->flags != NETFLOOR_NO_FIELD; ++row) {
+        places_.try_emplace(row->fieldId, fields_.size());
         fields_.push_back(describe(tables, *row));
     }
 }
 
 const FieldDescription *FieldTables::find(std::uint32_t id) const {
-    const auto found = std::ranges::find(fields_, id, &FieldDescription::id);
-    return found == fields_.end() ? nullptr : &*found;
+    const auto found = places_.find(id);
+    return found == places_.end() ? nullptr : &fields_[found->second];
 }
 
 const FieldDescription *FieldTables::find(std::string_view name) const {

@@ -39,6 +39,7 @@ std::uint32_t bits(const Octets &packet, std::uint32_t first, std::uint32_t last
 // What the tables do not tell, and the grammar does.
 const std::set<std::uint32_t> scaledByEight = {294, 619};
 const std::set<std::uint32_t> readBackward = {201, 208, 209, 215, 216, 555, 895, 925, 927}; // last octet first
+constexpr std::uint32_t reportedByShortName = 243;
 constexpr std::uint32_t secondOctetFirst = 0x269; // so the layout lists two octets that are read in network order
 
 // Compares report after report with the tables, and keeps what it has seen.
@@ -54,22 +55,22 @@ public:
         }
     }
 
-    [[nodiscard]] const std::map<std::uint32_t, std::set<std::uint32_t>> &values() const { return values_; }
-    [[nodiscard]] const std::set<std::uint32_t> &followed() const { return followed_; }
-    [[nodiscard]] const std::set<std::uint32_t> &moved() const { return moved_; }
-    [[nodiscard]] const std::set<std::uint32_t> &reversed() const { return reversed_; }
-    [[nodiscard]] std::uint64_t reports() const { return reports_; }
+    std::map<std::uint32_t, std::set<std::uint32_t>> values; // by id, of fields of up to 16 bits
+    std::set<std::uint32_t> followed;                        // another field with a layout followed
+    std::set<std::uint32_t> moved;                           // and stood where the advance leads
+    std::set<std::uint32_t> reversed;                        // reported in the other order than the layout's
+    std::uint64_t reports = 0;
 
 private:
     void compare(const Octets &packet, const FieldReport &report, const FieldReport *next) {
-        ++reports_;
-        const FieldDescription *const known = find(report.id);
+        ++reports;
+        const FieldDescription *const known = tables().find(report.id);
         if (known == nullptr) {
             return fail(packet, report, "no such field in the tables");
         }
         std::string_view name = report.name;
         name.remove_prefix(std::min(name.find_first_not_of(' '), name.size()));
-        if (name != known->name && name != known->shortName) {
+        if (name != (report.id == reportedByShortName ? known->shortName : known->name)) {
             return fail(packet, report, "named " + std::string(known->name));
         }
         const std::vector<std::uint32_t> elements = elementsOf(packet, report, *known);
@@ -80,7 +81,7 @@ private:
         if (known->layout.kind != FieldLayout::Kind::none) {
             comparePlace(packet, report, *known, next);
         }
-        if (std::set<std::uint32_t> &seen = values_[report.id]; known->width.value_or(99) <= 16) {
+        if (std::set<std::uint32_t> &seen = values[report.id]; known->width.value_or(99) <= 16) {
             seen.insert(report.value);
         }
     }
@@ -104,7 +105,7 @@ private:
         std::vector<BitSpan> expected = known.layOut(cursor, repeats);
         if (spans != expected) {
             std::ranges::reverse(expected);
-            reversed_.insert(report.id);
+            reversed.insert(report.id);
         }
         const bool fits =
             repeats >= known.layout.leastCount && (known.layout.mostCount == 0 || repeats <= known.layout.mostCount);
@@ -114,15 +115,15 @@ private:
         if (value * (scaledByEight.contains(report.id) ? 8 : 1) != report.value) {
             return fail(packet, report, "value " + std::to_string(value));
         }
-        if (const FieldDescription *const nextKnown = next == nullptr ? nullptr : find(next->id);
+        if (const FieldDescription *const nextKnown = next == nullptr ? nullptr : tables().find(next->id);
             nextKnown != nullptr && nextKnown->layout.kind != FieldLayout::Kind::none && !next->ranges.empty()) {
             std::vector<BitSpan> nextSpans;
             for (const ReportedRange &range : next->ranges) {
                 nextSpans.push_back({range.firstBit, range.lastBit});
             }
-            followed_.insert(report.id);
+            followed.insert(report.id);
             if (cursorOf(nextSpans, *nextKnown) == cursor + known.layout.advance(repeats)) {
-                moved_.insert(report.id);
+                moved.insert(report.id);
             }
         }
     }
@@ -164,14 +165,6 @@ private:
         return elements;
     }
 
-    const FieldDescription *find(std::uint32_t id) {
-        const auto [found, isNew] = byId_.try_emplace(id, nullptr);
-        if (isNew) {
-            found->second = tables().find(id);
-        }
-        return found->second;
-    }
-
     void fail(const Octets &packet, const FieldReport &report, const std::string &why) {
         failed_ = true;
         ADD_FAILURE() << report.id << " \"" << report.name << "\" \"" << report.text << "\" value " << report.value
@@ -179,12 +172,6 @@ private:
                       << hexText(packet);
     }
 
-    std::map<std::uint32_t, const FieldDescription *> byId_;
-    std::map<std::uint32_t, std::set<std::uint32_t>> values_; // by id, of fields of up to 16 bits
-    std::set<std::uint32_t> followed_;                        // another field with a layout followed
-    std::set<std::uint32_t> moved_;                           // and stood where the advance leads
-    std::set<std::uint32_t> reversed_;                        // reported in the other order than the layout's
-    std::uint64_t reports_ = 0;
     bool failed_ = false;
 };
 
@@ -208,8 +195,8 @@ Octets withValue(Octets packet, const FieldReport &field, std::uint32_t value) {
     return packet;
 }
 
-// Every value of a field of up to 8 bits and every port, of UDP and of TCP; else those that have names, their
-// neighbours and samples.
+// Every value of a field of up to 8 bits and of one with ports; else those that have names, their neighbours and
+// samples.
 std::set<std::uint32_t> valuesToTry(const FieldDescription &field) {
     constexpr std::uint32_t mostSamples = 61;
     constexpr std::uint32_t udpSourcePort = 479;
@@ -256,8 +243,8 @@ TEST(Views, AgreeOnEveryField) {
     std::set<std::uint32_t> backward = readBackward;
     std::set<std::uint32_t> elsewhere;
     for (const FieldDescription &field : tables().fields()) {
-        const auto seen = all.values().find(field.id);
-        if (seen == all.values().end()) {
+        const auto seen = all.values.find(field.id);
+        if (seen == all.values.end()) {
             missing.insert(field.id);
         } else if (field.width.value_or(99) <= 8 && seen->second.size() < 1u << *field.width) {
             partly.insert(field.id);
@@ -265,17 +252,17 @@ TEST(Views, AgreeOnEveryField) {
         if (field.layoutOffset == secondOctetFirst) {
             backward.insert(field.id);
         }
-        if (all.followed().contains(field.id) && !all.moved().contains(field.id)) {
+        if (all.followed.contains(field.id) && !all.moved.contains(field.id)) {
             elsewhere.insert(field.id);
         }
     }
     EXPECT_EQ(idsText(missing), "");
     EXPECT_EQ(idsText(partly), idsText(there));
-    EXPECT_EQ(idsText(all.reversed()), idsText(backward));
+    EXPECT_EQ(idsText(all.reversed), idsText(backward));
     EXPECT_EQ(idsText(elsewhere), "168"); // is read a second time
-    EXPECT_GE(all.followed().size(), 340U);
-    EXPECT_GE(all.reports(), 100000U);
-    EXPECT_EQ(all.values().at(479).size(), 65536U); // ports
+    EXPECT_GE(all.followed.size(), 340U);
+    EXPECT_GE(all.reports, 100000U);
+    EXPECT_EQ(all.values.at(479).size(), 65536U); // ports
 }
 
 // Whatever else stands in a packet: octets changed at random, and all that looks like a packet in the captures.
@@ -301,7 +288,7 @@ TEST(Views, AgreeOnAnyPacket) {
             }
         }
     }
-    EXPECT_GE(all.reports(), 50000U);
+    EXPECT_GE(all.reports, 50000U);
 }
 
 TEST(Views, NameValues) {
@@ -339,44 +326,18 @@ TEST(Views, NameValues) {
 
 // The key-field table tells neither width nor kind; the host takes both from the field of the same name.
 TEST(Views, TellKeyTypes) {
-    const std::map<KeyType, std::set<std::string>> expected = {
-        {KeyType::number8,
-         {"Checksum Present",
-          "Code",
-          "Code ",
-          "DF",
-          "Data Offset",
-          "Embedded IP Protocols",
-          "FIN",
-          "Header Extention length",
-          "ICMP Message Type",
-          "IPinIP Protocol",
-          "Key Present",
-          "M Flag",
-          "MF",
-          "MIPinIP Protocol",
-          "Next Header",
-          "Opt Data Length",
-          "Option Type",
-          "Original Internet Header Length",
-          "Protocol",
-          "RST",
-          "SCTP Chunk Type",
-          "SYN",
-          "Sequence Number Present",
-          "Time to Live",
-          "Version"}},
-        {KeyType::number16,
-         {"Fragment Offset", "GRE Protocol", "ICMP Sequence Number", "Identification", "Original IP Total Length",
-          "Payload Length", "SCTP Destination Port Number", "SCTP Source Port Number", "Stream Indetifier S",
-          "Stream Sequence Number n", "TCP Destination Port", "TCP Source Port", "Total Length", "UDP Destination Port",
-          "UDP Source Port", "fragment Offset"}},
-        {KeyType::number32,
-         {"Acknowledgement Number", "Cumulative TSN Ack", "GRE Key", "Initial Transmission Sequence Number(I_TSN)",
-          "Payload Protocol Identifier", "SPI", "Sequence Number", "Sequency Number", "TSN"}},
+    const struct {
+        KeyType type;
+        std::size_t count; // of names; 58 rows are filled at all
+        std::set<std::string> telling;
+    } cases[] = {
+        {KeyType::number8, 25, {"Code", "Code ", "DF", "Time to Live"}},
+        {KeyType::number16, 16, {"Fragment Offset", "fragment Offset", "Identification"}},
+        {KeyType::number32, 9, {"SPI", "Sequence Number", "Sequency Number", "TSN"}},
         {KeyType::ipv4Address,
+         5,
          {"Address Mask", "Destination Address", "Original Dest Address", "Original Src Address", "Source Address"}},
-        {KeyType::ipv6Address, {"Destination IP Address", "IP Address", "Source IP Address"}},
+        {KeyType::ipv6Address, 3, {"Destination IP Address", "IP Address", "Source IP Address"}},
     };
     std::map<KeyType, std::set<std::string>> found;
     for (const Octets &packet : packetsOfAllFields()) {
@@ -384,7 +345,10 @@ TEST(Views, TellKeyTypes) {
             found[key.type].insert(key.name);
         }
     }
-    EXPECT_EQ(found, expected);
+    for (const auto &[type, count, telling] : cases) {
+        EXPECT_EQ(found[type].size(), count);
+        EXPECT_TRUE(std::ranges::includes(found[type], telling)) << *telling.begin();
+    }
 }
 
 } // namespace

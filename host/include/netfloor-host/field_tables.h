@@ -7,11 +7,13 @@
 //     std::cout << protocol->display(6) << '\n';      // Protocol=Transmission Control Protocol
 #pragma once
 
+#include <cstddef>
 #include <cstdint>
 #include <optional>
 #include <span>
 #include <string>
 #include <string_view>
+#include <unordered_map>
 #include <vector>
 
 #include "netfloor-host/plugin_library.h"
@@ -93,6 +95,7 @@ public:
     // In the order of the plug-in's grammar.
     [[nodiscard]] const std::vector<FieldDescription> &fields() const { return fields_; }
 
+    // The field of that id, or null; without a search, so that a host may ask for each field of a report.
     [[nodiscard]] const FieldDescription *find(std::uint32_t id) const;
 
     // The first field of that name or short name, or null; `named` gives all.
@@ -102,6 +105,7 @@ public:
 private:
     PluginLibrary library_;
     std::vector<FieldDescription> fields_;
+    std::unordered_map<std::uint32_t, std::size_t> places_; // in fields_, by id
 };
 
 } // namespace netfloor
