@@ -95,7 +95,7 @@ template <class Pass> NETFLOOR_INLINE inline std::int32_t limitedPart(Reader<Pas
         return static_cast<std::int32_t>(words);
     }
     const auto headerOctets = static_cast<std::int32_t>(words * bitsPerWord / bitsPerOctet);
-    at.variables().tcpOptionOctets = headerOctets - fixedHeaderOctets;
+    at.variables().tcpOptions.octets = headerOctets - fixedHeaderOctets;
     apart<options<Pass>>(at);
     return headerOctets;
 }
