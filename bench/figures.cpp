@@ -8,13 +8,13 @@
 
 namespace netfloor::bench {
 
-bool Figures::ReportContext(const Context& /*context*/) {
+bool Figures::ReportContext(const Context & /*context*/) {
     return true;
 }
 
-void Figures::ReportRuns(const std::vector<Run>& runs) {
-    for (const Run& run : runs) {
-        const std::string& name = run.run_name.function_name;
+void Figures::ReportRuns(const std::vector<Run> &runs) {
+    for (const Run &run : runs) {
+        const std::string &name = run.run_name.function_name;
         const std::size_t bar = name.find('|');
         const auto packets = run.counters.find("packets");
         if (run.error_occurred || bar == std::string::npos || packets == run.counters.end()) {
@@ -34,12 +34,12 @@ double Figures::of(std::string_view set, std::string_view what) const {
     return found == medians_.end() ? 0 : found->second;
 }
 
-bool runAll(int argc, char** argv, Figures& figures) {
+bool runAll(int argc, char **argv, Figures &figures) {
     // What comes later on the command line wins.
     std::array<std::string, 3> defaults = {"--benchmark_enable_random_interleaving=true", "--benchmark_repetitions=9",
                                            "--benchmark_min_time=0.05"};
-    std::vector<char*> arguments = {argv[0]};
-    for (std::string& argument : defaults) {
+    std::vector<char *> arguments = {argv[0]};
+    for (std::string &argument : defaults) {
         arguments.push_back(argument.data());
     }
     arguments.insert(arguments.end(), argv + 1, argv + argc);

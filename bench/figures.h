@@ -16,8 +16,8 @@ using FigureKey = std::pair<std::string, std::string>;
 
 class Figures : public benchmark::BenchmarkReporter {
 public:
-    bool ReportContext(const Context& context) override;
-    void ReportRuns(const std::vector<Run>& runs) override;
+    bool ReportContext(const Context &context) override;
+    void ReportRuns(const std::vector<Run> &runs) override;
 
     // Nothing measured: 0.
     [[nodiscard]] double of(std::string_view set, std::string_view what) const;
@@ -31,9 +31,10 @@ private:
 };
 
 // Registers `what` over `set`: `body` is called once an iteration, and runs all the packets of the set.
-template <class Body> void measure(std::string_view set, std::string_view what, std::size_t packets, Body body) {
+template <class Body>
+void measure(std::string_view set, std::string_view what, std::size_t packets, Body body) {
     const std::string name = std::string(set) + "|" + std::string(what);
-    benchmark::RegisterBenchmark(name.c_str(), [packets, body](benchmark::State& state) {
+    benchmark::RegisterBenchmark(name.c_str(), [packets, body](benchmark::State &state) {
         for (auto _ : state) {
             body();
             benchmark::ClobberMemory();
@@ -44,7 +45,7 @@ template <class Body> void measure(std::string_view set, std::string_view what, 
 
 // Runs all that was registered: nine repetitions of each, interleaved, unless the arguments say otherwise.
 // False where an argument is not understood.
-[[nodiscard]] bool runAll(int argc, char** argv, Figures& figures);
+[[nodiscard]] bool runAll(int argc, char **argv, Figures &figures);
 
 // A figure in a column of 9, a dash where there is none.
 void printFigure(double figure, int decimals);

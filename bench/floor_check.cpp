@@ -49,14 +49,16 @@ bool sameCalls(NetfloorPreDecode md) {
 bool sameKeys(NetfloorExtract xtr) {
     PacketHost host;
     Octets packet = plainUdp();
-    const auto record = [&](XtrContext& context) { return Octets(context.keyRecord, context.keyRecord + keyRecordOctets); };
-    XtrContext& context = host.prepareKeys(packet);
+    const auto record = [&](XtrContext &context) {
+        return Octets(context.keyRecord, context.keyRecord + keyRecordOctets);
+    };
+    XtrContext &context = host.prepareKeys(packet);
     if (xtr(&context) != 1) {
         return false;
     }
     const Octets ofPlugin = record(context);
     PacketHost other;
-    XtrContext& otherContext = other.prepareKeys(packet);
+    XtrContext &otherContext = other.prepareKeys(packet);
     storeKeysByHand(otherContext.keyRecord, packet.data());
     return record(otherContext) == ofPlugin;
 }
@@ -64,22 +66,25 @@ bool sameKeys(NetfloorExtract xtr) {
 } // namespace
 
 // This host keeps what it is told. Its other operations are the null host's.
-std::int32_t hs_AddDecodedFieldsData(PreDecodeContext* context, std::uint32_t outputRangeCount, const BitRange* ranges, const char* display,
-                                     std::uint32_t, const char* fieldName, std::uint32_t fieldId, std::uint32_t,
-                                     std::uint32_t bitOrder) {
-    const FieldRecord& record = context->decodeState->fieldRecord;
-    std::string call = std::to_string(fieldId) + " \"" + fieldName + "\" \"" + display + "\" order " + std::to_string(bitOrder) +
-                       " value " + std::to_string(record.value) + " id " + std::to_string(record.fieldId) + " ranges";
+std::int32_t hs_AddDecodedFieldsData(PreDecodeContext *context, std::uint32_t outputRangeCount, const BitRange *ranges,
+                                     const char *display, std::uint32_t, const char *fieldName, std::uint32_t fieldId,
+                                     std::uint32_t, std::uint32_t bitOrder) {
+    const FieldRecord &record = context->decodeState->fieldRecord;
+    std::string call = std::to_string(fieldId) + " \"" + fieldName + "\" \"" + display + "\" order " +
+                       std::to_string(bitOrder) + " value " + std::to_string(record.value) + " id " +
+                       std::to_string(record.fieldId) + " ranges";
     for (std::uint32_t i = 0; i < outputRangeCount; ++i) {
-        call += " " + std::to_string(ranges[i].firstBit) + "-" + std::to_string(ranges[i].lastBit) + "=" + std::to_string(ranges[i].value);
+        call += " " + std::to_string(ranges[i].firstBit) + "-" + std::to_string(ranges[i].lastBit) + "=" +
+                std::to_string(ranges[i].value);
     }
     calls.push_back(call);
     return 0;
 }
 
-int main(int argc, char** argv) {
-    void* const library = argc == 2 ? dlopen(argv[1], RTLD_NOW | RTLD_LOCAL) : nullptr;
-    const auto md = library == nullptr ? nullptr : reinterpret_cast<NetfloorPreDecode>(dlsym(library, "vex_PreDecodeMD"));
+int main(int argc, char **argv) {
+    void *const library = argc == 2 ? dlopen(argv[1], RTLD_NOW | RTLD_LOCAL) : nullptr;
+    const auto md =
+        library == nullptr ? nullptr : reinterpret_cast<NetfloorPreDecode>(dlsym(library, "vex_PreDecodeMD"));
     const auto xtr = library == nullptr ? nullptr : reinterpret_cast<NetfloorExtract>(dlsym(library, "XTR_netfloor"));
     if (md == nullptr || xtr == nullptr) {
         std::printf("usage: bench_floor_check PLUGIN\n");

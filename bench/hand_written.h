@@ -10,9 +10,9 @@
 namespace netfloor::bench {
 
 // The 22 fields with the texts, names, ids and bit ranges of the MD pass, a call of the host for each.
-void reportByHand(PreDecodeContext& context, const std::uint8_t* packet);
+void reportByHand(PreDecodeContext &context, const std::uint8_t *packet);
 
 // The key fields of the XTR pass, by direct loads into the places that the null host gave them.
-void storeKeysByHand(std::uint8_t* keyRecord, const std::uint8_t* packet);
+void storeKeysByHand(std::uint8_t *keyRecord, const std::uint8_t *packet);
 
 } // namespace netfloor::bench

@@ -37,11 +37,11 @@ public:
         keyContext_.byteAreaSize = bench::byteAreaSize;
         keyContext_.decodeState = &state_;
     }
-    PacketHost(const PacketHost&) = delete;
-    PacketHost& operator=(const PacketHost&) = delete;
+    PacketHost(const PacketHost &) = delete;
+    PacketHost &operator=(const PacketHost &) = delete;
 
     // Before a pass with a PreDecodeContext.
-    PreDecodeContext& prepare(std::span<std::uint8_t> packet) {
+    PreDecodeContext &prepare(std::span<std::uint8_t> packet) {
         reset(packet);
         context_.layerNumber = 1;
         context_.decoderId = 1;
@@ -52,22 +52,18 @@ public:
     }
 
     // Before the XTR pass.
-    XtrContext& prepareKeys(std::span<std::uint8_t> packet) {
+    XtrContext &prepareKeys(std::span<std::uint8_t> packet) {
         reset(packet);
         std::memset(keyRecord_.data(), 0, presenceOctets);
         keyContext_.byteAreaOffset = bench::byteAreaOffset;
         return keyContext_;
     }
 
-    std::uint8_t run(NetfloorPreDecode pass, std::span<std::uint8_t> packet) {
-        return pass(&prepare(packet));
-    }
+    std::uint8_t run(NetfloorPreDecode pass, std::span<std::uint8_t> packet) { return pass(&prepare(packet)); }
 
-    std::int32_t run(NetfloorExtract pass, std::span<std::uint8_t> packet) {
-        return pass(&prepareKeys(packet));
-    }
+    std::int32_t run(NetfloorExtract pass, std::span<std::uint8_t> packet) { return pass(&prepareKeys(packet)); }
 
-    [[nodiscard]] const PreDecodeContext& context() const { return context_; }
+    [[nodiscard]] const PreDecodeContext &context() const { return context_; }
 
 private:
     static constexpr std::uint32_t stackCapacity = 64;

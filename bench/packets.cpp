@@ -89,7 +89,7 @@ Octets initWithFourParameters() {
 
 } // namespace
 
-const Octets& plainUdp() {
+const Octets &plainUdp() {
     static const Octets packet = ipv4({.protocol = udpNumber, .payload = udpOf(40000, 50000, 60)});
     return packet;
 }
@@ -97,7 +97,9 @@ const Octets& plainUdp() {
 std::span<const PacketSet> packetSets() {
     static const std::vector<PacketSet> sets = {
         {"IPv4 + UDP, 60 octets", {plainUdp()}, true},
-        {"IPv4 + TCP with timestamps, 512 octets", {ipv4({.protocol = tcpNumber, .payload = tcpWithTimestamps(512)})}, true},
+        {"IPv4 + TCP with timestamps, 512 octets",
+         {ipv4({.protocol = tcpNumber, .payload = tcpWithTimestamps(512)})},
+         true},
         {"IPv4 mix: 5 TCP, 3 UDP", mix(), true},
         {"IPv6 + UDP, 60 octets", {ipv6({.nextHeader = udpNumber, .payload = udpOf(40000, 50000, 60)})}, true},
         {"IPv6 + 2 extension headers + TCP",

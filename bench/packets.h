@@ -21,7 +21,7 @@ struct PacketSet {
 };
 
 // The packet for which there is hand-written code: IPv4 + UDP with 60 octets of payload, ports without a name.
-[[nodiscard]] const Octets& plainUdp();
+[[nodiscard]] const Octets &plainUdp();
 
 [[nodiscard]] std::span<const PacketSet> packetSets();
 

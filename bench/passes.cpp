@@ -20,9 +20,9 @@ namespace {
 
 using namespace netfloor::bench;
 
-constexpr const char* handWritten = "by hand";
+constexpr const char *handWritten = "by hand";
 
-[[noreturn]] void fail(const char* reason, const char* detail) {
+[[noreturn]] void fail(const char *reason, const char *detail) {
     std::fprintf(stderr, "bench_passes: %s%s\n", reason, detail);
     std::exit(1);
 }
@@ -34,15 +34,16 @@ struct Passes {
     NetfloorExtract xtr;
 };
 
-template <class Entry> void resolve(void* library, const char* name, Entry& entry) {
+template <class Entry>
+void resolve(void *library, const char *name, Entry &entry) {
     entry = reinterpret_cast<Entry>(dlsym(library, name));
     if (entry == nullptr) {
         fail("the plug-in has no entry ", name);
     }
 }
 
-Passes load(const char* path) {
-    void* const library = dlopen(path, RTLD_NOW | RTLD_LOCAL);
+Passes load(const char *path) {
+    void *const library = dlopen(path, RTLD_NOW | RTLD_LOCAL);
     if (library == nullptr) {
         fail("cannot load the plug-in: ", dlerror());
     }
@@ -60,20 +61,20 @@ struct Bench {
     std::vector<Octets> packets;
     PeerKeys peerKeys;
 
-    explicit Bench(const PacketSet& set) : packets(set.packets), peerKeys() {}
+    explicit Bench(const PacketSet &set) : packets(set.packets), peerKeys() {}
 
     void all(NetfloorPreDecode pass) {
-        for (Octets& packet : packets) {
+        for (Octets &packet : packets) {
             host.run(pass, packet);
         }
     }
     void all(NetfloorExtract pass) {
-        for (Octets& packet : packets) {
+        for (Octets &packet : packets) {
             host.run(pass, packet);
         }
     }
-    void inTurn(const Passes& passes) {
-        for (Octets& packet : packets) {
+    void inTurn(const Passes &passes) {
+        for (Octets &packet : packets) {
             host.run(passes.mv, packet);
             host.run(passes.xtr, packet);
             host.run(passes.to, packet);
@@ -81,14 +82,14 @@ struct Bench {
         }
     }
     void peer() {
-        for (const Octets& packet : packets) {
+        for (const Octets &packet : packets) {
             readKeys(packet, peerKeys);
         }
     }
 
     // What is measured is the plug-in with the null host, and it runs to the end of each packet.
-    void check(const Passes& passes, const char* name) {
-        for (Octets& packet : packets) {
+    void check(const Passes &passes, const char *name) {
+        for (Octets &packet : packets) {
             if (host.run(passes.xtr, packet) != 1) {
                 fail("the XTR pass does not get its keys from the null host: ", name);
             }
@@ -101,7 +102,7 @@ struct Bench {
     }
 };
 
-void measureSet(const PacketSet& set, Bench& bench, const Passes& passes) {
+void measureSet(const PacketSet &set, Bench &bench, const Passes &passes) {
     const std::size_t count = set.packets.size();
     measure(set.name, "MV", count, [&] { bench.all(passes.mv); });
     measure(set.name, "XTR", count, [&] { bench.all(passes.xtr); });
@@ -113,15 +114,16 @@ void measureSet(const PacketSet& set, Bench& bench, const Passes& passes) {
     }
 }
 
-void printTable(const Figures& figures) {
-    std::printf("%-38s%9s%9s%9s%9s%9s%9s%9s%9s\n", "ns a packet", "MV", "XTR", "TO", "MD", "in turn", "libtins", "l/MV", "l/XTR");
-    for (const PacketSet& set : packetSets()) {
+void printTable(const Figures &figures) {
+    std::printf("%-38s%9s%9s%9s%9s%9s%9s%9s%9s\n", "ns a packet", "MV", "XTR", "TO", "MD", "in turn", "libtins", "l/MV",
+                "l/XTR");
+    for (const PacketSet &set : packetSets()) {
         std::printf("%-38s", set.name.data());
-        for (const char* what : {"MV", "XTR", "TO", "MD", "in turn", "libtins"}) {
+        for (const char *what : {"MV", "XTR", "TO", "MD", "in turn", "libtins"}) {
             printFigure(figures.of(set.name, what), 1);
         }
         const double peer = figures.of(set.name, "libtins");
-        for (const char* what : {"MV", "XTR"}) {
+        for (const char *what : {"MV", "XTR"}) {
             const double pass = figures.of(set.name, what);
             printFigure(pass > 0 ? peer / pass : 0, 2);
         }
@@ -132,33 +134,29 @@ void printTable(const Figures& figures) {
     const double keys = figures.of(handWritten, "XTR");
     std::printf("%-38s%9s%9.1f%9s%9.1f\n", "the first row, written by hand", "-", keys, "-", lines);
     if (lines > 0 && keys > 0) {
-        std::printf("\nMD / the same lines by hand: %.2f    XTR / the same keys by hand: %.2f\n", figures.of(first, "MD") / lines,
-                    figures.of(first, "XTR") / keys);
+        std::printf("\nMD / the same lines by hand: %.2f    XTR / the same keys by hand: %.2f\n",
+                    figures.of(first, "MD") / lines, figures.of(first, "XTR") / keys);
     }
     std::printf("Greatest spread of the repetitions of one figure: %.0f %%\n", figures.spread() * 100);
 }
 
 } // namespace
 
-int main(int argc, char** argv) {
+int main(int argc, char **argv) {
     if (argc < 2) {
         fail("usage: bench_passes PLUGIN [--benchmark_...]", "");
     }
     const Passes passes = load(argv[1]);
     std::deque<Bench> benches;
-    for (const PacketSet& set : packetSets()) {
-        Bench& bench = benches.emplace_back(set);
+    for (const PacketSet &set : packetSets()) {
+        Bench &bench = benches.emplace_back(set);
         bench.check(passes, set.name.data());
         measureSet(set, bench, passes);
     }
     PacketHost host;
     Octets packet = plainUdp();
-    measure(handWritten, "MD", 1, [&] {
-        reportByHand(host.prepare(packet), packet.data());
-    });
-    measure(handWritten, "XTR", 1, [&] {
-        storeKeysByHand(host.prepareKeys(packet).keyRecord, packet.data());
-    });
+    measure(handWritten, "MD", 1, [&] { reportByHand(host.prepare(packet), packet.data()); });
+    measure(handWritten, "XTR", 1, [&] { storeKeysByHand(host.prepareKeys(packet).keyRecord, packet.data()); });
     Figures figures;
     if (!runAll(argc - 1, argv + 1, figures)) {
         return 1;

@@ -12,11 +12,11 @@
 namespace netfloor::bench {
 namespace {
 
-void readTransport(const Tins::PDU& header, PeerKeys& keys) {
-    if (const auto* udp = header.find_pdu<Tins::UDP>()) {
+void readTransport(const Tins::PDU &header, PeerKeys &keys) {
+    if (const auto *udp = header.find_pdu<Tins::UDP>()) {
         keys.sourcePort = udp->sport();
         keys.destinationPort = udp->dport();
-    } else if (const auto* tcp = header.find_pdu<Tins::TCP>()) {
+    } else if (const auto *tcp = header.find_pdu<Tins::TCP>()) {
         keys.sourcePort = tcp->sport();
         keys.destinationPort = tcp->dport();
         keys.sequence = tcp->seq();
@@ -28,7 +28,7 @@ void readTransport(const Tins::PDU& header, PeerKeys& keys) {
     }
 }
 
-void readIpv4(std::span<const std::uint8_t> packet, PeerKeys& keys) {
+void readIpv4(std::span<const std::uint8_t> packet, PeerKeys &keys) {
     const Tins::IP ip(packet.data(), static_cast<std::uint32_t>(packet.size()));
     keys.version = ip.version();
     keys.totalLength = ip.tot_len();
@@ -45,7 +45,7 @@ void readIpv4(std::span<const std::uint8_t> packet, PeerKeys& keys) {
     readTransport(ip, keys);
 }
 
-void readIpv6(std::span<const std::uint8_t> packet, PeerKeys& keys) {
+void readIpv6(std::span<const std::uint8_t> packet, PeerKeys &keys) {
     const Tins::IPv6 ip(packet.data(), static_cast<std::uint32_t>(packet.size()));
     keys.version = ip.version();
     keys.totalLength = ip.payload_length();
@@ -54,7 +54,7 @@ void readIpv6(std::span<const std::uint8_t> packet, PeerKeys& keys) {
     const Tins::IPv6Address destination = ip.dst_addr();
     std::copy_n(source.begin(), keys.source.size(), keys.source.begin());
     std::copy_n(destination.begin(), keys.destination.size(), keys.destination.begin());
-    for (const Tins::IPv6::ext_header& header : ip.headers()) {
+    for (const Tins::IPv6::ext_header &header : ip.headers()) {
         ++keys.extensionHeaders;
         keys.extensionOctets = static_cast<std::uint16_t>(keys.extensionOctets + header.data_size());
     }
@@ -63,7 +63,7 @@ void readIpv6(std::span<const std::uint8_t> packet, PeerKeys& keys) {
 
 } // namespace
 
-void readKeys(std::span<const std::uint8_t> packet, PeerKeys& keys) {
+void readKeys(std::span<const std::uint8_t> packet, PeerKeys &keys) {
     keys.extensionHeaders = 0;
     keys.extensionOctets = 0;
     if (packet[0] >> 4 == 6) {

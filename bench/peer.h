@@ -33,6 +33,6 @@ struct PeerKeys {
 };
 
 // Throws what libtins throws for a packet that it cannot take apart.
-void readKeys(std::span<const std::uint8_t> packet, PeerKeys& keys);
+void readKeys(std::span<const std::uint8_t> packet, PeerKeys &keys);
 
 } // namespace netfloor::bench

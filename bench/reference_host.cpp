@@ -17,18 +17,18 @@ using namespace netfloor::bench;
 using netfloor::Pass;
 
 struct NamedPass {
-    const char* name;
+    const char *name;
     Pass pass;
 };
 
 constexpr NamedPass passes[] = {{"MV", Pass::mv}, {"XTR", Pass::xtr}, {"TO", Pass::to}, {"MD", Pass::md}};
 
-void runAndPrint(int argc, char** argv) {
+void runAndPrint(int argc, char **argv) {
     netfloor::Host host(netfloor::PluginLibrary::open(argv[1]));
-    for (const PacketSet& set : packetSets()) {
-        for (const NamedPass& named : passes) {
+    for (const PacketSet &set : packetSets()) {
+        for (const NamedPass &named : passes) {
             measure(set.name, named.name, set.packets.size(), [&] {
-                for (const Octets& packet : set.packets) {
+                for (const Octets &packet : set.packets) {
                     benchmark::DoNotOptimize(host.run(named.pass, packet));
                 }
             });
@@ -39,12 +39,12 @@ void runAndPrint(int argc, char** argv) {
         return;
     }
     std::printf("%-38s", "ns a packet, reference host");
-    for (const NamedPass& named : passes) {
+    for (const NamedPass &named : passes) {
         std::printf("%9s", named.name);
     }
-    for (const PacketSet& set : packetSets()) {
+    for (const PacketSet &set : packetSets()) {
         std::printf("\n%-38s", set.name.data());
-        for (const NamedPass& named : passes) {
+        for (const NamedPass &named : passes) {
             printFigure(figures.of(set.name, named.name), 0);
         }
     }
@@ -53,14 +53,14 @@ void runAndPrint(int argc, char** argv) {
 
 } // namespace
 
-int main(int argc, char** argv) {
+int main(int argc, char **argv) {
     if (argc < 2) {
         std::fprintf(stderr, "usage: bench_reference_host PLUGIN [--benchmark_...]\n");
         return 1;
     }
     try {
         runAndPrint(argc, argv);
-    } catch (const std::exception& failure) {
+    } catch (const std::exception &failure) {
         std::fprintf(stderr, "bench_reference_host: %s\n", failure.what());
         return 1;
     }

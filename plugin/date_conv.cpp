@@ -10,7 +10,7 @@
 namespace {
 
 // Writes `number` in `digits` digits, zeros in front, and gives the place behind them.
-char* writeDigits(char* to, std::uint32_t number, std::uint32_t digits) {
+char *writeDigits(char *to, std::uint32_t number, std::uint32_t digits) {
     for (std::uint32_t place = digits; place-- > 0; number /= 10) {
         to[place] = static_cast<char>('0' + number % 10);
     }
@@ -19,14 +19,14 @@ char* writeDigits(char* to, std::uint32_t number, std::uint32_t digits) {
 
 } // namespace
 
-extern "C" NETFLOOR_EXPORT char* NETFLOOR_CDECL date_conv(char* text, void* /*ignored*/, DecodeState* state) {
+extern "C" NETFLOOR_EXPORT char *NETFLOOR_CDECL date_conv(char *text, void * /*ignored*/, DecodeState *state) {
     using namespace std::chrono;
     const sys_seconds time{seconds{state->fieldRecord.value}};
     const sys_days day = floor<days>(time);
     const year_month_day date{day};
     const hh_mm_ss clock{time - day};
 
-    char* to = text + std::strlen(text);
+    char *to = text + std::strlen(text);
     to = writeDigits(to, static_cast<std::uint32_t>(static_cast<int>(date.year())), 4);
     *to++ = '-';
     to = writeDigits(to, static_cast<unsigned>(date.month()), 2);

@@ -5,7 +5,7 @@
 #include "frame/outputs.h"
 #include "grammar.h"
 
-extern "C" NETFLOOR_EXPORT std::uint8_t NETFLOOR_CDECL vex_PreDecodeMV(PreDecodeContext* context) {
+extern "C" NETFLOOR_EXPORT std::uint8_t NETFLOOR_CDECL vex_PreDecodeMV(PreDecodeContext *context) {
     using namespace netfloor;
     return runPass<MvPass<Grammar>, Grammar>(*context) == Outcome::cutOff ? 0 : 1;
 }

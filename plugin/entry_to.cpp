@@ -5,7 +5,7 @@
 #include "frame/outputs.h"
 #include "grammar.h"
 
-extern "C" NETFLOOR_EXPORT std::uint8_t NETFLOOR_CDECL vex_PreDecodeTO(PreDecodeContext* context) {
+extern "C" NETFLOOR_EXPORT std::uint8_t NETFLOOR_CDECL vex_PreDecodeTO(PreDecodeContext *context) {
     using namespace netfloor;
     return runPass<ToPass<Grammar>, Grammar>(*context) == Outcome::cutOff ? 0 : 1;
 }

@@ -5,7 +5,7 @@
 #include "frame/outputs.h"
 #include "grammar.h"
 
-extern "C" NETFLOOR_EXPORT std::int32_t NETFLOOR_CDECL XTR_netfloor(XtrContext* context) {
+extern "C" NETFLOOR_EXPORT std::int32_t NETFLOOR_CDECL XTR_netfloor(XtrContext *context) {
     using namespace netfloor;
     using Pass = XtrPass<Grammar>;
     const std::optional<Outcome> outcome = runPass<Pass, Grammar>(*context);

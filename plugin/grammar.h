@@ -28,14 +28,17 @@ struct Grammar {
                        sctp::Variables {};
 
     static constexpr std::uint32_t noKeyRow = netfloor::noKeyRow;
-    static constexpr auto& keyRows = netfloor::keyRows;
+    static constexpr auto &keyRows = netfloor::keyRows;
 
-    template <const Field& field> static constexpr std::uint32_t displayId = displayIdOf(field);
-    template <const Field& field> static constexpr std::uint32_t keyRow = keyRowOf(field);
+    template <const Field &field>
+    static constexpr std::uint32_t displayId = displayIdOf(field);
+    template <const Field &field>
+    static constexpr std::uint32_t keyRow = keyRowOf(field);
 
     // One packet, from its version on. With a version other than 4 and 6 nothing further is read.
-    template <class Pass> NETFLOOR_INLINE static void packet(Reader<Pass>& at) {
-        auto& variables = at.variables();
+    template <class Pass>
+    NETFLOOR_INLINE static void packet(Reader<Pass> &at) {
+        auto &variables = at.variables();
         const Block<Pass> ip{at, "Ip"};
         const Block<Pass> header{at, "Ip Header"};
         read<version>(at, &variables.ipVersion);

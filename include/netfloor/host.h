@@ -49,8 +49,7 @@ int32_t NETFLOOR_CDECL hs_AddDecodedFieldsData(PreDecodeContext *context, uint32
  * TO: the short text of one field. `displayId` is the id of the first field in the field table
  * that has the field's name. `display` is valid during the call only. The result is not used.
  */
-int32_t NETFLOOR_CDECL hs_AddFieldsToDisplayData(PreDecodeContext *context, const char *display,
-                                                 uint32_t displayId);
+int32_t NETFLOOR_CDECL hs_AddFieldsToDisplayData(PreDecodeContext *context, const char *display, uint32_t displayId);
 
 /* ---- libhd_HostDispatch ---- */
 

@@ -76,9 +76,9 @@ typedef struct LayerInfoRecord {
 
 /* Bits of `flags` in DecodeState. Any of them makes the MV pass set its verdict. */
 enum {
-    NETFLOOR_FLAG_EXPECTATION = 0x2,           /* a fixed value, a bound or a count was not met */
-    NETFLOOR_FLAG_LIMIT_TOO_LONG = 0x8,        /* a length reaches behind the bits left (MV) */
-    NETFLOOR_FLAG_BITS_LEFT_OVER = 0x10,       /* bits that no field covers inside a length (MV) */
+    NETFLOOR_FLAG_EXPECTATION = 0x2,            /* a fixed value, a bound or a count was not met */
+    NETFLOOR_FLAG_LIMIT_TOO_LONG = 0x8,         /* a length reaches behind the bits left (MV) */
+    NETFLOOR_FLAG_BITS_LEFT_OVER = 0x10,        /* bits that no field covers inside a length (MV) */
     NETFLOOR_FLAG_NO_LAYER_FRAMES = 0x10000000, /* `layerFrames` could not grow */
     NETFLOOR_FLAG_NO_STACK = 0x20000000,        /* `blockStarts` or `limits` could not grow */
     NETFLOOR_FLAG_NO_RANGES = 0x40000000        /* `ranges` could not grow */
@@ -126,16 +126,16 @@ typedef struct DecodeState {
 
 /* One run of the MD, TO or MV pass. */
 typedef struct PreDecodeContext {
-    uint32_t bitsLeft;           /* out: bits that were not decoded, at the end or at a hand-off */
-    uint8_t layerNumber;         /* in, out: number of the layer; each hand-off adds 1 */
-    uint32_t decoderId;          /* in, out: the host's word for the decoding plug-in */
-    int32_t verdict;             /* out: -52 from the MV pass when a flag is set; else untouched */
-    uint8_t *fieldRecords;       /* in: records of 1000 octets each, written by the MD pass */
-    uint32_t fieldRecordCount;   /* in: index of the record now being written; the host's to move */
-    LayerInfoRecord *layerInfo;  /* in: the list of layers (MD, TO) */
-    uint32_t layerInfoCount;     /* in, out: index of the open record of `layerInfo` */
-    uint32_t layerInfoCapacity;  /* in: highest index for which `layerInfo` has room */
-    DecodeState *decodeState;    /* in: the packet */
+    uint32_t bitsLeft;          /* out: bits that were not decoded, at the end or at a hand-off */
+    uint8_t layerNumber;        /* in, out: number of the layer; each hand-off adds 1 */
+    uint32_t decoderId;         /* in, out: the host's word for the decoding plug-in */
+    int32_t verdict;            /* out: -52 from the MV pass when a flag is set; else untouched */
+    uint8_t *fieldRecords;      /* in: records of 1000 octets each, written by the MD pass */
+    uint32_t fieldRecordCount;  /* in: index of the record now being written; the host's to move */
+    LayerInfoRecord *layerInfo; /* in: the list of layers (MD, TO) */
+    uint32_t layerInfoCount;    /* in, out: index of the open record of `layerInfo` */
+    uint32_t layerInfoCapacity; /* in: highest index for which `layerInfo` has room */
+    DecodeState *decodeState;   /* in: the packet */
 } PreDecodeContext;
 
 /* One run of the XTR pass. */
@@ -165,7 +165,8 @@ typedef struct KeyFieldRow {
 #ifdef __cplusplus
 #define NETFLOOR_RECORD_SIZE(record, octets) static_assert(sizeof(record) == (octets), "a 32-bit host expects " #octets)
 #else
-#define NETFLOOR_RECORD_SIZE(record, octets) _Static_assert(sizeof(record) == (octets), "a 32-bit host expects " #octets)
+#define NETFLOOR_RECORD_SIZE(record, octets)                                                                           \
+    _Static_assert(sizeof(record) == (octets), "a 32-bit host expects " #octets)
 #endif
 NETFLOOR_RECORD_SIZE(BitRange, 24);
 NETFLOOR_RECORD_SIZE(FieldRecord, 60);

@@ -11,13 +11,14 @@
 namespace netfloor {
 
 // Reverses the working copy from the cursor on as long as it lives, and restores it then; in the passes that report
-// nothing, where no host has a field to look at meanwhile, no more of it than the one address that is read. In the form that
-// tells the host, fields are reported with a bit order of 8.
-template <class Pass> class [[nodiscard]] ReversedBits {
+// nothing, where no host has a field to look at meanwhile, no more of it than the one address that is read. In the form
+// that tells the host, fields are reported with a bit order of 8.
+template <class Pass>
+class [[nodiscard]] ReversedBits {
 public:
     enum class Report : bool { plain, toldToHost };
 
-    ReversedBits(Reader<Pass>& reader, Report report) : at_(reader), outerOrder_(reader.bitOrder) {
+    ReversedBits(Reader<Pass> &reader, Report report) : at_(reader), outerOrder_(reader.bitOrder) {
         if (at_.over()) {
             return;
         }
@@ -53,11 +54,11 @@ public:
         at_.bitOrder = outerOrder_;
     }
 
-    ReversedBits(const ReversedBits&) = delete;
-    ReversedBits& operator=(const ReversedBits&) = delete;
+    ReversedBits(const ReversedBits &) = delete;
+    ReversedBits &operator=(const ReversedBits &) = delete;
 
 private:
-    Reader<Pass>& at_;
+    Reader<Pass> &at_;
     std::uint32_t outerOrder_;
     std::uint32_t start_ = 0; // the octets that are reversed
     std::uint32_t end_ = 0;

@@ -16,7 +16,8 @@ namespace netfloor {
 inline constexpr std::uint32_t bitsPerOctet = 8;
 
 // Reads the bits `first` to `last`, at most 32, where first is not above last.
-[[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t bitsAscending(const std::uint8_t* data, std::uint32_t first, std::uint32_t last) {
+[[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t bitsAscending(const std::uint8_t *data, std::uint32_t first,
+                                                                    std::uint32_t last) {
     const std::uint32_t low = first - 1;
     const std::uint32_t high = last - 1;
     std::uint64_t gathered = 0;
@@ -37,7 +38,8 @@ inline constexpr std::uint32_t bitsPerOctet = 8;
 }
 
 // Reads the bits between `first` and `last`; where first is above last, in reverse order.
-[[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t bits(const std::uint8_t* data, std::uint32_t first, std::uint32_t last) {
+[[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t bits(const std::uint8_t *data, std::uint32_t first,
+                                                           std::uint32_t last) {
     if (static_cast<std::int32_t>(first) <= static_cast<std::int32_t>(last)) {
         return bitsAscending(data, first, last);
     }
@@ -50,12 +52,13 @@ inline constexpr std::uint32_t bitsPerOctet = 8;
 }
 
 // Reads the bits `first` to `last` out of line: the form that need not be fast.
-[[nodiscard, gnu::cold, gnu::noinline]] constexpr std::uint32_t bitsAcross(const std::uint8_t* data, std::uint32_t first, std::uint32_t last) {
+[[nodiscard, gnu::cold, gnu::noinline]] constexpr std::uint32_t bitsAcross(const std::uint8_t *data,
+                                                                           std::uint32_t first, std::uint32_t last) {
     return bitsAscending(data, first, last);
 }
 
 // Reads the 8 bits from bit number `first` on, wherever they lie.
-[[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t octetAt(const std::uint8_t* data, std::uint32_t first) {
+[[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t octetAt(const std::uint8_t *data, std::uint32_t first) {
     if (onOctetBorder(first)) [[likely]] {
         return data[(first - 1) / bitsPerOctet];
     }
@@ -63,7 +66,7 @@ inline constexpr std::uint32_t bitsPerOctet = 8;
 }
 
 // Reads the 4 bits from bit number `first` on, wherever they lie.
-[[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t nibbleAt(const std::uint8_t* data, std::uint32_t first) {
+[[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t nibbleAt(const std::uint8_t *data, std::uint32_t first) {
     const std::uint32_t low = (first - 1) % bitsPerOctet;
     if (low <= 4) [[likely]] {
         return data[(first - 1) / bitsPerOctet] >> low & 0xfu;
@@ -73,14 +76,14 @@ inline constexpr std::uint32_t bitsPerOctet = 8;
 
 // Reads the bits `low` to `high` behind `cursor`. On an octet border their octets and shifts are constants.
 template <std::uint32_t low, std::uint32_t high>
-[[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t pieceAt(const std::uint8_t* data, std::uint32_t cursor) {
+[[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t pieceAt(const std::uint8_t *data, std::uint32_t cursor) {
     if (!onOctetBorder(cursor)) [[unlikely]] {
         return bitsAcross(data, cursor + low, cursor + high);
     }
     constexpr std::uint32_t firstOctet = low / bitsPerOctet;
     constexpr std::uint32_t lastOctet = high / bitsPerOctet;
     constexpr std::uint64_t mask = (std::uint64_t{1} << (high - low + 1)) - 1;
-    const std::uint8_t* const from = data + (cursor - 1) / bitsPerOctet;
+    const std::uint8_t *const from = data + (cursor - 1) / bitsPerOctet;
     std::uint64_t gathered = 0;
     for (std::uint32_t octet = lastOctet + 1; octet-- > firstOctet;) {
         gathered = gathered << bitsPerOctet | from[octet];
@@ -88,20 +91,23 @@ template <std::uint32_t low, std::uint32_t high>
     return static_cast<std::uint32_t>(gathered >> (low % bitsPerOctet) & mask);
 }
 
-[[nodiscard, gnu::cold, gnu::noinline]] constexpr std::uint32_t octetsAcross(const std::uint8_t* data, std::uint32_t first, std::uint32_t count) {
+[[nodiscard, gnu::cold, gnu::noinline]] constexpr std::uint32_t octetsAcross(const std::uint8_t *data,
+                                                                             std::uint32_t first, std::uint32_t count) {
     std::uint32_t value = 0;
     for (std::uint32_t octet = 0; octet < count; ++octet) {
-        value = value << bitsPerOctet | bitsAscending(data, first + octet * bitsPerOctet, first + octet * bitsPerOctet + bitsPerOctet - 1);
+        value = value << bitsPerOctet |
+                bitsAscending(data, first + octet * bitsPerOctet, first + octet * bitsPerOctet + bitsPerOctet - 1);
     }
     return value;
 }
 
 // Reads `count` octets from bit number `first` on in network order; of more than four the last four stay.
-[[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t octetsAt(const std::uint8_t* data, std::uint32_t first, std::uint32_t count) {
+[[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t octetsAt(const std::uint8_t *data, std::uint32_t first,
+                                                               std::uint32_t count) {
     if (!onOctetBorder(first)) [[unlikely]] {
         return octetsAcross(data, first, count);
     }
-    const std::uint8_t* const from = data + (first - 1) / bitsPerOctet;
+    const std::uint8_t *const from = data + (first - 1) / bitsPerOctet;
     std::uint32_t value = 0;
     for (std::uint32_t octet = 0; octet < count; ++octet) {
         value = value << bitsPerOctet | from[octet];
@@ -119,7 +125,7 @@ inline constexpr auto reversedOctets = [] {
 
 // Reverses the bits of each octet of `data` from bit number `from` on, up to the last whole octet of a
 // packet of `totalBits`. Off an octet border the octets are those counted from `from` on.
-constexpr void reverseOctets(std::uint8_t* data, std::uint32_t from, std::uint32_t totalBits) {
+constexpr void reverseOctets(std::uint8_t *data, std::uint32_t from, std::uint32_t totalBits) {
     const std::uint32_t shift = (from - 1) % bitsPerOctet;
     const std::uint32_t end = totalBits / bitsPerOctet;
     std::uint32_t octet = (from - 1) / bitsPerOctet;

@@ -9,9 +9,10 @@
 namespace netfloor {
 
 // A block.
-template <class Pass> class [[nodiscard]] Block {
+template <class Pass>
+class [[nodiscard]] Block {
 public:
-    NETFLOOR_INLINE Block(Reader<Pass>& reader, BlockName name) : at_(reader), outer_(reader.block) {
+    NETFLOOR_INLINE Block(Reader<Pass> &reader, BlockName name) : at_(reader), outer_(reader.block) {
         at_.block = name;
         if (!at_.over()) {
             at_.openBlock();
@@ -25,21 +26,22 @@ public:
         }
     }
 
-    Block(const Block&) = delete;
-    Block& operator=(const Block&) = delete;
+    Block(const Block &) = delete;
+    Block &operator=(const Block &) = delete;
 
 private:
-    Reader<Pass>& at_;
+    Reader<Pass> &at_;
     BlockName outer_;
 };
 
 // A block with a length of its own: it narrows the limit, has its own live flag, and skips at its end what
 // nothing has read. The live flag of the enclosing production comes back at the end, so that what is cut
 // short inside the block does not stop what stands around it.
-template <class Pass> class [[nodiscard]] LimitedBlock {
+template <class Pass>
+class [[nodiscard]] LimitedBlock {
 public:
     // Opens the block; `limit` must follow, once the length is known.
-    NETFLOOR_INLINE LimitedBlock(Reader<Pass>& reader, BlockName name)
+    NETFLOOR_INLINE LimitedBlock(Reader<Pass> &reader, BlockName name)
         : at_(reader), outer_(reader.block), outerLive_(reader.live) {
         at_.block = name;
         if (!at_.over() && at_.openBlock()) {
@@ -48,7 +50,7 @@ public:
     }
 
     // Opens the block with a length in bits.
-    NETFLOOR_INLINE LimitedBlock(Reader<Pass>& reader, BlockName name, std::uint32_t bitCount)
+    NETFLOOR_INLINE LimitedBlock(Reader<Pass> &reader, BlockName name, std::uint32_t bitCount)
         : LimitedBlock(reader, name) {
         limit(bitCount);
     }
@@ -72,11 +74,11 @@ public:
         at_.live = outerLive_;
     }
 
-    LimitedBlock(const LimitedBlock&) = delete;
-    LimitedBlock& operator=(const LimitedBlock&) = delete;
+    LimitedBlock(const LimitedBlock &) = delete;
+    LimitedBlock &operator=(const LimitedBlock &) = delete;
 
 private:
-    Reader<Pass>& at_;
+    Reader<Pass> &at_;
     BlockName outer_;
     bool outerLive_;
 };
@@ -84,9 +86,10 @@ private:
 // The blocks of a chain, in which each link stands inside the one before: they stay open until the chain is
 // through. A chain is a loop, so that the native stack does not grow with the packet; closing all blocks at
 // its end leaves the same as if each link had been a call.
-template <class Pass> class [[nodiscard]] BlockChain {
+template <class Pass>
+class [[nodiscard]] BlockChain {
 public:
-    NETFLOOR_INLINE explicit BlockChain(Reader<Pass>& reader) : at_(reader), outer_(reader.block) {}
+    NETFLOOR_INLINE explicit BlockChain(Reader<Pass> &reader) : at_(reader), outer_(reader.block) {}
 
     // Opens the next block, inside the others.
     NETFLOOR_INLINE void open(BlockName name) {
@@ -120,11 +123,11 @@ public:
         at_.block = outer_;
     }
 
-    BlockChain(const BlockChain&) = delete;
-    BlockChain& operator=(const BlockChain&) = delete;
+    BlockChain(const BlockChain &) = delete;
+    BlockChain &operator=(const BlockChain &) = delete;
 
 private:
-    Reader<Pass>& at_;
+    Reader<Pass> &at_;
     BlockName outer_;
     std::uint32_t blocks_ = 0;
     std::uint32_t limits_ = 0;
@@ -132,7 +135,8 @@ private:
 
 // Runs a production out of line: the caller's reader is not touched by the call, and so can stay in
 // registers, and so can the production's own.
-template <auto production, class Pass> [[gnu::noinline]] void outOfLine(Reader<Pass>& reader) {
+template <auto production, class Pass>
+[[gnu::noinline]] void outOfLine(Reader<Pass> &reader) {
     Reader<Pass> at = reader;
     at.forget();
     production(at);
@@ -140,7 +144,8 @@ template <auto production, class Pass> [[gnu::noinline]] void outOfLine(Reader<P
     reader = at;
 }
 
-template <auto production, class Pass> NETFLOOR_INLINE inline void apart(Reader<Pass>& at) {
+template <auto production, class Pass>
+NETFLOOR_INLINE inline void apart(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }

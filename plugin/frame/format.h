@@ -23,7 +23,7 @@ struct Format {
     std::array<Conversion, most> conversion = {};
     std::size_t conversions = 0;
     Conversion element = Conversion::none; // of a list: how each element is shown
-    std::string_view separator = "";       // of a list: what stands between two elements
+    std::string_view separator = {};       // of a list: what stands between two elements
     bool wellFormed = true;
 
     [[nodiscard]] constexpr bool has(Conversion wanted) const {
@@ -38,14 +38,10 @@ struct Format {
 
 [[nodiscard]] constexpr Conversion numberConversion(char letter) {
     switch (letter) {
-    case 'u':
-        return Conversion::decimal;
-    case 'x':
-        return Conversion::hexadecimal;
-    case 'c':
-        return Conversion::character;
-    default:
-        return Conversion::none;
+    case 'u': return Conversion::decimal;
+    case 'x': return Conversion::hexadecimal;
+    case 'c': return Conversion::character;
+    default: return Conversion::none;
     }
 }
 

@@ -28,7 +28,8 @@ inline constexpr std::uint32_t serverPorts = 9000;
 // The signalling of the control plane, on either side: looked up without the protocol.
 inline constexpr std::uint32_t signallingPort = 3452;
 
-[[nodiscard]] constexpr NextLayer chooseNextLayer(std::uint32_t source, std::uint32_t destination, std::uint32_t protocol) {
+[[nodiscard]] constexpr NextLayer chooseNextLayer(std::uint32_t source, std::uint32_t destination,
+                                                  std::uint32_t protocol) {
     const auto byPort = [](std::uint32_t port) { return NextLayer{port, port, true, port != signallingPort}; };
     if (source < wellKnownPorts || source == signallingPort) {
         return byPort(source);
@@ -44,8 +45,9 @@ inline constexpr std::uint32_t signallingPort = 3452;
 
 // Tells the next layer how many octets it has, and how many of the IPv4 datagram stand in front of them. Over
 // IPv6 the latter is the negated payload, as no Total Length was read.
-template <class Pass> NETFLOOR_INLINE inline void tellNextLayer(Reader<Pass>& at) {
-    const auto& variables = at.variables();
+template <class Pass>
+NETFLOOR_INLINE inline void tellNextLayer(Reader<Pass> &at) {
+    const auto &variables = at.variables();
     const auto payloadOctets = static_cast<std::uint32_t>(variables.payloadOctets);
     at.state->scratch[NETFLOOR_NEXT_LAYER_OCTETS] = payloadOctets;
     at.state->scratch[NETFLOOR_PRECEDING_OCTETS] = variables.ipTotalLength - payloadOctets;
@@ -53,11 +55,12 @@ template <class Pass> NETFLOOR_INLINE inline void tellNextLayer(Reader<Pass>& at
 
 // Hands the rest of the packet to the owner of the next layer. The XTR pass ends here; the others come back
 // with the cursor where the next layer left it.
-template <class Pass> NETFLOOR_INLINE inline void handOff(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void handOff(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }
-    const auto& variables = at.variables();
+    const auto &variables = at.variables();
     const Block<Pass> choice{at, ""};
     const NextLayer next = chooseNextLayer(variables.sourcePort, variables.destinationPort, variables.ipProtocol);
     if (next.writesPort && !at.over()) {
@@ -67,7 +70,7 @@ template <class Pass> NETFLOOR_INLINE inline void handOff(Reader<Pass>& at) {
     if (at.over()) {
         return;
     }
-    LayerFrame& frame = at.state->layerFrames[at.state->layerIndex];
+    LayerFrame &frame = at.state->layerFrames[at.state->layerIndex];
     frame.nextLayerKey = next.key;
     if (next.writesProtocol) {
         frame.nextLayerProtocol = variables.ipProtocol;

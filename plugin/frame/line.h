@@ -24,10 +24,11 @@ public:
 
     using Buffer = std::array<char, most + 1 + slack>;
 
-    NETFLOOR_INLINE explicit Line(Buffer& buffer) : text_(buffer.data()), end_(text_) {}
+    NETFLOOR_INLINE explicit Line(Buffer &buffer) : text_(buffer.data()), end_(text_) {}
 
     // Appends a text whose length is known where it is written. One of no length may be null.
-    template <std::size_t size> NETFLOOR_INLINE void appendLiteral(const char* text) {
+    template <std::size_t size>
+    NETFLOOR_INLINE void appendLiteral(const char *text) {
         if constexpr (size > 0) {
             std::memcpy(end_, text, size);
             end_ += size;
@@ -35,14 +36,15 @@ public:
     }
 
     // Appends a number as a conversion shows it. A zero octet adds no character, as it would end the text.
-    template <Conversion conversion, std::uint32_t bitCount> NETFLOOR_INLINE void appendNumber(std::uint32_t value) {
+    template <Conversion conversion, std::uint32_t bitCount>
+    NETFLOOR_INLINE void appendNumber(std::uint32_t value) {
         if constexpr (conversion == Conversion::character) {
             *end_ = static_cast<char>(value);
             end_ += *end_ == '\0' ? 0 : 1;
         } else if constexpr (conversion == Conversion::hexadecimal) {
             end_ = writeHexadecimal(end_, value);
         } else if constexpr (bitCount <= bitsPerOctet) {
-            const OctetText& octet = octetTexts[value & 0xff];
+            const OctetText &octet = octetTexts[value & 0xff];
             std::memcpy(end_, octet.text.data(), octet.text.size());
             end_ += octet.size;
         } else {
@@ -51,9 +53,11 @@ public:
     }
 
     // Appends the name of a value; a name that is a format is filled with the value.
-    template <const ValueNames& names, bool brief> NETFLOOR_INLINE void appendName(std::uint32_t value) {
+    template <const ValueNames &names, bool brief>
+    NETFLOOR_INLINE void appendName(std::uint32_t value) {
         static constexpr Format otherwise = parseFormat(otherName(names, brief));
-        static_assert(otherwise.wellFormed && otherwise.conversions <= 1, "the name of other values takes one number at most");
+        static_assert(otherwise.wellFormed && otherwise.conversions <= 1,
+                      "the name of other values takes one number at most");
         const std::uint32_t row = rowNumber<names>(value);
         if constexpr (otherwise.conversions == 1) {
             if (row == 0) {
@@ -63,14 +67,14 @@ public:
                 return;
             }
         }
-        const auto& name = nameTexts<names, brief>[row];
+        const auto &name = nameTexts<names, brief>[row];
         std::memcpy(end_, name.text.data(), name.text.size());
         end_ += name.length;
     }
 
     // Appends the elements of a field; stops at the end of the buffer.
     template <Conversion conversion, std::uint32_t bitCount>
-    NETFLOOR_INLINE void appendElements(const BitRange* ranges, std::uint32_t count, std::string_view separator) {
+    NETFLOOR_INLINE void appendElements(const BitRange *ranges, std::uint32_t count, std::string_view separator) {
         for (std::uint32_t element = 0; element < count && !full(); ++element) {
             if (element > 0 && !separator.empty()) {
                 std::memcpy(end_, separator.data(), separator.size());
@@ -80,37 +84,36 @@ public:
         }
     }
 
-    [[nodiscard]] NETFLOOR_INLINE bool full() const {
-        return end_ > text_ + most;
-    }
+    [[nodiscard]] NETFLOOR_INLINE bool full() const { return end_ > text_ + most; }
 
     // Ends the text, and gives it.
-    NETFLOOR_INLINE const char* terminated() {
+    NETFLOOR_INLINE const char *terminated() {
         text_[std::min<std::size_t>(static_cast<std::size_t>(end_ - text_), most)] = '\0';
         return text_;
     }
 
 private:
-    char* text_;
-    char* end_; // the line itself lives in registers, the text in the buffer
+    char *text_;
+    char *end_; // the line itself lives in registers, the text in the buffer
 };
 
-template <const Field& field, const Format& format, std::size_t index>
-NETFLOOR_INLINE inline void appendConversion(Line& line, std::uint32_t value, const FieldRecord& record) {
+template <const Field &field, const Format &format, std::size_t index>
+NETFLOOR_INLINE inline void appendConversion(Line &line, std::uint32_t value, const FieldRecord &record) {
     constexpr Conversion conversion = format.conversion[index];
     if constexpr (conversion == Conversion::name || conversion == Conversion::briefName) {
         line.appendName<*field.names, conversion == Conversion::briefName>(value);
     } else if constexpr (conversion == Conversion::list) {
         line.appendElements<format.element, field.place.elementBits()>(
-            record.ranges, field.place.isRun() ? record.rangeCount : field.place.elements(field.place.count), format.separator);
+            record.ranges, field.place.isRun() ? record.rangeCount : field.place.elements(field.place.count),
+            format.separator);
     } else {
         line.appendNumber<conversion, field.place.isRun() ? 32 : field.place.width() * field.place.scale>(value);
     }
 }
 
 // Builds the text of a field. Behind the elements of a run there may be no room for more.
-template <const Field& field, const Format& format>
-NETFLOOR_INLINE inline void fill(Line& line, std::uint32_t value, const FieldRecord& record) {
+template <const Field &field, const Format &format>
+NETFLOOR_INLINE inline void fill(Line &line, std::uint32_t value, const FieldRecord &record) {
     static_assert(format.literal[0].size() <= Line::most, "a field's name fills no line");
     line.appendLiteral<format.literal[0].size()>(format.literal[0].data());
     if constexpr (format.conversions > 0) {

@@ -34,7 +34,7 @@ struct OptionArea {
 
 // The place of every type in the order of turns; behind the last one where the type is not known.
 template <std::size_t count>
-[[nodiscard]] consteval std::array<std::uint8_t, 256> turnsOf(const std::array<std::uint8_t, count>& types) {
+[[nodiscard]] consteval std::array<std::uint8_t, 256> turnsOf(const std::array<std::uint8_t, count> &types) {
     std::array<std::uint8_t, 256> turns{};
     turns.fill(count);
     for (std::size_t turn = 0; turn < count; ++turn) {
@@ -43,11 +43,12 @@ template <std::size_t count>
     return turns;
 }
 
-template <const auto& types> inline constexpr auto turnOf = turnsOf(types);
+template <const auto &types>
+inline constexpr auto turnOf = turnsOf(types);
 
 // Looks whose turn, from `turn` on, takes the option under the cursor: types.size() where none does.
-template <const auto& types, class Pass>
-[[nodiscard]] NETFLOOR_INLINE inline std::size_t nextTaker(Reader<Pass>& at, std::size_t turn) {
+template <const auto &types, class Pass>
+[[nodiscard]] NETFLOOR_INLINE inline std::size_t nextTaker(Reader<Pass> &at, std::size_t turn) {
     const std::optional<std::uint32_t> type = look(at, octets(1));
     if (!type || turnOf<types>[*type] < turn) {
         return types.size();
@@ -56,8 +57,8 @@ template <const auto& types, class Pass>
 }
 
 // An option of one octet.
-template <const Field& type, class Pass>
-NETFLOOR_INLINE inline void optionOfOneOctet(Reader<Pass>& at, BlockName name, OptionArea& area) {
+template <const Field &type, class Pass>
+NETFLOOR_INLINE inline void optionOfOneOctet(Reader<Pass> &at, BlockName name, OptionArea &area) {
     const Block<Pass> option{at, name};
     read<type>(at);
     if (at.live) {
@@ -66,16 +67,17 @@ NETFLOOR_INLINE inline void optionOfOneOctet(Reader<Pass>& at, BlockName name, O
 }
 
 // The block of an option with a length: its limit is read ahead.
-template <class Pass> class [[nodiscard]] OptionBlock : public LimitedBlock<Pass> {
+template <class Pass>
+class [[nodiscard]] OptionBlock : public LimitedBlock<Pass> {
 public:
-    NETFLOOR_INLINE OptionBlock(Reader<Pass>& reader, BlockName name) : LimitedBlock<Pass>(reader, name) {
+    NETFLOOR_INLINE OptionBlock(Reader<Pass> &reader, BlockName name) : LimitedBlock<Pass>(reader, name) {
         this->limit(look(reader, piece(8, 15)).value_or(0) * bitsPerOctet);
     }
 };
 
 // Reads the type and the length of an option, which counts for as many octets as its length says.
-template <const Field& type, const Field& length, class Pass>
-NETFLOOR_INLINE inline void optionHead(Reader<Pass>& at, OptionArea& area) {
+template <const Field &type, const Field &length, class Pass>
+NETFLOOR_INLINE inline void optionHead(Reader<Pass> &at, OptionArea &area) {
     read<type>(at);
     std::int32_t lengthOctets = 0;
     read<length>(at, &lengthOctets);
@@ -85,8 +87,8 @@ NETFLOOR_INLINE inline void optionHead(Reader<Pass>& at, OptionArea& area) {
 }
 
 // The same for an option that counts for a fixed number of octets, whatever its length says.
-template <const Field& type, const Field& length, class Pass>
-NETFLOOR_INLINE inline void optionHead(Reader<Pass>& at, OptionArea& area, std::int32_t countedOctets) {
+template <const Field &type, const Field &length, class Pass>
+NETFLOOR_INLINE inline void optionHead(Reader<Pass> &at, OptionArea &area, std::int32_t countedOctets) {
     read<type>(at);
     read<length>(at);
     if (at.live) {

@@ -22,23 +22,24 @@ inline constexpr std::int32_t faultyVerdict = -52;
 inline constexpr std::size_t decodedFieldOctets = 1000;
 
 // The list of layers, which the MD and TO passes keep.
-inline void openLayerInfo(PreDecodeContext& context, std::uint32_t decoderId) {
+inline void openLayerInfo(PreDecodeContext &context, std::uint32_t decoderId) {
     if (context.layerInfoCount > context.layerInfoCapacity) {
         hs_CreateNewLayerInfo(&context);
     }
-    LayerInfoRecord& layer = context.layerInfo[context.layerInfoCount];
+    LayerInfoRecord &layer = context.layerInfo[context.layerInfoCount];
     layer.firstBit = context.decodeState->cursor;
     layer.decoderId = decoderId;
     layer.layerNumber = context.layerNumber;
 }
 
-inline void closeLayerInfo(PreDecodeContext& context) {
+inline void closeLayerInfo(PreDecodeContext &context) {
     context.layerInfo[context.layerInfoCount].lastBit = context.decodeState->cursor - 1;
     ++context.layerInfoCount;
 }
 
 // What the three passes with a PreDecodeContext share.
-template <class Grammar, std::uint32_t mode> struct PreDecodePass {
+template <class Grammar, std::uint32_t mode>
+struct PreDecodePass {
     using Context = PreDecodeContext;
     using Variables = typename Grammar::Variables;
 
@@ -48,17 +49,15 @@ template <class Grammar, std::uint32_t mode> struct PreDecodePass {
     static inline constinit LastRead last{};
     static inline constinit std::uint32_t savedDecoderId = 0;
 
-    static constexpr bool raises(Mark found) {
-        return mode == NETFLOOR_MODE_MV || found == Mark::expectation;
-    }
+    static constexpr bool raises(Mark found) { return mode == NETFLOOR_MODE_MV || found == Mark::expectation; }
 
-    static void giveVerdict(PreDecodeContext& context) {
+    static void giveVerdict(PreDecodeContext &context) {
         if constexpr (mode == NETFLOOR_MODE_MV) {
             context.verdict = faultyVerdict;
         }
     }
 
-    static bool enter(PreDecodeContext& context) {
+    static bool enter(PreDecodeContext &context) {
         if constexpr (reports) {
             openLayerInfo(context, context.decoderId);
         }
@@ -66,7 +65,7 @@ template <class Grammar, std::uint32_t mode> struct PreDecodePass {
         return true;
     }
 
-    static void leave(PreDecodeContext& context) {
+    static void leave(PreDecodeContext &context) {
         if constexpr (reports) {
             closeLayerInfo(context);
         }
@@ -74,7 +73,7 @@ template <class Grammar, std::uint32_t mode> struct PreDecodePass {
 
     // Runs the owner of the next layer. A nested run of this pass leaves its own
     // decoder id behind; that is the one put back.
-    static Outcome transfer(PreDecodeContext& context) {
+    static Outcome transfer(PreDecodeContext &context) {
         if constexpr (reports) {
             closeLayerInfo(context);
         }
@@ -91,13 +90,15 @@ template <class Grammar, std::uint32_t mode> struct PreDecodePass {
 };
 
 // MD: the long text of each field, with its name, id and bit ranges.
-template <class Grammar> struct MdPass : PreDecodePass<Grammar, NETFLOOR_MODE_MD> {
+template <class Grammar>
+struct MdPass : PreDecodePass<Grammar, NETFLOOR_MODE_MD> {
     static inline constinit Line::Buffer buffer{};
 
-    template <const Field& field> NETFLOOR_INLINE static void output(Reader<MdPass>& at, std::uint32_t value) {
+    template <const Field &field>
+    NETFLOOR_INLINE static void output(Reader<MdPass> &at, std::uint32_t value) {
         static constexpr Format format = parseFormat(field.line);
-        const FieldRecord& record = at.state->fieldRecord;
-        std::uint8_t* const decoded = at.context->fieldRecords + at.context->fieldRecordCount * decodedFieldOctets;
+        const FieldRecord &record = at.state->fieldRecord;
+        std::uint8_t *const decoded = at.context->fieldRecords + at.context->fieldRecordCount * decodedFieldOctets;
         decoded[0] = at.context->layerNumber;
         decoded[1] = 0;
         if constexpr (field.place.shape != Shape::groups) {
@@ -105,16 +106,18 @@ template <class Grammar> struct MdPass : PreDecodePass<Grammar, NETFLOOR_MODE_MD
         }
         Line line(buffer);
         fill<field, format>(line, value, record);
-        hs_AddDecodedFieldsData(at.context, record.outputRangeCount, record.ranges, line.terminated(), 0, record.fieldName,
-                                field.id, 0, at.bitOrder);
+        hs_AddDecodedFieldsData(at.context, record.outputRangeCount, record.ranges, line.terminated(), 0,
+                                record.fieldName, field.id, 0, at.bitOrder);
     }
 };
 
 // TO: the short text of each field.
-template <class Grammar> struct ToPass : PreDecodePass<Grammar, NETFLOOR_MODE_TO> {
+template <class Grammar>
+struct ToPass : PreDecodePass<Grammar, NETFLOOR_MODE_TO> {
     static inline constinit Line::Buffer buffer{};
 
-    template <const Field& field> NETFLOOR_INLINE static void output(Reader<ToPass>& at, std::uint32_t value) {
+    template <const Field &field>
+    NETFLOOR_INLINE static void output(Reader<ToPass> &at, std::uint32_t value) {
         static constexpr Format format = parseFormat(field.display());
         Line line(buffer);
         fill<field, format>(line, value, at.state->fieldRecord);
@@ -123,14 +126,17 @@ template <class Grammar> struct ToPass : PreDecodePass<Grammar, NETFLOOR_MODE_TO
 };
 
 // MV: the verdict.
-template <class Grammar> struct MvPass : PreDecodePass<Grammar, NETFLOOR_MODE_MV> {
-    template <const Field& field> NETFLOOR_INLINE static void output(Reader<MvPass>& at, std::uint32_t, std::uint32_t) {
+template <class Grammar>
+struct MvPass : PreDecodePass<Grammar, NETFLOOR_MODE_MV> {
+    template <const Field &field>
+    NETFLOOR_INLINE static void output(Reader<MvPass> &at, std::uint32_t, std::uint32_t) {
         at.check();
     }
 };
 
 // XTR: the values of the key fields.
-template <class Grammar> struct XtrPass {
+template <class Grammar>
+struct XtrPass {
     using Context = XtrContext;
     using Variables = typename Grammar::Variables;
 
@@ -141,16 +147,15 @@ template <class Grammar> struct XtrPass {
     static inline constinit std::int32_t keyFieldStatus = 0;
     static inline constinit std::uint16_t presenceRow = 0;
 
-    static constexpr bool raises(Mark found) {
-        return found == Mark::expectation;
-    }
+    static constexpr bool raises(Mark found) { return found == Mark::expectation; }
 
-    static void giveVerdict(XtrContext&) {}
+    static void giveVerdict(XtrContext &) {}
 
     // Sets the key fields up until the host says they are, once and for all. False when it refuses.
-    static bool enter(XtrContext& context) {
+    static bool enter(XtrContext &context) {
         if (keyFieldStatus == 0) {
-            keyFieldStatus = hx_InitialiseOptXTR(Grammar::keyRows.data(), static_cast<std::uint32_t>(Grammar::keyRows.size()), &presenceRow);
+            keyFieldStatus = hx_InitialiseOptXTR(Grammar::keyRows.data(),
+                                                 static_cast<std::uint32_t>(Grammar::keyRows.size()), &presenceRow);
         }
         if (keyFieldStatus < 0) {
             return false;
@@ -161,17 +166,16 @@ template <class Grammar> struct XtrPass {
         return true;
     }
 
-    static void leave(XtrContext&) {}
+    static void leave(XtrContext &) {}
 
     // The pass ends at a hand-off: the host goes on by itself.
-    static Outcome transfer(XtrContext&) {
-        return Outcome::stopped;
-    }
+    static Outcome transfer(XtrContext &) { return Outcome::stopped; }
 
-    template <const Field& field> NETFLOOR_INLINE static void output(Reader<XtrPass>& at, std::uint32_t start, std::uint32_t units) {
+    template <const Field &field>
+    NETFLOOR_INLINE static void output(Reader<XtrPass> &at, std::uint32_t start, std::uint32_t units) {
         constexpr std::uint32_t row = Grammar::template keyRow<field>;
         if constexpr (row != Grammar::noKeyRow) {
-            const KeyFieldRow& key = Grammar::keyRows[row];
+            const KeyFieldRow &key = Grammar::keyRows[row];
             markPresent(*at.context, key);
             if constexpr (field.place.shape == Shape::addressNibbles) {
                 if (!storeAddress(*at.context, key, at.data, start)) {
@@ -185,25 +189,28 @@ template <class Grammar> struct XtrPass {
     }
 
 private:
-    NETFLOOR_INLINE static void markPresent(const XtrContext& context, const KeyFieldRow& row) {
-        std::uint8_t& presence = context.keyRecord[row.presenceOffset];
+    NETFLOOR_INLINE static void markPresent(const XtrContext &context, const KeyFieldRow &row) {
+        std::uint8_t &presence = context.keyRecord[row.presenceOffset];
         presence = static_cast<std::uint8_t>(presence | row.presenceMask);
     }
 
-    template <const Field& field>
-    NETFLOOR_INLINE static void storeNumber(Reader<XtrPass>& at, const KeyFieldRow& row, std::uint32_t start, std::uint32_t units) {
+    template <const Field &field>
+    NETFLOOR_INLINE static void storeNumber(Reader<XtrPass> &at, const KeyFieldRow &row, std::uint32_t start,
+                                            std::uint32_t units) {
         constexpr std::uint32_t width = field.place.width();
         static_assert(width > 0 && width <= 32, "a key field is a number of up to 32 bits, or an address");
-        using Stored = std::conditional_t<width <= 8, std::uint8_t, std::conditional_t<width <= 16, std::uint16_t, std::uint32_t>>;
+        using Stored =
+            std::conditional_t<width <= 8, std::uint8_t, std::conditional_t<width <= 16, std::uint16_t, std::uint32_t>>;
         const auto value = static_cast<Stored>(valueAt<field>(at.data, start, units) * field.place.scale);
         std::memcpy(at.context->keyRecord + row.valueOffset, &value, sizeof value);
     }
 
     // Stores an address as a string of octets, each with its two nibbles exchanged, as the nibbles were read.
     // The room test counts one octet more than is written. False when there is no room.
-    static bool storeAddress(XtrContext& context, const KeyFieldRow& row, const std::uint8_t* data, std::uint32_t start) {
+    static bool storeAddress(XtrContext &context, const KeyFieldRow &row, const std::uint8_t *data,
+                             std::uint32_t start) {
         constexpr std::uint32_t octetCount = addressBits / bitsPerOctet;
-        std::uint8_t* const place = context.keyRecord + row.valueOffset;
+        std::uint8_t *const place = context.keyRecord + row.valueOffset;
         const std::array<std::uint16_t, 2> lengthAndPlace = {addressBits, context.byteAreaOffset};
         std::memcpy(place, lengthAndPlace.data(), sizeof lengthAndPlace);
         if (octetCount >= context.byteAreaSize) {
@@ -213,7 +220,7 @@ private:
             std::memcpy(place, &failed, sizeof failed);
             return false;
         }
-        std::uint8_t* const area = context.keyRecord + context.byteAreaOffset;
+        std::uint8_t *const area = context.keyRecord + context.byteAreaOffset;
         for (std::uint32_t octet = 0; octet < octetCount; ++octet) {
             const std::uint32_t value = octetAt(data, start + octet * bitsPerOctet);
             area[octet] = static_cast<std::uint8_t>(value << nibbleBits | value >> nibbleBits);

@@ -29,9 +29,7 @@ struct Piece {
     std::uint32_t low;
     std::uint32_t high;
 
-    [[nodiscard]] constexpr std::uint32_t width() const {
-        return high - low + 1;
-    }
+    [[nodiscard]] constexpr std::uint32_t width() const { return high - low + 1; }
 };
 
 inline constexpr std::uint32_t addressGroupCount = 8;
@@ -42,19 +40,15 @@ inline constexpr std::uint32_t addressBits = addressGroupCount * groupBits;
 
 struct Place {
     Shape shape;
-    std::uint32_t count;               // pieces or units (octets, groups, nibbles); 0: told by the packet
-    std::array<Piece, 4> pieces = {};  // of `pieces` and `ahead`
-    std::uint32_t advance = 0;         // bits that the cursor moves on; for a run: bits for each unit
-    std::uint32_t scale = 1;           // the value is shown and stored multiplied by this
-    std::uint32_t mostUnits = 0;       // of a run: the most units that are taken; 0: no bound
+    std::uint32_t count;              // pieces or units (octets, groups, nibbles); 0: told by the packet
+    std::array<Piece, 4> pieces = {}; // of `pieces` and `ahead`
+    std::uint32_t advance = 0;        // bits that the cursor moves on; for a run: bits for each unit
+    std::uint32_t scale = 1;          // the value is shown and stored multiplied by this
+    std::uint32_t mostUnits = 0;      // of a run: the most units that are taken; 0: no bound
 
-    [[nodiscard]] constexpr bool isRun() const {
-        return count == 0;
-    }
+    [[nodiscard]] constexpr bool isRun() const { return count == 0; }
 
-    [[nodiscard]] constexpr bool isPieces() const {
-        return shape == Shape::pieces || shape == Shape::ahead;
-    }
+    [[nodiscard]] constexpr bool isPieces() const { return shape == Shape::pieces || shape == Shape::ahead; }
 
     // Elements that the field fills.
     [[nodiscard]] constexpr std::uint32_t elements(std::uint32_t units) const {
@@ -63,9 +57,7 @@ struct Place {
 
     // True where a field is read only when its bits are left. An address in groups and what is shown ahead
     // are read without that test, also from behind the limit, as far as the packet reaches.
-    [[nodiscard]] constexpr bool isTested() const {
-        return shape != Shape::groups && shape != Shape::ahead;
-    }
+    [[nodiscard]] constexpr bool isTested() const { return shape != Shape::groups && shape != Shape::ahead; }
 
     // Bits that must be left for a field of so many units; for one that is not tested, left in the packet.
     [[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t needs(std::uint32_t units) const {
@@ -88,12 +80,9 @@ struct Place {
     [[nodiscard]] constexpr std::uint32_t unitBits() const {
         switch (shape) {
         case Shape::octets:
-        case Shape::octetsBackward:
-            return bitsPerOctet;
-        case Shape::nibbles:
-            return nibbleBits;
-        default:
-            return groupBits;
+        case Shape::octetsBackward: return bitsPerOctet;
+        case Shape::nibbles: return nibbleBits;
+        default: return groupBits;
         }
     }
 

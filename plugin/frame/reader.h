@@ -41,26 +41,25 @@ enum class Outcome : std::uint8_t {
 
 // The name of a block: a literal, whose length is known where it is written.
 struct BlockName {
-    const char* text = nullptr;
+    const char *text = nullptr;
     std::size_t size = 0;
 
     BlockName() = default;
-    template <std::size_t octets> consteval BlockName(const char (&literal)[octets]) : text(literal), size(octets - 1) {}
+    template <std::size_t octets>
+    consteval BlockName(const char (&literal)[octets]) : text(literal), size(octets - 1) {}
 
     // Copies the name and its terminating zero.
-    NETFLOOR_INLINE void copyTo(char* buffer) const {
-        std::memcpy(buffer, text, size + 1);
-    }
+    NETFLOOR_INLINE void copyTo(char *buffer) const { std::memcpy(buffer, text, size + 1); }
 };
 
 // Writes a field that was read at `cursor` into the field record.
-using RecordWriter = void (*)(FieldRecord& record, const std::uint8_t* data, std::uint32_t cursor, std::uint32_t units);
+using RecordWriter = void (*)(FieldRecord &record, const std::uint8_t *data, std::uint32_t cursor, std::uint32_t units);
 
 // Starts the record of a field whose elements are still to be read.
-using RecordBeginning = void (*)(FieldRecord& record);
+using RecordBeginning = void (*)(FieldRecord &record);
 
-template <const Field& field>
-void writeRecord(FieldRecord& record, const std::uint8_t* data, std::uint32_t cursor, std::uint32_t units) {
+template <const Field &field>
+void writeRecord(FieldRecord &record, const std::uint8_t *data, std::uint32_t cursor, std::uint32_t units) {
     beginRecord<field>(record);
     writeElements<field>(record, data, cursor, field.place.isRun() ? units : field.place.count);
 }
@@ -70,8 +69,8 @@ void writeRecord(FieldRecord& record, const std::uint8_t* data, std::uint32_t cu
 struct LastRead {
     RecordWriter writer = nullptr; // of the last field; null: the record is up to date
     std::uint32_t cursor = 0;      // where that field lies
-    std::uint32_t units = 0;      // of a run
-    std::uint32_t seenPieces = 0; // pieces of a look ahead behind that field; 0: there was none
+    std::uint32_t units = 0;       // of a run
+    std::uint32_t seenPieces = 0;  // pieces of a look ahead behind that field; 0: there was none
     std::uint32_t seenFirst = 0;
     std::uint32_t seenWidth = 0;
 };
@@ -84,13 +83,14 @@ struct Unsettled {
     std::uint32_t blocks = 0; // on the stack behind the last push; 0: there was none
 };
 
-template <class Pass> class Reader {
+template <class Pass>
+class Reader {
 public:
     using Context = typename Pass::Context;
 
-    Context* context;
-    DecodeState* state;
-    std::uint8_t* data;
+    Context *context;
+    DecodeState *state;
+    std::uint8_t *data;
     std::uint32_t cursor;
     std::uint32_t left;
     std::uint32_t blockDepth;
@@ -107,21 +107,19 @@ public:
     std::uint32_t sureBlocks = 0; // blocks that there is room for
     Unsettled unsettled = {};
 
-    NETFLOOR_INLINE explicit Reader(Context& passContext) : context(&passContext), state(passContext.decodeState) {
+    NETFLOOR_INLINE explicit Reader(Context &passContext) : context(&passContext), state(passContext.decodeState) {
         takeState();
     }
 
-    NETFLOOR_INLINE static typename Pass::Variables& variables() {
-        return Pass::variables;
-    }
+    NETFLOOR_INLINE static typename Pass::Variables &variables() { return Pass::variables; }
 
     // The last condition of the grammar, and the bits of its last step. They live in the state.
-    [[nodiscard]] NETFLOOR_INLINE std::uint8_t& condition() {
+    [[nodiscard]] NETFLOOR_INLINE std::uint8_t &condition() {
         settle();
         return state->condition;
     }
 
-    [[nodiscard]] NETFLOOR_INLINE std::int32_t& advance() {
+    [[nodiscard]] NETFLOOR_INLINE std::int32_t &advance() {
         settle();
         return state->advance;
     }
@@ -134,9 +132,7 @@ public:
         return holds;
     }
 
-    NETFLOOR_INLINE static LastRead& last() {
-        return Pass::last;
-    }
+    NETFLOOR_INLINE static LastRead &last() { return Pass::last; }
 
     // Raises a mark, if the pass does.
     NETFLOOR_INLINE void mark(Mark found) {
@@ -157,9 +153,7 @@ public:
         }
     }
 
-    [[nodiscard]] NETFLOOR_INLINE bool over() const {
-        return outcome != Outcome::on;
-    }
+    [[nodiscard]] NETFLOOR_INLINE bool over() const { return outcome != Outcome::on; }
 
     // Ends the run: nothing has an effect from here on.
     NETFLOOR_INLINE void end(Outcome how) {
@@ -225,7 +219,7 @@ public:
         if (Pass::reports) {
             return;
         }
-        const LastRead& read = last();
+        const LastRead &read = last();
         if (read.writer != nullptr) {
             read.writer(state->fieldRecord, data, read.cursor, read.units);
         }
@@ -238,10 +232,10 @@ public:
 
     // What a look ahead leaves in the field record: value and elements, under the name of the field before.
     NETFLOOR_INLINE std::uint32_t writeSeen(std::uint32_t first, std::uint32_t pieceCount, std::uint32_t width) {
-        FieldRecord& record = state->fieldRecord;
+        FieldRecord &record = state->fieldRecord;
         record.value = 0;
         for (std::uint32_t i = 0; i < pieceCount; ++i) {
-            BitRange& range = record.ranges[i];
+            BitRange &range = record.ranges[i];
             range.firstBit = first + i * width;
             range.lastBit = range.firstBit + width - 1;
             range.value = bits(data, range.firstBit, range.lastBit);
@@ -334,7 +328,7 @@ public:
     }
 
 private:
-    NETFLOOR_INLINE bool push(BitStack& stack, std::uint32_t& depth, std::uint32_t bit) {
+    NETFLOOR_INLINE bool push(BitStack &stack, std::uint32_t &depth, std::uint32_t bit) {
         ++depth;
         stack.count = depth;
         if (Pass::reports) {
@@ -351,16 +345,16 @@ private:
         return true;
     }
 
-    [[gnu::cold, gnu::noinline]] bool growStack(BitStack& stack) {
+    [[gnu::cold, gnu::noinline]] bool growStack(BitStack &stack) {
         giveState();
         while (stack.count >= stack.capacity) {
             const std::uint32_t capacity = stack.capacity * 2;
-            void* const grown = capacity == 0 ? nullptr : hs_Realloc(stack.base, capacity * sizeof *stack.base);
+            void *const grown = capacity == 0 ? nullptr : hs_Realloc(stack.base, capacity * sizeof *stack.base);
             if (grown == nullptr) {
                 state->flags |= NETFLOOR_FLAG_NO_STACK;
                 return false;
             }
-            stack.base = static_cast<std::uint32_t*>(grown);
+            stack.base = static_cast<std::uint32_t *>(grown);
             stack.top = stack.base + stack.count;
             stack.capacity = capacity;
         }
@@ -369,14 +363,14 @@ private:
 
     [[gnu::cold, gnu::noinline]] bool growRanges(std::uint32_t elements, RecordBeginning begin) {
         giveState();
-        FieldRecord& record = state->fieldRecord;
+        FieldRecord &record = state->fieldRecord;
         begin(record);
-        void* const grown = hs_Realloc(record.ranges, elements * sizeof *record.ranges);
+        void *const grown = hs_Realloc(record.ranges, elements * sizeof *record.ranges);
         if (grown == nullptr) {
             state->flags |= NETFLOOR_FLAG_NO_RANGES;
             return false;
         }
-        record.ranges = static_cast<BitRange*>(grown);
+        record.ranges = static_cast<BitRange *>(grown);
         record.rangeCapacity = elements;
         return true;
     }

@@ -13,30 +13,34 @@
 namespace netfloor {
 
 // Calls `visit` with the number of each piece, as a constant.
-template <std::uint32_t count, class Visit> NETFLOOR_INLINE inline void forEachPiece(Visit visit) {
+template <std::uint32_t count, class Visit>
+NETFLOOR_INLINE inline void forEachPiece(Visit visit) {
     [&]<std::size_t... i>(std::index_sequence<i...>) NETFLOOR_INLINE {
         (visit.template operator()<i>(), ...);
-    }(std::make_index_sequence<count>{});
+    }
+    (std::make_index_sequence<count>{});
 }
 
 // A value with a further piece of so many bits behind it.
-[[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t joined(std::uint32_t value, std::uint32_t piece, std::uint32_t width) {
+[[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t joined(std::uint32_t value, std::uint32_t piece,
+                                                             std::uint32_t width) {
     return width == 32 ? piece : value << width | piece;
 }
 
 // Whether a field has a number that a variable can take: an address and a run of nibbles have none.
-[[nodiscard]] constexpr bool hasStoredValue(const Place& place) {
+[[nodiscard]] constexpr bool hasStoredValue(const Place &place) {
     return place.isPieces() || place.shape == Shape::octets || place.shape == Shape::octetsBackward;
 }
 
 // The value of a field that lies at `cursor`, before it is scaled.
-template <const Field& field>
-[[nodiscard]] NETFLOOR_INLINE inline std::uint32_t valueAt(const std::uint8_t* data, std::uint32_t cursor, std::uint32_t units) {
-    constexpr const Place& place = field.place;
+template <const Field &field>
+[[nodiscard]] NETFLOOR_INLINE inline std::uint32_t valueAt(const std::uint8_t *data, std::uint32_t cursor,
+                                                           std::uint32_t units) {
+    constexpr const Place &place = field.place;
     std::uint32_t value = 0;
     if constexpr (place.isPieces()) {
         forEachPiece<place.count>([&]<std::uint32_t i>() NETFLOOR_INLINE {
-            constexpr Piece piece = place.pieces[i];
+            constexpr Piece piece = field.place.pieces[i];
             value = joined(value, pieceAt<piece.low, piece.high>(data, cursor), piece.width());
         });
     } else if constexpr (place.shape == Shape::octets) {
@@ -49,12 +53,43 @@ template <const Field& field>
     return value;
 }
 
+// An address for the eye. Only the values of the later groups are kept: the first element stands for the whole address.
+inline void writeGroups(FieldRecord &record, const std::uint8_t *data, std::uint32_t cursor, std::uint32_t groups) {
+    for (std::uint32_t group = 0; group < groups; ++group) {
+        std::uint32_t digits = 0;
+        for (std::uint32_t digit = 0; digit < nibblesPerGroup; ++digit) {
+            digits = digits << nibbleBits | nibbleAt(data, cursor + group * groupBits + digit * nibbleBits);
+        }
+        record.ranges[group].value = digits;
+    }
+    record.wideStart = 0;
+    record.wideBits = groups * groupBits;
+    record.ranges[0].firstBit = cursor;
+    record.ranges[0].lastBit = cursor + record.wideBits - 1;
+}
+
+// An address in a stretch of reversed bits. Gives the value, of which the last two groups stay.
+[[nodiscard]] inline std::uint32_t writeReversedGroups(BitRange *ranges, const std::uint8_t *data, std::uint32_t cursor,
+                                                       std::uint32_t groups) {
+    std::uint32_t value = 0;
+    for (std::uint32_t group = 0; group < groups; ++group) {
+        const std::uint32_t first = cursor + group * groupBits;
+        const std::uint32_t last = first + groupBits - 1;
+        ranges[group].firstBit = first;
+        ranges[group].lastBit = last;
+        ranges[group].value = bits(data, last, first);
+        value = value << groupBits | ranges[group].value;
+    }
+    return value;
+}
+
 // Writes the elements and the value of a field that lies at `cursor`, and its id. There is room for the
 // elements. Gives the value.
-template <const Field& field>
-NETFLOOR_INLINE inline std::uint32_t writeElements(FieldRecord& record, const std::uint8_t* data, std::uint32_t cursor, std::uint32_t units) {
-    constexpr const Place& place = field.place;
-    BitRange* const ranges = record.ranges;
+template <const Field &field>
+NETFLOOR_INLINE inline std::uint32_t writeElements(FieldRecord &record, const std::uint8_t *data, std::uint32_t cursor,
+                                                   std::uint32_t units) {
+    constexpr const Place &place = field.place;
+    BitRange *const ranges = record.ranges;
     std::uint32_t value = 0;
     const auto nibble = [&](std::uint32_t index, std::uint32_t first) NETFLOOR_INLINE {
         ranges[index].firstBit = first;
@@ -73,7 +108,7 @@ NETFLOOR_INLINE inline std::uint32_t writeElements(FieldRecord& record, const st
 
     if constexpr (place.shape == Shape::pieces) {
         forEachPiece<place.count>([&]<std::uint32_t i>() NETFLOOR_INLINE {
-            constexpr Piece piece = place.pieces[i];
+            constexpr Piece piece = field.place.pieces[i];
             ranges[i].firstBit = cursor + piece.low;
             ranges[i].lastBit = cursor + piece.high;
             ranges[i].value = pieceAt<piece.low, piece.high>(data, cursor);
@@ -92,28 +127,10 @@ NETFLOOR_INLINE inline std::uint32_t writeElements(FieldRecord& record, const st
             octet(i, cursor + (units - 1 - i) * bitsPerOctet);
         }
     } else if constexpr (place.shape == Shape::groups) {
-        // Only the values of the later groups are kept: the first element stands for the whole address.
-        for (std::uint32_t group = 0; group < units; ++group) {
-            std::uint32_t digits = 0;
-            for (std::uint32_t digit = 0; digit < nibblesPerGroup; ++digit) {
-                digits = digits << nibbleBits | nibbleAt(data, cursor + group * groupBits + digit * nibbleBits);
-            }
-            ranges[group].value = digits;
-        }
-        record.wideStart = 0;
-        record.wideBits = units * groupBits;
-        ranges[0].firstBit = cursor;
-        ranges[0].lastBit = cursor + record.wideBits - 1;
+        writeGroups(record, data, cursor, units);
         outputElements = 1;
     } else if constexpr (place.shape == Shape::reversedGroups) {
-        for (std::uint32_t group = 0; group < units; ++group) {
-            const std::uint32_t first = cursor + group * groupBits;
-            const std::uint32_t last = first + groupBits - 1;
-            ranges[group].firstBit = first;
-            ranges[group].lastBit = last;
-            ranges[group].value = bits(data, last, first);
-            value = value << groupBits | ranges[group].value;
-        }
+        value = writeReversedGroups(ranges, data, cursor, units);
     } else if constexpr (place.shape == Shape::nibbles || place.shape == Shape::addressNibbles) {
         for (std::uint32_t i = 0; i < elements; ++i) {
             nibble(i, cursor + i * nibbleBits);
@@ -132,7 +149,8 @@ NETFLOOR_INLINE inline std::uint32_t writeElements(FieldRecord& record, const st
 }
 
 // Resets the record for a field and gives it the field's name.
-template <const Field& field> NETFLOOR_INLINE inline void beginRecord(FieldRecord& record) {
+template <const Field &field>
+NETFLOOR_INLINE inline void beginRecord(FieldRecord &record) {
     record.value = 0;
     record.rangeCount = 0;
     record.valueText[0] = '\0';

@@ -13,7 +13,8 @@ namespace netfloor {
 // For a field that sets no variable.
 struct Unstored {};
 
-template <class Store> NETFLOOR_INLINE inline void store(Store& into, std::uint32_t value) {
+template <class Store>
+NETFLOOR_INLINE inline void store(Store &into, std::uint32_t value) {
     if constexpr (std::is_pointer_v<Store>) {
         *into = static_cast<std::remove_pointer_t<Store>>(value);
     } else {
@@ -21,13 +22,14 @@ template <class Store> NETFLOOR_INLINE inline void store(Store& into, std::uint3
     }
 }
 
-template <const Field& field> inline constexpr std::uint32_t neededBits = field.place.needs(field.place.count);
+template <const Field &field>
+inline constexpr std::uint32_t neededBits = field.place.needs(field.place.count);
 
 // Whether the bits of a field are there. A field that is not tested needs them in the packet only; where they
 // are not all there it is not reported either, and clears the live flag like any other.
-template <const Field& field, class Pass>
-[[nodiscard]] NETFLOOR_INLINE inline bool fits(Reader<Pass>& at, std::uint32_t units) {
-    constexpr const Place& place = field.place;
+template <const Field &field, class Pass>
+[[nodiscard]] NETFLOOR_INLINE inline bool fits(Reader<Pass> &at, std::uint32_t units) {
+    constexpr const Place &place = field.place;
     if constexpr (!place.isTested()) {
         return at.cursor + neededBits<field> <= at.state->totalBits + 1;
     }
@@ -37,8 +39,9 @@ template <const Field& field, class Pass>
 }
 
 // The step of a field that a stretch has made sure of. What the host can see of it is put off.
-template <const Field& field, class Pass, class Store> NETFLOOR_INLINE inline void sureStep(Reader<Pass>& at, Store into) {
-    constexpr const Place& place = field.place;
+template <const Field &field, class Pass, class Store>
+NETFLOOR_INLINE inline void sureStep(Reader<Pass> &at, Store into) {
+    constexpr const Place &place = field.place;
     if (!onOctetBorder(at.cursor)) {
         __builtin_unreachable();
     }
@@ -57,15 +60,16 @@ template <const Field& field, class Pass, class Store> NETFLOOR_INLINE inline vo
 }
 
 // Whether a stretch can make sure of a field: all of fixed size and tested that move in whole octets.
-template <const Field& field>
-inline constexpr bool canBeSure = !field.place.isRun() && field.place.isTested() && field.place.advance % bitsPerOctet == 0;
+template <const Field &field>
+inline constexpr bool canBeSure =
+    !field.place.isRun() && field.place.isTested() && field.place.advance % bitsPerOctet == 0;
 
 // The step of a field of `units` units; see `read` and `readRun`.
-template <const Field& field, class Pass, class Store>
-NETFLOOR_INLINE inline void step(Reader<Pass>& at, std::uint32_t units, Store into) {
+template <const Field &field, class Pass, class Store>
+NETFLOOR_INLINE inline void step(Reader<Pass> &at, std::uint32_t units, Store into) {
     static_assert(consistent(field), "the declaration of this field contradicts itself");
     static_assert(std::is_same_v<Store, Unstored> || hasStoredValue(field.place), "this field has no number to store");
-    constexpr const Place& place = field.place;
+    constexpr const Place &place = field.place;
     if (!at.live) {
         return;
     }
@@ -117,21 +121,23 @@ NETFLOOR_INLINE inline void step(Reader<Pass>& at, std::uint32_t units, Store in
 
 // Reads a field of fixed size. `into` takes its value: a pointer to a variable, or a function of the value.
 // A field that does not fit clears the live flag and the condition, and changes nothing else.
-template <const Field& field, class Pass, class Store = Unstored>
-NETFLOOR_INLINE inline void read(Reader<Pass>& at, Store into = {}) {
+template <const Field &field, class Pass, class Store = Unstored>
+NETFLOOR_INLINE inline void read(Reader<Pass> &at, Store into = {}) {
     static_assert(!field.place.isRun(), "a run needs its number of units");
     step<field>(at, field.place.count, into);
 }
 
 // Reads a field of as many units (octets, nibbles) as the packet tells. The number counts as unsigned in the
 // test of the bits left, so that a negative one does not fit.
-template <const Field& field, class Pass> NETFLOOR_INLINE inline void readRun(Reader<Pass>& at, std::int32_t units) {
+template <const Field &field, class Pass>
+NETFLOOR_INLINE inline void readRun(Reader<Pass> &at, std::int32_t units) {
     static_assert(field.place.isRun(), "a field of fixed size has its number of units");
     step<field>(at, static_cast<std::uint32_t>(units), Unstored{});
 }
 
 // Reads a field again and again, up to `count` times, as long as its bits are left. Gives how often it was read.
-template <const Field& field, class Pass> NETFLOOR_INLINE inline std::int32_t readRepeated(Reader<Pass>& at, std::int32_t count) {
+template <const Field &field, class Pass>
+NETFLOOR_INLINE inline std::int32_t readRepeated(Reader<Pass> &at, std::int32_t count) {
     std::int32_t seen = 0;
     while (at.live && seen < count) {
         read<field>(at);
@@ -142,19 +148,20 @@ template <const Field& field, class Pass> NETFLOOR_INLINE inline std::int32_t re
 
 // Reads a field `count` times. Where it ends with another count, as bits ran out or the count is negative,
 // that is marked.
-template <const Field& field, class Pass>
-NETFLOOR_INLINE inline void readCounted(Reader<Pass>& at, std::int32_t count) {
+template <const Field &field, class Pass>
+NETFLOOR_INLINE inline void readCounted(Reader<Pass> &at, std::int32_t count) {
     if (readRepeated<field>(at, count) != count) {
         at.mark(Mark::count);
     }
 }
 
 // A look ahead keeps the record of the field before.
-inline void keepRecord(FieldRecord&) {}
+inline void keepRecord(FieldRecord &) {}
 
 // Looks at the bits of `place` without moving the cursor and without reporting anything; nothing where they
 // are not all left or the run is over. The field record keeps what was seen, under the name of the field before.
-template <class Pass> NETFLOOR_INLINE inline std::optional<std::uint32_t> look(Reader<Pass>& at, const Place& place) {
+template <class Pass>
+NETFLOOR_INLINE inline std::optional<std::uint32_t> look(Reader<Pass> &at, const Place &place) {
     at.settle();
     if (at.over() || at.left < place.needs(place.count) || !at.roomFor(place.count, keepRecord)) {
         return std::nullopt;
@@ -172,7 +179,8 @@ template <class Pass> NETFLOOR_INLINE inline std::optional<std::uint32_t> look(R
 }
 
 // Moves the cursor back over `bitCount` bits, so that they can be read a second time.
-template <class Pass> NETFLOOR_INLINE inline void stepBack(Reader<Pass>& at, std::uint32_t bitCount) {
+template <class Pass>
+NETFLOOR_INLINE inline void stepBack(Reader<Pass> &at, std::uint32_t bitCount) {
     if (at.over()) {
         return;
     }

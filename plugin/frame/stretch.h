@@ -16,7 +16,8 @@ inline constexpr std::uint32_t mostStretchBlocks = 4;
 // Runs a production whose first `bitCount` bits are fields of fixed size. A pass that reports nothing asks once
 // whether they all fit, and then writes only what is left to be seen behind them; the rare packet that is cut
 // short there is read field by field, out of line.
-template <std::uint32_t bitCount, auto production, class Pass> NETFLOOR_INLINE inline void stretch(Reader<Pass>& at) {
+template <std::uint32_t bitCount, auto production, class Pass>
+NETFLOOR_INLINE inline void stretch(Reader<Pass> &at) {
     if constexpr (Pass::reports) {
         production(at);
     } else {

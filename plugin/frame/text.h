@@ -37,10 +37,10 @@ inline constexpr std::size_t mostDigits = 10;
 
 // Writes a number in hexadecimal without leading zeros, and gives the place behind it. Up to eight
 // characters are written, so there must be room for them.
-NETFLOOR_INLINE inline char* writeHexadecimal(char* to, std::uint32_t value) {
+NETFLOOR_INLINE inline char *writeHexadecimal(char *to, std::uint32_t value) {
     const auto digits = static_cast<std::uint32_t>(value == 0 ? 1 : (35 - std::countl_zero(value)) / 4);
     std::array<char, 8> all;
-    for (std::uint32_t octet = 0; octet < 4; ++octet) {
+    for (std::size_t octet = 0; octet < 4; ++octet) {
         std::memcpy(&all[octet * 2], &hexadecimalPairs[value >> (24 - octet * 8) & 0xff], 2);
     }
     std::uint64_t text = 0;
@@ -64,9 +64,9 @@ NETFLOOR_INLINE inline char* writeHexadecimal(char* to, std::uint32_t value) {
 }
 
 // Writes a number in decimal without leading zeros, and gives the place behind it.
-NETFLOOR_INLINE inline char* writeDecimal(char* to, std::uint32_t value) {
-    char* const end = to + decimalDigits(value);
-    char* place = end;
+NETFLOOR_INLINE inline char *writeDecimal(char *to, std::uint32_t value) {
+    char *const end = to + decimalDigits(value);
+    char *place = end;
     for (; value >= 100; value /= 100) {
         place -= 2;
         std::memcpy(place, &decimalPairs[value % 100], 2);
@@ -98,7 +98,8 @@ inline constexpr auto octetTexts = [] {
 
 // Names of one list in entries of one size, so that a name is copied without a look at its length. Entry 0 is
 // the name of a value without a row; a format there stays empty.
-template <std::size_t size> struct NameText {
+template <std::size_t size>
+struct NameText {
     std::array<char, size> text{};
     std::uint8_t length = 0;
 
@@ -110,24 +111,25 @@ template <std::size_t size> struct NameText {
     }
 };
 
-[[nodiscard]] constexpr std::string_view nameOf(const ValueName& row, bool brief) {
+[[nodiscard]] constexpr std::string_view nameOf(const ValueName &row, bool brief) {
     return brief ? row.brief : row.text;
 }
 
-[[nodiscard]] constexpr std::string_view otherName(const ValueNames& names, bool brief) {
+[[nodiscard]] constexpr std::string_view otherName(const ValueNames &names, bool brief) {
     return brief ? names.otherwiseBrief : names.otherwise;
 }
 
 // The length of the longest name of a list.
-[[nodiscard]] constexpr std::size_t longestName(const ValueNames& names, bool brief) {
+[[nodiscard]] constexpr std::size_t longestName(const ValueNames &names, bool brief) {
     std::size_t longest = otherName(names, brief).size() + mostDigits;
-    for (const ValueName& row : names.rows) {
+    for (const ValueName &row : names.rows) {
         longest = std::max(longest, nameOf(row, brief).size());
     }
     return longest;
 }
 
-template <const ValueNames& names, bool brief> inline constexpr auto nameTexts = [] {
+template <const ValueNames &names, bool brief>
+inline constexpr auto nameTexts = [] {
     constexpr std::size_t unit = 16;
     constexpr std::size_t size = (longestName(names, brief) + unit - 1) / unit * unit;
     std::array<NameText<size>, names.rows.size() + 1> texts{};

@@ -36,7 +36,8 @@ struct ValueNames {
 };
 
 // Where every value below `values` stands in a list of names: row number + 1, or 0.
-template <std::size_t values> [[nodiscard]] consteval std::array<std::uint16_t, values> directIndex(const ValueNames& names) {
+template <std::size_t values>
+[[nodiscard]] consteval std::array<std::uint16_t, values> directIndex(const ValueNames &names) {
     std::array<std::uint16_t, values> index{};
     for (std::size_t row = 0; row < names.rows.size(); ++row) {
         for (std::size_t value = names.rows[row].from; value <= names.rows[row].to && value < values; ++value) {
@@ -50,14 +51,16 @@ template <std::size_t values> [[nodiscard]] consteval std::array<std::uint16_t, 
 inline constexpr std::uint32_t directIndexMost = 8191;
 
 // How many values a list of names has in its direct index: all, or those of its first row in a sparse list.
-[[nodiscard]] constexpr std::size_t indexedValues(const ValueNames& names) {
+[[nodiscard]] constexpr std::size_t indexedValues(const ValueNames &names) {
     return (names.rows.back().to <= directIndexMost ? names.rows.back().to : names.rows.front().to) + std::size_t{1};
 }
 
-template <const ValueNames& names> inline constexpr auto valueIndex = directIndex<indexedValues(names)>(names);
+template <const ValueNames &names>
+inline constexpr auto valueIndex = directIndex<indexedValues(names)>(names);
 
 // The number, from 1, of the row that names `value`; 0 where none does.
-template <const ValueNames& names> [[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t rowNumber(std::uint32_t value) {
+template <const ValueNames &names>
+[[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t rowNumber(std::uint32_t value) {
     constexpr std::size_t indexed = indexedValues(names);
     if (value < indexed) {
         return valueIndex<names>[value];

@@ -79,7 +79,8 @@ inline constexpr Field problemData          {575, "64-bit Original Data Datagram
 
 // Many senders quote more than 64 bits of data. Here what is left goes to the host as one field without a name; in
 // the other messages nothing reads it, and the datagram ends with bits left over.
-template <class Pass> NETFLOOR_INLINE inline void destinationUnreachable(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void destinationUnreachable(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }
@@ -95,7 +96,8 @@ template <class Pass> NETFLOOR_INLINE inline void destinationUnreachable(Reader<
     }
 }
 
-template <class Pass> NETFLOOR_INLINE inline void sourceQuench(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void sourceQuench(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }
@@ -107,7 +109,8 @@ template <class Pass> NETFLOOR_INLINE inline void sourceQuench(Reader<Pass>& at)
     read<sourceQuenchData>(at);
 }
 
-template <class Pass> NETFLOOR_INLINE inline void redirect(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void redirect(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }
@@ -119,7 +122,8 @@ template <class Pass> NETFLOOR_INLINE inline void redirect(Reader<Pass>& at) {
     read<redirectData>(at);
 }
 
-template <class Pass> NETFLOOR_INLINE inline void timeExceeded(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void timeExceeded(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }
@@ -131,7 +135,8 @@ template <class Pass> NETFLOOR_INLINE inline void timeExceeded(Reader<Pass>& at)
     read<timeExceededData>(at);
 }
 
-template <class Pass> NETFLOOR_INLINE inline void parameterProblem(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void parameterProblem(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }

@@ -26,11 +26,12 @@ namespace netfloor::icmp {
 inline constexpr Field reservedData{541, "ICMP Reserved Data", octets(1), "ICMP Reserved Data=%x"};
 
 // A message of a type without a meaning: what stands behind the type is data, octet by octet.
-template <class Pass> NETFLOOR_INLINE inline void reservedMessage(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void reservedMessage(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }
-    auto& variables = at.variables();
+    auto &variables = at.variables();
     const Block<Pass> message{at, ""};
     variables.payloadOctets -= 1;
     std::int32_t seen = 0;
@@ -44,14 +45,16 @@ template <class Pass> NETFLOOR_INLINE inline void reservedMessage(Reader<Pass>& 
 }
 
 // Runs a message that has no other code than 0. With another code, or none, nothing behind the type is read.
-template <auto production, class Pass> NETFLOOR_INLINE inline void withCodeZero(Reader<Pass>& at) {
+template <auto production, class Pass>
+NETFLOOR_INLINE inline void withCodeZero(Reader<Pass> &at) {
     if (look(at, octets(1)) != std::uint32_t{0}) {
         return at.mark(Mark::expectation);
     }
     apart<production>(at);
 }
 
-template <class Pass> NETFLOOR_INLINE inline void message(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void message(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }

@@ -110,9 +110,9 @@ inline constexpr std::int32_t typeOctets = 1;
 inline constexpr std::int32_t octetsBehindType = 7;
 
 // What stands behind the type: `fixed` are the fields of the header's second word.
-template <const Field& code, const Field& checksum, const Field& data, const Field&... fixed, class Pass>
-NETFLOOR_INLINE inline void body(Reader<Pass>& at) {
-    auto& variables = at.variables();
+template <const Field &code, const Field &checksum, const Field &data, const Field &...fixed, class Pass>
+NETFLOOR_INLINE inline void body(Reader<Pass> &at) {
+    auto &variables = at.variables();
     const Block<Pass> block{at, ""};
     read<code>(at);
     readCounted<checksum>(at, 2);
@@ -123,18 +123,19 @@ NETFLOOR_INLINE inline void body(Reader<Pass>& at) {
     readCounted<data>(at, variables.payloadOctets);
 }
 
-template <class Pass> NETFLOOR_INLINE inline void bodyOf(Reader<Pass>& at, std::uint32_t type) {
+template <class Pass>
+NETFLOOR_INLINE inline void bodyOf(Reader<Pass> &at, std::uint32_t type) {
     switch (type) {
-    case typeUnreachable:
-        return body<unreachableCode, unreachableChecksum, unreachablePacket, unreachableUnused>(at);
-    case typeTooBig:
-        return body<tooBigCode, tooBigChecksum, tooBigPacket, tooBigMtu>(at);
+    case typeUnreachable: return body<unreachableCode, unreachableChecksum, unreachablePacket, unreachableUnused>(at);
+    case typeTooBig: return body<tooBigCode, tooBigChecksum, tooBigPacket, tooBigMtu>(at);
     case typeTimeExceeded:
         return body<timeExceededCode, timeExceededChecksum, timeExceededPacket, timeExceededUnused>(at);
     case typeParameterProblem:
-        return body<parameterProblemCode, parameterProblemChecksum, parameterProblemPacket, parameterProblemPointer>(at);
+        return body<parameterProblemCode, parameterProblemChecksum, parameterProblemPacket, parameterProblemPointer>(
+            at);
     case typeEchoRequest:
-        return body<echoRequestCode, echoRequestChecksum, echoRequestData, echoRequestIdentifier, echoRequestSequence>(at);
+        return body<echoRequestCode, echoRequestChecksum, echoRequestData, echoRequestIdentifier, echoRequestSequence>(
+            at);
     case typeEchoReply:
         return body<echoReplyCode, echoReplyChecksum, echoReplyData, echoReplyIdentifier, echoReplySequence>(at);
     default:
@@ -144,7 +145,8 @@ template <class Pass> NETFLOOR_INLINE inline void bodyOf(Reader<Pass>& at, std::
     }
 }
 
-template <class Pass> NETFLOOR_INLINE inline void message(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void message(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }

@@ -58,7 +58,8 @@ struct MessageVariables {
     std::uint32_t icmpType;
 };
 
-template <class Pass> NETFLOOR_INLINE inline void messageType(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void messageType(Reader<Pass> &at) {
     readByCarriage<typeInIpInIp, typeInMinimal, type>(at, &at.variables().icmpType);
 }
 

@@ -65,11 +65,12 @@ inline constexpr Field addressMask           {604, "Address Mask",         octet
 
 inline constexpr std::int32_t echoHeaderOctets = 8;
 
-template <class Pass> NETFLOOR_INLINE inline void echo(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void echo(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }
-    auto& variables = at.variables();
+    auto &variables = at.variables();
     const Block<Pass> message{at, ""};
     read<echoCode>(at);
     read<echoChecksum>(at);
@@ -84,7 +85,8 @@ template <class Pass> NETFLOOR_INLINE inline void echo(Reader<Pass>& at) {
     }
 }
 
-template <class Pass> NETFLOOR_INLINE inline void timestamp(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void timestamp(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }
@@ -98,7 +100,8 @@ template <class Pass> NETFLOOR_INLINE inline void timestamp(Reader<Pass>& at) {
     read<transmitTimestamp>(at);
 }
 
-template <class Pass> NETFLOOR_INLINE inline void information(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void information(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }
@@ -110,7 +113,8 @@ template <class Pass> NETFLOOR_INLINE inline void information(Reader<Pass>& at) 
 }
 
 // An entry is 8 octets, whatever the size of an entry says. One that is cut short counts as seen.
-template <class Pass> NETFLOOR_INLINE inline void routerAdvertisement(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void routerAdvertisement(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }
@@ -132,7 +136,8 @@ template <class Pass> NETFLOOR_INLINE inline void routerAdvertisement(Reader<Pas
     }
 }
 
-template <class Pass> NETFLOOR_INLINE inline void routerSolicitation(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void routerSolicitation(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }
@@ -142,7 +147,8 @@ template <class Pass> NETFLOOR_INLINE inline void routerSolicitation(Reader<Pass
     read<solicitationReserved>(at);
 }
 
-template <class Pass> NETFLOOR_INLINE inline void addressMaskMessage(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void addressMaskMessage(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }

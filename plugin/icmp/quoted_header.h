@@ -90,7 +90,8 @@ inline constexpr Field quotedSource          {624, "IP Source Address",       oc
 inline constexpr Field quotedDestination     {625, "IP Destination Address",  octets(4),                                     R"(  IP Destination Address=%-["%u":"."])"};
 // clang-format on
 
-template <class Pass> NETFLOOR_INLINE inline void quotedProtocol(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void quotedProtocol(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }
@@ -105,7 +106,8 @@ template <class Pass> NETFLOOR_INLINE inline void quotedProtocol(Reader<Pass>& a
     }
 }
 
-template <class Pass> NETFLOOR_INLINE inline void quotedHeader(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void quotedHeader(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }

@@ -10,9 +10,9 @@
 namespace netfloor {
 
 // Reads the variant for the protocol of the outermost header.
-template <const Field& inIpInIp, const Field& inMinimalEncapsulation, const Field& other, class Pass,
+template <const Field &inIpInIp, const Field &inMinimalEncapsulation, const Field &other, class Pass,
           class Store = Unstored>
-NETFLOOR_INLINE inline void readByCarriage(Reader<Pass>& at, Store into = {}) {
+NETFLOOR_INLINE inline void readByCarriage(Reader<Pass> &at, Store into = {}) {
     switch (at.variables().outerProtocol) {
     case protocolIpInIp: return read<inIpInIp>(at, into);
     case protocolMinimalEncapsulation: return read<inMinimalEncapsulation>(at, into);

@@ -25,8 +25,8 @@
 #include "frame/field.h"
 #include "frame/step.h"
 #include "frame/stretch.h"
-#include "icmp/icmpv6.h"
 #include "icmp/icmp.h"
+#include "icmp/icmpv6.h"
 #include "ipv4/options.h"
 #include "ipv4/service_and_fragment.h"
 #include "ipv4/unknown_data.h"
@@ -55,41 +55,36 @@ inline constexpr std::uint32_t bitsBeforeLimit = 32;
 
 // Runs the production of the payload. A later fragment is data, whatever its protocol; with DF set the offset
 // does not count.
-template <class Pass> NETFLOOR_INLINE inline void dispatch(Reader<Pass>& at) {
-    const auto& variables = at.variables();
+template <class Pass>
+NETFLOOR_INLINE inline void dispatch(Reader<Pass> &at) {
+    const auto &variables = at.variables();
     if (variables.fragmentOffset >= 1 && variables.dontFragment == 0) {
         return apart<unknownData<Pass>>(at);
     }
     switch (variables.ipProtocol) {
-    case protocolIcmp:
-        return apart<icmp::message<Pass>>(at);
+    case protocolIcmp: return apart<icmp::message<Pass>>(at);
     case protocolIpInIp:
-    case protocolMinimalEncapsulation:
-        return apart<tunnel::packet<Pass>>(at);
-    case protocolGre:
-        return apart<gre::packet<Pass>>(at);
-    case protocolTcp:
-        return apart<tcp::segment<Pass>>(at);
-    case protocolUdp:
-        return udp::datagram(at);
-    case protocolIcmpv6:
-        return apart<icmpv6::message<Pass>>(at);
-    case protocolSctp:
-        return apart<sctp::packet<Pass>>(at);
-    default:
-        return apart<unknownData<Pass>>(at);
+    case protocolMinimalEncapsulation: return apart<tunnel::packet<Pass>>(at);
+    case protocolGre: return apart<gre::packet<Pass>>(at);
+    case protocolTcp: return apart<tcp::segment<Pass>>(at);
+    case protocolUdp: return udp::datagram(at);
+    case protocolIcmpv6: return apart<icmpv6::message<Pass>>(at);
+    case protocolSctp: return apart<sctp::packet<Pass>>(at);
+    default: return apart<unknownData<Pass>>(at);
     }
 }
 
-template <class Pass> NETFLOOR_INLINE inline void upToTotalLength(Reader<Pass>& at) {
-    auto& variables = at.variables();
+template <class Pass>
+NETFLOOR_INLINE inline void upToTotalLength(Reader<Pass> &at) {
+    auto &variables = at.variables();
     read<headerLength>(at, [&](std::uint32_t words) { variables.ipHeaderOctets = words * 4; });
     typeOfService(at);
     read<totalLength>(at, &variables.ipTotalLength);
 }
 
-template <class Pass> NETFLOOR_INLINE inline void behindTotalLength(Reader<Pass>& at) {
-    auto& variables = at.variables();
+template <class Pass>
+NETFLOOR_INLINE inline void behindTotalLength(Reader<Pass> &at) {
+    auto &variables = at.variables();
     read<identification>(at);
     flagAndFragmentOffset(at);
     read<timeToLive>(at);
@@ -105,11 +100,12 @@ template <class Pass> NETFLOOR_INLINE inline void behindTotalLength(Reader<Pass>
     read<destinationAddress>(at);
 }
 
-template <class Pass> NETFLOOR_INLINE inline void datagram(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void datagram(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }
-    auto& variables = at.variables();
+    auto &variables = at.variables();
     const Block<Pass> header{at, "IPv4 Header"};
     stretch<32, upToTotalLength<Pass>>(at);
 

@@ -107,7 +107,8 @@ struct OptionVariables {
     std::int32_t optionOctets; // of the area behind the fixed header
 };
 
-template <class Pass> void securityOption(Reader<Pass>& at, OptionArea& area) {
+template <class Pass>
+void securityOption(Reader<Pass> &at, OptionArea &area) {
     const OptionBlock<Pass> option{at, "Type130"};
     optionHead<security, securityLength>(at, area);
     read<securityLevel>(at);
@@ -117,8 +118,8 @@ template <class Pass> void securityOption(Reader<Pass>& at, OptionArea& area) {
 }
 
 // In an IPv4 header that an IPv6 packet holds, a route is taken as one of IPv6 addresses.
-template <const Field& type, const Field& length, const Field& pointer, const Field& routeData, class Pass>
-void routeOption(Reader<Pass>& at, BlockName name, OptionArea& area) {
+template <const Field &type, const Field &length, const Field &pointer, const Field &routeData, class Pass>
+void routeOption(Reader<Pass> &at, BlockName name, OptionArea &area) {
     const OptionBlock<Pass> option{at, name};
     optionHead<type, length>(at, area);
     read<pointer>(at);
@@ -131,13 +132,15 @@ void routeOption(Reader<Pass>& at, BlockName name, OptionArea& area) {
     }
 }
 
-template <class Pass> void streamIdentifierOption(Reader<Pass>& at, OptionArea& area) {
+template <class Pass>
+void streamIdentifierOption(Reader<Pass> &at, OptionArea &area) {
     const OptionBlock<Pass> option{at, "Type136"};
     optionHead<streamIdentifier, streamLength>(at, area);
     read<streamId>(at);
 }
 
-template <class Pass> void addressAndTimestamp(Reader<Pass>& at) {
+template <class Pass>
+void addressAndTimestamp(Reader<Pass> &at) {
     const Block<Pass> block{at, "INLINE BLOCK"};
     if (at.variables().ipVersion == 4) {
         read<registeringAddress>(at);
@@ -148,7 +151,8 @@ template <class Pass> void addressAndTimestamp(Reader<Pass>& at) {
 }
 
 // With prespecified addresses these show as timestamps too.
-template <class Pass> void timestampOption(Reader<Pass>& at, OptionArea& area) {
+template <class Pass>
+void timestampOption(Reader<Pass> &at, OptionArea &area) {
     const OptionBlock<Pass> option{at, "Type68"};
     std::uint32_t flag = 0;
     optionHead<internetTimestamp, timestampLength>(at, area);
@@ -166,13 +170,15 @@ template <class Pass> void timestampOption(Reader<Pass>& at, OptionArea& area) {
 }
 
 // Ends the list: there is no further round.
-template <class Pass> void endOfListOption(Reader<Pass>& at, OptionArea& area) {
+template <class Pass>
+void endOfListOption(Reader<Pass> &at, OptionArea &area) {
     optionOfOneOctet<endOfOptionPart>(at, "", area);
     area.taken = false;
 }
 
 // Takes the option under the cursor, which is of a known type.
-template <class Pass> void option(Reader<Pass>& at, std::uint8_t type, OptionArea& area) {
+template <class Pass>
+void option(Reader<Pass> &at, std::uint8_t type, OptionArea &area) {
     switch (type) {
     case 1: return optionOfOneOctet<noOperation>(at, "Type1", area);
     case 130: return securityOption(at, area);
@@ -186,7 +192,8 @@ template <class Pass> void option(Reader<Pass>& at, std::uint8_t type, OptionAre
     }
 }
 
-template <class Pass> void optionRound(Reader<Pass>& at, OptionArea& area) {
+template <class Pass>
+void optionRound(Reader<Pass> &at, OptionArea &area) {
     area.taken = false;
     for (std::size_t turn = 0; at.live && turn < optionTypes.size(); ++turn) {
         turn = nextTaker<optionTypes>(at, turn);
@@ -197,7 +204,8 @@ template <class Pass> void optionRound(Reader<Pass>& at, OptionArea& area) {
     }
 }
 
-template <class Pass> void optionArea(Reader<Pass>& at) {
+template <class Pass>
+void optionArea(Reader<Pass> &at) {
     OptionArea area{at.variables().optionOctets};
     {
         BlockChain<Pass> rounds{at};
@@ -212,7 +220,8 @@ template <class Pass> void optionArea(Reader<Pass>& at) {
 }
 
 // The options in an area of so many octets. A header without options costs no more than its block.
-template <class Pass> NETFLOOR_INLINE inline void options(Reader<Pass>& at, std::int32_t areaOctets) {
+template <class Pass>
+NETFLOOR_INLINE inline void options(Reader<Pass> &at, std::int32_t areaOctets) {
     if (!at.live) {
         return;
     }
@@ -224,7 +233,8 @@ template <class Pass> NETFLOOR_INLINE inline void options(Reader<Pass>& at, std:
 }
 
 // The options of the header whose length was read last.
-template <class Pass> NETFLOOR_INLINE inline void options(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void options(Reader<Pass> &at) {
     options(at, static_cast<std::int32_t>(at.variables().ipHeaderOctets) - fixedHeaderOctets);
 }
 

@@ -16,9 +16,14 @@
 namespace netfloor::ipv4 {
 
 inline constexpr std::array precedenceRows = {
-    ValueName{0, "Routine"},       ValueName{1, "Priority"},       ValueName{2, "Immediate"},
-    ValueName{3, "Flash"},         ValueName{4, "Flash Override"}, ValueName{5, "CRITIC/ECP"},
-    ValueName{6, "Internetwork Control"}, ValueName{7, "Network Control"},
+    ValueName{0, "Routine"},
+    ValueName{1, "Priority"},
+    ValueName{2, "Immediate"},
+    ValueName{3, "Flash"},
+    ValueName{4, "Flash Override"},
+    ValueName{5, "CRITIC/ECP"},
+    ValueName{6, "Internetwork Control"},
+    ValueName{7, "Network Control"},
 };
 inline constexpr std::array delayRows = {ValueName{0, "Normal Delay"}, ValueName{1, "Low Delay"}};
 inline constexpr std::array throughputRows = {ValueName{0, "Normal Throughput"}, ValueName{1, "High Throughput"}};
@@ -51,7 +56,8 @@ struct FragmentVariables {
     std::uint32_t fragmentOffset; // in units of 8 octets, as on the wire
 };
 
-template <class Pass> NETFLOOR_INLINE inline void typeOfService(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void typeOfService(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }
@@ -63,11 +69,12 @@ template <class Pass> NETFLOOR_INLINE inline void typeOfService(Reader<Pass>& at
     read<serviceReserved>(at);
 }
 
-template <class Pass> NETFLOOR_INLINE inline void flagAndFragmentOffset(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void flagAndFragmentOffset(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }
-    auto& variables = at.variables();
+    auto &variables = at.variables();
     const Block<Pass> block{at, "Flag and Fragment Offset"};
     read<fragmentReserved>(at);
     read<dontFragmentFlag>(at, &variables.dontFragment);

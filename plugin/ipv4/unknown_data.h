@@ -10,7 +10,8 @@ namespace netfloor {
 
 inline constexpr Field unknownProtocolData{285, "Unknown Protocol Data", octets(1), "Unknown Protocol Data=%x"};
 
-template <class Pass> void unknownData(Reader<Pass>& at) {
+template <class Pass>
+void unknownData(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }

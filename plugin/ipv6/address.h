@@ -16,8 +16,8 @@ inline constexpr Field addressKey    {950, "IP Address",         addressNibbles(
 // clang-format on
 
 // An address is read twice: `shown` gives its text, and `key` what the key record keeps.
-template <const Field& shown, const Field& key, class Pass>
-NETFLOOR_INLINE inline void addressReadTwice(Reader<Pass>& at) {
+template <const Field &shown, const Field &key, class Pass>
+NETFLOOR_INLINE inline void addressReadTwice(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }
@@ -28,7 +28,8 @@ NETFLOOR_INLINE inline void addressReadTwice(Reader<Pass>& at) {
 }
 
 // An address read with the bits of each octet reversed, twice over, so that its groups show in network order.
-template <class Pass> void reversedAddress(Reader<Pass>& at, typename ReversedBits<Pass>::Report report) {
+template <class Pass>
+void reversedAddress(Reader<Pass> &at, typename ReversedBits<Pass>::Report report) {
     if (!at.live) {
         return;
     }

@@ -83,14 +83,16 @@ inline constexpr std::uint32_t fragmentHeaderOctets = 8;
 inline constexpr std::uint32_t securityHeaderOctets = 8;
 
 // Counts a header off the payload.
-template <class Pass> NETFLOOR_INLINE inline void countOff(Reader<Pass>& at, std::uint32_t octetCount) {
+template <class Pass>
+NETFLOOR_INLINE inline void countOff(Reader<Pass> &at, std::uint32_t octetCount) {
     if (at.live) {
         at.variables().payloadOctets -= static_cast<std::int32_t>(octetCount);
     }
 }
 
 // Gives the length as it stands in the header.
-template <class Pass> [[nodiscard]] NETFLOOR_INLINE inline std::uint32_t headerLength(Reader<Pass>& at) {
+template <class Pass>
+[[nodiscard]] NETFLOOR_INLINE inline std::uint32_t headerLength(Reader<Pass> &at) {
     std::uint32_t length = 0;
     if (at.live) {
         const Block<Pass> block{at, "Header Extention Length"};
@@ -102,8 +104,7 @@ template <class Pass> [[nodiscard]] NETFLOOR_INLINE inline std::uint32_t headerL
 // The links of the chain. Their blocks stay open in `chain`; each gives whether the chain goes on behind it.
 
 template <class Pass>
-[[nodiscard]] NETFLOOR_INLINE inline bool optionsHeader(Reader<Pass>& at, BlockChain<Pass>& chain,
-                                                            BlockName name) {
+[[nodiscard]] NETFLOOR_INLINE inline bool optionsHeader(Reader<Pass> &at, BlockChain<Pass> &chain, BlockName name) {
     chain.open(name);
     nextHeader(at);
     countOff(at, extensionOctets(headerLength(at)));
@@ -111,7 +112,8 @@ template <class Pass>
 }
 
 // "Sgmt Left" does not steer the addresses: all that the length has room for are read.
-template <class Pass> NETFLOOR_INLINE inline void type0Routing(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void type0Routing(Reader<Pass> &at) {
     nextHeader(at);
     const std::uint32_t length = headerLength(at);
     read<routingType>(at);
@@ -124,7 +126,8 @@ template <class Pass> NETFLOOR_INLINE inline void type0Routing(Reader<Pass>& at)
 }
 
 // The header is read up to 4 octets in front of its end, and that is where the next one is looked for.
-template <class Pass> NETFLOOR_INLINE inline void unknownRouting(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void unknownRouting(Reader<Pass> &at) {
     nextHeader(at);
     const std::uint32_t length = headerLength(at);
     readRun<spare>(at, static_cast<std::int32_t>(length * 8 + 2));
@@ -133,7 +136,7 @@ template <class Pass> NETFLOOR_INLINE inline void unknownRouting(Reader<Pass>& a
 
 // A header of an unknown type that is not through with its segments is left unread, and ends the chain.
 template <class Pass>
-[[nodiscard]] NETFLOOR_INLINE inline bool routingHeader(Reader<Pass>& at, BlockChain<Pass>& chain) {
+[[nodiscard]] NETFLOOR_INLINE inline bool routingHeader(Reader<Pass> &at, BlockChain<Pass> &chain) {
     std::uint32_t type = 0;
     chain.open("Ipv6 Routing Header");
     read<routingTypeAhead>(at, &type);
@@ -157,7 +160,7 @@ template <class Pass>
 
 // The offset steers nothing: what a later fragment holds is read as the next header all the same.
 template <class Pass>
-[[nodiscard]] NETFLOOR_INLINE inline bool fragmentHeader(Reader<Pass>& at, BlockChain<Pass>& chain) {
+[[nodiscard]] NETFLOOR_INLINE inline bool fragmentHeader(Reader<Pass> &at, BlockChain<Pass> &chain) {
     chain.open("IPv6 Fragment Header");
     nextHeader(at);
     read<fragmentReserved>(at);
@@ -170,8 +173,8 @@ template <class Pass>
 }
 
 template <class Pass>
-[[nodiscard]] NETFLOOR_INLINE inline bool authenticationHeader(Reader<Pass>& at, BlockChain<Pass>& chain) {
-    auto& variables = at.variables();
+[[nodiscard]] NETFLOOR_INLINE inline bool authenticationHeader(Reader<Pass> &at, BlockChain<Pass> &chain) {
+    auto &variables = at.variables();
     std::uint32_t words = 0;
     chain.open("IP Authentication Header");
     nextHeader(at);
@@ -187,7 +190,8 @@ template <class Pass>
     return true;
 }
 
-template <class Pass> void securityPayload(Reader<Pass>& at) {
+template <class Pass>
+void securityPayload(Reader<Pass> &at) {
     const Block<Pass> block{at, ""};
     read<securityIndex>(at);
     read<securitySequence>(at);
@@ -196,51 +200,40 @@ template <class Pass> void securityPayload(Reader<Pass>& at) {
 }
 
 // A protocol that ends the chain. The tunnels of IPv4 are not followed from here.
-template <class Pass> NETFLOOR_INLINE inline void upperProtocol(Reader<Pass>& at, std::uint32_t protocol) {
+template <class Pass>
+NETFLOOR_INLINE inline void upperProtocol(Reader<Pass> &at, std::uint32_t protocol) {
     switch (protocol) {
     case protocolIcmp:
-    case protocolIcmpv6:
-        return apart<icmpv6::message<Pass>>(at);
-    case protocolTcp:
-        return apart<tcp::segment<Pass>>(at);
-    case protocolUdp:
-        return apart<udp::datagram<Pass>>(at);
-    case protocolGre:
-        return apart<gre::packet<Pass>>(at);
-    case protocolSctp:
-        return apart<sctp::packet<Pass>>(at);
-    case protocolEsp:
-        return apart<securityPayload<Pass>>(at);
-    default:
-        return apart<unknownData<Pass>>(at);
+    case protocolIcmpv6: return apart<icmpv6::message<Pass>>(at);
+    case protocolTcp: return apart<tcp::segment<Pass>>(at);
+    case protocolUdp: return apart<udp::datagram<Pass>>(at);
+    case protocolGre: return apart<gre::packet<Pass>>(at);
+    case protocolSctp: return apart<sctp::packet<Pass>>(at);
+    case protocolEsp: return apart<securityPayload<Pass>>(at);
+    default: return apart<unknownData<Pass>>(at);
     }
 }
 
 template <class Pass>
-[[nodiscard]] NETFLOOR_INLINE inline bool link(Reader<Pass>& at, BlockChain<Pass>& chain, std::uint32_t protocol) {
+[[nodiscard]] NETFLOOR_INLINE inline bool link(Reader<Pass> &at, BlockChain<Pass> &chain, std::uint32_t protocol) {
     switch (protocol) {
     case protocolHopByHop:
     case protocolDestinationOptions:
         return optionsHeader(at, chain,
                              protocol == protocolHopByHop ? BlockName{"IPv6 Hop-by-Hop Header"}
                                                           : BlockName{"Destination Option Header"});
-    case protocolIpv6:
-        return fixedHeader(at, chain);
-    case protocolRouting:
-        return routingHeader(at, chain);
-    case protocolFragment:
-        return fragmentHeader(at, chain);
-    case protocolAuthentication:
-        return authenticationHeader(at, chain);
-    default:
-        upperProtocol(at, protocol);
-        return false;
+    case protocolIpv6: return fixedHeader(at, chain);
+    case protocolRouting: return routingHeader(at, chain);
+    case protocolFragment: return fragmentHeader(at, chain);
+    case protocolAuthentication: return authenticationHeader(at, chain);
+    default: upperProtocol(at, protocol); return false;
     }
 }
 
 // A packet: its IPv6 header, and what that leads to.
-template <class Pass> NETFLOOR_INLINE inline void datagram(Reader<Pass>& at) {
-    const auto& variables = at.variables();
+template <class Pass>
+NETFLOOR_INLINE inline void datagram(Reader<Pass> &at) {
+    const auto &variables = at.variables();
     BlockChain<Pass> chain{at};
     std::uint32_t next = protocolIpv6;
     while (link(at, chain, next) && at.live && variables.payloadOctets >= 1) {

@@ -45,11 +45,12 @@ inline constexpr std::uint32_t payloadLengthBits = 16;
 inline constexpr std::uint32_t bitsBehindLength = 272;
 
 // The Next Header of any header of the chain.
-template <class Pass> NETFLOOR_INLINE inline void nextHeader(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void nextHeader(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }
-    auto& variables = at.variables();
+    auto &variables = at.variables();
     const Block<Pass> block{at, "Next Header"};
     read<nextHeaderField>(at, &variables.ipProtocol);
     if (at.live) {
@@ -62,7 +63,7 @@ template <class Pass> NETFLOOR_INLINE inline void nextHeader(Reader<Pass>& at) {
 // The test of the length is made with what stands behind the Payload Length, while the body starts with it:
 // a packet one or two octets short is read as far as it goes.
 template <class Pass>
-[[nodiscard]] NETFLOOR_INLINE inline bool fixedHeader(Reader<Pass>& at, BlockChain<Pass>& chain) {
+[[nodiscard]] NETFLOOR_INLINE inline bool fixedHeader(Reader<Pass> &at, BlockChain<Pass> &chain) {
     std::uint32_t payloadOctets = 0;
     chain.open("IPv6 Header");
     read<trafficClass>(at);

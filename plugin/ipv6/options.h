@@ -42,22 +42,25 @@ inline constexpr std::uint32_t actionSkip = 0;
 
 inline constexpr std::int32_t nibblesPerOctet = 2;
 
-template <class Pass> NETFLOOR_INLINE inline void padN(Reader<Pass>& at) {
-    auto& variables = at.variables();
+template <class Pass>
+NETFLOOR_INLINE inline void padN(Reader<Pass> &at) {
+    auto &variables = at.variables();
     read<padNType>(at);
     read<padNLength>(at, &variables.optionLength);
     readRun<paddingData>(at, variables.optionLength * nibblesPerOctet);
 }
 
-template <class Pass> NETFLOOR_INLINE inline void skippedOption(Reader<Pass>& at) {
-    auto& variables = at.variables();
+template <class Pass>
+NETFLOOR_INLINE inline void skippedOption(Reader<Pass> &at) {
+    auto &variables = at.variables();
     read<unknownOptionType>(at);
     read<unknownOptionLength>(at, &variables.optionLength);
     readCounted<skippedOctet>(at, variables.optionLength);
 }
 
 // The option forbids to go on. Its length is not read: all behind its type is data.
-template <class Pass> NETFLOOR_INLINE inline void discardedOption(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void discardedOption(Reader<Pass> &at) {
     read<discardedOptionType>(at);
     if (at.variables().payloadOctets >= 1) {
         apart<unknownData<Pass>>(at);
@@ -66,7 +69,7 @@ template <class Pass> NETFLOOR_INLINE inline void discardedOption(Reader<Pass>& 
 
 // Reads an option, whose blocks stay open in `chain`. Gives whether the chain goes on behind it.
 template <class Pass>
-[[nodiscard]] NETFLOOR_INLINE inline bool option(Reader<Pass>& at, BlockChain<Pass>& chain) {
+[[nodiscard]] NETFLOOR_INLINE inline bool option(Reader<Pass> &at, BlockChain<Pass> &chain) {
     std::uint32_t type = 0;
     chain.open("Options");
     read<optionTypeAhead>(at, &type);
@@ -82,8 +85,7 @@ template <class Pass>
         chain.open("PadN Option");
         padN(at);
         return true;
-    default:
-        break;
+    default: break;
     }
     std::uint32_t action = 0;
     chain.open("Unknown Option");

@@ -37,8 +37,9 @@ inline constexpr Field errorFlags    = lowerFlagsField(909);
 inline constexpr Field errorLength   = chunkLengthField(910);
 // clang-format on
 
-template <class Pass> void abort(Reader<Pass>& at) {
-    std::int32_t& errorOctets = at.variables().errorOctets;
+template <class Pass>
+void abort(Reader<Pass> &at) {
+    std::int32_t &errorOctets = at.variables().errorOctets;
     LimitedBlock<Pass> block{at, "Abort Association"};
     block.limit(limitFromLength<abortLengthAhead>(at, octetsBehindHead(errorOctets)));
     read<abortReserved>(at);
@@ -47,7 +48,8 @@ template <class Pass> void abort(Reader<Pass>& at) {
     errorCauses(at);
 }
 
-template <class Pass> void error(Reader<Pass>& at) {
+template <class Pass>
+void error(Reader<Pass> &at) {
     const Block<Pass> block{at, "Error"};
     read<errorFlags>(at);
     read<errorLength>(at, octetsBehindHead(at.variables().errorOctets));

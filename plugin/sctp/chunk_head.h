@@ -28,7 +28,8 @@ constexpr Field lengthField      (std::uint32_t id) { return {id, "  Length",   
 // The Length that several chunks share.
 inline constexpr Field chunkLength = chunkLengthField(808);
 
-template <class Pass> NETFLOOR_INLINE inline void readChunkLength(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void readChunkLength(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }

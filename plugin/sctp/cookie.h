@@ -28,8 +28,9 @@ inline constexpr Field cookieAckFlags  = lowerFlagsField(892);
 // clang-format on
 
 // `chunkOctets` stays without the head, so that the walk takes four octets fewer than the Length.
-template <class Pass> void cookieEcho(Reader<Pass>& at) {
-    std::int32_t& chunkOctets = at.variables().chunkOctets;
+template <class Pass>
+void cookieEcho(Reader<Pass> &at) {
+    std::int32_t &chunkOctets = at.variables().chunkOctets;
     const Block<Pass> block{at, "Cookie Echo"};
     read<cookieEchoFlags>(at);
     readChunkLength(at);
@@ -39,7 +40,8 @@ template <class Pass> void cookieEcho(Reader<Pass>& at) {
     readRun<cookie>(at, chunkOctets);
 }
 
-template <class Pass> void cookieAck(Reader<Pass>& at) {
+template <class Pass>
+void cookieAck(Reader<Pass> &at) {
     const Block<Pass> block{at, "Cookie Acknowledge"};
     read<cookieAckFlags>(at);
     readChunkLength(at);

@@ -12,7 +12,7 @@ namespace netfloor::sctp {
 // not fit. An element counts once it is begun, so a list whose last element is cut short has its full count.
 // The condition is then whether that last element is whole, and otherwise true.
 template <class Pass, class Element>
-NETFLOOR_INLINE inline void countedList(Reader<Pass>& at, std::int32_t count, Element element) {
+NETFLOOR_INLINE inline void countedList(Reader<Pass> &at, std::int32_t count, Element element) {
     std::int32_t begun = 0;
     at.test(true);
     while (at.live && begun < count) {

@@ -54,7 +54,8 @@ inline constexpr Field payloadProtocolIdentifier {820, "    Payload Protocol Ide
 // A Length of so many octets is that of a chunk without user data.
 inline constexpr std::int32_t emptyDataOctets = 16;
 
-template <class Pass> NETFLOOR_INLINE inline void data(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void data(Reader<Pass> &at) {
     const Block<Pass> block{at, "Data"};
     read<dataReserved>(at);
     read<unorderedBit>(at);

@@ -85,8 +85,9 @@ inline constexpr Field unknownCauseLength        = causeLengthField(935);
 inline constexpr Field unknownCause              {938, "      Unknown Cause",                      octetRun(), "      Unknown Cause=%x"};
 // clang-format on
 
-template <class Pass> void missingParameters(Reader<Pass>& at) {
-    std::int32_t& missingParameterCount = at.variables().missingParameterCount;
+template <class Pass>
+void missingParameters(Reader<Pass> &at) {
+    std::int32_t &missingParameterCount = at.variables().missingParameterCount;
     read<missingLength>(at);
     read<missingNumber>(at, &missingParameterCount);
     countedList(at, missingParameterCount, [&at] {
@@ -96,8 +97,9 @@ template <class Pass> void missingParameters(Reader<Pass>& at) {
 }
 
 // The list runs until a field does not fit: behind the last parameter that is the type of the next.
-template <class Pass> void unrecognizedParameterList(Reader<Pass>& at) {
-    std::int32_t& errorOctets = at.variables().errorOctets;
+template <class Pass>
+void unrecognizedParameterList(Reader<Pass> &at) {
+    std::int32_t &errorOctets = at.variables().errorOctets;
     read<unrecognizedListLength>(at, octetsBehindHead(errorOctets));
     if (!at.live) {
         return;
@@ -108,45 +110,37 @@ template <class Pass> void unrecognizedParameterList(Reader<Pass>& at) {
     }
 }
 
-template <class Pass> void unknownCauseValue(Reader<Pass>& at) {
-    std::int32_t& errorOctets = at.variables().errorOctets;
+template <class Pass>
+void unknownCauseValue(Reader<Pass> &at) {
+    std::int32_t &errorOctets = at.variables().errorOctets;
     read<unknownCauseLength>(at, octetsBehindHead(errorOctets));
     if (at.test(errorOctets >= 1)) {
         readRun<unknownCause>(at, errorOctets);
     }
 }
 
-template <class Pass> void causeOf(Reader<Pass>& at, std::uint32_t code) {
-    std::int32_t& errorOctets = at.variables().errorOctets;
+template <class Pass>
+void causeOf(Reader<Pass> &at, std::uint32_t code) {
+    std::int32_t &errorOctets = at.variables().errorOctets;
     switch (code) {
     case invalidStreamIdentifier:
         read<invalidStreamLength>(at);
         read<invalidStream>(at);
         return read<invalidStreamReserved>(at);
-    case missingMandatoryParameter:
-        return missingParameters(at);
-    case staleCookie:
-        read<staleCookieLength>(at);
-        return read<staleness>(at);
-    case outOfResource:
-        return read<outOfResourceLength>(at);
+    case missingMandatoryParameter: return missingParameters(at);
+    case staleCookie: read<staleCookieLength>(at); return read<staleness>(at);
+    case outOfResource: return read<outOfResourceLength>(at);
     case unresolvableAddress:
         read<unresolvableLength>(at, octetsBehindHead(errorOctets));
         return readRun<unresolvableValue>(at, errorOctets);
     case unrecognizedChunkType:
         read<unrecognizedChunkLength>(at, octetsBehindHead(errorOctets));
         return readRun<unrecognizedChunk>(at, errorOctets);
-    case invalidMandatoryParameter:
-        return read<invalidMandatoryLength>(at);
-    case unrecognizedParametersCause:
-        return unrecognizedParameterList(at);
-    case noUserData:
-        read<noUserDataLength>(at, octetsBehindHead(errorOctets));
-        return read<noUserDataTsn>(at);
-    case cookieWhileShuttingDown:
-        return read<shuttingDownLength>(at, octetsBehindHead(errorOctets));
-    default:
-        return unknownCauseValue(at);
+    case invalidMandatoryParameter: return read<invalidMandatoryLength>(at);
+    case unrecognizedParametersCause: return unrecognizedParameterList(at);
+    case noUserData: read<noUserDataLength>(at, octetsBehindHead(errorOctets)); return read<noUserDataTsn>(at);
+    case cookieWhileShuttingDown: return read<shuttingDownLength>(at, octetsBehindHead(errorOctets));
+    default: return unknownCauseValue(at);
     }
 }
 
@@ -162,7 +156,8 @@ template <class Pass> void causeOf(Reader<Pass>& at, std::uint32_t code) {
 
 // The list goes on as long as its rounds end with the condition true, mostly with a field that did fit, whether or
 // not anything is left. It ordinarily ends with a limit that is longer than what is left.
-template <class Pass> void errorCauses(Reader<Pass>& at) {
+template <class Pass>
+void errorCauses(Reader<Pass> &at) {
     at.test(true);
     while (at.live && at.condition() != 0) {
         const LimitedBlock<Pass> cause{at, "Error Causes", bitsOf(at.variables().errorOctets)};

@@ -33,14 +33,15 @@ inline constexpr Field heartbeatInfo       {943, "        Sender-specific HB Inf
 inline constexpr std::uint32_t knownInfoType = 1;
 
 // Information of another type stays unread: the walk takes it for the next chunk.
-template <class Pass> void heartbeatInformation(Reader<Pass>& at) {
+template <class Pass>
+void heartbeatInformation(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }
     if (look(at, octets(2)) != knownInfoType) {
         return at.mark(Mark::expectation);
     }
-    std::int32_t& errorOctets = at.variables().errorOctets;
+    std::int32_t &errorOctets = at.variables().errorOctets;
     LimitedBlock<Pass> block{at, "Heartbeat Information TLV"};
     block.limit(limitFromLength<valueLengthAhead>(at, octetsBehindHead(errorOctets)));
     read<heartbeatInfoType>(at);
@@ -48,18 +49,21 @@ template <class Pass> void heartbeatInformation(Reader<Pass>& at) {
     readRun<heartbeatInfo>(at, errorOctets);
 }
 
-template <const Field& flags, class Pass> void heartbeatChunk(Reader<Pass>& at, BlockName name) {
+template <const Field &flags, class Pass>
+void heartbeatChunk(Reader<Pass> &at, BlockName name) {
     const Block<Pass> block{at, name};
     read<flags>(at);
     readChunkLength(at);
     heartbeatInformation(at);
 }
 
-template <class Pass> void heartbeat(Reader<Pass>& at) {
+template <class Pass>
+void heartbeat(Reader<Pass> &at) {
     heartbeatChunk<heartbeatFlags>(at, "Heartbeat Request");
 }
 
-template <class Pass> void heartbeatAck(Reader<Pass>& at) {
+template <class Pass>
+void heartbeatAck(Reader<Pass> &at) {
     heartbeatChunk<heartbeatAckFlags>(at, "Heartbeat Acknowledgement");
 }
 

@@ -48,8 +48,9 @@ template <std::uint32_t ids> inline constexpr Field initialTsn      {ids + 6, " 
 // The Length counts in so many octets in front of the parameters.
 inline constexpr std::int32_t octetsBeforeParameters = 20;
 
-template <std::uint32_t ids, auto parameters, class Pass> void initFields(Reader<Pass>& at) {
-    auto& variables = at.variables();
+template <std::uint32_t ids, auto parameters, class Pass>
+void initFields(Reader<Pass> &at) {
+    auto &variables = at.variables();
     read<initFlags<ids>>(at);
     read<initLength<ids>>(at, &variables.chunkOctets);
     read<initiateTag<ids>>(at);
@@ -63,13 +64,15 @@ template <std::uint32_t ids, auto parameters, class Pass> void initFields(Reader
     parameters(at);
 }
 
-template <class Pass> void init(Reader<Pass>& at) {
+template <class Pass>
+void init(Reader<Pass> &at) {
     LimitedBlock<Pass> block{at, "INIT"};
     block.limit(limitFromLength<initLengthAhead>(at, &at.variables().chunkOctets));
     initFields<initIds, initParameters<Pass>>(at);
 }
 
-template <class Pass> void initAck(Reader<Pass>& at) {
+template <class Pass>
+void initAck(Reader<Pass> &at) {
     const Block<Pass> block{at, "Init Ack"};
     initFields<initAckIds, initAckParameters<Pass>>(at);
 }

@@ -46,12 +46,9 @@ inline constexpr std::array initParameterRows = {
     ValueName{ecnCapableType, "Reserved for ECN Capable"},
 };
 inline constexpr std::array initAckParameterRows = {
-    ValueName{ipv4AddressType, "IPv4 Address"},
-    ValueName{ipv6AddressType, "IPv6 Address"},
-    ValueName{stateCookieType, "State Cookie"},
-    ValueName{unrecognizedParametersType, "Unrecognized Parameters"},
-    ValueName{hostNameType, "Host Name Address"},
-    ValueName{ecnCapableType, "Reserved for ECN Capable"},
+    ValueName{ipv4AddressType, "IPv4 Address"},   ValueName{ipv6AddressType, "IPv6 Address"},
+    ValueName{stateCookieType, "State Cookie"},   ValueName{unrecognizedParametersType, "Unrecognized Parameters"},
+    ValueName{hostNameType, "Host Name Address"}, ValueName{ecnCapableType, "Reserved for ECN Capable"},
 };
 inline constexpr std::array addressTypeRows = {
     ValueName{ipv4AddressType, "IPv4 Address"},
@@ -80,19 +77,22 @@ inline constexpr Field stateCookie             {857, "        State Cookie", oct
 
 // What a parameter takes from the octets of its list: its Length less 8, and not its Length. So a list seldom ends with
 // its last parameter; it ends where the bits do.
-template <class Pass> void reckonParameter(Reader<Pass>& at, std::int32_t& listOctets) {
+template <class Pass>
+void reckonParameter(Reader<Pass> &at, std::int32_t &listOctets) {
     if (at.live) {
         listOctets -= at.variables().parameterOctets - headOctets;
     }
 }
 
 // Whether the list has another parameter, by that reckoning.
-template <class Pass> [[nodiscard]] bool listGoesOn(Reader<Pass>& at, std::int32_t listOctets) {
+template <class Pass>
+[[nodiscard]] bool listGoesOn(Reader<Pass> &at, std::int32_t listOctets) {
     return at.test(listOctets >= 1) && at.live;
 }
 
 // A parameter whose value is one field, of fixed size or of as many octets as the Length tells.
-template <const Field& field, class Pass> void parameterOf(Reader<Pass>& at, BlockName name) {
+template <const Field &field, class Pass>
+void parameterOf(Reader<Pass> &at, BlockName name) {
     if (!at.live) {
         return;
     }
@@ -104,7 +104,8 @@ template <const Field& field, class Pass> void parameterOf(Reader<Pass>& at, Blo
     }
 }
 
-template <class Pass> void ipv6AddressParameter(Reader<Pass>& at) {
+template <class Pass>
+void ipv6AddressParameter(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }
@@ -113,48 +114,44 @@ template <class Pass> void ipv6AddressParameter(Reader<Pass>& at) {
 }
 
 // The types that both lists know, and those that neither does.
-template <class Pass> void commonParameter(Reader<Pass>& at, std::uint32_t type) {
+template <class Pass>
+void commonParameter(Reader<Pass> &at, std::uint32_t type) {
     switch (type) {
-    case ipv4AddressType:
-        return parameterOf<ipv4Address>(at, "IPv4 Address");
-    case ipv6AddressType:
-        return ipv6AddressParameter(at);
-    case hostNameType:
-        return parameterOf<hostName>(at, "Host Name Address");
-    case ecnCapableType:
-        return parameterOf<ecnCapable>(at, "Reserved for ECN Capable");
-    default:
-        return parameterOf<unknownParameter>(at, "Reserved for ECN Capable");
+    case ipv4AddressType: return parameterOf<ipv4Address>(at, "IPv4 Address");
+    case ipv6AddressType: return ipv6AddressParameter(at);
+    case hostNameType: return parameterOf<hostName>(at, "Host Name Address");
+    case ecnCapableType: return parameterOf<ecnCapable>(at, "Reserved for ECN Capable");
+    default: return parameterOf<unknownParameter>(at, "Reserved for ECN Capable");
     }
 }
 
 // From here on `parameterOctets` counts the types, and the list reckons with that number.
-template <class Pass> void supportedAddressTypes(Reader<Pass>& at) {
+template <class Pass>
+void supportedAddressTypes(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }
-    std::int32_t& typeCount = at.variables().parameterOctets;
+    std::int32_t &typeCount = at.variables().parameterOctets;
     const Block<Pass> block{at, "Supported Address Types"};
     typeCount /= 2;
     readCounted<supportedAddressType>(at, typeCount);
 }
 
-template <class Pass> void initParameter(Reader<Pass>& at) {
+template <class Pass>
+void initParameter(Reader<Pass> &at) {
     std::uint32_t type = 0;
     read<initParameterType>(at, &type);
     read<initParameterLength>(at, octetsBehindHead(at.variables().parameterOctets));
     switch (type) {
-    case cookiePreservativeType:
-        return parameterOf<cookieLifeSpanIncrement>(at, "Cookie Preservative");
-    case supportedAddressesType:
-        return supportedAddressTypes(at);
-    default:
-        return commonParameter(at, type);
+    case cookiePreservativeType: return parameterOf<cookieLifeSpanIncrement>(at, "Cookie Preservative");
+    case supportedAddressesType: return supportedAddressTypes(at);
+    default: return commonParameter(at, type);
     }
 }
 
-template <class Pass> void initParameters(Reader<Pass>& at) {
-    auto& variables = at.variables();
+template <class Pass>
+void initParameters(Reader<Pass> &at) {
+    auto &variables = at.variables();
     BlockChain<Pass> chain{at};
     while (listGoesOn(at, variables.chunkOctets)) {
         chain.open("Init Option Container");
@@ -174,7 +171,8 @@ template <class Pass> void initParameters(Reader<Pass>& at) {
 }
 
 // The parameters set `parameterOctets` anew, so that the outer list reckons with the last of them.
-template <class Pass> void unrecognizedParameters(Reader<Pass>& at) {
+template <class Pass>
+void unrecognizedParameters(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }
@@ -188,22 +186,21 @@ template <class Pass> void unrecognizedParameters(Reader<Pass>& at) {
     }
 }
 
-template <class Pass> void initAckParameter(Reader<Pass>& at) {
+template <class Pass>
+void initAckParameter(Reader<Pass> &at) {
     std::uint32_t type = 0;
     read<initAckParameterType>(at, &type);
     read<initAckParameterLength>(at, octetsBehindHead(at.variables().parameterOctets));
     switch (type) {
-    case stateCookieType:
-        return parameterOf<stateCookie>(at, "State Cookie");
-    case unrecognizedParametersType:
-        return unrecognizedParameters(at);
-    default:
-        return commonParameter(at, type);
+    case stateCookieType: return parameterOf<stateCookie>(at, "State Cookie");
+    case unrecognizedParametersType: return unrecognizedParameters(at);
+    default: return commonParameter(at, type);
     }
 }
 
-template <class Pass> void initAckParameters(Reader<Pass>& at) {
-    auto& variables = at.variables();
+template <class Pass>
+void initAckParameters(Reader<Pass> &at) {
+    auto &variables = at.variables();
     BlockChain<Pass> chain{at};
     while (listGoesOn(at, variables.chunkOctets)) {
         chain.open("InitAck Options Container");

@@ -17,7 +17,7 @@ namespace netfloor::sctp {
 inline constexpr std::int32_t headOctets = 4;
 
 // Stores a Length as the octets behind the head. Of a Length below 4 the number is negative, and nothing fits.
-[[nodiscard]] constexpr auto octetsBehindHead(std::int32_t& octets) {
+[[nodiscard]] constexpr auto octetsBehindHead(std::int32_t &octets) {
     return [&octets](std::uint32_t length) { octets = static_cast<std::int32_t>(length) - headOctets; };
 }
 
@@ -37,9 +37,9 @@ struct Skipped {
 
 // A Length that lies behind the place where its limited block starts.
 struct LengthAhead {
-    std::array<Skipped, 2> stretches; // what lies in front of the Length; a stretch that needs nothing is none
-    bool addsSkippedes;               // whether the limit adds the stretches to the Length
-    std::uint32_t takesOff;           // bits that the limit takes off the sum
+    std::array<Skipped, 2> skipped; // what lies in front of the Length; one that needs nothing is none
+    bool addsSkipped;               // whether the limit adds them to the Length
+    std::uint32_t takesOff;         // bits that the limit takes off the sum
 };
 
 // The limits of a whole Length are Length * 8 bits, of ABORT Length * 8 - 8. INIT starts behind its Chunk Type,
@@ -52,8 +52,8 @@ inline constexpr LengthAhead valueLengthAhead{{{{typeBits, typeBits}}}, true, 32
 // Reads a Length ahead of its turn, and gives the bits of the limit that it sets. Nothing is reported, and the
 // cursor comes back. What does not fit adds the advance of the step before instead of its own: behind the last
 // parameter of a list that makes a limit which holds no parameter.
-template <const LengthAhead& ahead, class Pass, class Store>
-[[nodiscard]] std::uint32_t limitFromLength(Reader<Pass>& at, Store into) {
+template <const LengthAhead &ahead, class Pass, class Store>
+[[nodiscard]] std::uint32_t limitFromLength(Reader<Pass> &at, Store into) {
     if (at.over()) {
         return 0;
     }
@@ -66,14 +66,14 @@ template <const LengthAhead& ahead, class Pass, class Store>
     };
 
     std::uint32_t sum = 0;
-    for (const Skipped& stretch : ahead.stretches) {
-        if (stretch.needs == 0) {
+    for (const Skipped &part : ahead.skipped) {
+        if (part.needs == 0) {
             continue;
         }
-        if (at.test(at.left >= stretch.needs)) {
-            stepOver(stretch.width);
+        if (at.test(at.left >= part.needs)) {
+            stepOver(part.width);
         }
-        sum += ahead.addsSkippedes ? static_cast<std::uint32_t>(at.advance()) : 0;
+        sum += ahead.addsSkipped ? static_cast<std::uint32_t>(at.advance()) : 0;
     }
     const std::optional<std::uint32_t> length = look(at, octets(2));
     if (at.test(length.has_value())) {

@@ -2,7 +2,6 @@
 // ECNE and CWR, which RFC 9260 reserves (appendix A), and the chunks of unknown types: a head, and octets.
 #pragma once
 
-
 #include "frame/block.h"
 #include "frame/field.h"
 #include "frame/step.h"
@@ -22,9 +21,9 @@ inline constexpr Field unknownFlags     = flagsField(809);
 inline constexpr Field reservedContents {813, "    Reserved contents", octetRun(), R"(    Reserved contents=%-["%x"])"};
 // clang-format on
 
-template <const Field& flags, const Field& reserved, class Pass>
-void congestionChunk(Reader<Pass>& at, BlockName name) {
-    auto& variables = at.variables();
+template <const Field &flags, const Field &reserved, class Pass>
+void congestionChunk(Reader<Pass> &at, BlockName name) {
+    auto &variables = at.variables();
     const Block<Pass> block{at, name};
     read<flags>(at);
     readChunkLength(at);
@@ -36,17 +35,20 @@ void congestionChunk(Reader<Pass>& at, BlockName name) {
     }
 }
 
-template <class Pass> void explicitCongestionEcho(Reader<Pass>& at) {
+template <class Pass>
+void explicitCongestionEcho(Reader<Pass> &at) {
     congestionChunk<ecneFlags, ecneReserved>(at, "ECNE");
 }
 
-template <class Pass> void congestionWindowReduced(Reader<Pass>& at) {
+template <class Pass>
+void congestionWindowReduced(Reader<Pass> &at) {
     congestionChunk<cwrFlags, cwrReserved>(at, "CWR");
 }
 
 // `chunkOctets` stays without the head where there are contents: the walk takes four octets fewer than the Length.
-template <class Pass> void reservedChunk(Reader<Pass>& at) {
-    std::int32_t& chunkOctets = at.variables().chunkOctets;
+template <class Pass>
+void reservedChunk(Reader<Pass> &at) {
+    std::int32_t &chunkOctets = at.variables().chunkOctets;
     const Block<Pass> block{at, "Reserved chunks"};
     read<unknownFlags>(at);
     readChunkLength(at);

@@ -40,8 +40,9 @@ inline constexpr Field gapBlockEnd        {882, "    Gap Ack Block End",        
 inline constexpr Field duplicateTsn       {883, "    Duplicate TSN",                              octets(4), "    Duplicate TSN=0x%x"};
 // clang-format on
 
-template <class Pass> NETFLOOR_INLINE inline void selectiveAcknowledgement(Reader<Pass>& at) {
-    auto& variables = at.variables();
+template <class Pass>
+NETFLOOR_INLINE inline void selectiveAcknowledgement(Reader<Pass> &at) {
+    auto &variables = at.variables();
     const Block<Pass> block{at, "Selective Acknowledgement"};
     read<sackFlags>(at);
     read<sackLength>(at, &variables.chunkOctets);

@@ -17,8 +17,8 @@
 //
 // Nothing is tested that SCTP itself would test. Nor does a chunk have a border, except in INIT and ABORT: the next
 // Chunk Type is read where the last field of the chunk before ended. So padding, and whatever a body does not read,
-// show as chunks of their own. `payloadOctets`, which ends the walk, follows the Lengths and not the cursor; where the two
-// part, the walk ends with the bits.
+// show as chunks of their own. `payloadOctets`, which ends the walk, follows the Lengths and not the cursor; where the
+// two part, the walk ends with the bits.
 #pragma once
 
 #include <array>
@@ -97,8 +97,9 @@ inline constexpr Field laterChunkType  {805, "SCTP  Chunk Type",             oct
 
 inline constexpr std::int32_t commonHeaderOctets = 12;
 
-template <class Pass> NETFLOOR_INLINE inline void commonHeader(Reader<Pass>& at) {
-    auto& variables = at.variables();
+template <class Pass>
+NETFLOOR_INLINE inline void commonHeader(Reader<Pass> &at) {
+    auto &variables = at.variables();
     const Block<Pass> block{at, "Common Header"};
     read<sourcePort>(at, &variables.sourcePort);
     read<destinationPort>(at, &variables.destinationPort);
@@ -109,8 +110,9 @@ template <class Pass> NETFLOOR_INLINE inline void commonHeader(Reader<Pass>& at)
     }
 }
 
-template <class Pass> NETFLOOR_INLINE inline std::uint32_t readChunkType(Reader<Pass>& at) {
-    std::uint32_t& chunksSeen = at.variables().chunksSeen;
+template <class Pass>
+NETFLOOR_INLINE inline std::uint32_t readChunkType(Reader<Pass> &at) {
+    std::uint32_t &chunksSeen = at.variables().chunksSeen;
     std::uint32_t type = 0;
     if (at.test(chunksSeen == 0)) {
         read<firstChunkType>(at, &type);
@@ -121,47 +123,33 @@ template <class Pass> NETFLOOR_INLINE inline std::uint32_t readChunkType(Reader<
     return type;
 }
 
-template <class Pass> NETFLOOR_INLINE inline void chunkBody(Reader<Pass>& at, std::uint32_t type) {
+template <class Pass>
+NETFLOOR_INLINE inline void chunkBody(Reader<Pass> &at, std::uint32_t type) {
     switch (type) {
-    case dataType:
-        return data(at);
-    case initType:
-        return apart<init<Pass>>(at);
-    case initAckType:
-        return apart<initAck<Pass>>(at);
-    case sackType:
-        return selectiveAcknowledgement(at);
-    case heartbeatType:
-        return apart<heartbeat<Pass>>(at);
-    case heartbeatAckType:
-        return apart<heartbeatAck<Pass>>(at);
-    case abortType:
-        return apart<abort<Pass>>(at);
-    case shutdownType:
-        return apart<shutdown<Pass>>(at);
-    case shutdownAckType:
-        return apart<shutdownAck<Pass>>(at);
-    case errorType:
-        return apart<error<Pass>>(at);
-    case cookieEchoType:
-        return apart<cookieEcho<Pass>>(at);
-    case cookieAckType:
-        return apart<cookieAck<Pass>>(at);
-    case ecneType:
-        return apart<explicitCongestionEcho<Pass>>(at);
-    case cwrType:
-        return apart<congestionWindowReduced<Pass>>(at);
-    case shutdownCompleteType:
-        return apart<shutdownComplete<Pass>>(at);
-    default:
-        return apart<reservedChunk<Pass>>(at);
+    case dataType: return data(at);
+    case initType: return apart<init<Pass>>(at);
+    case initAckType: return apart<initAck<Pass>>(at);
+    case sackType: return selectiveAcknowledgement(at);
+    case heartbeatType: return apart<heartbeat<Pass>>(at);
+    case heartbeatAckType: return apart<heartbeatAck<Pass>>(at);
+    case abortType: return apart<abort<Pass>>(at);
+    case shutdownType: return apart<shutdown<Pass>>(at);
+    case shutdownAckType: return apart<shutdownAck<Pass>>(at);
+    case errorType: return apart<error<Pass>>(at);
+    case cookieEchoType: return apart<cookieEcho<Pass>>(at);
+    case cookieAckType: return apart<cookieAck<Pass>>(at);
+    case ecneType: return apart<explicitCongestionEcho<Pass>>(at);
+    case cwrType: return apart<congestionWindowReduced<Pass>>(at);
+    case shutdownCompleteType: return apart<shutdownComplete<Pass>>(at);
+    default: return apart<reservedChunk<Pass>>(at);
     }
 }
 
 // Each round reads one Chunk Type octet at least, or ends the walk, whatever the Lengths say and whatever a next layer
 // that led back into this pass has left in the variables.
-template <class Pass> NETFLOOR_INLINE inline void chunks(Reader<Pass>& at) {
-    auto& variables = at.variables();
+template <class Pass>
+NETFLOOR_INLINE inline void chunks(Reader<Pass> &at) {
+    auto &variables = at.variables();
     BlockChain<Pass> chain{at};
     while (at.live) {
         chain.open("Chunk list");
@@ -179,11 +167,12 @@ template <class Pass> NETFLOOR_INLINE inline void chunks(Reader<Pass>& at) {
     }
 }
 
-template <class Pass> void packet(Reader<Pass>& at) {
+template <class Pass>
+void packet(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }
-    auto& variables = at.variables();
+    auto &variables = at.variables();
     const LimitedBlock<Pass> body{at, "SCTP Body", bitsOf(variables.payloadOctets)};
     variables.chunksSeen = 0;
     commonHeader(at);

@@ -41,20 +41,23 @@ inline constexpr Field completeTagBit           {890, "  T bit",    bit(0).advan
 inline constexpr Field completeLength           = lengthField(891);
 // clang-format on
 
-template <class Pass> void shutdown(Reader<Pass>& at) {
+template <class Pass>
+void shutdown(Reader<Pass> &at) {
     const Block<Pass> block{at, "Shutdown"};
     read<shutdownFlags>(at);
     read<shutdownLength>(at, &at.variables().chunkOctets);
     read<shutdownCumulativeTsnAck>(at);
 }
 
-template <class Pass> void shutdownAck(Reader<Pass>& at) {
+template <class Pass>
+void shutdownAck(Reader<Pass> &at) {
     const Block<Pass> block{at, "Shutdown Acknowledge"};
     read<shutdownAckFlags>(at);
     read<shutdownAckLength>(at, &at.variables().chunkOctets);
 }
 
-template <class Pass> void shutdownComplete(Reader<Pass>& at) {
+template <class Pass>
+void shutdownComplete(Reader<Pass> &at) {
     const Block<Pass> block{at, "Shutdown Complete"};
     read<completeReserved>(at);
     read<completeTagBit>(at);

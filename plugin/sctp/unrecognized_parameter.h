@@ -16,8 +16,9 @@ inline constexpr Field unrecognizedLength {864, "        Length",               
 inline constexpr Field unrecognizedValue  {865, "                Value",               octetRun(), "                Value", noNames, "0x%x"};
 // clang-format on
 
-template <class Pass> void unrecognizedParameter(Reader<Pass>& at) {
-    std::int32_t& parameterOctets = at.variables().parameterOctets;
+template <class Pass>
+void unrecognizedParameter(Reader<Pass> &at) {
+    std::int32_t &parameterOctets = at.variables().parameterOctets;
     const Block<Pass> block{at, "Unrecogonized Parameters"};
     read<unrecognizedType>(at);
     read<unrecognizedLength>(at, octetsBehindHead(parameterOctets));

@@ -7,9 +7,9 @@
 #include <cstdint>
 
 #include "frame/field.h"
-#include "icmp/icmpv6.h"
 #include "icmp/error_messages.h"
 #include "icmp/icmp.h"
+#include "icmp/icmpv6.h"
 #include "icmp/message_type.h"
 #include "icmp/query_messages.h"
 #include "icmp/quoted_header.h"
@@ -21,9 +21,9 @@
 #include "ipv6/extension_headers.h"
 #include "ipv6/header.h"
 #include "ipv6/options.h"
+#include "sctp/sctp.h"
 #include "transport/tcp.h"
 #include "transport/tcp_options.h"
-#include "sctp/sctp.h"
 #include "transport/udp.h"
 #include "tunnels/gre.h"
 #include "tunnels/ip_in_ip.h"
@@ -32,7 +32,7 @@
 
 namespace netfloor {
 
-inline constexpr std::array<const Field*, 381> catalogue = {
+inline constexpr std::array<const Field *, 381> catalogue = {
     // the IPv4 header
     &version,
     &ipv4::headerLength,
@@ -433,8 +433,8 @@ inline constexpr std::array<const Field*, 381> catalogue = {
 };
 
 // The id under which the TO pass reports a field: that of the first field of the same name.
-[[nodiscard]] constexpr std::uint32_t displayIdOf(const Field& field) {
-    for (const Field* const candidate : catalogue) {
+[[nodiscard]] constexpr std::uint32_t displayIdOf(const Field &field) {
+    for (const Field *const candidate : catalogue) {
         if (candidate->tableName() == field.tableName()) {
             return candidate->id;
         }

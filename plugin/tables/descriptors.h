@@ -21,20 +21,32 @@ namespace netfloor {
 inline constexpr std::uint32_t usualMark = 5;
 inline constexpr std::uint32_t otherMark = 6;
 inline constexpr std::array<std::uint32_t, 16> otherMarked = {
-    tcp::reservedBesideDataOffset.id, tcp::dataOffset.id, tcp::reservedBesideFlags.id, tcp::urgent.id,
-    tcp::acknowledgement.id,          tcp::push.id,       tcp::reset.id,               tcp::synchronize.id,
-    tcp::finish.id,                   tcp::windowSize.id, tcp::checksum.id,            tcp::urgentPointer.id,
-    udp::length.id,                   udp::checksum.id,   sctp::initParameterLength.id, sctp::initAckParameterLength.id,
+    tcp::reservedBesideDataOffset.id,
+    tcp::dataOffset.id,
+    tcp::reservedBesideFlags.id,
+    tcp::urgent.id,
+    tcp::acknowledgement.id,
+    tcp::push.id,
+    tcp::reset.id,
+    tcp::synchronize.id,
+    tcp::finish.id,
+    tcp::windowSize.id,
+    tcp::checksum.id,
+    tcp::urgentPointer.id,
+    udp::length.id,
+    udp::checksum.id,
+    sctp::initParameterLength.id,
+    sctp::initAckParameterLength.id,
 };
 
 inline constexpr std::uint32_t widthHead = 0xffff0000;
 
 // An address that is read as groups or as nibbles counts as variable, like a run.
-[[nodiscard]] constexpr bool hasFixedWidth(const Place& place) {
+[[nodiscard]] constexpr bool hasFixedWidth(const Place &place) {
     return !place.isRun() && place.shape != Shape::groups && place.shape != Shape::addressNibbles;
 }
 
-[[nodiscard]] constexpr std::uint32_t sizeClass(const Place& place) {
+[[nodiscard]] constexpr std::uint32_t sizeClass(const Place &place) {
     const std::uint32_t width = place.width();
     if (!hasFixedWidth(place) || width > 32) {
         return 4;
@@ -43,30 +55,32 @@ inline constexpr std::uint32_t widthHead = 0xffff0000;
 }
 
 // An address of fixed width, shown as elements with something between them.
-[[nodiscard]] constexpr bool isListedAddress(const Field& field) {
+[[nodiscard]] constexpr bool isListedAddress(const Field &field) {
     return hasFixedWidth(field.place) && !parseFormat(field.line).separator.empty();
 }
 
-[[nodiscard]] constexpr bool isKeyField(const Field& field) {
+[[nodiscard]] constexpr bool isKeyField(const Field &field) {
     return keyRowOf(field) != noKeyRow;
 }
 
-[[nodiscard]] constexpr std::uint32_t flagsOf(const Field& field) {
+[[nodiscard]] constexpr std::uint32_t flagsOf(const Field &field) {
     const bool marked = std::ranges::find(otherMarked, field.id) != otherMarked.end();
     return sizeClass(field.place) | (isListedAddress(field) ? 3u : 0u) << 8 | (isKeyField(field) ? 1u : 0u) << 16 |
            (marked ? otherMark : usualMark) << 24;
 }
 
 // The zero-terminated name without blanks behind. Where there are none it is the field's own literal.
-template <std::size_t index> inline constexpr auto bareNameText = [] {
+template <std::size_t index>
+inline constexpr auto bareNameText = [] {
     constexpr std::string_view name = catalogue[index]->bareName();
     std::array<char, name.size() + 1> text{};
     std::ranges::copy(name, text.begin());
     return text;
 }();
 
-template <std::size_t index> [[nodiscard]] constexpr const char* shortNameOf() {
-    constexpr const Field& field = *catalogue[index];
+template <std::size_t index>
+[[nodiscard]] constexpr const char *shortNameOf() {
+    constexpr const Field &field = *catalogue[index];
     if constexpr (field.bareName().size() == field.tableName().size()) {
         return field.tableName().data();
     } else {
@@ -80,12 +94,13 @@ struct FieldTable {
     FieldTableEnd end;
 };
 
-template <std::size_t index> [[nodiscard]] constexpr FieldDescriptor descriptorOf(std::uintptr_t keyIndex) {
-    constexpr const Field& field = *catalogue[index];
+template <std::size_t index>
+[[nodiscard]] constexpr FieldDescriptor descriptorOf() {
+    constexpr const Field &field = *catalogue[index];
     return {
         .flags = flagsOf(field),
         .fieldId = field.id,
-        .keyIndex = keyIndex,
+        .keyIndex = 0, // counted over all rows
         .name = field.title.empty() ? field.tableName().data() : field.title.data(),
         .shortName = shortNameOf<index>(),
         .valueCount = static_cast<std::int32_t>(valueRowCount(field)),
@@ -99,23 +114,26 @@ template <std::size_t index> [[nodiscard]] constexpr FieldDescriptor descriptorO
 }
 
 inline constexpr FieldTable fieldTable = []<std::size_t... index>(std::index_sequence<index...>) {
-    FieldTable table{};
+    FieldTable table{.rows = {descriptorOf<index>()...},
+                     .end = {.flags = NETFLOOR_NO_FIELD,
+                             .fieldId = 0xffff,
+                             .marker = NETFLOOR_LAST_FIELD,
+                             .words = {0, 0xffff},
+                             .counts = {0xffff, 0xffff},
+                             .width = 0xffffffff,
+                             .zero = {}}};
     std::uintptr_t keys = 0;
-    ((table.rows[index] = descriptorOf<index>(isKeyField(*catalogue[index]) ? ++keys : 0)), ...);
-    table.end = {.flags = NETFLOOR_NO_FIELD,
-                 .fieldId = 0xffff,
-                 .marker = NETFLOOR_LAST_FIELD,
-                 .words = {0, 0xffff},
-                 .counts = {0xffff, 0xffff},
-                 .width = 0xffffffff,
-                 .zero = {}};
+    for (std::size_t row = 0; row < catalogue.size(); ++row) {
+        table.rows[row].keyIndex = isKeyField(*catalogue[row]) ? ++keys : 0;
+    }
     return table;
-}(std::make_index_sequence<catalogue.size()>{});
+}
+(std::make_index_sequence<catalogue.size()>{});
 
 inline constexpr auto valueMap = textTables.values;
 
 inline constexpr auto displayStrings = [] {
-    std::array<const char*, textTables.texts.count() + 1> texts{};
+    std::array<const char *, textTables.texts.count() + 1> texts{};
     for (std::uint32_t text = 0; text < textTables.texts.count(); ++text) {
         texts[text] = textTables.texts[text].data();
     }

@@ -15,7 +15,7 @@
 namespace netfloor {
 
 // The key fields, a row each, in the order in which the grammar comes to them.
-inline constexpr std::array<const Field*, 112> keySites = {
+inline constexpr std::array<const Field *, 112> keySites = {
     &version,
     &ipv4::totalLength,
     &ipv4::identification,
@@ -134,7 +134,7 @@ inline constexpr std::uint32_t noKeyRow = 0xffffffff;
 // The table ends with a row without a name, which no field fills: a host can mark it present.
 inline constexpr std::uint32_t keyRowCount = keySites.size() + 1;
 
-[[nodiscard]] constexpr std::uint32_t keyRowOf(const Field& field) {
+[[nodiscard]] constexpr std::uint32_t keyRowOf(const Field &field) {
     bool isKey = false;
     std::uint32_t last = noKeyRow;
     for (std::uint32_t row = 0; row < keySites.size(); ++row) {

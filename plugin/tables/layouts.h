@@ -29,9 +29,7 @@ struct LayoutRecord {
         }
     }
 
-    constexpr void addConstant(std::uint32_t value) {
-        add({0x10, 0, 0, 0, value});
-    }
+    constexpr void addConstant(std::uint32_t value) { add({0x10, 0, 0, 0, value}); }
 
     constexpr void addRange(std::uint32_t from, std::uint32_t to) {
         add({0x05});
@@ -48,9 +46,7 @@ struct LayoutRecord {
         }
     }
 
-    constexpr void addReference(std::uint32_t number) {
-        add({0x08, number, 0});
-    }
+    constexpr void addReference(std::uint32_t number) { add({0x08, number, 0}); }
 
     constexpr void finish() {
         const std::size_t length = size - 2;
@@ -58,7 +54,7 @@ struct LayoutRecord {
         octets[1] = static_cast<std::uint8_t>(length >> 8);
     }
 
-    [[nodiscard]] constexpr bool sameAs(const std::uint8_t* other) const {
+    [[nodiscard]] constexpr bool sameAs(const std::uint8_t *other) const {
         for (std::size_t i = 0; i < size; ++i) {
             if (octets[i] != other[i]) {
                 return false;
@@ -73,31 +69,31 @@ inline constexpr std::uint32_t fixedLength = 0;    // reference at the end
 inline constexpr std::uint32_t variableLength = 1; // reference at the end
 
 // A field that is read ahead, or by groups that no piece describes, has no layout.
-[[nodiscard]] constexpr bool hasLayout(const Place& place) {
+[[nodiscard]] constexpr bool hasLayout(const Place &place) {
     return place.shape != Shape::ahead && place.shape != Shape::groups;
 }
 
 // The pieces of which a field is made, and how often they repeat. Nibbles that come again in the next octet are
 // listed once.
-[[nodiscard]] constexpr std::uint32_t distinctPieces(const Place& place) {
+[[nodiscard]] constexpr std::uint32_t distinctPieces(const Place &place) {
     const bool repeats = place.count == 4 && place.pieces[2].low == place.pieces[0].low + bitsPerOctet &&
                          place.pieces[3].low == place.pieces[1].low + bitsPerOctet;
     return repeats ? 2 : place.count;
 }
 
 // Two whole octets are listed with the second one first, although the passes read the first one first.
-[[nodiscard]] constexpr bool isOctetPair(const Place& place) {
+[[nodiscard]] constexpr bool isOctetPair(const Place &place) {
     return place.count == 2 && place.pieces[0].width() == bitsPerOctet && place.pieces[1].width() == bitsPerOctet;
 }
 
 // The pieces of one unit.
-constexpr void addPieces(LayoutRecord& record, const Place& place) {
+constexpr void addPieces(LayoutRecord &record, const Place &place) {
     switch (place.shape) {
     case Shape::pieces: {
         const std::uint32_t count = distinctPieces(place);
         record.add({count});
         for (std::uint32_t i = 0; i < count; ++i) {
-            const Piece& piece = place.pieces[isOctetPair(place) ? count - 1 - i : i];
+            const Piece &piece = place.pieces[isOctetPair(place) ? count - 1 - i : i];
             record.addPiece(piece.low + 1, piece.high + 1);
         }
         return;
@@ -112,23 +108,21 @@ constexpr void addPieces(LayoutRecord& record, const Place& place) {
         record.add({1});
         record.addPiece(groupBits, 1);
         return;
-    default:
-        record.add({1});
-        record.addPiece(1, place.unitBits());
+    default: record.add({1}); record.addPiece(1, place.unitBits());
     }
 }
 
 // How often the pieces of a fixed field repeat, and the bits from one repeat to the next. A field of octets is laid
 // out octet by octet also where the cursor stays in front of it.
-[[nodiscard]] constexpr std::uint32_t repeats(const Place& place) {
+[[nodiscard]] constexpr std::uint32_t repeats(const Place &place) {
     return place.shape == Shape::pieces ? place.count / distinctPieces(place) : place.count;
 }
 
-[[nodiscard]] constexpr std::uint32_t stepBits(const Place& place) {
+[[nodiscard]] constexpr std::uint32_t stepBits(const Place &place) {
     return place.shape == Shape::pieces ? place.advance / repeats(place) : place.unitBits();
 }
 
-[[nodiscard]] constexpr LayoutRecord layoutOf(const Place& place) {
+[[nodiscard]] constexpr LayoutRecord layoutOf(const Place &place) {
     LayoutRecord record;
     if (!hasLayout(place)) {
         record.add({0xff, 0x00, 0x00});

@@ -14,7 +14,8 @@
 namespace netfloor {
 
 // Gives each distinct text a number, in the order of first use.
-template <std::size_t most> class TextNumbers {
+template <std::size_t most>
+class TextNumbers {
 public:
     constexpr std::uint32_t numberOf(std::string_view text) {
         std::size_t slot = hash(text) % slots_.size();
@@ -28,13 +29,9 @@ public:
         return count_++;
     }
 
-    [[nodiscard]] constexpr std::uint32_t count() const {
-        return count_;
-    }
+    [[nodiscard]] constexpr std::uint32_t count() const { return count_; }
 
-    [[nodiscard]] constexpr std::string_view operator[](std::size_t number) const {
-        return texts_[number];
-    }
+    [[nodiscard]] constexpr std::string_view operator[](std::size_t number) const { return texts_[number]; }
 
 private:
     // FNV-1a, of the first characters and the length: enough to tell most names apart.
@@ -52,7 +49,8 @@ private:
 };
 
 // The numbers that value rows refer to, each once, in the order of first use; a range has two of its own.
-template <std::size_t most> class ValuePool {
+template <std::size_t most>
+class ValuePool {
 public:
     constexpr std::uint32_t indexOf(std::uint32_t value) {
         for (std::uint32_t index = 0; index < count_; ++index) {
@@ -65,7 +63,8 @@ public:
 
     constexpr std::uint32_t indexOfRange(std::uint32_t from, std::uint32_t to) {
         for (std::uint32_t index = 0; index + 1 < count_; ++index) {
-            if (numbers_[index] == static_cast<std::int32_t>(from) && numbers_[index + 1] == static_cast<std::int32_t>(to)) {
+            if (numbers_[index] == static_cast<std::int32_t>(from) &&
+                numbers_[index + 1] == static_cast<std::int32_t>(to)) {
                 return index;
             }
         }
@@ -74,13 +73,9 @@ public:
         return index;
     }
 
-    [[nodiscard]] constexpr std::uint32_t count() const {
-        return count_;
-    }
+    [[nodiscard]] constexpr std::uint32_t count() const { return count_; }
 
-    [[nodiscard]] constexpr std::int32_t operator[](std::size_t index) const {
-        return numbers_[index];
-    }
+    [[nodiscard]] constexpr std::int32_t operator[](std::size_t index) const { return numbers_[index]; }
 
 private:
     constexpr std::uint32_t append(std::uint32_t value) {
@@ -97,14 +92,14 @@ inline constexpr std::uint32_t anyFrom = 50;
 inline constexpr std::uint32_t anyTo = 0;
 
 // The rows of a field's list of names.
-[[nodiscard]] constexpr std::size_t valueRowCount(const Field& field) {
+[[nodiscard]] constexpr std::size_t valueRowCount(const Field &field) {
     const bool hasDefault = !field.names->otherwise.empty();
     return field.hasNames() ? field.names->rows.size() + (hasDefault ? 1 : 0) : 0;
 }
 
 inline constexpr std::size_t allValueRows = [] {
     std::size_t rows = 0;
-    for (const Field* const field : catalogue) {
+    for (const Field *const field : catalogue) {
         rows += valueRowCount(*field);
     }
     return rows;
@@ -123,7 +118,7 @@ inline constexpr TextTables textTables = [] {
     TextTables tables;
     std::size_t row = 0;
     for (std::size_t i = 0; i < catalogue.size(); ++i) {
-        const Field& field = *catalogue[i];
+        const Field &field = *catalogue[i];
         tables.lines[i] = tables.texts.numberOf(field.line);
         tables.valueStart[i] = field.hasNames() ? static_cast<std::int32_t>(row) : -1;
         if (!field.hasNames()) {
@@ -133,9 +128,10 @@ inline constexpr TextTables textTables = [] {
             const std::uint32_t index = tables.pool.indexOfRange(anyFrom, anyTo);
             tables.values[row++] = {NETFLOOR_VALUE_RANGE, index, tables.texts.numberOf(field.names->otherwise)};
         }
-        for (const ValueName& name : field.names->rows) {
+        for (const ValueName &name : field.names->rows) {
             const bool one = name.from == name.to;
-            const std::uint32_t index = one ? tables.pool.indexOf(name.from) : tables.pool.indexOfRange(name.from, name.to);
+            const std::uint32_t index =
+                one ? tables.pool.indexOf(name.from) : tables.pool.indexOfRange(name.from, name.to);
             const std::uint32_t kind = one ? NETFLOOR_VALUE_ONE : NETFLOOR_VALUE_RANGE;
             tables.values[row++] = {kind, index, tables.texts.numberOf(name.text)};
         }

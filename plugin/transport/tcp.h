@@ -69,7 +69,8 @@ inline constexpr std::uint32_t wordsBeforeLimit = 3;
 inline constexpr std::uint32_t bitsPerWord = 32;
 
 // The fields that stand in the limited block.
-template <class Pass> NETFLOOR_INLINE inline void fromDataOffset(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void fromDataOffset(Reader<Pass> &at) {
     read<dataOffset>(at);
     read<reservedBesideFlags>(at);
     read<urgent>(at);
@@ -85,7 +86,8 @@ template <class Pass> NETFLOOR_INLINE inline void fromDataOffset(Reader<Pass>& a
 
 // Reads the header from the Data Offset on and gives its length in octets. A Data Offset of 3 or 4 has no room for the
 // fixed header: the header then counts for as many octets, not words, and what is behind its block for payload.
-template <class Pass> NETFLOOR_INLINE inline std::int32_t limitedPart(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline std::int32_t limitedPart(Reader<Pass> &at) {
     LimitedBlock<Pass> block{at, "INLINE BLOCK"};
     const std::uint32_t words = look(at, dataOffset.place).value_or(0);
     // Below three words this wraps to a huge number, which is more than any packet holds.
@@ -101,8 +103,9 @@ template <class Pass> NETFLOOR_INLINE inline std::int32_t limitedPart(Reader<Pas
 }
 
 // Takes the header off the payload. Once one was longer than its payload, no later one of the packet is taken off.
-template <class Pass> NETFLOOR_INLINE inline void accountFor(Reader<Pass>& at, std::int32_t headerOctets) {
-    auto& variables = at.variables();
+template <class Pass>
+NETFLOOR_INLINE inline void accountFor(Reader<Pass> &at, std::int32_t headerOctets) {
+    auto &variables = at.variables();
     if (variables.payloadOctets < headerOctets) {
         variables.tcpLengthShort = 1;
         variables.payloadOctets = 0;
@@ -112,8 +115,9 @@ template <class Pass> NETFLOOR_INLINE inline void accountFor(Reader<Pass>& at, s
     }
 }
 
-template <class Pass> NETFLOOR_INLINE inline void upToDataOffset(Reader<Pass>& at) {
-    auto& variables = at.variables();
+template <class Pass>
+NETFLOOR_INLINE inline void upToDataOffset(Reader<Pass> &at) {
+    auto &variables = at.variables();
     read<sourcePort>(at, &variables.sourcePort);
     readByCarriage<destinationPortIpInIp, destinationPortMinimal, destinationPort>(at, &variables.destinationPort);
     read<sequenceNumber>(at);
@@ -121,7 +125,8 @@ template <class Pass> NETFLOOR_INLINE inline void upToDataOffset(Reader<Pass>& a
     read<reservedBesideDataOffset>(at);
 }
 
-template <class Pass> NETFLOOR_INLINE inline void segment(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void segment(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }

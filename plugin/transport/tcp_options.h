@@ -73,25 +73,29 @@ struct OptionVariables {
     OptionArea tcpOptions; // behind the fixed header
 };
 
-template <class Pass> NETFLOOR_INLINE inline void maximumSegmentOption(Reader<Pass>& at, OptionArea& area) {
+template <class Pass>
+NETFLOOR_INLINE inline void maximumSegmentOption(Reader<Pass> &at, OptionArea &area) {
     const OptionBlock<Pass> option{at, ""};
     optionHead<maximumSegment, maximumLength>(at, area, maximumSegmentOctets);
     read<maximumSize>(at);
 }
 
-template <class Pass> NETFLOOR_INLINE inline void windowScaleOption(Reader<Pass>& at, OptionArea& area) {
+template <class Pass>
+NETFLOOR_INLINE inline void windowScaleOption(Reader<Pass> &at, OptionArea &area) {
     const OptionBlock<Pass> option{at, ""};
     optionHead<windowScale, windowScaleLength>(at, area, windowScaleOctets);
     read<shiftCount>(at);
 }
 
-template <class Pass> NETFLOOR_INLINE inline void sackPermittedOption(Reader<Pass>& at, OptionArea& area) {
+template <class Pass>
+NETFLOOR_INLINE inline void sackPermittedOption(Reader<Pass> &at, OptionArea &area) {
     const OptionBlock<Pass> option{at, ""};
     optionHead<sackPermitted, permittedLength>(at, area, sackPermittedOctets);
 }
 
 // The limit ends the blocks: the first edge that does not fit in.
-template <class Pass> NETFLOOR_INLINE inline void sackOption(Reader<Pass>& at, OptionArea& area) {
+template <class Pass>
+NETFLOOR_INLINE inline void sackOption(Reader<Pass> &at, OptionArea &area) {
     const OptionBlock<Pass> option{at, ""};
     optionHead<sack, sackLength>(at, area);
     while (at.live) {
@@ -101,20 +105,23 @@ template <class Pass> NETFLOOR_INLINE inline void sackOption(Reader<Pass>& at, O
     }
 }
 
-template <class Pass> NETFLOOR_INLINE inline void timestampsFields(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void timestampsFields(Reader<Pass> &at) {
     optionHead<timestamps, timestampsLength>(at, at.variables().tcpOptions, timestampsOctets);
     read<timestampValue>(at);
     read<timestampEcho>(at);
 }
 
 // The one option that nearly every segment carries.
-template <class Pass> NETFLOOR_INLINE inline void timestampsOption(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void timestampsOption(Reader<Pass> &at) {
     const OptionBlock<Pass> option{at, ""};
     stretch<timestampsOctets * bitsPerOctet, timestampsFields<Pass>>(at);
 }
 
 // The digest is what the length leaves, and one octet at least, so that it is cut short where nothing is left.
-template <class Pass> NETFLOOR_INLINE inline void md5SignatureOption(Reader<Pass>& at, OptionArea& area) {
+template <class Pass>
+NETFLOOR_INLINE inline void md5SignatureOption(Reader<Pass> &at, OptionArea &area) {
     const OptionBlock<Pass> option{at, ""};
     optionHead<md5Signature, md5Length>(at, area);
     const std::uint32_t digestOctets = std::clamp(at.left / bitsPerOctet, 1U, md5Digest.place.mostUnits);
@@ -122,7 +129,8 @@ template <class Pass> NETFLOOR_INLINE inline void md5SignatureOption(Reader<Pass
 }
 
 // Takes the option under the cursor, which is of a known kind.
-template <class Pass> NETFLOOR_INLINE inline void option(Reader<Pass>& at, std::uint8_t kind, OptionArea& area) {
+template <class Pass>
+NETFLOOR_INLINE inline void option(Reader<Pass> &at, std::uint8_t kind, OptionArea &area) {
     switch (kind) {
     case 0: return optionOfOneOctet<endOfList>(at, "", area);
     case 1: return optionOfOneOctet<noOperation>(at, "", area);
@@ -135,7 +143,8 @@ template <class Pass> NETFLOOR_INLINE inline void option(Reader<Pass>& at, std::
     }
 }
 
-template <class Pass> NETFLOOR_INLINE inline void padding(Reader<Pass>& at, OptionArea& area) {
+template <class Pass>
+NETFLOOR_INLINE inline void padding(Reader<Pass> &at, OptionArea &area) {
     const Block<Pass> block{at, "Padding"};
     readRun<optionPadding>(at, area.octets);
     if (at.live) {
@@ -144,7 +153,8 @@ template <class Pass> NETFLOOR_INLINE inline void padding(Reader<Pass>& at, Opti
 }
 
 // Once the area is used up no kind takes an option any more.
-template <class Pass> NETFLOOR_INLINE inline void optionRound(Reader<Pass>& at, OptionArea& area) {
+template <class Pass>
+NETFLOOR_INLINE inline void optionRound(Reader<Pass> &at, OptionArea &area) {
     area.taken = false;
     for (std::size_t turn = 0; at.live && turn < optionKinds.size(); ++turn) {
         std::size_t taker = nextTaker<optionKinds>(at, turn);
@@ -171,11 +181,12 @@ template <class Pass> NETFLOOR_INLINE inline void optionRound(Reader<Pass>& at, 
 
 // The options stand in the block that the Data Offset limits, and their live flag is that block's: an option that
 // reaches past the header ends the list, but not the segment, whose payload starts where the Data Offset says.
-template <class Pass> NETFLOOR_INLINE inline void options(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void options(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }
-    OptionArea& area = at.variables().tcpOptions;
+    OptionArea &area = at.variables().tcpOptions;
     BlockChain<Pass> rounds{at};
     do {
         rounds.open("options");

@@ -37,11 +37,12 @@ inline constexpr std::int32_t headerOctets = 8;
     return port == 1812 || port == 1813;
 }
 
-template <class Pass> NETFLOOR_INLINE inline void headerAndPayload(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void headerAndPayload(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }
-    auto& variables = at.variables();
+    auto &variables = at.variables();
     const Block<Pass> header{at, "User Datagram Protocol"};
     read<sourcePort>(at, &variables.sourcePort);
     readByCarriage<destinationPortIpInIp, destinationPortMinimal, destinationPort>(at, &variables.destinationPort);
@@ -64,7 +65,8 @@ template <class Pass> NETFLOOR_INLINE inline void headerAndPayload(Reader<Pass>&
     }
 }
 
-template <class Pass> NETFLOOR_INLINE inline void datagram(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void datagram(Reader<Pass> &at) {
     stretch<64, headerAndPayload<Pass>>(at);
 }
 

@@ -80,13 +80,15 @@ inline constexpr std::int32_t partOctets = 4;
 inline constexpr std::uint32_t hdlcFlag = 0x7e;
 
 // Takes octets that were read off the payload.
-template <class Pass> NETFLOOR_INLINE inline void account(const Reader<Pass>& at, std::int32_t octetCount) {
+template <class Pass>
+NETFLOOR_INLINE inline void account(const Reader<Pass> &at, std::int32_t octetCount) {
     if (at.live) {
         at.variables().payloadOctets -= octetCount;
     }
 }
 
-template <class Pass> NETFLOOR_INLINE inline void header(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void header(Reader<Pass> &at) {
     std::uint32_t greChecksumPresent = 0;
     std::uint32_t greKeyPresent = 0;
     std::uint32_t greSequencePresent = 0;
@@ -113,14 +115,16 @@ template <class Pass> NETFLOOR_INLINE inline void header(Reader<Pass>& at) {
     }
 }
 
-template <class Pass> NETFLOOR_INLINE inline bool flagAhead(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline bool flagAhead(Reader<Pass> &at) {
     return look(at, octets(1)) == hdlcFlag;
 }
 
 // The frame from its opening flag on, which stands under the cursor. A frame that the payload ends before its closing
 // flag just stops; one that the packet ends is a fault.
-template <class Pass> NETFLOOR_INLINE inline void frame(Reader<Pass>& at) {
-    const auto& variables = at.variables();
+template <class Pass>
+NETFLOOR_INLINE inline void frame(Reader<Pass> &at) {
+    const auto &variables = at.variables();
     const Block<Pass> block{at, "HDLC Data"};
     read<openingFlag>(at);
     account(at, 1);
@@ -140,11 +144,12 @@ template <class Pass> NETFLOOR_INLINE inline void frame(Reader<Pass>& at) {
     account(at, 1);
 }
 
-template <class Pass> NETFLOOR_INLINE inline void packet(Reader<Pass>& at) {
+template <class Pass>
+NETFLOOR_INLINE inline void packet(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }
-    const auto& variables = at.variables();
+    const auto &variables = at.variables();
     const Block<Pass> block{at, "Generic Routing Encapsulation"};
     header(at);
     if (at.live) {

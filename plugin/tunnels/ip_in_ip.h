@@ -42,8 +42,9 @@ inline constexpr Field sourceAddress      {636, "Original Src Address",         
 inline constexpr Field destinationAddress {637, "Original Dest Address",           octets(4),                R"(  Original Dest Address=%-["%u":"."])"};
 // clang-format on
 
-template <class Pass> NETFLOOR_INLINE inline void header(Reader<Pass>& at) {
-    auto& variables = at.variables();
+template <class Pass>
+NETFLOOR_INLINE inline void header(Reader<Pass> &at) {
+    auto &variables = at.variables();
     read<version>(at);
     read<headerLength>(at, [&](std::uint32_t words) { variables.ipHeaderOctets = words * 4; });
     ipv4::typeOfService(at);

@@ -42,8 +42,9 @@ inline constexpr Field sourceAddress      {651, "Original Src Address",  octets(
 inline constexpr std::uint32_t headerOctets = 8;
 inline constexpr std::uint32_t sourceAddressOctets = 4;
 
-template <class Pass> NETFLOOR_INLINE inline void header(Reader<Pass>& at) {
-    auto& variables = at.variables();
+template <class Pass>
+NETFLOOR_INLINE inline void header(Reader<Pass> &at) {
+    auto &variables = at.variables();
     std::uint32_t minimalSourcePresent = 0;
     read<protocol>(at, &variables.ipProtocol);
     read<reserved>(at);

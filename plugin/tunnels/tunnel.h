@@ -19,7 +19,8 @@
 namespace netfloor::tunnel {
 
 // Runs the production of the payload. GRE is known behind IP in IP only; ICMPv6 and SCTP are not.
-template <class Pass> NETFLOOR_INLINE inline void payload(Reader<Pass>& at, std::uint32_t innermostTunnel) {
+template <class Pass>
+NETFLOOR_INLINE inline void payload(Reader<Pass> &at, std::uint32_t innermostTunnel) {
     switch (at.variables().ipProtocol) {
     case protocolIcmp: return apart<icmp::message<Pass>>(at);
     case protocolTcp: return apart<tcp::segment<Pass>>(at);
@@ -31,8 +32,9 @@ template <class Pass> NETFLOOR_INLINE inline void payload(Reader<Pass>& at, std:
 }
 
 // Reads the tunnel that the protocol says, and all tunnels inside it.
-template <class Pass> NETFLOOR_INLINE inline void packet(Reader<Pass>& at) {
-    const auto& variables = at.variables();
+template <class Pass>
+NETFLOOR_INLINE inline void packet(Reader<Pass> &at) {
+    const auto &variables = at.variables();
     BlockChain<Pass> levels{at};
     std::uint32_t tunnel = variables.ipProtocol;
     while (at.live) {

@@ -208,15 +208,15 @@ TEST_F(Command, tellsMarksByDesignFromDamage) {
         {ipv4({.protocol = 17, .payload = udp(1, 2, hex("61*4"))}), 0, "good     0x10 a UDP payload", 0},
         {ipv4({.protocol = 47, .payload = hex("0000 0800 45*20")}), 0, "good     0x2 every GRE payload", 0},
         {ipv4({.protocol = 132, .payload = init}), 0, "good     0x8 an SCTP INIT", 0},
-        {ipv4({.protocol = 17, .payload = hex("0001 0002 0010")}), 0,
-         "unread   0x10 bits left over inside a length: 2 octets behind 'UDP Destination Port' at octet 23", 0},
+        {ipv4({.protocol = 17, .payload = hex("0001 0002 00")}), 0,
+         "unread   0x10 bits left over inside a length: 1 octet behind 'UDP Destination Port' at octet 23", 0},
         {ipv4({.protocol = 6, .payload = tcpHead + hex("f002 0100 0000 0000")}), 0, "DAMAGED  0x2 every TCP header", 1},
         {ipv4({.protocol = 132, .payload = longInit}), 0, "DAMAGED  0x8 length reaches behind the bits left", 1},
         {ipv4({.protocol = 1, .payload = hex("08 01 0000 0001 0001")}), 0,
          "DAMAGED  0x2 expectation not met behind 'ICMP Message Type' at octet 20", 1},
         // The capture, not the sender, has cut the first.
         {ipv4({.protocol = 132, .payload = longInit}), 60, "cut      0x8", 0},
-        {shortened(udpPacket, 10), 0, "unread", 0},
+        {shortened(udpPacket, 11), 0, "unread", 0},
     };
     for (const Row &row : rows) {
         SCOPED_TRACE(row.expected);

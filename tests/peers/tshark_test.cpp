@@ -151,7 +151,8 @@ TEST_P(Captures, keyFieldsAgreeWithTshark) {
                 continue;
             }
             ++compared;
-            EXPECT_EQ(normal(value, pairs[pair].unit), normal(other, pairs[pair].peerUnit)) << "packet " << row[0] << ", " << pairs[pair].key;
+            EXPECT_EQ(normal(value, pairs[pair].unit), normal(other, pairs[pair].peerUnit))
+                << "packet " << row[0] << ", " << pairs[pair].key;
         }
     }
     EXPECT_GT(compared, 0) << "nothing to compare";

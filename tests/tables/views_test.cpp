@@ -67,10 +67,8 @@ private:
         if (known == nullptr) {
             return fail(packet, report, "no such field in the tables");
         }
-        const std::string_view name =
-            std::string_view(report.name)
-                .substr(report.name.find_first_not_of(' ') + 1 == 0 ? report.name.size()
-                                                                    : report.name.find_first_not_of(' '));
+        std::string_view name = report.name;
+        name.remove_prefix(std::min(name.find_first_not_of(' '), name.size()));
         if (name != known->name && name != known->shortName) {
             return fail(packet, report, "named " + std::string(known->name));
         }
@@ -306,6 +304,89 @@ TEST(Views, AgreeOnAnyPacket) {
         }
     }
     EXPECT_GE(all.reports(), 50000U);
+}
+
+TEST(Views, NameValues) {
+    const struct {
+        std::uint32_t id, value;
+        const char *name;
+    } cases[] = {
+        {295, 6, "TCP"},
+        {295, 138, "Unassigned"}, // a range, ends included
+        {295, 252, "Unassigned"},
+        {295, 253, ""},                // no row at all
+        {247, 4, "Parameter Problem"}, // a row of its own in front of a range
+        {247, 5, "Undefined"},
+        {247, 127, "Undefined"},
+        {247, 128, "Echo Request"},
+        {802, 62, "reserved by IETF"},
+        {802, 63, "IETF-defined Chunk Extensions"},
+        {802, 255, "IETF-defined Chunk Extensions"},
+        {479, 139, "NETBIOS Session Service"},
+        {479, 50000, "50000"},                      // the default, which is a format
+        {479, 50, "Remote Mail Checking Protocol"}, // the numbers of the default row are no range
+        {698, 0xabcd, "abcd"},
+        {537, 42, "Reserved"}, // and one that is none
+        {150, 4, ""},
+    };
+    for (const auto &[id, value, name] : cases) {
+        EXPECT_EQ(tables().find(id)->valueName(value), name) << id << ' ' << value;
+    }
+    EXPECT_EQ(tables().find("Version"), tables().find(150));
+    EXPECT_EQ(tables().find("discard packet"), tables().find(243)); // a short name
+    EXPECT_EQ(tables().named("TCP Destination Port").size(), 3U);
+    EXPECT_EQ(tables().find("No Such Field"), nullptr);
+    EXPECT_EQ(tables().find(151), nullptr);
+}
+
+// The key-field table tells neither width nor kind; the host takes both from the field of the same name.
+TEST(Views, TellKeyTypes) {
+    const std::map<KeyType, std::set<std::string>> expected = {
+        {KeyType::number8,
+         {"Checksum Present",
+          "Code",
+          "Code ",
+          "DF",
+          "Data Offset",
+          "Embedded IP Protocols",
+          "FIN",
+          "Header Extention length",
+          "ICMP Message Type",
+          "IPinIP Protocol",
+          "Key Present",
+          "M Flag",
+          "MF",
+          "MIPinIP Protocol",
+          "Next Header",
+          "Opt Data Length",
+          "Option Type",
+          "Original Internet Header Length",
+          "Protocol",
+          "RST",
+          "SCTP Chunk Type",
+          "SYN",
+          "Sequence Number Present",
+          "Time to Live",
+          "Version"}},
+        {KeyType::number16,
+         {"Fragment Offset", "GRE Protocol", "ICMP Sequence Number", "Identification", "Original IP Total Length",
+          "Payload Length", "SCTP Destination Port Number", "SCTP Source Port Number", "Stream Indetifier S",
+          "Stream Sequence Number n", "TCP Destination Port", "TCP Source Port", "Total Length", "UDP Destination Port",
+          "UDP Source Port", "fragment Offset"}},
+        {KeyType::number32,
+         {"Acknowledgement Number", "Cumulative TSN Ack", "GRE Key", "Initial Transmission Sequence Number(I_TSN)",
+          "Payload Protocol Identifier", "SPI", "Sequence Number", "Sequency Number", "TSN"}},
+        {KeyType::ipv4Address,
+         {"Address Mask", "Destination Address", "Original Dest Address", "Original Src Address", "Source Address"}},
+        {KeyType::ipv6Address, {"Destination IP Address", "IP Address", "Source IP Address"}},
+    };
+    std::map<KeyType, std::set<std::string>> found;
+    for (const Octets &packet : packetsOfAllFields()) {
+        for (const KeyValue &key : sharedHost().run(Pass::xtr, packet).keys) {
+            found[key.type].insert(key.name);
+        }
+    }
+    EXPECT_EQ(found, expected);
 }
 
 } // namespace
