@@ -23,6 +23,7 @@
 #include "frame/field.h"
 #include "frame/options.h"
 #include "frame/step.h"
+#include "frame/stretch.h"
 
 namespace netfloor::tcp {
 
@@ -69,7 +70,7 @@ inline constexpr std::int32_t sackPermittedOctets = 2;
 inline constexpr std::int32_t timestampsOctets = 10;
 
 struct OptionVariables {
-    std::int32_t tcpOptionOctets; // of the area behind the fixed header
+    OptionArea tcpOptions; // behind the fixed header
 };
 
 template <class Pass>
@@ -105,11 +106,17 @@ NETFLOOR_INLINE inline void sackOption(Reader<Pass> &at, OptionArea &area) {
 }
 
 template <class Pass>
-NETFLOOR_INLINE inline void timestampsOption(Reader<Pass> &at, OptionArea &area) {
-    const OptionBlock<Pass> option{at, ""};
-    optionHead<timestamps, timestampsLength>(at, area, timestampsOctets);
+NETFLOOR_INLINE inline void timestampsFields(Reader<Pass> &at) {
+    optionHead<timestamps, timestampsLength>(at, at.variables().tcpOptions, timestampsOctets);
     read<timestampValue>(at);
     read<timestampEcho>(at);
+}
+
+// The one option that nearly every segment carries.
+template <class Pass>
+NETFLOOR_INLINE inline void timestampsOption(Reader<Pass> &at) {
+    const OptionBlock<Pass> option{at, ""};
+    stretch<timestampsOctets * bitsPerOctet, timestampsFields<Pass>>(at);
 }
 
 // The digest is what the length leaves, and one octet at least, so that it is cut short where nothing is left.
@@ -131,7 +138,7 @@ NETFLOOR_INLINE inline void option(Reader<Pass> &at, std::uint8_t kind, OptionAr
     case 3: return windowScaleOption(at, area);
     case 4: return sackPermittedOption(at, area);
     case 5: return sackOption(at, area);
-    case 8: return timestampsOption(at, area);
+    case 8: return timestampsOption(at);
     default: return md5SignatureOption(at, area);
     }
 }
@@ -179,7 +186,7 @@ NETFLOOR_INLINE inline void options(Reader<Pass> &at) {
     if (!at.live) {
         return;
     }
-    OptionArea area{at.variables().tcpOptionOctets};
+    OptionArea &area = at.variables().tcpOptions;
     BlockChain<Pass> rounds{at};
     do {
         rounds.open("options");
