@@ -7,7 +7,10 @@
 #pragma once
 
 #include <array>
+#include <cstddef>
 #include <cstdint>
+#include <cstring>
+#include <utility>
 
 #include "frame/inline.h"
 
@@ -113,6 +116,36 @@ template <std::uint32_t low, std::uint32_t high>
         value = value << bitsPerOctet | from[octet];
     }
     return value;
+}
+
+// The same for a constant number of octets, for which compilers then take one load.
+template <std::uint32_t count>
+[[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t octetsAt(const std::uint8_t *data, std::uint32_t first) {
+    if (!onOctetBorder(first)) [[unlikely]] {
+        return octetsAcross(data, first, count);
+    }
+    const std::uint8_t *const from = data + (first - 1) / bitsPerOctet;
+    std::uint32_t value = 0;
+    [&]<std::size_t... octet>(std::index_sequence<octet...>) NETFLOOR_INLINE {
+        ((value = value << bitsPerOctet | from[octet]), ...);
+    }
+    (std::make_index_sequence<count>{});
+    return value;
+}
+
+// Copies `count` octets from bit number `first` on.
+template <std::size_t count>
+[[nodiscard]] NETFLOOR_INLINE inline std::array<std::uint8_t, count> octetArrayAt(const std::uint8_t *data,
+                                                                                  std::uint32_t first) {
+    std::array<std::uint8_t, count> octets{};
+    if (onOctetBorder(first)) [[likely]] {
+        std::memcpy(octets.data(), data + (first - 1) / bitsPerOctet, count);
+        return octets;
+    }
+    for (std::uint32_t octet = 0; octet < count; ++octet) {
+        octets[octet] = static_cast<std::uint8_t>(octetAt(data, first + octet * bitsPerOctet));
+    }
+    return octets;
 }
 
 inline constexpr auto reversedOctets = [] {

@@ -83,24 +83,28 @@ struct Unsettled {
     std::uint32_t blocks = 0; // on the stack behind the last push; 0: there was none
 };
 
-template <class Pass>
-class Reader {
-public:
-    using Context = typename Pass::Context;
-
-    Context *context;
-    DecodeState *state;
-    std::uint8_t *data;
-    std::uint32_t cursor;
-    std::uint32_t left;
-    std::uint32_t blockDepth;
-    std::uint32_t limitDepth;
+// Where a reader stands: what of it goes along when a production runs out of line.
+struct Standing {
+    std::uint32_t cursor = 0;
+    std::uint32_t left = 0;
+    std::uint32_t blockDepth = 0;
+    std::uint32_t limitDepth = 0;
     bool live = true;
     Outcome outcome = Outcome::on;
     bool unchecked = false; // a flag was set that the verdict has not taken in yet
     std::uint32_t bitOrder = 0;
     BlockName block = {}; // name of the innermost open block
     BlockName shown = {}; // the name that `blockName` is to hold, in the passes that report nothing
+};
+
+template <class Pass>
+class Reader : public Standing {
+public:
+    using Context = typename Pass::Context;
+
+    Context *context;
+    DecodeState *state;
+    std::uint8_t *data;
 
     // What is known in a stretch (see stretch.h): constants where the compiler looks, and 0 outside.
     std::uint32_t sureBits = 0;   // bits that are left, from an octet border on, and ranges for their fields
@@ -110,6 +114,10 @@ public:
     NETFLOOR_INLINE explicit Reader(Context &passContext) : context(&passContext), state(passContext.decodeState) {
         takeState();
     }
+
+    // Goes on where another reader stands, behind which all is settled.
+    NETFLOOR_INLINE Reader(Context &passContext, const Standing &standing)
+        : Standing(standing), context(&passContext), state(passContext.decodeState), data(state->data) {}
 
     NETFLOOR_INLINE static typename Pass::Variables &variables() { return Pass::variables; }
 
@@ -188,6 +196,13 @@ public:
             state->blockStarts.count = unsettled.blocks;
         }
         unsettled = {};
+    }
+
+    // Goes on where a production that ran out of line left off.
+    NETFLOOR_INLINE void stand(const Standing &standing) {
+        static_cast<Standing &>(*this) = standing;
+        data = state->data;
+        forget();
     }
 
     // What was sure is no longer: the reader comes from elsewhere, where all was settled.

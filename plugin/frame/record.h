@@ -43,8 +43,10 @@ template <const Field &field>
             constexpr Piece piece = field.place.pieces[i];
             value = joined(value, pieceAt<piece.low, piece.high>(data, cursor), piece.width());
         });
+    } else if constexpr (place.shape == Shape::octets && !place.isRun()) {
+        value = octetsAt<place.count>(data, cursor);
     } else if constexpr (place.shape == Shape::octets) {
-        value = octetsAt(data, cursor, place.isRun() ? units : place.count);
+        value = octetsAt(data, cursor, units);
     } else if constexpr (place.shape == Shape::octetsBackward) {
         for (std::uint32_t octet = units; octet-- > 0;) {
             value = value << bitsPerOctet | octetAt(data, cursor + octet * bitsPerOctet);
