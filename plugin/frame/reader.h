@@ -79,7 +79,7 @@ struct LastRead {
 struct Unsettled {
     RecordWriter writer = nullptr; // of the last field; null: there was none
     std::uint32_t cursor = 0;
-    std::uint32_t advance = 0;
+    std::int32_t advance = 0;
     std::uint32_t blocks = 0; // on the stack behind the last push; 0: there was none
 };
 
@@ -187,7 +187,7 @@ public:
     NETFLOOR_INLINE void settle() {
         if (unsettled.writer != nullptr) {
             state->condition = 1;
-            state->advance = static_cast<std::int32_t>(unsettled.advance);
+            state->advance = unsettled.advance;
             last().writer = unsettled.writer;
             last().cursor = unsettled.cursor;
             last().seenPieces = 0;
