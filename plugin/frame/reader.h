@@ -183,8 +183,11 @@ public:
         forget();
     }
 
-    // Writes what a stretch has put off.
+    // Writes what a stretch has put off. The passes that report have nothing put off.
     NETFLOOR_INLINE void settle() {
+        if (Pass::reports) {
+            return;
+        }
         if (unsettled.writer != nullptr) {
             state->condition = 1;
             state->advance = unsettled.advance;
