@@ -107,6 +107,7 @@ public:
     std::uint8_t *data;
 
     // What is known in a stretch (see stretch.h): constants where the compiler looks, and 0 outside.
+    bool inStretch = false;
     std::uint32_t sureBits = 0;   // bits that are left, from an octet border on, and ranges for their fields
     std::uint32_t sureBlocks = 0; // blocks that there is room for
     Unsettled unsettled = {};
@@ -183,9 +184,9 @@ public:
         forget();
     }
 
-    // Writes what a stretch has put off. The passes that report have nothing put off.
+    // Writes what a stretch has put off.
     NETFLOOR_INLINE void settle() {
-        if (Pass::reports) {
+        if (Pass::reports || !inStretch) {
             return;
         }
         if (unsettled.writer != nullptr) {
@@ -210,6 +211,7 @@ public:
 
     // What was sure is no longer: the reader comes from elsewhere, where all was settled.
     NETFLOOR_INLINE void forget() {
+        inStretch = false;
         sureBits = 0;
         sureBlocks = 0;
         unsettled = {};
