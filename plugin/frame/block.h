@@ -134,9 +134,9 @@ private:
 };
 
 // Runs a production out of line, on a reader of its own: the caller's is not touched by the call, and so both
-// can stay in registers.
+// can stay in registers. What it calls by itself is inlined, so that its reader has no address.
 template <auto production, class Pass>
-[[gnu::noinline]] void outOfLine(typename Pass::Context &context, Standing &standing) {
+[[gnu::noinline, gnu::flatten]] void outOfLine(typename Pass::Context &context, Standing &standing) {
     Reader<Pass> at(context, standing);
     production(at);
     at.settle();

@@ -71,8 +71,8 @@ NETFLOOR_INLINE inline void sureStep(Reader<Pass> &at, Store into) {
 
 // Whether a stretch can make sure of a field: all of fixed size that move in whole octets and are part of it.
 template <const Field &field>
-inline constexpr bool canBeSure = !field.place.isRun() && field.place.shape != Shape::ahead &&
-                                  field.place.advance % bitsPerOctet == 0;
+inline constexpr bool canBeSure =
+    !field.place.isRun() && field.place.shape != Shape::ahead && field.place.advance % bitsPerOctet == 0;
 
 // The step of a field of `units` units; see `read` and `readRun`.
 template <const Field &field, class Pass, class Store>
