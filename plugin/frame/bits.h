@@ -156,13 +156,25 @@ inline constexpr auto reversedOctets = [] {
     return table;
 }();
 
+// Eight octets at once, the bits of each reversed.
+[[nodiscard]] constexpr std::uint64_t eachReversed(std::uint64_t octets) {
+    octets = (octets >> 1 & 0x5555555555555555) | (octets & 0x5555555555555555) << 1;
+    octets = (octets >> 2 & 0x3333333333333333) | (octets & 0x3333333333333333) << 2;
+    return (octets >> 4 & 0x0f0f0f0f0f0f0f0f) | (octets & 0x0f0f0f0f0f0f0f0f) << 4;
+}
+
 // Reverses the bits of each octet of `data` from bit number `from` on, up to the last whole octet of a
 // packet of `totalBits`. Off an octet border the octets are those counted from `from` on.
-constexpr void reverseOctets(std::uint8_t *data, std::uint32_t from, std::uint32_t totalBits) {
+inline void reverseOctets(std::uint8_t *data, std::uint32_t from, std::uint32_t totalBits) {
     const std::uint32_t shift = (from - 1) % bitsPerOctet;
     const std::uint32_t end = totalBits / bitsPerOctet;
     std::uint32_t octet = (from - 1) / bitsPerOctet;
     if (shift == 0) {
+        for (std::uint64_t octets = 0; octet + sizeof octets <= end; octet += sizeof octets) {
+            std::memcpy(&octets, data + octet, sizeof octets);
+            octets = eachReversed(octets);
+            std::memcpy(data + octet, &octets, sizeof octets);
+        }
         for (; octet < end; ++octet) {
             data[octet] = reversedOctets[data[octet]];
         }
