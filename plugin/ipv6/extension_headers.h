@@ -206,7 +206,7 @@ NETFLOOR_INLINE inline void upperProtocol(Reader<Pass> &at, std::uint32_t protoc
     case protocolIcmp:
     case protocolIcmpv6: return apart<icmpv6::message<Pass>>(at);
     case protocolTcp: return apart<tcp::segment<Pass>>(at);
-    case protocolUdp: return apart<udp::datagram<Pass>>(at);
+    case protocolUdp: return udp::datagram(at);
     case protocolGre: return apart<gre::packet<Pass>>(at);
     case protocolSctp: return apart<sctp::packet<Pass>>(at);
     case protocolEsp: return apart<securityPayload<Pass>>(at);
