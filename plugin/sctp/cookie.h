@@ -22,7 +22,7 @@ namespace netfloor::sctp {
 
 // clang-format off
 inline constexpr Field cookieEchoFlags = lowerFlagsField(893);
-inline constexpr Field cookie          {895, "    Cookie", octetRunBackward(), R"(    Cookie=%-["%x"])"};
+inline constexpr Field cookie {895, "    Cookie", octetRunBackward(), R"(    Cookie=%-["%x"])"};
 
 inline constexpr Field cookieAckFlags  = lowerFlagsField(892);
 // clang-format on

@@ -61,18 +61,18 @@ inline constexpr ValueNames initAckParameterNames{.rows = initAckParameterRows, 
 inline constexpr ValueNames addressTypeNames{.rows = addressTypeRows, .otherwise = "Unknow Address Type"};
 
 // clang-format off
-inline constexpr Field initParameterType       {847, "Parameter Type",       octets(2), "Parameter Type=%-S", &initParameterNames};
-inline constexpr Field initParameterLength     {848, "      Length",         octets(2), "      Length=%u octet(s)"};
-inline constexpr Field initAckParameterType    {851, "Parameter Type",       octets(2), "Parameter Type=%-S", &initAckParameterNames};
-inline constexpr Field initAckParameterLength  {852, "      Length",         octets(2), "      Length=%u octet(s)"};
+inline constexpr Field initParameterType       {847, "Parameter Type",                               octets(2),  "Parameter Type=%-S", &initParameterNames};
+inline constexpr Field initParameterLength     {848, "      Length",                                 octets(2),  "      Length=%u octet(s)"};
+inline constexpr Field initAckParameterType    {851, "Parameter Type",                               octets(2),  "Parameter Type=%-S", &initAckParameterNames};
+inline constexpr Field initAckParameterLength  {852, "      Length",                                 octets(2),  "      Length=%u octet(s)"};
 
-inline constexpr Field ipv4Address             {855, "        IP Address",   octets(4), R"(        IP Address=%-["%u":"."])"};
-inline constexpr Field cookieLifeSpanIncrement {867, "        Suggested Cookie Life-span Increment", octets(4), "        Suggested Cookie Life-span Increment=%u (msec.)"};
-inline constexpr Field hostName                {868, "        Host Name",    octetRun(), R"(        Host Name=%-["%c"])"};
-inline constexpr Field supportedAddressType    {870, "        Address Type", octets(2),  "        Address Type=%-S", &addressTypeNames};
-inline constexpr Field ecnCapable              {871, "        Reserved",     octetRun(), "        Reserved", noNames, "%x"};
-inline constexpr Field unknownParameter        {872, "        Reserved",     octetRun(), "        Reserved", noNames, "%x"};
-inline constexpr Field stateCookie             {857, "        State Cookie", octetRun(), R"(        State Cookie=%-["%x"])"};
+inline constexpr Field ipv4Address             {855, "        IP Address",                           octets(4),  R"(        IP Address=%-["%u":"."])"};
+inline constexpr Field cookieLifeSpanIncrement {867, "        Suggested Cookie Life-span Increment", octets(4),  "        Suggested Cookie Life-span Increment=%u (msec.)"};
+inline constexpr Field hostName                {868, "        Host Name",                            octetRun(), R"(        Host Name=%-["%c"])"};
+inline constexpr Field supportedAddressType    {870, "        Address Type",                         octets(2),  "        Address Type=%-S", &addressTypeNames};
+inline constexpr Field ecnCapable              {871, "        Reserved",                             octetRun(), "        Reserved", noNames, "%x"};
+inline constexpr Field unknownParameter        {872, "        Reserved",                             octetRun(), "        Reserved", noNames, "%x"};
+inline constexpr Field stateCookie             {857, "        State Cookie",                         octetRun(), R"(        State Cookie=%-["%x"])"};
 // clang-format on
 
 // What a parameter takes from the octets of its list: its Length less 8, and not its Length. So a list seldom ends with

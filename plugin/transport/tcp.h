@@ -97,7 +97,7 @@ NETFLOOR_INLINE inline std::int32_t limitedPart(Reader<Pass> &at) {
         return static_cast<std::int32_t>(words);
     }
     const auto headerOctets = static_cast<std::int32_t>(words * bitsPerWord / bitsPerOctet);
-    at.variables().tcpOptionOctets = headerOctets - fixedHeaderOctets;
+    at.variables().tcpOptions.octets = headerOctets - fixedHeaderOctets;
     apart<options<Pass>>(at);
     return headerOctets;
 }
