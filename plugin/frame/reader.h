@@ -16,6 +16,7 @@
 #include <cstddef>
 #include <cstdint>
 #include <cstring>
+#include <string_view>
 
 #include "frame/field.h"
 #include "frame/record.h"
@@ -47,6 +48,8 @@ struct BlockName {
     BlockName() = default;
     template <std::size_t octets>
     consteval BlockName(const char (&literal)[octets]) : text(literal), size(octets - 1) {}
+    // The name of a value, which is a literal too.
+    constexpr explicit BlockName(std::string_view literal) : text(literal.data()), size(literal.size()) {}
 
     // Copies the name and its terminating zero.
     NETFLOOR_INLINE void copyTo(char *buffer) const { std::memcpy(buffer, text, size + 1); }

@@ -191,7 +191,7 @@ NETFLOOR_INLINE inline void stepBack(Reader<Pass> &at, std::uint32_t bitCount) {
         return;
     }
     if (at.unsettled.advance == static_cast<std::int32_t>(bitCount)) {
-        // What a stretch has just read.
+        // An address that a stretch has just read.
         at.unsettled.advance = -at.unsettled.advance;
         at.sureBits += bitCount;
         at.cursor -= bitCount;

@@ -70,7 +70,7 @@ inline constexpr Field authenticationSequence {209, "Sequency Number",         o
 inline constexpr Field authenticationData     {211, "Authentication Data",     octets(1),                "Authentication Data=%x"};
 // clang-format on
 
-struct ExtensionHeaderVariables : HeaderVariables, OptionVariables {
+struct ExtensionHeaderVariables {
     std::int32_t ahDataOctets; // of the authentication header that was read last
 };
 

@@ -29,7 +29,7 @@ inline constexpr Field cookieAckFlags  = lowerFlagsField(892);
 
 // `chunkOctets` stays without the head, so that the walk takes four octets fewer than the Length.
 template <class Pass>
-void cookieEcho(Reader<Pass> &at) {
+void cookieEchoChunk(Reader<Pass> &at) {
     std::int32_t &chunkOctets = at.variables().chunkOctets;
     const Block<Pass> block{at, "Cookie Echo"};
     read<cookieEchoFlags>(at);
@@ -41,7 +41,7 @@ void cookieEcho(Reader<Pass> &at) {
 }
 
 template <class Pass>
-void cookieAck(Reader<Pass> &at) {
+void cookieAckChunk(Reader<Pass> &at) {
     const Block<Pass> block{at, "Cookie Acknowledge"};
     read<cookieAckFlags>(at);
     readChunkLength(at);

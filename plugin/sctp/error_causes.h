@@ -90,10 +90,12 @@ void missingParameters(Reader<Pass> &at) {
     std::int32_t &missingParameterCount = at.variables().missingParameterCount;
     read<missingLength>(at);
     read<missingNumber>(at, &missingParameterCount);
-    countedList(at, missingParameterCount, [&at] {
+    const bool cutShort = countedList(at, missingParameterCount, [&at] {
         const Block<Pass> block{at, "INLINE BLOCK"};
         read<missingType>(at);
     });
+    // The list of causes ends behind a last type that is cut short.
+    at.test(!cutShort);
 }
 
 // The list runs until a field does not fit: behind the last parameter that is the type of the next.
@@ -146,12 +148,8 @@ void causeOf(Reader<Pass> &at, std::uint32_t code) {
 
 // The block of a cause bears the name of its code.
 [[nodiscard]] constexpr BlockName causeBlock(std::uint32_t code) {
-    BlockName name{"Unknown Cause Code"};
-    if (const std::uint32_t row = rowNumber<causeCodeNames>(code); row != 0) {
-        name.text = causeCodeRows[row - 1].text.data();
-        name.size = causeCodeRows[row - 1].text.size();
-    }
-    return name;
+    const std::uint32_t row = rowNumber<causeCodeNames>(code);
+    return row == 0 ? BlockName{"Unknown Cause Code"} : BlockName{causeCodeRows[row - 1].text};
 }
 
 // The list goes on as long as its rounds end with the condition true, mostly with a field that did fit, whether or

@@ -65,14 +65,14 @@ void initFields(Reader<Pass> &at) {
 }
 
 template <class Pass>
-void init(Reader<Pass> &at) {
+void initChunk(Reader<Pass> &at) {
     LimitedBlock<Pass> block{at, "INIT"};
     block.limit(limitFromLength<initLengthAhead>(at, &at.variables().chunkOctets));
     initFields<initIds, initParameters<Pass>>(at);
 }
 
 template <class Pass>
-void initAck(Reader<Pass> &at) {
+void initAckChunk(Reader<Pass> &at) {
     const Block<Pass> block{at, "Init Ack"};
     initFields<initAckIds, initAckParameters<Pass>>(at);
 }

@@ -84,7 +84,7 @@ void reckonParameter(Reader<Pass> &at, std::int32_t &listOctets) {
     }
 }
 
-// Whether the list has another parameter, by that reckoning.
+// Whether the list has another parameter, by that reckoning. It is asked also behind a field that did not fit.
 template <class Pass>
 [[nodiscard]] bool listGoesOn(Reader<Pass> &at, std::int32_t listOctets) {
     return at.test(listOctets >= 1) && at.live;
@@ -162,8 +162,8 @@ void initParameters(Reader<Pass> &at) {
             initParameter(at);
             reckonParameter(at, variables.chunkOctets);
         }
-        // A parameter of Length 0 would be read again for ever. Where not even a type is left, the next limit ends
-        // the list.
+        // A parameter of Length 0 would be read again for ever. Where less than a type is left, the next limit is
+        // another one, and ends the list with its mark.
         if (at.cursor == start && at.left >= typeBits) {
             at.live = false;
         }

@@ -42,7 +42,7 @@ inline constexpr Field completeLength           = lengthField(891);
 // clang-format on
 
 template <class Pass>
-void shutdown(Reader<Pass> &at) {
+void shutdownChunk(Reader<Pass> &at) {
     const Block<Pass> block{at, "Shutdown"};
     read<shutdownFlags>(at);
     read<shutdownLength>(at, &at.variables().chunkOctets);
@@ -50,14 +50,14 @@ void shutdown(Reader<Pass> &at) {
 }
 
 template <class Pass>
-void shutdownAck(Reader<Pass> &at) {
+void shutdownAckChunk(Reader<Pass> &at) {
     const Block<Pass> block{at, "Shutdown Acknowledge"};
     read<shutdownAckFlags>(at);
     read<shutdownAckLength>(at, &at.variables().chunkOctets);
 }
 
 template <class Pass>
-void shutdownComplete(Reader<Pass> &at) {
+void shutdownCompleteChunk(Reader<Pass> &at) {
     const Block<Pass> block{at, "Shutdown Complete"};
     read<completeReserved>(at);
     read<completeTagBit>(at);
