@@ -83,7 +83,7 @@ typedef struct ProtocolIdentity {
  *       848 and 852 (lengths of SCTP parameters); what it says is not published, and no reader needs it
  */
 typedef struct FieldDescriptor {
-    uint32_t flags;          /* four octets, see "Flags" below; NETFLOOR_NO_FIELD in the row that ends the table */
+    uint32_t flags;          /* four octets, see "Flags" above; NETFLOOR_NO_FIELD in the row that ends the table */
     uint32_t fieldId;        /* the id under which the MD pass reports it, in one row only */
     uintptr_t keyIndex;      /* 1, 2, 3... for the key fields, 0 for the others; no index of a KeyFieldRow */
     const char *name;        /* as the MD pass reports it, without blanks in front; several fields may bear one name,

@@ -3,8 +3,8 @@
 //
 //     const netfloor::FieldTables tables(netfloor::PluginLibrary::open("build/plugin/libnetfloor.so"));
 //     const netfloor::FieldDescription *protocol = tables.find("Protocol");
-//     std::cout << protocol->valueName(6) << '\n';    // Transmission Control Protocol
-//     std::cout << protocol->display(6) << '\n';      // Protocol=Transmission Control Protocol
+//     std::cout << protocol->valueName(6) << '\n';    // TCP
+//     std::cout << protocol->display(6) << '\n';      // Protocol=TCP
 #pragma once
 
 #include <cstddef>
