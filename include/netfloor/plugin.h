@@ -30,7 +30,8 @@ extern "C" {
  * MD: reports each field with its long text, name, id and bit ranges (hs_AddDecodedFieldsData).
  * Returns 1 when the pass ran to its end, also when the packet ended early, and 0 when it was cut
  * off: storage ran out, or hd_PreDecode refused. A pass that is cut off leaves its blocks open and
- * `bitsLeft` of the context as it was; `flags` says which storage it was.
+ * `bitsLeft` of the context as it was, or as the last hand-off wrote it; `flags` says which storage
+ * it was.
  */
 uint8_t NETFLOOR_CDECL vex_PreDecodeMD(PreDecodeContext *context);
 

@@ -32,7 +32,11 @@ typedef struct BitRange {
     uint32_t untouched[2]; /* the host's own */
 } BitRange;
 
-/* The field read last. It is complete whenever the plug-in calls the host, and on return. */
+/*
+ * The field read last, complete whenever the plug-in calls the host, and on return. In the MV and XTR passes, what that
+ * field does not write itself in `ranges` may be older than the field before: elements behind the last one, flag words
+ * of octets, bit numbers of the later groups of an address.
+ */
 typedef struct FieldRecord {
     uint32_t fieldId;          /* id of the field, as in the field table */
     char *fieldName;           /* buffer of at least 255 octets: name of the field, zero-terminated */

@@ -10,9 +10,10 @@
 
 namespace netfloor {
 
-// Reverses the working copy from the cursor on as long as it lives, and restores it then; in the passes that report
-// nothing, where no host has a field to look at meanwhile, no more of it than the one address that is read. In the form
-// that tells the host, fields are reported with a bit order of 8.
+// Reverses the working copy from the cursor on as long as it lives, and restores it then from the source, with
+// whatever a lower layer has changed in it. The passes that report nothing, where no host has a field to look at
+// meanwhile, reverse no more than the one address that is read, and restore the whole once; a host that looks while
+// storage grows sees that. In the form that tells the host, fields are reported with a bit order of 8.
 template <class Pass>
 class [[nodiscard]] ReversedBits {
 public:
@@ -43,8 +44,7 @@ public:
         }
         at_.settle();
         at_.writeLastRead();
-        const std::uint32_t from = Pass::reports ? 0 : std::min(start_, end_);
-        std::memcpy(at_.data + from, at_.state->sourceData + from, end_ - from);
+        restore();
         const std::uint32_t blockStart = at_.state->blockStarts.base[at_.blockDepth];
         if (const std::uint32_t odd = (at_.cursor - blockStart) % bitsPerOctet; odd != 0) {
             const std::uint32_t rest = std::min(bitsPerOctet - odd, at_.left);
@@ -58,6 +58,15 @@ public:
     ReversedBits &operator=(const ReversedBits &) = delete;
 
 private:
+    void restore() {
+        bool &copyRestored = at_.variables().copyRestored;
+        const bool whole = Pass::reports || !copyRestored;
+        const std::uint32_t from = whole ? 0 : std::min(start_, end_);
+        const std::uint32_t to = whole ? at_.state->totalBits / bitsPerOctet : end_;
+        std::memcpy(at_.data + from, at_.state->sourceData + from, to - from);
+        copyRestored = true;
+    }
+
     Reader<Pass> &at_;
     std::uint32_t outerOrder_;
     std::uint32_t start_ = 0; // the octets that are reversed

@@ -84,6 +84,7 @@ NETFLOOR_INLINE inline void handOff(Reader<Pass> &at) {
         return;
     }
     at.takeState();
+    at.variables().copyRestored = false; // the next layer may have changed it
     // What the next layer leaves in front of its payload or beyond the limit is not the grammar's to read on.
     const std::uint32_t end = at.state->limits.base[at.limitDepth] + 1;
     if (at.cursor < payload || at.cursor > end || at.left > end - at.cursor) {

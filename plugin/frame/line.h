@@ -15,8 +15,8 @@
 
 namespace netfloor {
 
-// A zero-terminated text of at most 255 characters; what does not fit is dropped. Most formats are known to fit,
-// and are built without a test; they may write whole words behind their end.
+// A zero-terminated text of at most 255 characters; what does not fit is dropped. All formats are known to fit into
+// the buffer, so that only lists of elements ask for its end; what is copied may be longer than what counts.
 class Line {
 public:
     static constexpr std::size_t most = 255;
@@ -107,14 +107,33 @@ NETFLOOR_INLINE inline void appendConversion(Line &line, std::uint32_t value, co
             record.ranges, field.place.isRun() ? record.rangeCount : field.place.elements(field.place.count),
             format.separator);
     } else {
-        line.appendNumber<conversion, field.place.isRun() ? 32 : field.place.width() * field.place.scale>(value);
+        line.appendNumber<conversion, field.place.isRun() || field.place.scale != 1 ? 32 : field.place.width()>(value);
     }
 }
 
-// Builds the text of a field. Behind the elements of a run there may be no room for more.
+// The most characters that a conversion writes, those behind the end of the line included.
+template <const Field &field, const Format &format, std::size_t index>
+inline constexpr std::size_t mostWritten = [] {
+    constexpr Conversion conversion = format.conversion[index];
+    if constexpr (conversion == Conversion::none) {
+        return std::size_t{0};
+    } else if constexpr (conversion == Conversion::name || conversion == Conversion::briefName) {
+        return nameTexts<*field.names, conversion == Conversion::briefName>[0].text.size();
+    } else if constexpr (conversion == Conversion::list) {
+        constexpr std::size_t element = mostDigits + format.separator.size();
+        return field.place.isRun() ? Line::most + element : field.place.elements(field.place.count) * element;
+    } else {
+        return mostDigits;
+    }
+}();
+
+// Builds the text of a field.
 template <const Field &field, const Format &format>
 NETFLOOR_INLINE inline void fill(Line &line, std::uint32_t value, const FieldRecord &record) {
-    static_assert(format.literal[0].size() <= Line::most, "a field's name fills no line");
+    static_assert(format.literal[0].size() + mostWritten<field, format, 0> + format.literal[1].size() +
+                          mostWritten<field, format, 1> + format.literal[2].size() <=
+                      Line::most + Line::slack,
+                  "the buffer has no room for what this field may write");
     line.appendLiteral<format.literal[0].size()>(format.literal[0].data());
     if constexpr (format.conversions > 0) {
         appendConversion<field, format, 0>(line, value, record);

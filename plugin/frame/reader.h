@@ -111,7 +111,7 @@ public:
 
     // What is known in a stretch (see stretch.h): constants where the compiler looks, and 0 outside.
     bool inStretch = false;
-    std::uint32_t sureBits = 0;   // bits that are left, from an octet border on, and ranges for their fields
+    std::uint32_t sureBits = 0;   // bits that are left, from an octet border on; the record has room for their elements
     std::uint32_t sureBlocks = 0; // blocks that there is room for
     Unsettled unsettled = {};
 

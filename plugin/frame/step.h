@@ -52,7 +52,7 @@ template <const Field &field, class Pass, class Store>
 NETFLOOR_INLINE inline void sureStep(Reader<Pass> &at, Store into) {
     constexpr const Place &place = field.place;
     if (!onOctetBorder(at.cursor)) {
-        __builtin_unreachable();
+        __builtin_unreachable(); // a stretch starts on one and moves in octets: the slow roads need no code here
     }
     at.showBlock();
     const std::uint32_t start = at.cursor;
@@ -191,7 +191,7 @@ NETFLOOR_INLINE inline void stepBack(Reader<Pass> &at, std::uint32_t bitCount) {
         return;
     }
     if (at.unsettled.advance == static_cast<std::int32_t>(bitCount)) {
-        // An address that a stretch has just read.
+        // An address that a stretch has just read: outside of one the number is 0, and inside the bits are there.
         at.unsettled.advance = -at.unsettled.advance;
         at.sureBits += bitCount;
         at.cursor -= bitCount;

@@ -9,8 +9,11 @@
 
 namespace netfloor {
 
-// The most elements of a field of fixed size, and as many blocks as a stretch opens.
+// The most elements of a field of fixed size.
 inline constexpr std::uint32_t mostFixedElements = addressGroupCount * nibblesPerGroup;
+
+// So many blocks a stretch opens without a test of its own, as many as UDP and its hand-off have; more take the usual
+// road.
 inline constexpr std::uint32_t mostStretchBlocks = 4;
 
 // Runs a production whose first `bitCount` bits are fields of fixed size. A pass that reports nothing asks once

@@ -117,7 +117,8 @@ void securityOption(Reader<Pass> &at, OptionArea &area) {
     read<transmissionControl>(at);
 }
 
-// In an IPv4 header that an IPv6 packet holds, a route is taken as one of IPv6 addresses.
+// In a packet that is not one of IPv4, a route is one of IPv6 addresses. No IPv6 header leads to an IPv4 header so far,
+// but the field tables publish the address as part of the routes.
 template <const Field &type, const Field &length, const Field &pointer, const Field &routeData, class Pass>
 void routeOption(Reader<Pass> &at, BlockName name, OptionArea &area) {
     const OptionBlock<Pass> option{at, name};

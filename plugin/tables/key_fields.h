@@ -134,6 +134,7 @@ inline constexpr std::uint32_t noKeyRow = 0xffffffff;
 // The table ends with a row without a name, which no field fills: a host can mark it present.
 inline constexpr std::uint32_t keyRowCount = keySites.size() + 1;
 
+// Whether a field is a key field goes by its id, as other fields may bear its name. Fields of one name share a row.
 [[nodiscard]] constexpr std::uint32_t keyRowOf(const Field &field) {
     bool isKey = false;
     std::uint32_t last = noKeyRow;

@@ -105,6 +105,7 @@ NETFLOOR_INLINE inline void sackOption(Reader<Pass> &at, OptionArea &area) {
     }
 }
 
+// The production of a stretch gets the reader alone.
 template <class Pass>
 NETFLOOR_INLINE inline void timestampsFields(Reader<Pass> &at) {
     optionHead<timestamps, timestampsLength>(at, at.variables().tcpOptions, timestampsOctets);
@@ -152,7 +153,8 @@ NETFLOOR_INLINE inline void padding(Reader<Pass> &at, OptionArea &area) {
     }
 }
 
-// Once the area is used up no kind takes an option any more.
+// One turn for each kind, in order; once the area is used up none takes an option any more. A round in which none did
+// ends the list with padding.
 template <class Pass>
 NETFLOOR_INLINE inline void optionRound(Reader<Pass> &at, OptionArea &area) {
     area.taken = false;
