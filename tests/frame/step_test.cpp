@@ -143,6 +143,31 @@ TEST(FieldStep, fieldThatDoesNotFitLeavesTheRecord) {
     }
 }
 
+// Where a lower layer has changed the working copy, a reversed address puts the source back, in front of itself too
+// and behind: the second parameter is of type 6 again, and not of type 0x1006.
+TEST(FieldStep, reversedAddressRestoresTheWorkingCopy) {
+    const Octets packet = ipv4({.protocol = 132, .payload = hex(R"(
+        0b 59 0b 5a 00 00 00 2a 00 00 00 00   # SCTP
+        01 00 00 3c 00 00 00 01 00 00 00 00   # INIT, tag, window
+        00 01 00 01 00 00 00 01               #   streams, initial TSN
+        00 06 00 14 20*16                     # IPv6 addresses
+        00 06 00 14 30*16
+    )")});
+    StateOptions options;
+    options.prepare = [](DecodeState &state) {
+        state.data[8] = 1; // Time to Live
+        state.data[72] = 0x10;
+    };
+    for (const Pass pass : allPasses) {
+        SCOPED_TRACE(passName(pass));
+        BareRun run(packet, options);
+        EXPECT_EQ(run.enter(pass), 1);
+        EXPECT_EQ(run.state().fieldRecord.fieldId, 856u);
+        EXPECT_EQ(run.state().fieldRecord.value, 0x30303030u);
+        EXPECT_EQ(hexText({run.state().data, packet.size()}), hexText(packet));
+    }
+}
+
 struct CutCase {
     std::uint32_t bits;
     std::size_t fields;
