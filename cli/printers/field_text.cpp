@@ -87,10 +87,11 @@ std::optional<std::uint32_t> unshownNumber(const FieldReport &field) {
     }
     std::array<char, 16> hexadecimal{};
     std::snprintf(hexadecimal.data(), hexadecimal.size(), "%x", field.value);
+    const bool isNumber = *shown == hexadecimal.data() || shown->ends_with("(" + std::to_string(field.value) + ")");
     // A single letter is an octet of text.
     const bool isName =
         shown->empty() || (shown->size() > 1 && std::isalpha(static_cast<unsigned char>(shown->front())) != 0);
-    return isName && *shown != hexadecimal.data() ? std::optional(field.value) : std::nullopt;
+    return isName && !isNumber ? std::optional(field.value) : std::nullopt;
 }
 
 } // namespace netfloor::cli

@@ -85,7 +85,7 @@ TEST_F(Command, shows) {
         {"netfloor detail $T/five.pcap",
          0,
          {"Packet 2  1.000000  42 octets, Ethernet\n  no IP: ARP\n", "      Source Address= 10.0.0.1\n",
-          "Data=8 octets"},
+          "Destination Port=Domain Name Server (53)\n", "Data=8 octets"},
          {},
          {"["
           "97-128]"}},
