@@ -22,6 +22,8 @@ struct Grammar {
     struct Variables : SharedVariables,
                        ipv4::FragmentVariables,
                        ipv4::OptionVariables,
+                       ipv6::HeaderVariables,
+                       ipv6::OptionVariables,
                        ipv6::ExtensionHeaderVariables,
                        icmp::MessageVariables,
                        tcp::TcpVariables,

@@ -7,7 +7,10 @@
 #pragma once
 
 #include <array>
+#include <cstddef>
 #include <cstdint>
+#include <cstring>
+#include <utility>
 
 #include "frame/inline.h"
 
@@ -115,6 +118,36 @@ template <std::uint32_t low, std::uint32_t high>
     return value;
 }
 
+// The same for a constant number of octets, for which compilers then take one load.
+template <std::uint32_t count>
+[[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t octetsAt(const std::uint8_t *data, std::uint32_t first) {
+    if (!onOctetBorder(first)) [[unlikely]] {
+        return octetsAcross(data, first, count);
+    }
+    const std::uint8_t *const from = data + (first - 1) / bitsPerOctet;
+    std::uint32_t value = 0;
+    [&]<std::size_t... octet>(std::index_sequence<octet...>) NETFLOOR_INLINE {
+        ((value = value << bitsPerOctet | from[octet]), ...);
+    }
+    (std::make_index_sequence<count>{});
+    return value;
+}
+
+// Copies `count` octets from bit number `first` on.
+template <std::size_t count>
+[[nodiscard]] NETFLOOR_INLINE inline std::array<std::uint8_t, count> octetArrayAt(const std::uint8_t *data,
+                                                                                  std::uint32_t first) {
+    std::array<std::uint8_t, count> octets{};
+    if (onOctetBorder(first)) [[likely]] {
+        std::memcpy(octets.data(), data + (first - 1) / bitsPerOctet, count);
+        return octets;
+    }
+    for (std::uint32_t octet = 0; octet < count; ++octet) {
+        octets[octet] = static_cast<std::uint8_t>(octetAt(data, first + octet * bitsPerOctet));
+    }
+    return octets;
+}
+
 inline constexpr auto reversedOctets = [] {
     std::array<std::uint8_t, 256> table{};
     for (std::uint32_t value = 0; value < table.size(); ++value) {
@@ -123,13 +156,25 @@ inline constexpr auto reversedOctets = [] {
     return table;
 }();
 
+// Eight octets at once, the bits of each reversed.
+[[nodiscard]] constexpr std::uint64_t eachReversed(std::uint64_t octets) {
+    octets = (octets >> 1 & 0x5555555555555555) | (octets & 0x5555555555555555) << 1;
+    octets = (octets >> 2 & 0x3333333333333333) | (octets & 0x3333333333333333) << 2;
+    return (octets >> 4 & 0x0f0f0f0f0f0f0f0f) | (octets & 0x0f0f0f0f0f0f0f0f) << 4;
+}
+
 // Reverses the bits of each octet of `data` from bit number `from` on, up to the last whole octet of a
 // packet of `totalBits`. Off an octet border the octets are those counted from `from` on.
-constexpr void reverseOctets(std::uint8_t *data, std::uint32_t from, std::uint32_t totalBits) {
+inline void reverseOctets(std::uint8_t *data, std::uint32_t from, std::uint32_t totalBits) {
     const std::uint32_t shift = (from - 1) % bitsPerOctet;
     const std::uint32_t end = totalBits / bitsPerOctet;
     std::uint32_t octet = (from - 1) / bitsPerOctet;
     if (shift == 0) {
+        for (std::uint64_t octets = 0; octet + sizeof octets <= end; octet += sizeof octets) {
+            std::memcpy(&octets, data + octet, sizeof octets);
+            octets = eachReversed(octets);
+            std::memcpy(data + octet, &octets, sizeof octets);
+        }
         for (; octet < end; ++octet) {
             data[octet] = reversedOctets[data[octet]];
         }

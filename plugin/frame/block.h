@@ -133,15 +133,14 @@ private:
     std::uint32_t limits_ = 0;
 };
 
-// Runs a production out of line: the caller's reader is not touched by the call, and so can stay in
-// registers, and so can the production's own.
+// Runs a production out of line, on a reader of its own: the caller's is not touched by the call, and so both
+// can stay in registers. What it calls by itself is inlined, so that its reader has no address.
 template <auto production, class Pass>
-[[gnu::noinline]] void outOfLine(Reader<Pass> &reader) {
-    Reader<Pass> at = reader;
-    at.forget();
+[[gnu::noinline, gnu::flatten]] void outOfLine(typename Pass::Context &context, Standing &standing) {
+    Reader<Pass> at(context, standing);
     production(at);
     at.settle();
-    reader = at;
+    standing = at;
 }
 
 template <auto production, class Pass>
@@ -150,10 +149,9 @@ NETFLOOR_INLINE inline void apart(Reader<Pass> &at) {
         return;
     }
     at.settle();
-    Reader<Pass> copy = at;
-    outOfLine<production>(copy);
-    at = copy;
-    at.forget();
+    Standing standing = at;
+    outOfLine<production, Pass>(*at.context, standing);
+    at.stand(standing);
 }
 
 } // namespace netfloor

@@ -8,6 +8,7 @@
 #include <cstring>
 #include <optional>
 #include <type_traits>
+#include <utility>
 
 #include "frame/reader.h"
 #include "netfloor/host.h"
@@ -45,9 +46,10 @@ NETFLOOR_INLINE inline void clear(Variables &variables) {
     static_assert(std::is_trivially_copyable_v<Variables>);
     constexpr std::size_t piece = 32;
     auto *const octets = reinterpret_cast<unsigned char *>(&variables);
-    for (std::size_t done = 0; done < sizeof variables; done += piece) {
-        std::memset(octets + done, 0, std::min(piece, sizeof variables - done));
+    [&]<std::size_t... i>(std::index_sequence<i...>) NETFLOOR_INLINE {
+        (std::memset(octets + i * piece, 0, std::min(piece, sizeof variables - i * piece)), ...);
     }
+    (std::make_index_sequence<(sizeof variables + piece - 1) / piece>{});
 }
 
 // Runs one pass over one layer. Nothing when the pass is refused before it starts.

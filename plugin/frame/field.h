@@ -16,7 +16,7 @@ namespace netfloor {
 inline constexpr ValueNames unnamed{};
 inline constexpr const ValueNames *noNames = &unnamed;
 
-// The default of a short text: the value part of the line.
+// The default of a short text: the value part of the line. A mark that is no text of a field.
 inline constexpr std::string_view asInLine = "=";
 
 struct Field {

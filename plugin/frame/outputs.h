@@ -220,11 +220,11 @@ private:
             std::memcpy(place, &failed, sizeof failed);
             return false;
         }
-        std::uint8_t *const area = context.keyRecord + context.byteAreaOffset;
-        for (std::uint32_t octet = 0; octet < octetCount; ++octet) {
-            const std::uint32_t value = octetAt(data, start + octet * bitsPerOctet);
-            area[octet] = static_cast<std::uint8_t>(value << nibbleBits | value >> nibbleBits);
+        auto octets = octetArrayAt<octetCount>(data, start);
+        for (std::uint8_t &octet : octets) {
+            octet = static_cast<std::uint8_t>(octet << nibbleBits | octet >> nibbleBits);
         }
+        std::memcpy(context.keyRecord + context.byteAreaOffset, octets.data(), octetCount);
         context.byteAreaOffset = static_cast<std::uint16_t>(context.byteAreaOffset + octetCount);
         return true;
     }

@@ -155,7 +155,8 @@ constexpr Place pieces(Piece first, Piece second, Piece third, Piece fourth) {
     return {.shape = Shape::pieces, .count = 4, .pieces = {first, second, third, fourth}};
 }
 
-// Two octets in network order, as two pieces. Unlike octets(2) it has a layout record of its own.
+// Two octets in network order, as two pieces. The value is that of octets(2), but the published layout is another, and
+// settles which of the two a field is.
 constexpr Place octetPair() {
     return pieces({0, 7}, {8, 15}).advancing(16);
 }

@@ -16,6 +16,7 @@
 #include <cstddef>
 #include <cstdint>
 #include <cstring>
+#include <string_view>
 
 #include "frame/field.h"
 #include "frame/record.h"
@@ -47,6 +48,8 @@ struct BlockName {
     BlockName() = default;
     template <std::size_t octets>
     consteval BlockName(const char (&literal)[octets]) : text(literal), size(octets - 1) {}
+    // The name of a value, which is a literal too.
+    constexpr explicit BlockName(std::string_view literal) : text(literal.data()), size(literal.size()) {}
 
     // Copies the name and its terminating zero.
     NETFLOOR_INLINE void copyTo(char *buffer) const { std::memcpy(buffer, text, size + 1); }
@@ -79,30 +82,35 @@ struct LastRead {
 struct Unsettled {
     RecordWriter writer = nullptr; // of the last field; null: there was none
     std::uint32_t cursor = 0;
-    std::uint32_t advance = 0;
+    std::int32_t advance = 0;
     std::uint32_t blocks = 0; // on the stack behind the last push; 0: there was none
 };
 
-template <class Pass>
-class Reader {
-public:
-    using Context = typename Pass::Context;
-
-    Context *context;
-    DecodeState *state;
-    std::uint8_t *data;
-    std::uint32_t cursor;
-    std::uint32_t left;
-    std::uint32_t blockDepth;
-    std::uint32_t limitDepth;
+// Where a reader stands: what of it goes along when a production runs out of line.
+struct Standing {
+    std::uint32_t cursor = 0;
+    std::uint32_t left = 0;
+    std::uint32_t blockDepth = 0;
+    std::uint32_t limitDepth = 0;
     bool live = true;
     Outcome outcome = Outcome::on;
     bool unchecked = false; // a flag was set that the verdict has not taken in yet
     std::uint32_t bitOrder = 0;
     BlockName block = {}; // name of the innermost open block
     BlockName shown = {}; // the name that `blockName` is to hold, in the passes that report nothing
+};
+
+template <class Pass>
+class Reader : public Standing {
+public:
+    using Context = typename Pass::Context;
+
+    Context *context;
+    DecodeState *state;
+    std::uint8_t *data;
 
     // What is known in a stretch (see stretch.h): constants where the compiler looks, and 0 outside.
+    bool inStretch = false;
     std::uint32_t sureBits = 0;   // bits that are left, from an octet border on, and ranges for their fields
     std::uint32_t sureBlocks = 0; // blocks that there is room for
     Unsettled unsettled = {};
@@ -110,6 +118,10 @@ public:
     NETFLOOR_INLINE explicit Reader(Context &passContext) : context(&passContext), state(passContext.decodeState) {
         takeState();
     }
+
+    // Goes on where another reader stands, behind which all is settled.
+    NETFLOOR_INLINE Reader(Context &passContext, const Standing &standing)
+        : Standing(standing), context(&passContext), state(passContext.decodeState), data(state->data) {}
 
     NETFLOOR_INLINE static typename Pass::Variables &variables() { return Pass::variables; }
 
@@ -177,9 +189,12 @@ public:
 
     // Writes what a stretch has put off.
     NETFLOOR_INLINE void settle() {
+        if (Pass::reports || !inStretch) {
+            return;
+        }
         if (unsettled.writer != nullptr) {
             state->condition = 1;
-            state->advance = static_cast<std::int32_t>(unsettled.advance);
+            state->advance = unsettled.advance;
             last().writer = unsettled.writer;
             last().cursor = unsettled.cursor;
             last().seenPieces = 0;
@@ -190,8 +205,16 @@ public:
         unsettled = {};
     }
 
+    // Goes on where a production that ran out of line left off.
+    NETFLOOR_INLINE void stand(const Standing &standing) {
+        static_cast<Standing &>(*this) = standing;
+        data = state->data;
+        forget();
+    }
+
     // What was sure is no longer: the reader comes from elsewhere, where all was settled.
     NETFLOOR_INLINE void forget() {
+        inStretch = false;
         sureBits = 0;
         sureBlocks = 0;
         unsettled = {};

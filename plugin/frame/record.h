@@ -43,8 +43,10 @@ template <const Field &field>
             constexpr Piece piece = field.place.pieces[i];
             value = joined(value, pieceAt<piece.low, piece.high>(data, cursor), piece.width());
         });
+    } else if constexpr (place.shape == Shape::octets && !place.isRun()) {
+        value = octetsAt<place.count>(data, cursor);
     } else if constexpr (place.shape == Shape::octets) {
-        value = octetsAt(data, cursor, place.isRun() ? units : place.count);
+        value = octetsAt(data, cursor, units);
     } else if constexpr (place.shape == Shape::octetsBackward) {
         for (std::uint32_t octet = units; octet-- > 0;) {
             value = value << bitsPerOctet | octetAt(data, cursor + octet * bitsPerOctet);
@@ -115,12 +117,14 @@ NETFLOOR_INLINE inline std::uint32_t writeElements(FieldRecord &record, const st
             ranges[i].flagWord = 0;
             value = joined(value, ranges[i].value, piece.width());
         });
-    } else if constexpr (place.shape == Shape::octets) {
-        for (std::uint32_t i = 0; i < (place.isRun() ? units : place.count); ++i) {
-            octet(i, cursor + i * bitsPerOctet);
-        }
+    } else if constexpr (place.shape == Shape::octets && !place.isRun()) {
+        forEachPiece<place.count>([&]<std::uint32_t i>() NETFLOOR_INLINE { octet(i, cursor + i * bitsPerOctet); });
         if constexpr (place.count == 1) {
             ranges[0].flagWord = 0; // a single octet is one piece, not a row of octets
+        }
+    } else if constexpr (place.shape == Shape::octets) {
+        for (std::uint32_t i = 0; i < units; ++i) {
+            octet(i, cursor + i * bitsPerOctet);
         }
     } else if constexpr (place.shape == Shape::octetsBackward) {
         for (std::uint32_t i = 0; i < units; ++i) {

@@ -38,6 +38,15 @@ template <const Field &field, class Pass>
     return at.left >= needs;
 }
 
+// Of an address in groups, what no other field writes in the record, so that it would be lost behind the next one.
+template <const Field &field, class Pass>
+NETFLOOR_INLINE inline void keepWide(Reader<Pass> &at) {
+    if constexpr (field.place.shape == Shape::groups) {
+        at.state->fieldRecord.wideStart = 0;
+        at.state->fieldRecord.wideBits = field.place.width();
+    }
+}
+
 // The step of a field that a stretch has made sure of. What the host can see of it is put off.
 template <const Field &field, class Pass, class Store>
 NETFLOOR_INLINE inline void sureStep(Reader<Pass> &at, Store into) {
@@ -55,14 +64,15 @@ NETFLOOR_INLINE inline void sureStep(Reader<Pass> &at, Store into) {
     at.sureBits -= place.advance;
     at.unsettled.writer = writeRecord<field>;
     at.unsettled.cursor = start;
-    at.unsettled.advance = place.advance;
+    at.unsettled.advance = static_cast<std::int32_t>(place.advance);
+    keepWide<field>(at);
     Pass::template output<field>(at, start, place.count);
 }
 
-// Whether a stretch can make sure of a field: all of fixed size and tested that move in whole octets.
+// Whether a stretch can make sure of a field: all of fixed size that move in whole octets and are part of it.
 template <const Field &field>
 inline constexpr bool canBeSure =
-    !field.place.isRun() && field.place.isTested() && field.place.advance % bitsPerOctet == 0;
+    !field.place.isRun() && field.place.shape != Shape::ahead && field.place.advance % bitsPerOctet == 0;
 
 // The step of a field of `units` units; see `read` and `readRun`.
 template <const Field &field, class Pass, class Store>
@@ -109,11 +119,7 @@ NETFLOOR_INLINE inline void step(Reader<Pass> &at, std::uint32_t units, Store in
         if constexpr (place.isRun()) {
             at.last().units = units;
         }
-        if constexpr (place.shape == Shape::groups) {
-            // No other field writes these, so that they would be lost behind the next one.
-            at.state->fieldRecord.wideStart = 0;
-            at.state->fieldRecord.wideBits = place.width();
-        }
+        keepWide<field>(at);
         at.last().seenPieces = 0;
         Pass::template output<field>(at, start, units);
     }
@@ -182,6 +188,14 @@ NETFLOOR_INLINE inline std::optional<std::uint32_t> look(Reader<Pass> &at, const
 template <class Pass>
 NETFLOOR_INLINE inline void stepBack(Reader<Pass> &at, std::uint32_t bitCount) {
     if (at.over()) {
+        return;
+    }
+    if (at.unsettled.advance == static_cast<std::int32_t>(bitCount)) {
+        // An address that a stretch has just read.
+        at.unsettled.advance = -at.unsettled.advance;
+        at.sureBits += bitCount;
+        at.cursor -= bitCount;
+        at.left += bitCount;
         return;
     }
     at.settle();

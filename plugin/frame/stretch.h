@@ -29,6 +29,7 @@ NETFLOOR_INLINE inline void stretch(Reader<Pass> &at) {
         }
         // A live reader is never over; said again, so that the tests for it fall away.
         at.outcome = Outcome::on;
+        at.inStretch = true;
         at.sureBits = bitCount;
         at.sureBlocks = mostStretchBlocks;
         production(at);

@@ -10,6 +10,8 @@
 //   +---------------------------------------------------------------+
 //   |      Internet header + 64 bits of original data datagram      |
 //   +---------------------------------------------------------------+
+//
+// Each message has fields of its own, equal ones too, so that a host sees by the id which message a field stands in.
 #pragma once
 
 #include <array>
@@ -49,32 +51,32 @@ inline constexpr ValueNames problemCodeNames{problemCodeRows};
 
 // The short text of the original data has its last four octets only.
 // clang-format off
-inline constexpr Field unreachableCode      {548, "Code",                          octets(1), "  Code=%-S", &unreachableCodeNames};
-inline constexpr Field unreachableChecksum  {549, "Checksum",                      octetPair(), "  Checksum=%x"};
-inline constexpr Field unreachableUnused    {550, "Unused",                        octets(4), "  Unused=%x"};
-inline constexpr Field unreachableData      {551, "64-bit Original Data Datagram", octets(8), R"(  64-bit Original Data Datagram=%-["%x"])", noNames, "%x"};
+inline constexpr Field unreachableCode      {548, "Code",                          octets(1),          "  Code=%-S", &unreachableCodeNames};
+inline constexpr Field unreachableChecksum  {549, "Checksum",                      octetPair(),        "  Checksum=%x"};
+inline constexpr Field unreachableUnused    {550, "Unused",                        octets(4),          "  Unused=%x"};
+inline constexpr Field unreachableData      {551, "64-bit Original Data Datagram", octets(8),          R"(  64-bit Original Data Datagram=%-["%x"])", noNames, "%x"};
 inline constexpr Field unreachableTail      {555, "",                              octetRunBackward(), "", noNames, "%x"};
 
-inline constexpr Field sourceQuenchCode     {556, "Code",                          octets(1), "Code=%x"};
-inline constexpr Field sourceQuenchChecksum {557, "Checksum",                      octetPair(), "  Checksum=%x"};
-inline constexpr Field sourceQuenchUnused   {558, "Unused",                        octets(4), "  Unused=%x"};
-inline constexpr Field sourceQuenchData     {559, "64-bit Original Data Datagram", octets(8), R"(  64-bit Original Data Datagram=%-["%x"])", noNames, "%x"};
+inline constexpr Field sourceQuenchCode     {556, "Code",                          octets(1),          "Code=%x"};
+inline constexpr Field sourceQuenchChecksum {557, "Checksum",                      octetPair(),        "  Checksum=%x"};
+inline constexpr Field sourceQuenchUnused   {558, "Unused",                        octets(4),          "  Unused=%x"};
+inline constexpr Field sourceQuenchData     {559, "64-bit Original Data Datagram", octets(8),          R"(  64-bit Original Data Datagram=%-["%x"])", noNames, "%x"};
 
-inline constexpr Field redirectCode         {560, "Code",                          octets(1), "  Code=%-S", &redirectCodeNames};
-inline constexpr Field redirectChecksum     {561, "Checksum",                      octetPair(), "  Checksum=%x"};
-inline constexpr Field redirectGateway      {564, "Gateway Internet Address",      octets(4), R"(  Gateway Internet Address=%-["%u":"."])"};
-inline constexpr Field redirectData         {566, "64-bit Original Data Datagram", octets(8), R"(  64-bit Original Data Datagram=%-["%x"])", noNames, "%x"};
+inline constexpr Field redirectCode         {560, "Code",                          octets(1),          "  Code=%-S", &redirectCodeNames};
+inline constexpr Field redirectChecksum     {561, "Checksum",                      octetPair(),        "  Checksum=%x"};
+inline constexpr Field redirectGateway      {564, "Gateway Internet Address",      octets(4),          R"(  Gateway Internet Address=%-["%u":"."])"};
+inline constexpr Field redirectData         {566, "64-bit Original Data Datagram", octets(8),          R"(  64-bit Original Data Datagram=%-["%x"])", noNames, "%x"};
 
-inline constexpr Field timeExceededCode     {567, "Code",                          octets(1), "  Code=%-S", &timeExceededCodeNames};
-inline constexpr Field timeExceededChecksum {568, "Checksum",                      octetPair(), "  Checksum=%x"};
-inline constexpr Field timeExceededUnused   {569, "Unused",                        octets(4), "  Unused=%x"};
-inline constexpr Field timeExceededData     {570, "64-bit Original Data Datagram", octets(8), R"(  64-bit Original Data Datagram=%-["%x"])", noNames, "%x"};
+inline constexpr Field timeExceededCode     {567, "Code",                          octets(1),          "  Code=%-S", &timeExceededCodeNames};
+inline constexpr Field timeExceededChecksum {568, "Checksum",                      octetPair(),        "  Checksum=%x"};
+inline constexpr Field timeExceededUnused   {569, "Unused",                        octets(4),          "  Unused=%x"};
+inline constexpr Field timeExceededData     {570, "64-bit Original Data Datagram", octets(8),          R"(  64-bit Original Data Datagram=%-["%x"])", noNames, "%x"};
 
-inline constexpr Field problemCode          {571, "Code",                          octets(1), "  Code=%-S", &problemCodeNames};
-inline constexpr Field problemChecksum      {572, "Checksum",                      octetPair(), "  Checksum=%x"};
-inline constexpr Field problemPointer       {573, "Pointer",                       octets(1), "  Pointer=%x"};
-inline constexpr Field problemUnused        {574, "Unused",                        octets(3), "  Unused=%x"};
-inline constexpr Field problemData          {575, "64-bit Original Data Datagram", octets(8), R"(  64-bit Original Data Datagram=%-["%x"])", noNames, "%x"};
+inline constexpr Field problemCode          {571, "Code",                          octets(1),          "  Code=%-S", &problemCodeNames};
+inline constexpr Field problemChecksum      {572, "Checksum",                      octetPair(),        "  Checksum=%x"};
+inline constexpr Field problemPointer       {573, "Pointer",                       octets(1),          "  Pointer=%x"};
+inline constexpr Field problemUnused        {574, "Unused",                        octets(3),          "  Unused=%x"};
+inline constexpr Field problemData          {575, "64-bit Original Data Datagram", octets(8),          R"(  64-bit Original Data Datagram=%-["%x"])", noNames, "%x"};
 // clang-format on
 
 // Many senders quote more than 64 bits of data. Here what is left goes to the host as one field without a name; in

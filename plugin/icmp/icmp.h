@@ -34,12 +34,11 @@ NETFLOOR_INLINE inline void reservedMessage(Reader<Pass> &at) {
     auto &variables = at.variables();
     const Block<Pass> message{at, ""};
     variables.payloadOctets -= 1;
-    std::int32_t seen = 0;
-    for (; at.live && seen < variables.payloadOctets; ++seen) {
+    for (std::int32_t seen = 0; at.live && seen < variables.payloadOctets; ++seen) {
         const Block<Pass> octet{at, ""};
         read<reservedData>(at);
     }
-    if (seen > variables.payloadOctets) {
+    if (variables.payloadOctets < 0) {
         at.mark(Mark::count);
     }
 }

@@ -25,42 +25,42 @@
 namespace netfloor::icmp {
 
 // clang-format off
-inline constexpr Field echoCode              {542, "Code",                 octets(1), "Code=%x"};
+inline constexpr Field echoCode              {542, "Code",                 octets(1),   "Code=%x"};
 inline constexpr Field echoChecksum          {543, "Checksum",             octetPair(), "  Checksum=%x"};
 inline constexpr Field echoIdentifier        {544, "Identifier",           octetPair(), "  Identifier=%x"};
 inline constexpr Field echoSequence          {545, "ICMP Sequence Number", octetPair(), "  ICMP Sequence Number=%u"};
-inline constexpr Field echoData              {547, "  Message Data",       octets(1), "  Message Data=%c"};
+inline constexpr Field echoData              {547, "  Message Data",       octets(1),   "  Message Data=%c"};
 
-inline constexpr Field timestampCode         {576, "Code",                 octets(1), "Code=%x"};
+inline constexpr Field timestampCode         {576, "Code",                 octets(1),   "Code=%x"};
 inline constexpr Field timestampChecksum     {577, "Checksum",             octetPair(), "  Checksum=%x"};
 inline constexpr Field timestampIdentifier   {578, "Identifier",           octetPair(), "  Identifier=%x"};
 inline constexpr Field timestampSequence     {579, "ICMP Sequence Number", octetPair(), "  ICMP Sequence Number=%u"};
-inline constexpr Field originateTimestamp    {580, "Originate Timestamp",  octets(4), "  Originate Timestamp=%x"};
-inline constexpr Field receiveTimestamp      {581, "Receive Timestamp",    octets(4), "  Receive Timestamp=%x"};
-inline constexpr Field transmitTimestamp     {582, "Transmit Timestamp",   octets(4), "  Transmit Timestamp=%x"};
+inline constexpr Field originateTimestamp    {580, "Originate Timestamp",  octets(4),   "  Originate Timestamp=%x"};
+inline constexpr Field receiveTimestamp      {581, "Receive Timestamp",    octets(4),   "  Receive Timestamp=%x"};
+inline constexpr Field transmitTimestamp     {582, "Transmit Timestamp",   octets(4),   "  Transmit Timestamp=%x"};
 
-inline constexpr Field informationCode       {583, "Code",                 octets(1), "Code=%x"};
+inline constexpr Field informationCode       {583, "Code",                 octets(1),   "Code=%x"};
 inline constexpr Field informationChecksum   {584, "Checksum",             octetPair(), "  Checksum=%x"};
 inline constexpr Field informationIdentifier {585, "Identifier",           octetPair(), "  Identifier=%x"};
 inline constexpr Field informationSequence   {586, "ICMP Sequence Number", octetPair(), "  ICMP Sequence Number=%u"};
 
-inline constexpr Field advertisementCode     {587, "Code",                 octets(1), "Code=%x"};
+inline constexpr Field advertisementCode     {587, "Code",                 octets(1),   "Code=%x"};
 inline constexpr Field advertisementChecksum {588, "Checksum",             octetPair(), "  Checksum=%x"};
-inline constexpr Field routers               {589, "Num Addr",             octets(1), "  Num Addr=%u"};
-inline constexpr Field routerEntrySize       {590, "Addr Entry Size",      octets(1), "  Addr Entry Size=%u"};
+inline constexpr Field routers               {589, "Num Addr",             octets(1),   "  Num Addr=%u"};
+inline constexpr Field routerEntrySize       {590, "Addr Entry Size",      octets(1),   "  Addr Entry Size=%u"};
 inline constexpr Field routerLifetime        {591, "Lifetime",             octetPair(), "  Lifetime=%x"};
-inline constexpr Field routerAddress         {595, "Router Address",       octets(4), "  Router Address=%x"};
-inline constexpr Field routerPreference      {596, "Preference Level",     octets(4), "  Preference Level=%x"};
+inline constexpr Field routerAddress         {595, "Router Address",       octets(4),   "  Router Address=%x"};
+inline constexpr Field routerPreference      {596, "Preference Level",     octets(4),   "  Preference Level=%x"};
 
-inline constexpr Field solicitationCode      {597, "Code",                 octets(1), "Code=%x"};
+inline constexpr Field solicitationCode      {597, "Code",                 octets(1),   "Code=%x"};
 inline constexpr Field solicitationChecksum  {598, "Checksum",             octetPair(), "  Checksum=%x"};
-inline constexpr Field solicitationReserved  {599, "Reserved",             octets(4), "  Reserved=%x"};
+inline constexpr Field solicitationReserved  {599, "Reserved",             octets(4),   "  Reserved=%x"};
 
-inline constexpr Field addressMaskCode       {600, "Code",                 octets(1), "Code=%x"};
+inline constexpr Field addressMaskCode       {600, "Code",                 octets(1),   "Code=%x"};
 inline constexpr Field addressMaskChecksum   {601, "Checksum",             octetPair(), "  Checksum=%x"};
 inline constexpr Field addressMaskIdentifier {602, "Identifier",           octetPair(), "  Identifier=%x"};
 inline constexpr Field addressMaskSequence   {603, "ICMP Sequence Number", octetPair(), "  ICMP Sequence Number=%u"};
-inline constexpr Field addressMask           {604, "Address Mask",         octets(4), "  Address Mask=%x"};
+inline constexpr Field addressMask           {604, "Address Mask",         octets(4),   "  Address Mask=%x"};
 // clang-format on
 
 inline constexpr std::int32_t echoHeaderOctets = 8;
@@ -80,7 +80,8 @@ NETFLOOR_INLINE inline void echo(Reader<Pass> &at) {
         variables.payloadOctets -= echoHeaderOctets;
     }
     // A datagram too short for its message is a fault; data that is cut short is none.
-    if (readRepeated<echoData>(at, variables.payloadOctets) > variables.payloadOctets) {
+    readRepeated<echoData>(at, variables.payloadOctets);
+    if (variables.payloadOctets < 0) {
         at.mark(Mark::count);
     }
 }

@@ -70,7 +70,7 @@ inline constexpr Field authenticationSequence {209, "Sequency Number",         o
 inline constexpr Field authenticationData     {211, "Authentication Data",     octets(1),                "Authentication Data=%x"};
 // clang-format on
 
-struct ExtensionHeaderVariables : OptionVariables {
+struct ExtensionHeaderVariables {
     std::int32_t ahDataOctets; // of the authentication header that was read last
 };
 
@@ -206,7 +206,7 @@ NETFLOOR_INLINE inline void upperProtocol(Reader<Pass> &at, std::uint32_t protoc
     case protocolIcmp:
     case protocolIcmpv6: return apart<icmpv6::message<Pass>>(at);
     case protocolTcp: return apart<tcp::segment<Pass>>(at);
-    case protocolUdp: return apart<udp::datagram<Pass>>(at);
+    case protocolUdp: return udp::datagram(at);
     case protocolGre: return apart<gre::packet<Pass>>(at);
     case protocolSctp: return apart<sctp::packet<Pass>>(at);
     case protocolEsp: return apart<securityPayload<Pass>>(at);

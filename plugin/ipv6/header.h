@@ -21,6 +21,7 @@
 #include "frame/block.h"
 #include "frame/field.h"
 #include "frame/step.h"
+#include "frame/stretch.h"
 #include "ipv6/address.h"
 #include "tables/protocol_numbers.h"
 
@@ -38,6 +39,10 @@ inline constexpr Field sourceNibbles      {958, "Source IP Address",      addres
 inline constexpr Field destinationGroups  {952, "Destination IP Address", addressGroups(),                                   R"(Destination IP Address=%-["%x":"."])"};
 inline constexpr Field destinationNibbles {954, "Destination IP Address", addressNibbles(),                                  ""};
 // clang-format on
+
+struct HeaderVariables {
+    std::uint32_t ipv6PayloadLength; // octets behind the fixed header
+};
 
 inline constexpr std::uint32_t payloadLengthBits = 16;
 
@@ -58,30 +63,40 @@ NETFLOOR_INLINE inline void nextHeader(Reader<Pass> &at) {
     }
 }
 
+template <class Pass>
+NETFLOOR_INLINE inline void upToPayloadLength(Reader<Pass> &at) {
+    read<trafficClass>(at);
+    read<flowLabel>(at);
+    read<payloadLengthAhead>(at, &at.variables().ipv6PayloadLength);
+}
+
+template <class Pass>
+NETFLOOR_INLINE inline void fromPayloadLength(Reader<Pass> &at) {
+    read<payloadLength>(at);
+    nextHeader(at);
+    read<hopLimit>(at);
+    addressReadTwice<sourceGroups, sourceNibbles>(at);
+    addressReadTwice<destinationGroups, destinationNibbles>(at);
+}
+
 // Reads a fixed header, whose body stays open in `chain`. Gives whether the chain goes on behind it.
 //
 // The test of the length is made with what stands behind the Payload Length, while the body starts with it:
 // a packet one or two octets short is read as far as it goes.
 template <class Pass>
 [[nodiscard]] NETFLOOR_INLINE inline bool fixedHeader(Reader<Pass> &at, BlockChain<Pass> &chain) {
-    std::uint32_t payloadOctets = 0;
+    auto &variables = at.variables();
     chain.open("IPv6 Header");
-    read<trafficClass>(at);
-    read<flowLabel>(at);
-    read<payloadLengthAhead>(at, &payloadOctets);
+    stretch<48, upToPayloadLength<Pass>>(at);
 
-    const std::uint32_t restBits = payloadOctets * bitsPerOctet + bitsBehindLength;
+    const std::uint32_t restBits = variables.ipv6PayloadLength * bitsPerOctet + bitsBehindLength;
     if (!at.live || restBits > at.left) {
         return false;
     }
     chain.openLimited("IPv6 Body", payloadLengthBits + restBits);
-    read<payloadLength>(at);
-    nextHeader(at);
-    read<hopLimit>(at);
-    addressReadTwice<sourceGroups, sourceNibbles>(at);
-    addressReadTwice<destinationGroups, destinationNibbles>(at);
+    stretch<payloadLengthBits + bitsBehindLength, fromPayloadLength<Pass>>(at);
     if (at.live) {
-        at.variables().payloadOctets = static_cast<std::int32_t>(payloadOctets);
+        variables.payloadOctets = static_cast<std::int32_t>(variables.ipv6PayloadLength);
     }
     return true;
 }

@@ -38,7 +38,7 @@ inline constexpr Field errorLength   = chunkLengthField(910);
 // clang-format on
 
 template <class Pass>
-void abort(Reader<Pass> &at) {
+void abortChunk(Reader<Pass> &at) {
     std::int32_t &errorOctets = at.variables().errorOctets;
     LimitedBlock<Pass> block{at, "Abort Association"};
     block.limit(limitFromLength<abortLengthAhead>(at, octetsBehindHead(errorOctets)));
@@ -49,7 +49,7 @@ void abort(Reader<Pass> &at) {
 }
 
 template <class Pass>
-void error(Reader<Pass> &at) {
+void errorChunk(Reader<Pass> &at) {
     const Block<Pass> block{at, "Error"};
     read<errorFlags>(at);
     read<errorLength>(at, octetsBehindHead(at.variables().errorOctets));

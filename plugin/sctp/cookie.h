@@ -22,14 +22,14 @@ namespace netfloor::sctp {
 
 // clang-format off
 inline constexpr Field cookieEchoFlags = lowerFlagsField(893);
-inline constexpr Field cookie          {895, "    Cookie", octetRunBackward(), R"(    Cookie=%-["%x"])"};
+inline constexpr Field cookie {895, "    Cookie", octetRunBackward(), R"(    Cookie=%-["%x"])"};
 
 inline constexpr Field cookieAckFlags  = lowerFlagsField(892);
 // clang-format on
 
 // `chunkOctets` stays without the head, so that the walk takes four octets fewer than the Length.
 template <class Pass>
-void cookieEcho(Reader<Pass> &at) {
+void cookieEchoChunk(Reader<Pass> &at) {
     std::int32_t &chunkOctets = at.variables().chunkOctets;
     const Block<Pass> block{at, "Cookie Echo"};
     read<cookieEchoFlags>(at);
@@ -41,7 +41,7 @@ void cookieEcho(Reader<Pass> &at) {
 }
 
 template <class Pass>
-void cookieAck(Reader<Pass> &at) {
+void cookieAckChunk(Reader<Pass> &at) {
     const Block<Pass> block{at, "Cookie Acknowledge"};
     read<cookieAckFlags>(at);
     readChunkLength(at);

@@ -9,22 +9,20 @@
 namespace netfloor::sctp {
 
 // Reads a list of `count` elements. The count is believed as it stands: the list ends at it, or where a field does
-// not fit. An element counts once it is begun, so a list whose last element is cut short has its full count.
-// The condition is then whether that last element is whole, and otherwise true.
+// not fit. An element counts once it is begun, so a list whose last element is cut short has its full count. Gives
+// whether that is so.
 template <class Pass, class Element>
-NETFLOOR_INLINE inline void countedList(Reader<Pass> &at, std::int32_t count, Element element) {
+NETFLOOR_INLINE inline bool countedList(Reader<Pass> &at, std::int32_t count, Element element) {
     std::int32_t begun = 0;
-    at.test(true);
     while (at.live && begun < count) {
         ++begun;
         element();
-        if (begun < count) {
-            at.test(true);
-        }
     }
     if (begun != count) {
         at.mark(Mark::count);
     }
+    at.test(true);
+    return begun > 0 && begun == count && !at.live;
 }
 
 } // namespace netfloor::sctp

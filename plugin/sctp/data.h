@@ -15,9 +15,9 @@
 //   |                           User Data                           |
 //   +---------------------------------------------------------------+
 //
-// The user data are the next layer's, which the ports choose; the Payload Protocol Identifier has no say in it. The
-// walk over the chunks goes on where the next layer stopped, so a chunk behind DATA is decoded if the next layer has
-// consumed the user data and their padding.
+// The I bit of RFC 7053 shows as reserved. The user data are the next layer's, which the ports choose; the Payload
+// Protocol Identifier has no say in it. The walk over the chunks goes on where the next layer stopped, so a chunk
+// behind DATA is decoded if the next layer has consumed the user data and their padding.
 #pragma once
 
 #include <array>
@@ -55,7 +55,7 @@ inline constexpr Field payloadProtocolIdentifier {820, "    Payload Protocol Ide
 inline constexpr std::int32_t emptyDataOctets = 16;
 
 template <class Pass>
-NETFLOOR_INLINE inline void data(Reader<Pass> &at) {
+NETFLOOR_INLINE inline void dataChunk(Reader<Pass> &at) {
     const Block<Pass> block{at, "Data"};
     read<dataReserved>(at);
     read<unorderedBit>(at);

@@ -62,27 +62,27 @@ constexpr Field longCauseLengthField(std::uint32_t id) {
 }
 
 // clang-format off
-inline constexpr Field causeCode                 {912, "    Cause Code",                           octetPair(), "    Cause Code=%-S", &causeCodeNames};
+inline constexpr Field causeCode             {912, "    Cause Code",                       octetPair(),        "    Cause Code=%-S", &causeCodeNames};
 inline constexpr Field invalidStreamLength       = causeLengthField(914);
-inline constexpr Field invalidStream             {915, "        Stream Identifier",                octetPair(), "        Stream Identifier=%u"};
-inline constexpr Field invalidStreamReserved     {916, "        Reserved",                         octetPair(), "        Reserved=%u"};
+inline constexpr Field invalidStream         {915, "        Stream Identifier",            octetPair(),        "        Stream Identifier=%u"};
+inline constexpr Field invalidStreamReserved {916, "        Reserved",                     octetPair(),        "        Reserved=%u"};
 inline constexpr Field missingLength             = causeLengthField(917);
-inline constexpr Field missingNumber             {918, "        Number of missing params",         octets(4), "        Number of missing params=%u"};
-inline constexpr Field missingType               {920, "        Missing Parameters Type",          octetPair(), "        Missing Parameters Type=%u"};
+inline constexpr Field missingNumber         {918, "        Number of missing params",     octets(4),          "        Number of missing params=%u"};
+inline constexpr Field missingType           {920, "        Missing Parameters Type",      octetPair(),        "        Missing Parameters Type=%u"};
 inline constexpr Field staleCookieLength         = longCauseLengthField(921);
-inline constexpr Field staleness                 {922, "        Measure of staleness (usec.)",     octets(4), "        Measure of staleness (usec.)=%u"};
+inline constexpr Field staleness             {922, "        Measure of staleness (usec.)", octets(4),          "        Measure of staleness (usec.)=%u"};
 inline constexpr Field outOfResourceLength       = longCauseLengthField(923);
 inline constexpr Field unresolvableLength        = causeLengthField(924);
-inline constexpr Field unresolvableValue         {925, "        Unrecognized Address",             octetRunBackward(), R"(        Unrecognized Address=%-["%x"])"};
+inline constexpr Field unresolvableValue     {925, "        Unrecognized Address",         octetRunBackward(), R"(        Unrecognized Address=%-["%x"])"};
 inline constexpr Field unrecognizedChunkLength   = causeLengthField(926);
-inline constexpr Field unrecognizedChunk         {927, "        Unrecognized Chunk",               octetRunBackward(), R"(        Unrecognized Chunk=%-["%x"])"};
+inline constexpr Field unrecognizedChunk     {927, "        Unrecognized Chunk",           octetRunBackward(), R"(        Unrecognized Chunk=%-["%x"])"};
 inline constexpr Field invalidMandatoryLength    = causeLengthField(928);
 inline constexpr Field unrecognizedListLength    = causeLengthField(929);
 inline constexpr Field noUserDataLength          = causeLengthField(932);
-inline constexpr Field noUserDataTsn             {933, "        TSN value",                        octets(4), "        TSN value=%u"};
+inline constexpr Field noUserDataTsn         {933, "        TSN value",                    octets(4),          "        TSN value=%u"};
 inline constexpr Field shuttingDownLength        = causeLengthField(934);
 inline constexpr Field unknownCauseLength        = causeLengthField(935);
-inline constexpr Field unknownCause              {938, "      Unknown Cause",                      octetRun(), "      Unknown Cause=%x"};
+inline constexpr Field unknownCause          {938, "      Unknown Cause",                  octetRun(),         "      Unknown Cause=%x"};
 // clang-format on
 
 template <class Pass>
@@ -90,10 +90,12 @@ void missingParameters(Reader<Pass> &at) {
     std::int32_t &missingParameterCount = at.variables().missingParameterCount;
     read<missingLength>(at);
     read<missingNumber>(at, &missingParameterCount);
-    countedList(at, missingParameterCount, [&at] {
+    const bool cutShort = countedList(at, missingParameterCount, [&at] {
         const Block<Pass> block{at, "INLINE BLOCK"};
         read<missingType>(at);
     });
+    // The list of causes ends behind a last type that is cut short.
+    at.test(!cutShort);
 }
 
 // The list runs until a field does not fit: behind the last parameter that is the type of the next.
@@ -146,12 +148,8 @@ void causeOf(Reader<Pass> &at, std::uint32_t code) {
 
 // The block of a cause bears the name of its code.
 [[nodiscard]] constexpr BlockName causeBlock(std::uint32_t code) {
-    BlockName name{"Unknown Cause Code"};
-    if (const std::uint32_t row = rowNumber<causeCodeNames>(code); row != 0) {
-        name.text = causeCodeRows[row - 1].text.data();
-        name.size = causeCodeRows[row - 1].text.size();
-    }
-    return name;
+    const std::uint32_t row = rowNumber<causeCodeNames>(code);
+    return row == 0 ? BlockName{"Unknown Cause Code"} : BlockName{causeCodeRows[row - 1].text};
 }
 
 // The list goes on as long as its rounds end with the condition true, mostly with a field that did fit, whether or

@@ -32,7 +32,8 @@ inline constexpr Field heartbeatInfo       {943, "        Sender-specific HB Inf
 
 inline constexpr std::uint32_t knownInfoType = 1;
 
-// Information of another type stays unread: the walk takes it for the next chunk.
+// Information of another type stays unread, and so does one whose type is cut short: the walk takes it for the next
+// chunk.
 template <class Pass>
 void heartbeatInformation(Reader<Pass> &at) {
     if (!at.live) {
@@ -50,7 +51,7 @@ void heartbeatInformation(Reader<Pass> &at) {
 }
 
 template <const Field &flags, class Pass>
-void heartbeatChunk(Reader<Pass> &at, BlockName name) {
+void heartbeatWith(Reader<Pass> &at, BlockName name) {
     const Block<Pass> block{at, name};
     read<flags>(at);
     readChunkLength(at);
@@ -58,13 +59,13 @@ void heartbeatChunk(Reader<Pass> &at, BlockName name) {
 }
 
 template <class Pass>
-void heartbeat(Reader<Pass> &at) {
-    heartbeatChunk<heartbeatFlags>(at, "Heartbeat Request");
+void heartbeatChunk(Reader<Pass> &at) {
+    heartbeatWith<heartbeatFlags>(at, "Heartbeat Request");
 }
 
 template <class Pass>
-void heartbeatAck(Reader<Pass> &at) {
-    heartbeatChunk<heartbeatAckFlags>(at, "Heartbeat Acknowledgement");
+void heartbeatAckChunk(Reader<Pass> &at) {
+    heartbeatWith<heartbeatAckFlags>(at, "Heartbeat Acknowledgement");
 }
 
 } // namespace netfloor::sctp

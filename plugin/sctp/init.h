@@ -38,11 +38,11 @@ inline constexpr std::uint32_t initAckIds = 835;
 // clang-format off
 template <std::uint32_t ids> inline constexpr Field initFlags       = flagsField(ids);
 template <std::uint32_t ids> inline constexpr Field initLength      = lengthField(ids + 1);
-template <std::uint32_t ids> inline constexpr Field initiateTag     {ids + 2, "    Initiate Tag",                                  octets(4), "    Initiate Tag=0x%x"};
-template <std::uint32_t ids> inline constexpr Field receiverWindow  {ids + 3, "    Advertised Receiver Window Credit (a_rwnd)",    octets(4), "    Advertised Receiver Window Credit (a_rwnd)=%u(dec)"};
-template <std::uint32_t ids> inline constexpr Field outboundStreams {ids + 4, "    Number of Outbound Streams",                    octets(2), "    Number of Outbound Streams=%u(dec)"};
-template <std::uint32_t ids> inline constexpr Field inboundStreams  {ids + 5, "    Number of Inbound Streams",                     octets(2), "    Number of Inbound Streams=%u(dec)"};
-template <std::uint32_t ids> inline constexpr Field initialTsn      {ids + 6, "    Initial Transmission Sequence Number(I_TSN)",   octets(4), "    Initial Transmission Sequence Number(I_TSN)=%u"};
+template <std::uint32_t ids> inline constexpr Field initiateTag     {ids + 2, "    Initiate Tag",                                octets(4), "    Initiate Tag=0x%x"};
+template <std::uint32_t ids> inline constexpr Field receiverWindow  {ids + 3, "    Advertised Receiver Window Credit (a_rwnd)",  octets(4), "    Advertised Receiver Window Credit (a_rwnd)=%u(dec)"};
+template <std::uint32_t ids> inline constexpr Field outboundStreams {ids + 4, "    Number of Outbound Streams",                  octets(2), "    Number of Outbound Streams=%u(dec)"};
+template <std::uint32_t ids> inline constexpr Field inboundStreams  {ids + 5, "    Number of Inbound Streams",                   octets(2), "    Number of Inbound Streams=%u(dec)"};
+template <std::uint32_t ids> inline constexpr Field initialTsn      {ids + 6, "    Initial Transmission Sequence Number(I_TSN)", octets(4), "    Initial Transmission Sequence Number(I_TSN)=%u"};
 // clang-format on
 
 // The Length counts in so many octets in front of the parameters.
@@ -65,14 +65,14 @@ void initFields(Reader<Pass> &at) {
 }
 
 template <class Pass>
-void init(Reader<Pass> &at) {
+void initChunk(Reader<Pass> &at) {
     LimitedBlock<Pass> block{at, "INIT"};
     block.limit(limitFromLength<initLengthAhead>(at, &at.variables().chunkOctets));
     initFields<initIds, initParameters<Pass>>(at);
 }
 
 template <class Pass>
-void initAck(Reader<Pass> &at) {
+void initAckChunk(Reader<Pass> &at) {
     const Block<Pass> block{at, "Init Ack"};
     initFields<initAckIds, initAckParameters<Pass>>(at);
 }

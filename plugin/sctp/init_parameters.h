@@ -61,18 +61,18 @@ inline constexpr ValueNames initAckParameterNames{.rows = initAckParameterRows, 
 inline constexpr ValueNames addressTypeNames{.rows = addressTypeRows, .otherwise = "Unknow Address Type"};
 
 // clang-format off
-inline constexpr Field initParameterType       {847, "Parameter Type",       octets(2), "Parameter Type=%-S", &initParameterNames};
-inline constexpr Field initParameterLength     {848, "      Length",         octets(2), "      Length=%u octet(s)"};
-inline constexpr Field initAckParameterType    {851, "Parameter Type",       octets(2), "Parameter Type=%-S", &initAckParameterNames};
-inline constexpr Field initAckParameterLength  {852, "      Length",         octets(2), "      Length=%u octet(s)"};
+inline constexpr Field initParameterType       {847, "Parameter Type",                               octets(2),  "Parameter Type=%-S", &initParameterNames};
+inline constexpr Field initParameterLength     {848, "      Length",                                 octets(2),  "      Length=%u octet(s)"};
+inline constexpr Field initAckParameterType    {851, "Parameter Type",                               octets(2),  "Parameter Type=%-S", &initAckParameterNames};
+inline constexpr Field initAckParameterLength  {852, "      Length",                                 octets(2),  "      Length=%u octet(s)"};
 
-inline constexpr Field ipv4Address             {855, "        IP Address",   octets(4), R"(        IP Address=%-["%u":"."])"};
-inline constexpr Field cookieLifeSpanIncrement {867, "        Suggested Cookie Life-span Increment", octets(4), "        Suggested Cookie Life-span Increment=%u (msec.)"};
-inline constexpr Field hostName                {868, "        Host Name",    octetRun(), R"(        Host Name=%-["%c"])"};
-inline constexpr Field supportedAddressType    {870, "        Address Type", octets(2),  "        Address Type=%-S", &addressTypeNames};
-inline constexpr Field ecnCapable              {871, "        Reserved",     octetRun(), "        Reserved", noNames, "%x"};
-inline constexpr Field unknownParameter        {872, "        Reserved",     octetRun(), "        Reserved", noNames, "%x"};
-inline constexpr Field stateCookie             {857, "        State Cookie", octetRun(), R"(        State Cookie=%-["%x"])"};
+inline constexpr Field ipv4Address             {855, "        IP Address",                           octets(4),  R"(        IP Address=%-["%u":"."])"};
+inline constexpr Field cookieLifeSpanIncrement {867, "        Suggested Cookie Life-span Increment", octets(4),  "        Suggested Cookie Life-span Increment=%u (msec.)"};
+inline constexpr Field hostName                {868, "        Host Name",                            octetRun(), R"(        Host Name=%-["%c"])"};
+inline constexpr Field supportedAddressType    {870, "        Address Type",                         octets(2),  "        Address Type=%-S", &addressTypeNames};
+inline constexpr Field ecnCapable              {871, "        Reserved",                             octetRun(), "        Reserved", noNames, "%x"};
+inline constexpr Field unknownParameter        {872, "        Reserved",                             octetRun(), "        Reserved", noNames, "%x"};
+inline constexpr Field stateCookie             {857, "        State Cookie",                         octetRun(), R"(        State Cookie=%-["%x"])"};
 // clang-format on
 
 // What a parameter takes from the octets of its list: its Length less 8, and not its Length. So a list seldom ends with
@@ -84,7 +84,7 @@ void reckonParameter(Reader<Pass> &at, std::int32_t &listOctets) {
     }
 }
 
-// Whether the list has another parameter, by that reckoning.
+// Whether the list has another parameter, by that reckoning. It is asked also behind a field that did not fit.
 template <class Pass>
 [[nodiscard]] bool listGoesOn(Reader<Pass> &at, std::int32_t listOctets) {
     return at.test(listOctets >= 1) && at.live;
@@ -162,8 +162,8 @@ void initParameters(Reader<Pass> &at) {
             initParameter(at);
             reckonParameter(at, variables.chunkOctets);
         }
-        // A parameter of Length 0 would be read again for ever. Where not even a type is left, the next limit ends
-        // the list.
+        // A parameter of Length 0 would be read again for ever. Where less than a type is left, the next limit is
+        // another one, and ends the list with its mark.
         if (at.cursor == start && at.left >= typeBits) {
             at.live = false;
         }

@@ -45,13 +45,28 @@ struct LengthAhead {
 // The limits of a whole Length are Length * 8 bits, of ABORT Length * 8 - 8. INIT starts behind its Chunk Type,
 // so that its limit reaches one octet behind the chunk. Where that octet is missing the limit does not hold, and the
 // walk over the chunks ends; where it is there, it is skipped.
-inline constexpr LengthAhead initLengthAhead{{{{8, 8}}}, true, 24};
-inline constexpr LengthAhead abortLengthAhead{{{{8, 0}, {8, 8}}}, false, 24};
-inline constexpr LengthAhead valueLengthAhead{{{{typeBits, typeBits}}}, true, 32}; // parameter, heartbeat information
+inline constexpr LengthAhead initLengthAhead = {
+    .skipped = {Skipped{.needs = 8, .width = 8}},
+    .addsSkipped = true,
+    .takesOff = 24,
+};
+// The octet of flags holds two fields, of which the first does not move the cursor.
+inline constexpr LengthAhead abortLengthAhead = {
+    .skipped = {Skipped{.needs = 8, .width = 0}, Skipped{.needs = 8, .width = 8}},
+    .addsSkipped = false,
+    .takesOff = 24,
+};
+// Of a parameter, and of the heartbeat information.
+inline constexpr LengthAhead valueLengthAhead = {
+    .skipped = {Skipped{.needs = typeBits, .width = typeBits}},
+    .addsSkipped = true,
+    .takesOff = 32,
+};
 
 // Reads a Length ahead of its turn, and gives the bits of the limit that it sets. Nothing is reported, and the
 // cursor comes back. What does not fit adds the advance of the step before instead of its own: behind the last
-// parameter of a list that makes a limit which holds no parameter.
+// parameter of a list that makes a limit which is longer than what is left, or 0. A Length that was read is kept, also
+// where the limit is then too short for the field itself.
 template <const LengthAhead &ahead, class Pass, class Store>
 [[nodiscard]] std::uint32_t limitFromLength(Reader<Pass> &at, Store into) {
     if (at.over()) {

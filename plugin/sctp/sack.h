@@ -41,7 +41,7 @@ inline constexpr Field duplicateTsn       {883, "    Duplicate TSN",            
 // clang-format on
 
 template <class Pass>
-NETFLOOR_INLINE inline void selectiveAcknowledgement(Reader<Pass> &at) {
+NETFLOOR_INLINE inline void sackChunk(Reader<Pass> &at) {
     auto &variables = at.variables();
     const Block<Pass> block{at, "Selective Acknowledgement"};
     read<sackFlags>(at);
@@ -59,8 +59,6 @@ NETFLOOR_INLINE inline void selectiveAcknowledgement(Reader<Pass> &at) {
         const Block<Pass> duplicate{at, "Duplicate TSN"};
         read<duplicateTsn>(at);
     });
-    // Unlike a list of an error cause, these leave no trace of an element that was cut short.
-    at.test(true);
 }
 
 } // namespace netfloor::sctp

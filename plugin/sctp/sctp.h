@@ -19,6 +19,9 @@
 // Chunk Type is read where the last field of the chunk before ended. So padding, and whatever a body does not read,
 // show as chunks of their own. `payloadOctets`, which ends the walk, follows the Lengths and not the cursor; where the
 // two part, the walk ends with the bits.
+//
+// Where a decision goes through `test`, the host sees it as the state's `condition`, and the list of error causes goes
+// by the last one.
 #pragma once
 
 #include <array>
@@ -32,28 +35,28 @@
 #include "sctp/data.h"
 #include "sctp/heartbeat.h"
 #include "sctp/init.h"
-#include "sctp/other_chunks.h"
+#include "sctp/reserved_chunks.h"
 #include "sctp/sack.h"
 #include "sctp/shutdown.h"
 
 namespace netfloor::sctp {
 
 enum ChunkType : std::uint32_t {
-    dataType,
-    initType,
-    initAckType,
-    sackType,
-    heartbeatType,
-    heartbeatAckType,
-    abortType,
-    shutdownType,
-    shutdownAckType,
-    errorType,
-    cookieEchoType,
-    cookieAckType,
-    ecneType,
-    cwrType,
-    shutdownCompleteType,
+    dataType = 0,
+    initType = 1,
+    initAckType = 2,
+    sackType = 3,
+    heartbeatType = 4,
+    heartbeatAckType = 5,
+    abortType = 6,
+    shutdownType = 7,
+    shutdownAckType = 8,
+    errorType = 9,
+    cookieEchoType = 10,
+    cookieAckType = 11,
+    ecneType = 12,
+    cwrType = 13,
+    shutdownCompleteType = 14,
 };
 
 // clang-format off
@@ -123,24 +126,25 @@ NETFLOOR_INLINE inline std::uint32_t readChunkType(Reader<Pass> &at) {
     return type;
 }
 
+// What a busy association consists of, DATA and SACK, is read in line, the rest out of line.
 template <class Pass>
 NETFLOOR_INLINE inline void chunkBody(Reader<Pass> &at, std::uint32_t type) {
     switch (type) {
-    case dataType: return data(at);
-    case initType: return apart<init<Pass>>(at);
-    case initAckType: return apart<initAck<Pass>>(at);
-    case sackType: return selectiveAcknowledgement(at);
-    case heartbeatType: return apart<heartbeat<Pass>>(at);
-    case heartbeatAckType: return apart<heartbeatAck<Pass>>(at);
-    case abortType: return apart<abort<Pass>>(at);
-    case shutdownType: return apart<shutdown<Pass>>(at);
-    case shutdownAckType: return apart<shutdownAck<Pass>>(at);
-    case errorType: return apart<error<Pass>>(at);
-    case cookieEchoType: return apart<cookieEcho<Pass>>(at);
-    case cookieAckType: return apart<cookieAck<Pass>>(at);
-    case ecneType: return apart<explicitCongestionEcho<Pass>>(at);
-    case cwrType: return apart<congestionWindowReduced<Pass>>(at);
-    case shutdownCompleteType: return apart<shutdownComplete<Pass>>(at);
+    case dataType: return dataChunk(at);
+    case initType: return apart<initChunk<Pass>>(at);
+    case initAckType: return apart<initAckChunk<Pass>>(at);
+    case sackType: return sackChunk(at);
+    case heartbeatType: return apart<heartbeatChunk<Pass>>(at);
+    case heartbeatAckType: return apart<heartbeatAckChunk<Pass>>(at);
+    case abortType: return apart<abortChunk<Pass>>(at);
+    case shutdownType: return apart<shutdownChunk<Pass>>(at);
+    case shutdownAckType: return apart<shutdownAckChunk<Pass>>(at);
+    case errorType: return apart<errorChunk<Pass>>(at);
+    case cookieEchoType: return apart<cookieEchoChunk<Pass>>(at);
+    case cookieAckType: return apart<cookieAckChunk<Pass>>(at);
+    case ecneType: return apart<ecneChunk<Pass>>(at);
+    case cwrType: return apart<cwrChunk<Pass>>(at);
+    case shutdownCompleteType: return apart<shutdownCompleteChunk<Pass>>(at);
     default: return apart<reservedChunk<Pass>>(at);
     }
 }

@@ -31,18 +31,18 @@ inline constexpr ValueNames completeTagNames{completeTagRows};
 // clang-format off
 inline constexpr Field shutdownFlags            = lowerFlagsField(884);
 inline constexpr Field shutdownLength           = lengthField(885);
-inline constexpr Field shutdownCumulativeTsnAck {886, "    Cumulative TSN Ack", octets(4), "    Cumulative TSN Ack=%u"};
+inline constexpr Field shutdownCumulativeTsnAck {886, "    Cumulative TSN Ack", octets(4),           "    Cumulative TSN Ack=%u"};
 
 inline constexpr Field shutdownAckFlags         = lowerFlagsField(887);
 inline constexpr Field shutdownAckLength        = lengthField(888);
 
-inline constexpr Field completeReserved         {889, "  Reserved", piece(1, 7),         "  Reserved=%x"};
-inline constexpr Field completeTagBit           {890, "  T bit",    bit(0).advancing(8), "  T bit=%-S", &completeTagNames};
+inline constexpr Field completeReserved         {889, "  Reserved",             piece(1, 7),         "  Reserved=%x"};
+inline constexpr Field completeTagBit           {890, "  T bit",                bit(0).advancing(8), "  T bit=%-S", &completeTagNames};
 inline constexpr Field completeLength           = lengthField(891);
 // clang-format on
 
 template <class Pass>
-void shutdown(Reader<Pass> &at) {
+void shutdownChunk(Reader<Pass> &at) {
     const Block<Pass> block{at, "Shutdown"};
     read<shutdownFlags>(at);
     read<shutdownLength>(at, &at.variables().chunkOctets);
@@ -50,14 +50,14 @@ void shutdown(Reader<Pass> &at) {
 }
 
 template <class Pass>
-void shutdownAck(Reader<Pass> &at) {
+void shutdownAckChunk(Reader<Pass> &at) {
     const Block<Pass> block{at, "Shutdown Acknowledge"};
     read<shutdownAckFlags>(at);
     read<shutdownAckLength>(at, &at.variables().chunkOctets);
 }
 
 template <class Pass>
-void shutdownComplete(Reader<Pass> &at) {
+void shutdownCompleteChunk(Reader<Pass> &at) {
     const Block<Pass> block{at, "Shutdown Complete"};
     read<completeReserved>(at);
     read<completeTagBit>(at);

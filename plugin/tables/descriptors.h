@@ -17,7 +17,8 @@
 
 namespace netfloor {
 
-// These bear another mark than the rest in the highest octet of their flags. What it says is the tables' own.
+// These bear another mark than the rest in the highest octet of their flags. Hosts keep the mark; what it stands
+// for is not known.
 inline constexpr std::uint32_t usualMark = 5;
 inline constexpr std::uint32_t otherMark = 6;
 inline constexpr std::array<std::uint32_t, 16> otherMarked = {

@@ -159,7 +159,7 @@ inline constexpr LayoutTable layoutTable = [] {
         const LayoutRecord record = layoutOf(catalogue[i]->place);
         std::size_t at = 0;
         while (at < table.size && !record.sameAs(&table.octets[at])) {
-            at += 2u + table.octets[at];
+            at += 2u + table.octets[at]; // the low octet of its length, which is below 256
         }
         table.offsets[i] = static_cast<std::uint32_t>(at);
         if (at == table.size) {

@@ -23,12 +23,12 @@
 namespace netfloor::udp {
 
 // clang-format off
-inline constexpr Field sourcePort                {479, "UDP Source Port",      octetPair(), "  UDP Source Port=%-S (%u)",      &portNames, "UDP - %-s (%u)"};
-inline constexpr Field destinationPortIpInIp     {482, "UDP Destination Port", octetPair(), "  UDP Destination Port=%-S (%u)", &portNames, "IPinIP - UDP - %-s (%u)"};
-inline constexpr Field destinationPortMinimal    {486, "UDP Destination Port", octetPair(), "  UDP Destination Port=%-S (%u)", &portNames, "MIPinIP - UDP - %-s (%u)"};
-inline constexpr Field destinationPort           {488, "UDP Destination Port", octetPair(), "  UDP Destination Port=%-S (%u)", &portNames, "UDP - %-s (%u)"};
-inline constexpr Field length                    {489, "UDP Length",           octetPair(), "  UDP Length=%u octet(s)"};
-inline constexpr Field checksum                  {490, "Checksum",             octetPair(), "  Checksum=%x"};
+inline constexpr Field sourcePort             {479, "UDP Source Port",      octetPair(), "  UDP Source Port=%-S (%u)",      &portNames, "UDP - %-s (%u)"};
+inline constexpr Field destinationPortIpInIp  {482, "UDP Destination Port", octetPair(), "  UDP Destination Port=%-S (%u)", &portNames, "IPinIP - UDP - %-s (%u)"};
+inline constexpr Field destinationPortMinimal {486, "UDP Destination Port", octetPair(), "  UDP Destination Port=%-S (%u)", &portNames, "MIPinIP - UDP - %-s (%u)"};
+inline constexpr Field destinationPort        {488, "UDP Destination Port", octetPair(), "  UDP Destination Port=%-S (%u)", &portNames, "UDP - %-s (%u)"};
+inline constexpr Field length                 {489, "UDP Length",           octetPair(), "  UDP Length=%u octet(s)"};
+inline constexpr Field checksum               {490, "Checksum",             octetPair(), "  Checksum=%x"};
 // clang-format on
 
 inline constexpr std::int32_t headerOctets = 8;

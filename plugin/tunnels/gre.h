@@ -63,9 +63,9 @@ inline constexpr Field keyPresent      {694, "Key Present",             bit(5), 
 inline constexpr Field sequencePresent {695, "Sequence Number Present", bit(4),                     "Sequence Number Present=%-S", &presenceNames};
 inline constexpr Field reserved0       {696, "Reserved0",               pieces({0, 3}, {11, 15}),   "Reserved0=%u"};
 inline constexpr Field version         {697, "Version",                 piece(8, 10).advancing(16), "Version=%u"};
-inline constexpr Field protocol        {698, "GRE Protocol",            octetPair(),                  "GRE Protocol=%-S",            &carriedProtocolNames};
-inline constexpr Field checksum        {702, "CheckSum (hex)",          octetPair(),                  "CheckSum (hex)=%x"};
-inline constexpr Field reserved1       {703, "Reserved1",               octetPair(),                  "Reserved1=%u"};
+inline constexpr Field protocol        {698, "GRE Protocol",            octetPair(),                "GRE Protocol=%-S",            &carriedProtocolNames};
+inline constexpr Field checksum        {702, "CheckSum (hex)",          octetPair(),                "CheckSum (hex)=%x"};
+inline constexpr Field reserved1       {703, "Reserved1",               octetPair(),                "Reserved1=%u"};
 inline constexpr Field key             {707, "GRE Key",                 octets(4),                  "GRE Key=%u"};
 inline constexpr Field sequence        {711, "Sequence Number",         octets(4),                  "Sequence Number=%u"};
 inline constexpr Field openingFlag     {716, "HDLC Flag",               octets(1),                  "HDLC Flag=0x%x"};

@@ -33,11 +33,11 @@ namespace netfloor::ipinip {
 // clang-format off
 inline constexpr Field version            {629, "Version",                         piece(4, 7),              "Version=%u"};
 inline constexpr Field headerLength       {630, "Original Internet Header Length", piece(0, 3).advancing(8), "Original Internet Header Length=%u*4 octets"};
-inline constexpr Field totalLength        {631, "Original IP Total Length",        octetPair(),                "Original IP Total Length=%u octets"};
-inline constexpr Field identification     {632, "Original Identification",         octetPair(),                "Original Identification=%x"};
+inline constexpr Field totalLength        {631, "Original IP Total Length",        octetPair(),              "Original IP Total Length=%u octets"};
+inline constexpr Field identification     {632, "Original Identification",         octetPair(),              "Original Identification=%x"};
 inline constexpr Field timeToLive         {633, "Time to Live",                    octets(1),                "Time to Live=%u"};
 inline constexpr Field protocol           {634, "IPinIP Protocol",                 octets(1),                "IPinIP Protocol=%-S", &protocolNames, "IPinIP - %-S"};
-inline constexpr Field headerChecksum     {635, "Header Checksum",                 octetPair(),                "  Header Checksum=%x"};
+inline constexpr Field headerChecksum     {635, "Header Checksum",                 octetPair(),              "  Header Checksum=%x"};
 inline constexpr Field sourceAddress      {636, "Original Src Address",            octets(4),                R"(  Original Src Address=%-["%u":"."])"};
 inline constexpr Field destinationAddress {637, "Original Dest Address",           octets(4),                R"(  Original Dest Address=%-["%u":"."])"};
 // clang-format on

@@ -31,12 +31,12 @@ inline constexpr ValueNames sourcePresentNames{sourcePresentRows};
 
 // The checksum is shown digit by digit.
 // clang-format off
-inline constexpr Field protocol           {640, "MIPinIP Protocol",      octets(1),                "MIPinIP Protocol=%-S", &protocolNames, "MIPinIP - %-S"};
-inline constexpr Field reserved           {641, "  Reserved",            piece(0, 6),              "  Reserved=%x"};
-inline constexpr Field sourcePresent      {642, "  S",                   bit(7).advancing(8),      "  S=%-S", &sourcePresentNames};
+inline constexpr Field protocol           {640, "MIPinIP Protocol",      octets(1),                                               "MIPinIP Protocol=%-S", &protocolNames, "MIPinIP - %-S"};
+inline constexpr Field reserved           {641, "  Reserved",            piece(0, 6),                                             "  Reserved=%x"};
+inline constexpr Field sourcePresent      {642, "  S",                   bit(7).advancing(8),                                     "  S=%-S", &sourcePresentNames};
 inline constexpr Field headerChecksum     {643, "Header Checksum",       pieces({4, 7}, {0, 3}, {12, 15}, {8, 11}).advancing(16), R"(  Header Checksum=%-["%x"](hex))", noNames, "%x"};
-inline constexpr Field destinationAddress {646, "Original Dest Address", octets(4),                R"(  Original Dest Address=%-["%u":"."])"};
-inline constexpr Field sourceAddress      {651, "Original Src Address",  octets(4),                R"(  Original Src Address=%-["%u":"."])"};
+inline constexpr Field destinationAddress {646, "Original Dest Address", octets(4),                                               R"(  Original Dest Address=%-["%u":"."])"};
+inline constexpr Field sourceAddress      {651, "Original Src Address",  octets(4),                                               R"(  Original Src Address=%-["%u":"."])"};
 // clang-format on
 
 inline constexpr std::uint32_t headerOctets = 8;

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: MIT
-// ECNE and CWR, which RFC 9260 reserves (appendix A), and the chunks of unknown types: a head, and octets.
+// ECNE and CWR, which RFC 9260 reserves (section 3.2; RFC 4960, appendix A), and the chunks of unknown types: a head,
+// and octets.
 #pragma once
 
 #include "frame/block.h"
@@ -36,12 +37,12 @@ void congestionChunk(Reader<Pass> &at, BlockName name) {
 }
 
 template <class Pass>
-void explicitCongestionEcho(Reader<Pass> &at) {
+void ecneChunk(Reader<Pass> &at) {
     congestionChunk<ecneFlags, ecneReserved>(at, "ECNE");
 }
 
 template <class Pass>
-void congestionWindowReduced(Reader<Pass> &at) {
+void cwrChunk(Reader<Pass> &at) {
     congestionChunk<cwrFlags, cwrReserved>(at, "CWR");
 }
 
