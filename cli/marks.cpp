@@ -113,7 +113,8 @@ std::uint32_t endBit(const FieldReport &length) {
 bool causesFit(const FieldReport &chunkLength, const Report &detail) {
     return std::none_of(detail.fields.begin(), detail.fields.end(), [&](const FieldReport &field) {
         const bool isCause = std::find(causeLengthIds.begin(), causeLengthIds.end(), field.id) != causeLengthIds.end();
-        return isCause && field.ranges.front().firstBit > chunkLength.ranges.front().firstBit &&
+        return isCause && !field.ranges.empty() &&
+               field.ranges.front().firstBit > chunkLength.ranges.front().firstBit &&
                field.ranges.front().firstBit < endBit(chunkLength) && endBit(field) > endBit(chunkLength);
     });
 }
@@ -121,7 +122,8 @@ bool causesFit(const FieldReport &chunkLength, const Report &detail) {
 const WideLimit *wideLimitOf(const Report &detail) {
     for (const WideLimit &limit : wideLimits) {
         for (const FieldReport &field : detail.fields) {
-            if (field.id == limit.lengthFieldId && endBit(field) <= detail.cursor && causesFit(field, detail)) {
+            if (field.id == limit.lengthFieldId && !field.ranges.empty() && endBit(field) <= detail.cursor &&
+                causesFit(field, detail)) {
                 return &limit;
             }
         }
