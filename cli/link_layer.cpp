@@ -47,9 +47,10 @@ constexpr std::array etherTypeNames = {
 };
 
 constexpr std::array pppNames = {
-    NumberName{0x8021, "PPP IPCP"}, NumberName{0x8057, "PPP IPv6CP"},     NumberName{0x80fd, "PPP CCP"},
-    NumberName{0xc021, "PPP LCP"},  NumberName{0xc023, "PPP PAP"},        NumberName{0xc025, "PPP LQR"},
-    NumberName{0xc223, "PPP CHAP"}, NumberName{0x00fd, "PPP compressed"}, NumberName{0x8281, "PPP MPLSCP"},
+    NumberName{0x0281, "PPP MPLS"},   NumberName{0x8021, "PPP IPCP"}, NumberName{0x8057, "PPP IPv6CP"},
+    NumberName{0x80fd, "PPP CCP"},    NumberName{0xc021, "PPP LCP"},  NumberName{0xc023, "PPP PAP"},
+    NumberName{0xc025, "PPP LQR"},    NumberName{0xc223, "PPP CHAP"}, NumberName{0x00fd, "PPP compressed"},
+    NumberName{0x8281, "PPP MPLSCP"},
 };
 
 template <std::size_t count>

@@ -8,6 +8,7 @@
 
 #include <netfloor/records.h>
 
+#include "gaps.h"
 #include "text.h"
 
 namespace netfloor::cli {
@@ -40,17 +41,24 @@ constexpr std::array usualMarks = {
     UsualMark{NETFLOOR_FLAG_BITS_LEFT_OVER, 490, 490, 32, "a UDP payload of at most 4 octets stays unread"},
 };
 
-// Limits that reach a little further than the length they are taken from: a mark of a packet that ends there, as long
-// as it holds all that the length says.
+// Chunks whose reading ordinarily ends with a limit that is longer than what is left: a mark of design, as long as the
+// packet holds all that their lengths say.
 struct WideLimit {
     std::uint32_t lengthFieldId;
-    std::uint32_t bitsInFront; // that the length counts and that stand in front of its field
     std::string_view text;
 };
 
+constexpr std::string_view causesText =
+    "a list of SCTP error causes leaves it, as another cause is looked for behind the last";
 constexpr std::array wideLimits = {
-    WideLimit{824, 16, "an SCTP INIT at the end of a packet leaves it, as its limit lies one octet further"},
+    WideLimit{824, "an SCTP INIT at the end of a packet leaves it, as its limit lies one octet further"},
+    WideLimit{910, causesText},
+    WideLimit{946, causesText},
 };
+constexpr std::array<std::uint32_t, 11> causeLengthIds = {914, 917, 921, 923, 924, 926, 928, 929, 932, 934, 935};
+
+// A chunk's type and flags, and a cause's code, stand in front of the Length and are counted by it.
+constexpr std::uint32_t bitsInFrontOfLength = 16;
 
 std::uint32_t lastBitOf(const FieldReport &field) {
     std::uint32_t last = 0;
@@ -71,26 +79,14 @@ std::optional<Place> placeOfFlag(std::uint32_t flag, const Report &detail) {
     return Place{next == detail.fields.begin() ? nullptr : &*(next - 1), 0};
 }
 
-// Where bits were passed over: the first stretch in front of the cursor that no field covers.
+// Where bits were passed over first.
 std::optional<Place> placeOfGap(const Report &detail) {
-    std::uint32_t covered = 0;
-    Place place;
-    for (const FieldReport &field : detail.fields) {
-        for (const ReportedRange &range : field.ranges) {
-            // Fields of one octet come from the top down, so a gap is one of whole octets.
-            if (range.firstBit > covered + bitsPerOctet) {
-                place.skippedBits = range.firstBit - covered - 1;
-                return place;
-            }
-            covered = std::max(covered, range.lastBit);
-        }
-        place.behind = &field;
-    }
-    if (detail.cursor <= covered + 1) {
+    const std::vector<Gap> gaps = findGaps(detail);
+    if (gaps.empty()) {
         return std::nullopt;
     }
-    place.skippedBits = detail.cursor - covered - 1;
-    return place;
+    const Gap &first = gaps.front();
+    return Place{first.behind(detail), first.lastBit - first.firstBit + 1};
 }
 
 std::string placeText(const Place &place, const Report &detail) {
@@ -109,12 +105,25 @@ std::string placeText(const Place &place, const Report &detail) {
     return text;
 }
 
-// Whether the flag that a limit leaves comes from one that is wide, in a packet that is whole.
+// The bit behind what a Length field counts.
+std::uint32_t endBit(const FieldReport &length) {
+    return length.ranges.front().firstBit - bitsInFrontOfLength + length.value * bitsPerOctet;
+}
+
+bool causesFit(const FieldReport &chunkLength, const Report &detail) {
+    return std::none_of(detail.fields.begin(), detail.fields.end(), [&](const FieldReport &field) {
+        const bool isCause = std::find(causeLengthIds.begin(), causeLengthIds.end(), field.id) != causeLengthIds.end();
+        return isCause && !field.ranges.empty() &&
+               field.ranges.front().firstBit > chunkLength.ranges.front().firstBit &&
+               field.ranges.front().firstBit < endBit(chunkLength) && endBit(field) > endBit(chunkLength);
+    });
+}
+
 const WideLimit *wideLimitOf(const Report &detail) {
     for (const WideLimit &limit : wideLimits) {
         for (const FieldReport &field : detail.fields) {
-            if (field.id == limit.lengthFieldId && !field.ranges.empty() &&
-                field.ranges.front().firstBit - limit.bitsInFront + field.value * bitsPerOctet <= detail.cursor) {
+            if (field.id == limit.lengthFieldId && !field.ranges.empty() && endBit(field) <= detail.cursor &&
+                causesFit(field, detail)) {
                 return &limit;
             }
         }
@@ -128,6 +137,10 @@ Mark explain(std::uint32_t flag, const Report &detail) {
         if (const WideLimit *const wide = wideLimitOf(detail)) {
             return {flag, MarkKind::byDesign, std::string(wide->text)};
         }
+        return mark;
+    }
+    if (flag == NETFLOOR_FLAG_EXPECTATION && (detail.flags & flag) == 0) {
+        mark.text += ": something is shorter than its count"; // which only the MV pass marks
         return mark;
     }
     const bool isGap = flag == NETFLOOR_FLAG_BITS_LEFT_OVER;

@@ -97,23 +97,44 @@ void addFieldsOptions(CLI::App &app, Options &options) {
     addPluginOption(app, options);
 }
 
+// Decimal digits, from `least` on.
+CLI::Validator wholeNumber(std::uint64_t least) {
+    const auto check = [least](const std::string &word) -> std::string {
+        const bool digits = !word.empty() && word.find_first_not_of("0123456789") == std::string::npos;
+        const bool isZero = word.find_first_not_of('0') == std::string::npos;
+        return digits && !(isZero && least > 0)
+                   ? ""
+                   : "'" + word + "' is no whole number from " + std::to_string(least) + " on";
+    };
+    return {check, ""};
+}
+
+Colour colourOf(const std::string &word) {
+    static const std::map<std::string, Colour> colours = {
+        {"auto", Colour::automatic}, {"always", Colour::always}, {"never", Colour::never}};
+    const auto found = colours.find(word);
+    if (found == colours.end()) {
+        throw CLI::ValidationError("--color", "'" + word + "' is none of auto, always and never");
+    }
+    return found->second;
+}
+
 void addOptions(CLI::App &app, Options &options) {
     app.add_option("file", options.file, "Capture file (pcap or pcapng, gzip or not); '-' for standard input")
         ->type_name("FILE")
         ->required();
     app.add_option("-f,--filter", options.filter, "Only packets that match, in libpcap's language (man pcap-filter)")
         ->type_name("EXPRESSION");
-    app.add_option("-c,--count", options.count, "Stop after N packets")->type_name("N");
+    app.add_option("-c,--count", options.count, "Stop after N packets")->type_name("N")->check(wholeNumber(0));
     app.add_option("-p,--packet", options.packet, "Only packet number N of the file")
         ->type_name("N")
-        ->check(CLI::PositiveNumber);
+        ->check(wholeNumber(1));
     app.add_flag("--utc", options.utc, "Date and time of day (UTC) instead of seconds since the first packet");
     addPluginOption(app, options);
-    const std::map<std::string, Colour> colours = {
-        {"auto", Colour::automatic}, {"always", Colour::always}, {"never", Colour::never}};
-    app.add_option("--color", options.colour, "auto (default: on a terminal, if NO_COLOR is not set), always, never")
-        ->type_name("WHEN")
-        ->transform(CLI::CheckedTransformer(colours));
+    app.add_option_function<std::string>(
+           "--color", [&options](const std::string &word) { options.colour = colourOf(word); },
+           "auto (default: on a terminal, if NO_COLOR is not set), always, never")
+        ->type_name("WHEN");
 }
 
 void addOwnOptions(CLI::App &app, Command command, Options &options) {
@@ -123,7 +144,8 @@ void addOwnOptions(CLI::App &app, Command command, Options &options) {
         break;
     case Command::detail:
         app.add_flag("-b,--bits", options.bits, "With the bits of each field; the first bit of the IP header is bit 1");
-        app.add_flag("-a,--all", options.all, "One line for each octet of data, too");
+        app.add_flag("-a,--all", options.all,
+                     "All octets of data, a line for each, and the second reading of addresses");
         break;
     case Command::keys:
         app.add_option("--column", options.columns, "Only the key field of this name (may be repeated)")
@@ -137,8 +159,8 @@ void addOwnOptions(CLI::App &app, Command command, Options &options) {
 }
 
 // Brings the command's name to the front, so that options may stand before it, and adds the one that
-// 'netfloor FILE' leaves out.
-void putCommandFirst(const CLI::App &app, std::vector<std::string> &words) {
+// 'netfloor FILE' leaves out. Gives whether there was one.
+bool putCommandFirst(const CLI::App &app, std::vector<std::string> &words) {
     const CLI::App *const common = app.get_subcommand(commandNames.front().name);
     auto word = words.begin();
     while (word != words.end() && word->starts_with("-") && *word != "-") {
@@ -153,6 +175,7 @@ void putCommandFirst(const CLI::App &app, std::vector<std::string> &words) {
     } else {
         words.insert(words.begin(), commandNames.front().name);
     }
+    return named;
 }
 
 } // namespace
@@ -180,9 +203,8 @@ std::variant<Options, ExitCode> parseOptions(int argumentCount, char **arguments
     if (words.empty()) {
         words.emplace_back("--help");
     }
-    if (std::find(forAll.begin(), forAll.end(), words.front()) == forAll.end()) {
-        putCommandFirst(app, words);
-    }
+    const bool named =
+        std::find(forAll.begin(), forAll.end(), words.front()) != forAll.end() || putCommandFirst(app, words);
     std::reverse(words.begin(), words.end()); // as CLI11 takes them
     try {
         app.parse(words);
@@ -190,7 +212,11 @@ std::variant<Options, ExitCode> parseOptions(int argumentCount, char **arguments
         app.exit(answer);
         return ExitCode::good;
     } catch (const CLI::ParseError &mistake) {
-        std::cerr << "netfloor: " << mistake.what() << "\nnetfloor --help tells what can be asked for.\n";
+        std::cerr << "netfloor: " << mistake.what() << '\n';
+        if (!named && dynamic_cast<const CLI::ExtrasError *>(&mistake) != nullptr) {
+            std::cerr << "One FILE is read; a word in front of it must be a command.\n";
+        }
+        std::cerr << "netfloor --help tells what can be asked for.\n";
         return ExitCode::usage;
     }
     return options;

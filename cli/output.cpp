@@ -26,6 +26,18 @@ constexpr std::string_view startOf(Style style) {
 
 } // namespace
 
+void Output::untrusted(std::string_view text) {
+    constexpr std::string_view digits = "0123456789abcdef";
+    for (const char character : text) {
+        const auto octet = static_cast<unsigned char>(character);
+        if (octet >= 0x20 && octet < 0x7f) {
+            buffer_ += character;
+        } else {
+            buffer_ += {'\\', 'x', digits[octet >> 4U], digits[octet & 0xfU]};
+        }
+    }
+}
+
 void Output::styled(Style style, std::string_view text) {
     if (!colour_ || style == Style::plain) {
         buffer_ += text;

@@ -35,6 +35,9 @@ public:
     }
     Output &operator<<(std::uint64_t number) { return *this << std::string_view(std::to_string(number)); }
 
+    // Text that came out of a packet: what a terminal would not just print is shown as \x1b.
+    void untrusted(std::string_view text);
+
     void styled(Style style, std::string_view text);
 
     // Blanks up to `width`, then `text`.

@@ -6,6 +6,8 @@
 #include <string_view>
 #include <vector>
 
+#include "gaps.h"
+#include "printers/field_text.h"
 #include "printers/printer.h"
 
 namespace netfloor::cli {
@@ -16,31 +18,6 @@ constexpr std::uint32_t bitsPerOctet = 8;
 constexpr std::size_t leastRun = 5;       // fewer octets of data stand on lines of their own
 constexpr std::size_t octetsPerLine = 16; // of data
 constexpr std::size_t mostDataLines = 4;  // without --all
-
-// "17-32", and for a field whose pieces do not follow one another "1-5,9-16".
-std::string bitsText(const std::vector<ReportedRange> &ranges) {
-    std::string text;
-    for (std::size_t i = 0; i < ranges.size();) {
-        const std::uint32_t first = ranges[i].firstBit;
-        std::uint32_t last = ranges[i].lastBit;
-        for (++i; i < ranges.size() && ranges[i].firstBit == last + 1; ++i) {
-            last = ranges[i].lastBit;
-        }
-        text += text.empty() ? "" : ",";
-        text += std::to_string(first);
-        if (last != first) {
-            text += "-" + std::to_string(last);
-        }
-    }
-    return text;
-}
-
-std::string octetsText(std::uint32_t firstBit, std::uint32_t lastBit) {
-    const std::uint32_t first = (firstBit - 1) / bitsPerOctet;
-    const std::uint32_t last = (lastBit - 1) / bitsPerOctet;
-    return first == last ? "octet " + std::to_string(first)
-                         : "octets " + std::to_string(first) + " to " + std::to_string(last);
-}
 
 bool isOneOctet(const FieldReport &field) {
     return field.ranges.size() == 1 && field.ranges[0].lastBit - field.ranges[0].firstBit + 1 == bitsPerOctet;
@@ -61,22 +38,29 @@ std::size_t runLength(std::span<const FieldReport> fields, std::size_t first) {
 class Tree {
 public:
     Tree(Output &out, const Options &options, const Report &report, std::span<const std::uint8_t> packet)
-        : out_(out), options_(options), report_(report), packet_(packet) {}
+        : out_(out), options_(options), report_(report), packet_(packet), gaps_(findGaps(report)) {}
 
     void print() {
         const std::span<const FieldReport> fields = report_.fields;
         for (std::size_t i = 0; i < fields.size();) {
+            printGap(i);
+            if (isReadAgain(i)) {
+                ++i;
+                continue;
+            }
             openBlocks(fields[i]);
             openLayer(fields[i]);
             const std::size_t run = options_.all ? 1 : runLength(fields, i);
             if (run >= leastRun) {
-                printData(fields.subspan(i, run));
+                const std::uint32_t firstBit = fields[i].ranges[0].firstBit;
+                printOctets(fields[i], {firstBit, packet_.subspan((firstBit - 1) / bitsPerOctet, run)});
                 i += run;
             } else {
                 printField(fields[i]);
                 ++i;
             }
         }
+        printGap(fields.size());
     }
 
 private:
@@ -138,6 +122,24 @@ private:
         return text + "]";
     }
 
+    // An address is read a second time for its key, without a text.
+    [[nodiscard]] bool isReadAgain(std::size_t i) const {
+        if (options_.all || i == 0 || !report_.fields[i].text.empty()) {
+            return false;
+        }
+        const FieldReport &before = report_.fields[i - 1];
+        const auto address = ipv6Address(report_.fields[i], packet_);
+        return address && report_.fields[i].name == before.name && address == ipv6Address(before, packet_);
+    }
+
+    void printGap(std::size_t nextField) {
+        for (; gap_ < gaps_.size() && gaps_[gap_].nextField <= nextField; ++gap_) {
+            indent();
+            out_.styled(Style::dim, "[in no field: " + octetsText(gaps_[gap_].firstBit, gaps_[gap_].lastBit) + "]");
+            out_ << '\n';
+        }
+    }
+
     void printBits(const std::string &bits) {
         if (options_.bits && !bits.empty()) {
             out_.styled(Style::dim, "  [" + bits + "]");
@@ -145,34 +147,42 @@ private:
     }
 
     void printField(const FieldReport &field) {
-        indent();
         const std::string_view text = withoutLeadingBlanks(field.text);
-        out_ << (text.empty() ? withoutLeadingBlanks(field.name) : text);
-        if (const auto address = ipv6Address(field, packet_)) {
+        const auto address = ipv6Address(field, packet_);
+        if (const OctetRun run = unshownOctets(field, packet_); !address && !run.octets.empty()) {
+            return printOctets(field, run);
+        }
+        indent();
+        out_.untrusted(text.empty() ? nameOf(field) : text);
+        if (address) {
             out_.styled(Style::good, "  (" + ipv6Text(*address) + ")");
+        } else if (const auto number = unshownNumber(field)) {
+            out_.styled(Style::dim, "  (" + std::to_string(*number) + ")");
         }
         printBits(bitsText(field.ranges));
         out_ << '\n';
     }
 
-    void printData(std::span<const FieldReport> run) {
+    // Octets as they stand in the packet.
+    void printOctets(const FieldReport &field, const OctetRun &run) {
+        const auto size = run.octets.size();
         indent();
-        out_ << withoutLeadingBlanks(run.front().name) << ": " << countText(run.size(), "octet");
-        printBits(bitsText({{0, run.front().ranges[0].firstBit, run.back().ranges[0].lastBit}}));
+        out_ << nameOf(field) << ": " << countText(size, "octet");
+        printBits(bitsText({{0, run.firstBit, run.firstBit + static_cast<std::uint32_t>(size) * bitsPerOctet - 1}}));
         out_ << '\n';
-        const std::size_t shown = std::min(run.size(), mostDataLines * octetsPerLine);
+        const std::size_t shown = options_.all ? size : std::min(size, mostDataLines * octetsPerLine);
         for (std::size_t line = 0; line < shown; line += octetsPerLine) {
             indent(1);
             for (std::size_t i = line; i < std::min(shown, line + octetsPerLine); ++i) {
                 std::array<char, 4> text{};
-                std::snprintf(text.data(), text.size(), i == line ? "%02x" : " %02x", run[i].ranges[0].value & 0xffU);
+                std::snprintf(text.data(), text.size(), i == line ? "%02x" : " %02x", run.octets[i]);
                 out_ << std::string_view(text.data());
             }
             out_ << '\n';
         }
-        if (shown < run.size()) {
+        if (shown < size) {
             indent(1);
-            out_.styled(Style::dim, "and " + countText(run.size() - shown, "octet") + " more (--all shows them)");
+            out_.styled(Style::dim, "and " + countText(size - shown, "octet") + " more (--all shows them)");
             out_ << '\n';
         }
     }
@@ -181,6 +191,8 @@ private:
     const Options &options_;
     const Report &report_;
     std::span<const std::uint8_t> packet_;
+    std::vector<Gap> gaps_;
+    std::size_t gap_ = 0;           // the next one
     std::vector<std::size_t> path_; // open blocks that have a name
     const LayerRecord *layer_ = nullptr;
 };

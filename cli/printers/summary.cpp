@@ -10,15 +10,14 @@ namespace netfloor::cli {
 
 namespace {
 
-// A text that says nothing without the name of its field: "64", "5f01", "0x1b3", "99(dec)".
+// A text that says nothing without the name of its field: "64", "5f01", "0x1b3", "99(dec)", "28 octets", "5*4 octets".
 bool isBareNumber(std::string_view text) {
     if (text.starts_with("0x")) {
         text.remove_prefix(2);
     }
-    if (text.ends_with("(dec)")) {
-        text.remove_suffix(5);
-    }
-    return !text.empty() && text.find_first_not_of("0123456789abcdef") == std::string_view::npos;
+    text = text.substr(0, text.find("(dec)"));
+    text = text.substr(0, text.find(" octet"));
+    return !text.empty() && text.find_first_not_of("0123456789abcdef*") == std::string_view::npos;
 }
 
 class SummaryPrinter final : public Printer {
@@ -78,11 +77,12 @@ private:
         if (isBareNumber(run.front().text)) {
             out() << names_.find(run.front().displayId).name << '=';
         }
-        out() << run.front().text;
+        out().untrusted(run.front().text);
         const std::size_t shown = options().all || run.size() <= mostShown ? run.size() : mostShown;
         for (std::size_t i = 1; i < shown; ++i) {
             if (options().all || (!run[i].text.empty() && run[i].text != run[i - 1].text)) {
-                out() << ' ' << run[i].text;
+                out() << ' ';
+                out().untrusted(run[i].text);
             }
         }
         if (shown < run.size()) {

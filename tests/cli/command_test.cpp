@@ -85,7 +85,7 @@ TEST_F(Command, shows) {
         {"netfloor detail $T/five.pcap",
          0,
          {"Packet 2  1.000000  42 octets, Ethernet\n  no IP: ARP\n", "      Source Address= 10.0.0.1\n",
-          "Data=8 octets"},
+          "Destination Port=Domain Name Server (53)\n", "Data=8 octets"},
          {},
          {"["
           "97-128]"}},
@@ -121,7 +121,10 @@ TEST_F(Command, chooses) {
         {"netfloor --packet 1 -f arp $T/five.pcap", 2, {}, {"does not match the filter"}, {}},
         {"netfloor -f 'no such' $T/five.pcap", 2, {}, {"pcap-filter"}, {}},
         {"netfloor keys --column Nothing $T/five.pcap", 2, {}, {"'Nothing'", "'Time to Live'"}, {}},
-        {"netfloor --packet 0 $T/five.pcap", 2, {}, {"--help"}, {}},
+        {"netfloor --packet 0 $T/five.pcap", 2, {}, {"'0' is no whole number from 1 on", "--help"}, {}},
+        {"netfloor --count -1 $T/five.pcap", 2, {}, {"'-1' is no whole number"}, {}},
+        {"netfloor --color blue $T/five.pcap", 2, {}, {"'blue' is none of auto, always and never"}, {}},
+        {"netfloor detial $T/five.pcap", 2, {}, {"a word in front of it must be a command"}, {}},
         {"netfloor detail", 2, {}, {"file is required"}, {}},
         {"netfloor --help", 0, {"Exit codes:"}, {}, {}},
     });
@@ -193,7 +196,8 @@ TEST_F(Command, endsWithACodeAndASentence) {
 // What every packet of a kind leaves by design is told apart from damage, and only damage makes the exit code.
 TEST_F(Command, tellsMarksByDesignFromDamage) {
     const Octets tcpHead = hex("0050 9c40 00000001 00000000");
-    const Octets init = hex("0b59 0b59 00000000 00000000  01 00 0014 00000001 00010000 000a 000a 00000001");
+    const Octets sctpHead = hex("0b59 0b59 00000000 00000000");
+    const Octets init = sctpHead + hex("01 00 0014 00000001 00010000 000a 000a 00000001");
     Octets longInit = init;
     longInit[15] = 0x20; // the length says 12 octets more
     struct Row {
@@ -213,6 +217,17 @@ TEST_F(Command, tellsMarksByDesignFromDamage) {
          "unread   0x10 bits left over inside a length: 1 octet behind 'UDP Destination Port' at octet 23", 0},
         {ipv4({.protocol = 6, .payload = tcpHead + hex("f002 0100 0000 0000")}), 0, "DAMAGED  0x2 every TCP header", 1},
         {ipv4({.protocol = 132, .payload = longInit}), 0, "DAMAGED  0x8 length reaches behind the bits left", 1},
+        {ipv4({.protocol = 132, .payload = sctpHead + hex("09 00 000c 0003 0008 00000005")}), 0,
+         "good     0x8 a list of SCTP error causes", 0},
+        {ipv4({.protocol = 132, .payload = sctpHead + hex("06 00 000c 0005 0008 00000005")}), 0,
+         "good     0x8 a list of SCTP error causes", 0},
+        {ipv4({.protocol = 132, .payload = sctpHead + hex("06 00 000c 0003 0010 00000005")}), 0, "DAMAGED  0x8", 1},
+        {ipv4({.protocol = 132, .payload = sctpHead + hex("09 00 0010 0003 0008 00000005")}), 0, "DAMAGED  0x8", 1},
+        {ipv4({.protocol = 47, .payload = hex("0000")}), 0, "DAMAGED  0x2 expectation not met: something is shorter",
+         1},
+        // The octets of the identification are read from the last one on, which is no gap in front of them.
+        {ipv6({.nextHeader = 44, .payload = hex("3a 00 0001 00000007  87*9")}), 0,
+         "8 octets behind 'ICMP Message Type' at octet 48", 0},
         {ipv4({.protocol = 1, .payload = hex("08 01 0000 0001 0001")}), 0,
          "DAMAGED  0x2 expectation not met behind 'ICMP Message Type' at octet 20", 1},
         // The capture, not the sender, has cut the first.
@@ -229,6 +244,31 @@ TEST_F(Command, tellsMarksByDesignFromDamage) {
     }
 }
 
+// What the texts of the plug-in leave out, or what a terminal must not get.
+TEST_F(Command, detailShowsNumbersOctetsAndGaps) {
+    const Octets quoted = ipv4({.protocol = 17, .payload = hex("00350007 00080001")});
+    writeFile("texts.pcap",
+              pcapFile(228, {{ipv6({.nextHeader = 58, .payload = hex("87 00 0000 00*20")})},
+                             {ipv4({.protocol = 1, .payload = hex("0b 00 0000 00000000") + quoted + hex("61*2")})},
+                             {ipv4({.protocol = 1, .payload = hex("08 00 0000 0001 0001 1b 5b 41")})}}));
+    check({
+        {"netfloor detail --packet 1 $T/texts.pcap",
+         0,
+         {"Next Header=IPv6-ICMP  (58)\n", "ICMP Message Type=  (135)\n", "[in no field: octets 41 to 63]\n"},
+         {},
+         {"\n          Source IP Address  ("}},
+        {"netfloor detail --all --packet 1 $T/texts.pcap", 0, {"\n          Source IP Address  (2001:db8::1)"}, {}, {}},
+        {"netfloor detail --packet 2 $T/texts.pcap",
+         0,
+         {"64-bit Original Data Datagram: 8 octets\n              00 35 00 07 00 08 00 01\n",
+          "[in no field: octets 56 to 57]\n"},
+         {},
+         {}},
+        {"netfloor detail --packet 3 $T/texts.pcap", 0, {"Message Data=\\x1b\n", "Data=A\n"}, {}, {"\x1b"}},
+        {"netfloor --all --packet 3 $T/texts.pcap", 0, {"\\x1b"}, {}, {"\x1b"}},
+    });
+}
+
 TEST_F(Command, showsIpv6AddressesInTheirUsualForm) {
     writeFile("ipv6.pcap", pcapFile(229, {{ipv6({.nextHeader = 17, .payload = udp(40000, 53, hex("61*8"))})}}));
     check({
@@ -240,7 +280,12 @@ TEST_F(Command, showsIpv6AddressesInTheirUsualForm) {
          {},
          {},
          2},
-        {"netfloor $T/ipv6.pcap", 0, {"Version=6 | 16 octets | UDP | 210.d08b.0.0.0.0.0.10 | "}, {}, {}, 1},
+        {"netfloor $T/ipv6.pcap",
+         0,
+         {"Version=6 | Payload Length=16 octets | UDP | 210.d08b.0.0.0.0.0.10 | "},
+         {},
+         {},
+         1},
     });
 }
 

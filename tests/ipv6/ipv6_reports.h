@@ -3,7 +3,6 @@
 #pragma once
 
 #include <string>
-#include <string_view>
 
 #include <gtest/gtest.h>
 
@@ -20,15 +19,6 @@ inline std::string idsBehindHeader(const Report &md) {
         ids += (ids.empty() ? "" : " ") + std::to_string(md.fields[at].id);
     }
     return ids;
-}
-
-// Lines in one: 246 "Error Message"; 531 ""
-inline std::string oneLine(std::string_view lines) {
-    std::string result;
-    for (const char letter : lines.substr(0, lines.size() - (lines.empty() ? 0 : 1))) {
-        result += letter == '\n' ? std::string("; ") : std::string(1, letter);
-    }
-    return result;
 }
 
 // One payload, the fields behind the header and the flags of the MV pass; the others set none.

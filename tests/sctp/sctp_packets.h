@@ -3,7 +3,6 @@
 #pragma once
 
 #include <string>
-#include <string_view>
 
 #include <gtest/gtest.h>
 
@@ -42,15 +41,6 @@ inline std::string chunkIds(const Report &md) {
         behindHeader |= field.id == 798;
     }
     return ids;
-}
-
-// Lines in one: 884 "0"; 808 "4"
-inline std::string oneLine(std::string_view lines) {
-    std::string result;
-    for (const char letter : lines.substr(0, lines.size() - (lines.empty() ? 0 : 1))) {
-        result += letter == '\n' ? std::string("; ") : std::string(1, letter);
-    }
-    return result;
 }
 
 // One packet, the fields behind `front` and the flags.

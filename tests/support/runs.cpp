@@ -277,6 +277,14 @@ std::string linesFrom(std::string_view text, std::string_view word) {
     return std::string(at == std::string::npos ? std::string_view() : text.substr(at));
 }
 
+std::string oneLine(std::string_view lines) {
+    std::string result;
+    for (const char letter : lines.substr(0, lines.empty() ? 0 : lines.size() - 1)) { // without the last line's end
+        result += letter == '\n' ? std::string("; ") : std::string(1, letter);
+    }
+    return result;
+}
+
 std::string verdictLine(const Report &report) {
     std::ostringstream out;
     out << "verdict " << report.verdict.value << " flags 0x" << std::hex << report.flags << '\n';

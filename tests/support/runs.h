@@ -75,6 +75,9 @@ void cutEverywhere(const Octets &packet, const std::function<void(std::size_t, c
 // The lines from the first one on that starts with `word`, so that a test needs not repeat the headers in front.
 [[nodiscard]] std::string linesFrom(std::string_view text, std::string_view word);
 
+// The lines in one: 884 "0"; 808 "4"
+[[nodiscard]] std::string oneLine(std::string_view lines);
+
 // The verdict's line: "verdict -52 flags 0x10".
 [[nodiscard]] std::string verdictLine(const Report &report);
 
