@@ -161,7 +161,7 @@ struct XtrPass {
             return false;
         }
         if (keyFieldStatus > 1 && presenceRow < Grammar::keyRows.size()) {
-            markPresent(context, Grammar::keyRows[presenceRow]);
+            markPresent(context.keyRecord, Grammar::keyRows[presenceRow]);
         }
         return true;
     }
@@ -176,33 +176,34 @@ struct XtrPass {
         constexpr std::uint32_t row = Grammar::template keyRow<field>;
         if constexpr (row != Grammar::noKeyRow) {
             const KeyFieldRow &key = Grammar::keyRows[row];
-            markPresent(*at.context, key);
+            std::uint8_t *const record = at.context->keyRecord;
+            markPresent(record, key);
             if constexpr (field.place.shape == Shape::addressNibbles) {
                 if (!storeAddress(*at.context, key, at.data, start)) {
                     at.giveState();
                     at.end(Outcome::cutOff);
                 }
             } else {
-                storeNumber<field>(at, key, start, units);
+                storeNumber<field>(record, key, at.data, start, units);
             }
         }
     }
 
 private:
-    NETFLOOR_INLINE static void markPresent(const XtrContext &context, const KeyFieldRow &row) {
-        std::uint8_t &presence = context.keyRecord[row.presenceOffset];
+    NETFLOOR_INLINE static void markPresent(std::uint8_t *record, const KeyFieldRow &row) {
+        std::uint8_t &presence = record[row.presenceOffset];
         presence = static_cast<std::uint8_t>(presence | row.presenceMask);
     }
 
     template <const Field &field>
-    NETFLOOR_INLINE static void storeNumber(Reader<XtrPass> &at, const KeyFieldRow &row, std::uint32_t start,
-                                            std::uint32_t units) {
+    NETFLOOR_INLINE static void storeNumber(std::uint8_t *record, const KeyFieldRow &row, const std::uint8_t *data,
+                                            std::uint32_t start, std::uint32_t units) {
         constexpr std::uint32_t width = field.place.width();
         static_assert(width > 0 && width <= 32, "a key field is a number of up to 32 bits, or an address");
         using Stored =
             std::conditional_t<width <= 8, std::uint8_t, std::conditional_t<width <= 16, std::uint16_t, std::uint32_t>>;
-        const auto value = static_cast<Stored>(valueAt<field>(at.data, start, units) * field.place.scale);
-        std::memcpy(at.context->keyRecord + row.valueOffset, &value, sizeof value);
+        const auto value = static_cast<Stored>(valueAt<field>(data, start, units) * field.place.scale);
+        std::memcpy(record + row.valueOffset, &value, sizeof value);
     }
 
     // Stores an address as a string of octets, each with its two nibbles exchanged, as the nibbles were read.
