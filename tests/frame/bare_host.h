@@ -51,6 +51,7 @@ struct KeyRoom {
 
     std::array<std::uint8_t, rows> presence;
     std::array<std::array<std::uint8_t, 8>, rows> values;
+    std::array<std::uint8_t, 4096> addresses = {}; // of IPv6, for whom the context says so
 };
 
 // What the host could see during one call of the MD or TO output.

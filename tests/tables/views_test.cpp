@@ -14,7 +14,7 @@
 #include <gtest/gtest.h>
 
 #include "support/runs.h"
-#include "tables/corpus.h"
+#include "support/corpus.h"
 
 namespace netfloor::test {
 namespace {

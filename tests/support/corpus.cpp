@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-#include "tables/corpus.h"
+#include "support/corpus.h"
 
 #include <cstdint>
 #include <string_view>
