@@ -13,8 +13,8 @@
 
 #include <gtest/gtest.h>
 
-#include "support/runs.h"
 #include "support/corpus.h"
+#include "support/runs.h"
 
 namespace netfloor::test {
 namespace {
