@@ -10,8 +10,8 @@
 #include <cstddef>
 #include <cstdint>
 #include <cstring>
-#include <utility>
 
+#include "frame/for_each.h"
 #include "frame/inline.h"
 
 namespace netfloor {
@@ -126,10 +126,7 @@ template <std::uint32_t count>
     }
     const std::uint8_t *const from = data + (first - 1) / bitsPerOctet;
     std::uint32_t value = 0;
-    [&]<std::size_t... octet>(std::index_sequence<octet...>) NETFLOOR_INLINE {
-        ((value = value << bitsPerOctet | from[octet]), ...);
-    }
-    (std::make_index_sequence<count>{});
+    forEach<count>([&]<std::size_t octet>() NETFLOOR_INLINE { value = value << bitsPerOctet | from[octet]; });
     return value;
 }
 

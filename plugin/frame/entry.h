@@ -8,8 +8,8 @@
 #include <cstring>
 #include <optional>
 #include <type_traits>
-#include <utility>
 
+#include "frame/for_each.h"
 #include "frame/reader.h"
 #include "netfloor/host.h"
 
@@ -46,10 +46,9 @@ NETFLOOR_INLINE inline void clear(Variables &variables) {
     static_assert(std::is_trivially_copyable_v<Variables>);
     constexpr std::size_t piece = 32;
     auto *const octets = reinterpret_cast<unsigned char *>(&variables);
-    [&]<std::size_t... i>(std::index_sequence<i...>) NETFLOOR_INLINE {
-        (std::memset(octets + i * piece, 0, std::min(piece, sizeof variables - i * piece)), ...);
-    }
-    (std::make_index_sequence<(sizeof variables + piece - 1) / piece>{});
+    forEach<(sizeof variables + piece - 1) / piece>([&]<std::size_t i>() NETFLOOR_INLINE {
+        std::memset(octets + i * piece, 0, std::min(piece, sizeof variables - i * piece));
+    });
 }
 
 // Runs one pass over one layer. Nothing when the pass is refused before it starts.

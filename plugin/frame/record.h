@@ -4,22 +4,13 @@
 
 #include <cstdint>
 #include <cstring>
-#include <utility>
 
 #include "frame/bits.h"
 #include "frame/field.h"
+#include "frame/for_each.h"
 #include "netfloor/records.h"
 
 namespace netfloor {
-
-// Calls `visit` with the number of each piece, as a constant.
-template <std::uint32_t count, class Visit>
-NETFLOOR_INLINE inline void forEachPiece(Visit visit) {
-    [&]<std::size_t... i>(std::index_sequence<i...>) NETFLOOR_INLINE {
-        (visit.template operator()<i>(), ...);
-    }
-    (std::make_index_sequence<count>{});
-}
 
 // A value with a further piece of so many bits behind it.
 [[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t joined(std::uint32_t value, std::uint32_t piece,
@@ -39,7 +30,7 @@ template <const Field &field>
     constexpr const Place &place = field.place;
     std::uint32_t value = 0;
     if constexpr (place.isPieces()) {
-        forEachPiece<place.count>([&]<std::uint32_t i>() NETFLOOR_INLINE {
+        forEach<place.count>([&]<std::uint32_t i>() NETFLOOR_INLINE {
             constexpr Piece piece = field.place.pieces[i];
             value = joined(value, pieceAt<piece.low, piece.high>(data, cursor), piece.width());
         });
@@ -109,7 +100,7 @@ NETFLOOR_INLINE inline std::uint32_t writeElements(FieldRecord &record, const st
     std::uint32_t outputElements = elements;
 
     if constexpr (place.shape == Shape::pieces) {
-        forEachPiece<place.count>([&]<std::uint32_t i>() NETFLOOR_INLINE {
+        forEach<place.count>([&]<std::uint32_t i>() NETFLOOR_INLINE {
             constexpr Piece piece = field.place.pieces[i];
             ranges[i].firstBit = cursor + piece.low;
             ranges[i].lastBit = cursor + piece.high;
@@ -118,7 +109,7 @@ NETFLOOR_INLINE inline std::uint32_t writeElements(FieldRecord &record, const st
             value = joined(value, ranges[i].value, piece.width());
         });
     } else if constexpr (place.shape == Shape::octets && !place.isRun()) {
-        forEachPiece<place.count>([&]<std::uint32_t i>() NETFLOOR_INLINE { octet(i, cursor + i * bitsPerOctet); });
+        forEach<place.count>([&]<std::uint32_t i>() NETFLOOR_INLINE { octet(i, cursor + i * bitsPerOctet); });
         if constexpr (place.count == 1) {
             ranges[0].flagWord = 0; // a single octet is one piece, not a row of octets
         }

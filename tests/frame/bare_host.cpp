@@ -55,13 +55,20 @@ std::string stackText(const BitStack &stack) {
     return out.str();
 }
 
-std::string describe(const DecodeState &state) {
+std::string describeField(const DecodeState &state) {
     const FieldRecord &record = state.fieldRecord;
     std::ostringstream out;
     out << "cursor " << state.cursor << " left " << state.bitsLeft << " advance " << state.advance << " condition "
         << unsigned{state.condition} << " block \"" << state.blockName << "\" field " << record.fieldId << " \""
         << record.fieldName << "\" value " << record.value << record.valueText << " ranges " << record.rangeCount << '/'
         << record.outputRangeCount;
+    return out.str();
+}
+
+std::string describe(const DecodeState &state) {
+    const FieldRecord &record = state.fieldRecord;
+    std::ostringstream out;
+    out << describeField(state);
     for (std::uint32_t i = 0; i < record.rangeCount; ++i) {
         const BitRange &range = record.ranges[i];
         out << ' ' << range.value << ':' << range.firstBit << '-' << range.lastBit << ':' << range.flagWord;

@@ -65,6 +65,9 @@ struct Seen {
 // cursor 9 left 232 advance 8 condition 1 block "IPv4 Header" field 152 "Internet Header Length" value 5 ranges 1/1
 [[nodiscard]] std::string describe(const DecodeState &state);
 
+// The same without the elements.
+[[nodiscard]] std::string describeField(const DecodeState &state);
+
 // The elements from the bottom to the top: "1 1 1 33".
 [[nodiscard]] std::string stackText(const BitStack &stack);
 

@@ -22,12 +22,9 @@ namespace {
 std::string leftIn(const DecodeState &state) {
     const FieldRecord &record = state.fieldRecord;
     std::ostringstream out;
-    out << "cursor " << state.cursor << " left " << state.bitsLeft << " advance " << state.advance << " condition "
-        << unsigned{state.condition} << " block \"" << state.blockName << "\" blocks " << stackText(state.blockStarts)
-        << " counted " << state.blockStarts.count << " limits " << stackText(state.limits) << " counted "
-        << state.limits.count << " field " << record.fieldId << " \"" << record.fieldName << "\" value " << record.value
-        << record.valueText << " wide " << record.wideStart << '+' << record.wideBits << " ranges " << record.rangeCount
-        << '/' << record.outputRangeCount;
+    out << describeField(state) << " wide " << record.wideStart << '+' << record.wideBits << " blocks "
+        << stackText(state.blockStarts) << " counted " << state.blockStarts.count << " limits "
+        << stackText(state.limits) << " counted " << state.limits.count << " elements";
     for (std::uint32_t i = 0; i < record.rangeCount; ++i) {
         out << ' ' << record.ranges[i].value;
         if (i < record.outputRangeCount) {
