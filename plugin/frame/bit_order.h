@@ -8,7 +8,11 @@
 
 #include "frame/reader.h"
 
-namespace netfloor {
+namespace netfloor::plugin {
+
+struct BitOrderVariables {
+    bool copyRestored; // the working copy was restored as a whole since the host last had the packet
+};
 
 // Reverses the working copy from the cursor on as long as it lives, and restores it then from the source, with
 // whatever a lower layer has changed in it. The passes that report nothing, where no host has a field to look at
@@ -19,39 +23,39 @@ class [[nodiscard]] ReversedBits {
 public:
     enum class Report : bool { plain, toldToHost };
 
-    ReversedBits(Reader<Pass> &reader, Report report) : at_(reader), outerOrder_(reader.bitOrder) {
-        if (at_.over()) {
+    ReversedBits(Reader<Pass> &reader, Report report) : reader_(reader), outerOrder_(reader.bitOrder) {
+        if (reader_.ended()) {
             return;
         }
         if (report == Report::toldToHost) {
-            at_.bitOrder = bitsPerOctet;
+            reader_.bitOrder = bitsPerOctet;
         }
-        at_.settle();
-        at_.writeLastRead();
-        start_ = (at_.cursor - 1) / bitsPerOctet;
-        end_ = at_.state->totalBits / bitsPerOctet;
+        reader_.settle();
+        reader_.writeLastRead();
+        start_ = (reader_.cursor - 1) / bitsPerOctet;
+        end_ = reader_.state->totalBits / bitsPerOctet;
         if (!Pass::reports) {
             // Off an octet border an address reaches into one octet more.
             end_ = std::min(end_, start_ + addressBits / bitsPerOctet + 1);
         }
-        reverseOctets(at_.data, at_.cursor, end_ * bitsPerOctet);
+        reverseOctets(reader_.data, reader_.cursor, end_ * bitsPerOctet);
     }
 
     // Behind the stretch the cursor stands on a whole octet, counted from the start of the innermost block.
     ~ReversedBits() {
-        if (at_.over()) {
+        if (reader_.ended()) {
             return;
         }
-        at_.settle();
-        at_.writeLastRead();
+        reader_.settle();
+        reader_.writeLastRead();
         restore();
-        const std::uint32_t blockStart = at_.state->blockStarts.base[at_.blockDepth];
-        if (const std::uint32_t odd = (at_.cursor - blockStart) % bitsPerOctet; odd != 0) {
-            const std::uint32_t rest = std::min(bitsPerOctet - odd, at_.left);
-            at_.cursor += rest;
-            at_.left -= rest;
+        const std::uint32_t blockStart = reader_.state->blockStarts.base[reader_.blockDepth];
+        if (const std::uint32_t odd = (reader_.cursor - blockStart) % bitsPerOctet; odd != 0) {
+            const std::uint32_t rest = std::min(bitsPerOctet - odd, reader_.left);
+            reader_.cursor += rest;
+            reader_.left -= rest;
         }
-        at_.bitOrder = outerOrder_;
+        reader_.bitOrder = outerOrder_;
     }
 
     ReversedBits(const ReversedBits &) = delete;
@@ -59,18 +63,18 @@ public:
 
 private:
     void restore() {
-        bool &copyRestored = at_.variables().copyRestored;
+        bool &copyRestored = reader_.variables().copyRestored;
         const bool whole = Pass::reports || !copyRestored;
         const std::uint32_t from = whole ? 0 : std::min(start_, end_);
-        const std::uint32_t to = whole ? at_.state->totalBits / bitsPerOctet : end_;
-        std::memcpy(at_.data + from, at_.state->sourceData + from, to - from);
+        const std::uint32_t to = whole ? reader_.state->totalBits / bitsPerOctet : end_;
+        std::memcpy(reader_.data + from, reader_.state->sourceData + from, to - from);
         copyRestored = true;
     }
 
-    Reader<Pass> &at_;
+    Reader<Pass> &reader_;
     std::uint32_t outerOrder_;
     std::uint32_t start_ = 0; // the octets that are reversed
     std::uint32_t end_ = 0;
 };
 
-} // namespace netfloor
+} // namespace netfloor::plugin

@@ -14,7 +14,7 @@
 #include "frame/for_each.h"
 #include "frame/inline.h"
 
-namespace netfloor {
+namespace netfloor::plugin {
 
 inline constexpr std::uint32_t bitsPerOctet = 8;
 
@@ -186,4 +186,4 @@ inline void reverseOctets(std::uint8_t *data, std::uint32_t from, std::uint32_t 
     }
 }
 
-} // namespace netfloor
+} // namespace netfloor::plugin

@@ -6,23 +6,23 @@
 
 #include "frame/reader.h"
 
-namespace netfloor {
+namespace netfloor::plugin {
 
 // A block.
 template <class Pass>
 class [[nodiscard]] Block {
 public:
-    NETFLOOR_INLINE Block(Reader<Pass> &reader, BlockName name) : at_(reader), outer_(reader.block) {
-        at_.block = name;
-        if (!at_.over()) {
-            at_.openBlock();
+    NETFLOOR_INLINE Block(Reader<Pass> &reader, BlockName name) : reader_(reader), outer_(reader.block) {
+        reader_.block = name;
+        if (!reader_.ended()) {
+            reader_.openBlock();
         }
     }
 
     NETFLOOR_INLINE ~Block() {
-        at_.block = outer_;
-        if (!at_.over()) {
-            at_.closeBlock();
+        reader_.block = outer_;
+        if (!reader_.ended()) {
+            reader_.closeBlock();
         }
     }
 
@@ -30,7 +30,7 @@ public:
     Block &operator=(const Block &) = delete;
 
 private:
-    Reader<Pass> &at_;
+    Reader<Pass> &reader_;
     BlockName outer_;
 };
 
@@ -42,10 +42,10 @@ class [[nodiscard]] LimitedBlock {
 public:
     // Opens the block; `limit` must follow, once the length is known.
     NETFLOOR_INLINE LimitedBlock(Reader<Pass> &reader, BlockName name)
-        : at_(reader), outer_(reader.block), outerLive_(reader.live) {
-        at_.block = name;
-        if (!at_.over() && at_.openBlock()) {
-            at_.live = true;
+        : reader_(reader), outer_(reader.block), outerLive_(reader.live) {
+        reader_.block = name;
+        if (!reader_.ended() && reader_.openBlock()) {
+            reader_.live = true;
         }
     }
 
@@ -58,27 +58,27 @@ public:
     // Sets the limit. A length that reaches behind the bits left does not narrow anything: the block is read
     // as far as bits last, and the enclosing production reads no further.
     NETFLOOR_INLINE void limit(std::uint32_t bitCount) {
-        if (!at_.over() && !at_.narrow(bitCount)) {
+        if (!reader_.ended() && !reader_.narrow(bitCount)) {
             outerLive_ = false;
         }
     }
 
     NETFLOOR_INLINE ~LimitedBlock() {
-        at_.block = outer_;
-        if (at_.over()) {
+        reader_.block = outer_;
+        if (reader_.ended()) {
             return;
         }
-        at_.sweep();
-        at_.closeBlock();
-        at_.popLimit();
-        at_.live = outerLive_;
+        reader_.skipRest();
+        reader_.closeBlock();
+        reader_.popLimit();
+        reader_.live = outerLive_;
     }
 
     LimitedBlock(const LimitedBlock &) = delete;
     LimitedBlock &operator=(const LimitedBlock &) = delete;
 
 private:
-    Reader<Pass> &at_;
+    Reader<Pass> &reader_;
     BlockName outer_;
     bool outerLive_;
 };
@@ -89,12 +89,12 @@ private:
 template <class Pass>
 class [[nodiscard]] BlockChain {
 public:
-    NETFLOOR_INLINE explicit BlockChain(Reader<Pass> &reader) : at_(reader), outer_(reader.block) {}
+    NETFLOOR_INLINE explicit BlockChain(Reader<Pass> &reader) : reader_(reader), outer_(reader.block) {}
 
     // Opens the next block, inside the others.
     NETFLOOR_INLINE void open(BlockName name) {
-        at_.block = name;
-        if (!at_.over() && at_.openBlock()) {
+        reader_.block = name;
+        if (!reader_.ended() && reader_.openBlock()) {
             ++blocks_;
         }
     }
@@ -103,9 +103,9 @@ public:
     // such a block, so that no outer live flag is kept.
     NETFLOOR_INLINE void openLimited(BlockName name, std::uint32_t bitCount) {
         open(name);
-        if (!at_.over()) {
-            at_.live = true;
-            at_.narrow(bitCount);
+        if (!reader_.ended()) {
+            reader_.live = true;
+            reader_.narrow(bitCount);
             ++limits_;
         }
     }
@@ -113,21 +113,21 @@ public:
     // Closing a block touches neither cursor nor limit, so that it does not matter which blocks a limit stands
     // between: the limits are swept first, innermost first.
     NETFLOOR_INLINE ~BlockChain() {
-        for (; limits_ > 0 && !at_.over(); --limits_) {
-            at_.sweep();
-            at_.popLimit();
+        for (; limits_ > 0 && !reader_.ended(); --limits_) {
+            reader_.skipRest();
+            reader_.popLimit();
         }
-        for (; blocks_ > 0 && !at_.over(); --blocks_) {
-            at_.closeBlock();
+        for (; blocks_ > 0 && !reader_.ended(); --blocks_) {
+            reader_.closeBlock();
         }
-        at_.block = outer_;
+        reader_.block = outer_;
     }
 
     BlockChain(const BlockChain &) = delete;
     BlockChain &operator=(const BlockChain &) = delete;
 
 private:
-    Reader<Pass> &at_;
+    Reader<Pass> &reader_;
     BlockName outer_;
     std::uint32_t blocks_ = 0;
     std::uint32_t limits_ = 0;
@@ -136,22 +136,22 @@ private:
 // Runs a production out of line, on a reader of its own: the caller's is not touched by the call, and so both
 // can stay in registers. What it calls by itself is inlined, so that its reader has no address.
 template <auto production, class Pass>
-[[gnu::noinline, gnu::flatten]] void outOfLine(typename Pass::Context &context, Standing &standing) {
-    Reader<Pass> at(context, standing);
-    production(at);
-    at.settle();
-    standing = at;
+[[gnu::noinline, gnu::flatten]] void outOfLineBody(typename Pass::Context &context, Position &position) {
+    Reader<Pass> reader(context, position);
+    production(reader);
+    reader.settle();
+    position = reader;
 }
 
 template <auto production, class Pass>
-NETFLOOR_INLINE inline void apart(Reader<Pass> &at) {
-    if (!at.live) {
+NETFLOOR_INLINE inline void runOutOfLine(Reader<Pass> &reader) {
+    if (!reader.live) {
         return;
     }
-    at.settle();
-    Standing standing = at;
-    outOfLine<production, Pass>(*at.context, standing);
-    at.stand(standing);
+    reader.settle();
+    Position position = reader;
+    outOfLineBody<production, Pass>(*reader.context, position);
+    reader.stand(position);
 }
 
-} // namespace netfloor
+} // namespace netfloor::plugin

@@ -13,7 +13,7 @@
 #include "frame/reader.h"
 #include "netfloor/host.h"
 
-namespace netfloor {
+namespace netfloor::plugin {
 
 // Makes room for one layer frame more and opens it. The first layer of a packet has the frame 0; a plug-in that
 // starts anywhere else takes the next one.
@@ -62,14 +62,14 @@ NETFLOOR_INLINE inline std::optional<Outcome> runPass(typename Pass::Context &co
     if (!openLayerFrame(state)) {
         return Outcome::cutOff;
     }
-    Reader<Pass> at(context);
-    Grammar::template packet<Pass>(at);
-    if (!at.over()) {
-        at.giveState();
+    Reader<Pass> reader(context);
+    Grammar::template packet<Pass>(reader);
+    if (!reader.ended()) {
+        reader.giveState();
         Pass::leave(context);
-        context.bitsLeft = at.left;
+        context.bitsLeft = reader.left;
     }
-    return at.outcome;
+    return reader.outcome;
 }
 
-} // namespace netfloor
+} // namespace netfloor::plugin

@@ -7,11 +7,11 @@
 #include <cstdint>
 #include <string_view>
 
-#include "frame/format.h"
+#include "frame/display_format.h"
 #include "frame/place.h"
 #include "frame/value_names.h"
 
-namespace netfloor {
+namespace netfloor::plugin {
 
 inline constexpr ValueNames unnamed{};
 inline constexpr const ValueNames *noNames = &unnamed;
@@ -86,4 +86,4 @@ struct Field {
            (place.mostUnits == 0 || place.isRun()) && (place.shape != Shape::ahead || place.advance == 0);
 }
 
-} // namespace netfloor
+} // namespace netfloor::plugin

@@ -8,7 +8,7 @@
 
 #include "frame/inline.h"
 
-namespace netfloor {
+namespace netfloor::plugin {
 
 // Calls `visit` with the number of each round, as a constant.
 template <std::size_t count, class Visit>
@@ -19,4 +19,4 @@ NETFLOOR_INLINE constexpr void forEach(Visit visit) {
     (std::make_index_sequence<count>{});
 }
 
-} // namespace netfloor
+} // namespace netfloor::plugin

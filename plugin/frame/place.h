@@ -11,7 +11,7 @@
 
 #include "frame/bits.h"
 
-namespace netfloor {
+namespace netfloor::plugin {
 
 enum class Shape : std::uint8_t {
     pieces,         // one to four pieces, in the order in which they make the value
@@ -203,4 +203,4 @@ constexpr Place ahead(std::uint32_t low, std::uint32_t high) {
     return {.shape = Shape::ahead, .count = 1, .pieces = {Piece{low, high}}};
 }
 
-} // namespace netfloor
+} // namespace netfloor::plugin

@@ -19,14 +19,14 @@
 #include <string_view>
 
 #include "frame/field.h"
-#include "frame/record.h"
+#include "frame/field_record.h"
 #include "netfloor/host.h"
 #include "netfloor/records.h"
 
-namespace netfloor {
+namespace netfloor::plugin {
 
 // What a production may find wrong. The pass decides whether it raises the mark.
-enum class Mark : std::uint8_t {
+enum class Flag : std::uint8_t {
     expectation,  // a fixed value was not met: all passes
     count,        // a list ended with another count than it should have: MV pass
     limitTooLong, // a length reaches behind the bits left: MV pass
@@ -87,7 +87,7 @@ struct Unsettled {
 };
 
 // Where a reader stands: what of it goes along when a production runs out of line.
-struct Standing {
+struct Position {
     std::uint32_t cursor = 0;
     std::uint32_t left = 0;
     std::uint32_t blockDepth = 0;
@@ -101,7 +101,7 @@ struct Standing {
 };
 
 template <class Pass>
-class Reader : public Standing {
+class Reader : public Position {
 public:
     using Context = typename Pass::Context;
 
@@ -120,8 +120,8 @@ public:
     }
 
     // Goes on where another reader stands, behind which all is settled.
-    NETFLOOR_INLINE Reader(Context &passContext, const Standing &standing)
-        : Standing(standing), context(&passContext), state(passContext.decodeState), data(state->data) {}
+    NETFLOOR_INLINE Reader(Context &passContext, const Position &position)
+        : Position(position), context(&passContext), state(passContext.decodeState), data(state->data) {}
 
     NETFLOOR_INLINE static typename Pass::Variables &variables() { return Pass::variables; }
 
@@ -138,7 +138,7 @@ public:
 
     // Keeps a condition of the grammar as the last one, and gives it back.
     NETFLOOR_INLINE bool test(bool holds) {
-        if (!over()) {
+        if (!ended()) {
             condition() = holds ? 1 : 0;
         }
         return holds;
@@ -147,13 +147,13 @@ public:
     NETFLOOR_INLINE static LastRead &last() { return Pass::last; }
 
     // Raises a mark, if the pass does.
-    NETFLOOR_INLINE void mark(Mark found) {
-        if (over() || !Pass::raises(found)) {
+    NETFLOOR_INLINE void raise(Flag flag) {
+        if (ended() || !Pass::raises(flag)) {
             return;
         }
-        state->flags |= found == Mark::limitTooLong   ? NETFLOOR_FLAG_LIMIT_TOO_LONG
-                        : found == Mark::bitsLeftOver ? NETFLOOR_FLAG_BITS_LEFT_OVER
-                                                      : NETFLOOR_FLAG_EXPECTATION;
+        state->flags |= flag == Flag::limitTooLong   ? NETFLOOR_FLAG_LIMIT_TOO_LONG
+                        : flag == Flag::bitsLeftOver ? NETFLOOR_FLAG_BITS_LEFT_OVER
+                                                     : NETFLOOR_FLAG_EXPECTATION;
         unchecked = true;
     }
 
@@ -165,7 +165,7 @@ public:
         }
     }
 
-    [[nodiscard]] NETFLOOR_INLINE bool over() const { return outcome != Outcome::on; }
+    [[nodiscard]] NETFLOOR_INLINE bool ended() const { return outcome != Outcome::on; }
 
     // Ends the run: nothing has an effect from here on.
     NETFLOOR_INLINE void end(Outcome how) {
@@ -206,8 +206,8 @@ public:
     }
 
     // Goes on where a production that ran out of line left off.
-    NETFLOOR_INLINE void stand(const Standing &standing) {
-        static_cast<Standing &>(*this) = standing;
+    NETFLOOR_INLINE void stand(const Position &position) {
+        static_cast<Position &>(*this) = position;
         data = state->data;
         forget();
     }
@@ -313,7 +313,7 @@ public:
         if (narrows) {
             left = bitCount;
         } else {
-            mark(Mark::limitTooLong);
+            raise(Flag::limitTooLong);
         }
         push(state->limits, limitDepth, cursor + left - 1);
         return narrows;
@@ -328,11 +328,11 @@ public:
     }
 
     // Skips what is left of the innermost limit.
-    NETFLOOR_INLINE void sweep() {
+    NETFLOOR_INLINE void skipRest() {
         if (left != 0) {
             cursor += left;
             left = 0;
-            mark(Mark::bitsLeftOver);
+            raise(Flag::bitsLeftOver);
         }
     }
 
@@ -399,4 +399,4 @@ private:
     }
 };
 
-} // namespace netfloor
+} // namespace netfloor::plugin

@@ -10,7 +10,7 @@
 
 #include "frame/inline.h"
 
-namespace netfloor {
+namespace netfloor::plugin {
 
 // The name of one value, or of all values from `from` to `to`.
 struct ValueName {
@@ -75,4 +75,4 @@ template <const ValueNames &names>
     return 0;
 }
 
-} // namespace netfloor
+} // namespace netfloor::plugin

@@ -19,10 +19,10 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
-#include "frame/step.h"
+#include "frame/field_step.h"
 #include "icmp/quoted_header.h"
 
-namespace netfloor::icmp {
+namespace netfloor::plugin::icmp {
 
 inline constexpr std::array unreachableCodeRows = {
     ValueName{0, "Net unreachable"},
@@ -82,73 +82,73 @@ inline constexpr Field problemData          {575, "64-bit Original Data Datagram
 // Many senders quote more than 64 bits of data. Here what is left goes to the host as one field without a name; in
 // the other messages nothing reads it, and the datagram ends with bits left over.
 template <class Pass>
-NETFLOOR_INLINE inline void destinationUnreachable(Reader<Pass> &at) {
-    if (!at.live) {
+NETFLOOR_INLINE inline void destinationUnreachable(Reader<Pass> &reader) {
+    if (!reader.live) {
         return;
     }
-    const Block<Pass> message{at, "Destination Unreachable Message"};
-    read<unreachableCode>(at);
-    read<unreachableChecksum>(at);
-    read<unreachableUnused>(at);
-    apart<quotedHeader<Pass>>(at);
-    read<unreachableData>(at);
-    if (at.left != 0) {
-        const std::uint32_t icmpTailOctets = at.left / bitsPerOctet;
-        readRun<unreachableTail>(at, static_cast<std::int32_t>(icmpTailOctets));
+    const Block<Pass> message{reader, "Destination Unreachable Message"};
+    read<unreachableCode>(reader);
+    read<unreachableChecksum>(reader);
+    read<unreachableUnused>(reader);
+    runOutOfLine<quotedHeader<Pass>>(reader);
+    read<unreachableData>(reader);
+    if (reader.left != 0) {
+        const std::uint32_t icmpTailOctets = reader.left / bitsPerOctet;
+        readRun<unreachableTail>(reader, static_cast<std::int32_t>(icmpTailOctets));
     }
 }
 
 template <class Pass>
-NETFLOOR_INLINE inline void sourceQuench(Reader<Pass> &at) {
-    if (!at.live) {
+NETFLOOR_INLINE inline void sourceQuench(Reader<Pass> &reader) {
+    if (!reader.live) {
         return;
     }
-    const Block<Pass> message{at, "Source Quench Message"};
-    read<sourceQuenchCode>(at);
-    read<sourceQuenchChecksum>(at);
-    read<sourceQuenchUnused>(at);
-    apart<quotedHeader<Pass>>(at);
-    read<sourceQuenchData>(at);
+    const Block<Pass> message{reader, "Source Quench Message"};
+    read<sourceQuenchCode>(reader);
+    read<sourceQuenchChecksum>(reader);
+    read<sourceQuenchUnused>(reader);
+    runOutOfLine<quotedHeader<Pass>>(reader);
+    read<sourceQuenchData>(reader);
 }
 
 template <class Pass>
-NETFLOOR_INLINE inline void redirect(Reader<Pass> &at) {
-    if (!at.live) {
+NETFLOOR_INLINE inline void redirect(Reader<Pass> &reader) {
+    if (!reader.live) {
         return;
     }
-    const Block<Pass> message{at, "Redirect Message"};
-    read<redirectCode>(at);
-    read<redirectChecksum>(at);
-    read<redirectGateway>(at);
-    apart<quotedHeader<Pass>>(at);
-    read<redirectData>(at);
+    const Block<Pass> message{reader, "Redirect Message"};
+    read<redirectCode>(reader);
+    read<redirectChecksum>(reader);
+    read<redirectGateway>(reader);
+    runOutOfLine<quotedHeader<Pass>>(reader);
+    read<redirectData>(reader);
 }
 
 template <class Pass>
-NETFLOOR_INLINE inline void timeExceeded(Reader<Pass> &at) {
-    if (!at.live) {
+NETFLOOR_INLINE inline void timeExceeded(Reader<Pass> &reader) {
+    if (!reader.live) {
         return;
     }
-    const Block<Pass> message{at, "Time Exceeded Message"};
-    read<timeExceededCode>(at);
-    read<timeExceededChecksum>(at);
-    read<timeExceededUnused>(at);
-    apart<quotedHeader<Pass>>(at);
-    read<timeExceededData>(at);
+    const Block<Pass> message{reader, "Time Exceeded Message"};
+    read<timeExceededCode>(reader);
+    read<timeExceededChecksum>(reader);
+    read<timeExceededUnused>(reader);
+    runOutOfLine<quotedHeader<Pass>>(reader);
+    read<timeExceededData>(reader);
 }
 
 template <class Pass>
-NETFLOOR_INLINE inline void parameterProblem(Reader<Pass> &at) {
-    if (!at.live) {
+NETFLOOR_INLINE inline void parameterProblem(Reader<Pass> &reader) {
+    if (!reader.live) {
         return;
     }
-    const Block<Pass> message{at, "Parameter Problem Message"};
-    read<problemCode>(at);
-    read<problemChecksum>(at);
-    read<problemPointer>(at);
-    read<problemUnused>(at);
-    apart<quotedHeader<Pass>>(at);
-    read<problemData>(at);
+    const Block<Pass> message{reader, "Parameter Problem Message"};
+    read<problemCode>(reader);
+    read<problemChecksum>(reader);
+    read<problemPointer>(reader);
+    read<problemUnused>(reader);
+    runOutOfLine<quotedHeader<Pass>>(reader);
+    read<problemData>(reader);
 }
 
-} // namespace netfloor::icmp
+} // namespace netfloor::plugin::icmp

@@ -16,70 +16,70 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
-#include "frame/step.h"
+#include "frame/field_step.h"
 #include "icmp/error_messages.h"
 #include "icmp/message_type.h"
 #include "icmp/query_messages.h"
 
-namespace netfloor::icmp {
+namespace netfloor::plugin::icmp {
 
 inline constexpr Field reservedData{541, "ICMP Reserved Data", octets(1), "ICMP Reserved Data=%x"};
 
 // A message of a type without a meaning: what stands behind the type is data, octet by octet.
 template <class Pass>
-NETFLOOR_INLINE inline void reservedMessage(Reader<Pass> &at) {
-    if (!at.live) {
+NETFLOOR_INLINE inline void reservedMessage(Reader<Pass> &reader) {
+    if (!reader.live) {
         return;
     }
-    auto &variables = at.variables();
-    const Block<Pass> message{at, ""};
+    auto &variables = reader.variables();
+    const Block<Pass> message{reader, ""};
     variables.payloadOctets -= 1;
-    for (std::int32_t seen = 0; at.live && seen < variables.payloadOctets; ++seen) {
-        const Block<Pass> octet{at, ""};
-        read<reservedData>(at);
+    for (std::int32_t seen = 0; reader.live && seen < variables.payloadOctets; ++seen) {
+        const Block<Pass> octet{reader, ""};
+        read<reservedData>(reader);
     }
     if (variables.payloadOctets < 0) {
-        at.mark(Mark::count);
+        reader.raise(Flag::count);
     }
 }
 
 // Runs a message that has no other code than 0. With another code, or none, nothing behind the type is read.
 template <auto production, class Pass>
-NETFLOOR_INLINE inline void withCodeZero(Reader<Pass> &at) {
-    if (look(at, octets(1)) != std::uint32_t{0}) {
-        return at.mark(Mark::expectation);
+NETFLOOR_INLINE inline void withCodeZero(Reader<Pass> &reader) {
+    if (peek(reader, octets(1)) != std::uint32_t{0}) {
+        return reader.raise(Flag::expectation);
     }
-    apart<production>(at);
+    runOutOfLine<production>(reader);
 }
 
 template <class Pass>
-NETFLOOR_INLINE inline void message(Reader<Pass> &at) {
-    if (!at.live) {
+NETFLOOR_INLINE inline void message(Reader<Pass> &reader) {
+    if (!reader.live) {
         return;
     }
-    const Block<Pass> block{at, "ICMP Message Type"};
-    messageType(at);
-    if (!at.live) {
+    const Block<Pass> block{reader, "ICMP Message Type"};
+    messageType(reader);
+    if (!reader.live) {
         return;
     }
-    switch (at.variables().icmpType) {
+    switch (reader.variables().icmpType) {
     case typeEchoReply:
-    case typeEcho: return withCodeZero<echo<Pass>>(at);
-    case typeDestinationUnreachable: return apart<destinationUnreachable<Pass>>(at);
-    case typeSourceQuench: return withCodeZero<sourceQuench<Pass>>(at);
-    case typeRedirect: return apart<redirect<Pass>>(at);
-    case typeRouterAdvertisement: return withCodeZero<routerAdvertisement<Pass>>(at);
-    case typeRouterSolicitation: return withCodeZero<routerSolicitation<Pass>>(at);
-    case typeTimeExceeded: return apart<timeExceeded<Pass>>(at);
-    case typeParameterProblem: return apart<parameterProblem<Pass>>(at);
+    case typeEcho: return withCodeZero<echo<Pass>>(reader);
+    case typeDestinationUnreachable: return runOutOfLine<destinationUnreachable<Pass>>(reader);
+    case typeSourceQuench: return withCodeZero<sourceQuench<Pass>>(reader);
+    case typeRedirect: return runOutOfLine<redirect<Pass>>(reader);
+    case typeRouterAdvertisement: return withCodeZero<routerAdvertisement<Pass>>(reader);
+    case typeRouterSolicitation: return withCodeZero<routerSolicitation<Pass>>(reader);
+    case typeTimeExceeded: return runOutOfLine<timeExceeded<Pass>>(reader);
+    case typeParameterProblem: return runOutOfLine<parameterProblem<Pass>>(reader);
     case typeTimestamp:
-    case typeTimestampReply: return withCodeZero<timestamp<Pass>>(at);
+    case typeTimestampReply: return withCodeZero<timestamp<Pass>>(reader);
     case typeInformationRequest:
-    case typeInformationReply: return withCodeZero<information<Pass>>(at);
+    case typeInformationReply: return withCodeZero<information<Pass>>(reader);
     case typeAddressMaskRequest:
-    case typeAddressMaskReply: return withCodeZero<addressMaskMessage<Pass>>(at);
-    default: return apart<reservedMessage<Pass>>(at);
+    case typeAddressMaskReply: return withCodeZero<addressMaskMessage<Pass>>(reader);
+    default: return runOutOfLine<reservedMessage<Pass>>(reader);
     }
 }
 
-} // namespace netfloor::icmp
+} // namespace netfloor::plugin::icmp

@@ -19,10 +19,10 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
-#include "frame/step.h"
-#include "ipv4/unknown_data.h"
+#include "frame/field_step.h"
+#include "ip/unknown_data.h"
 
-namespace netfloor::icmpv6 {
+namespace netfloor::plugin::icmpv6 {
 
 enum : std::uint32_t {
     typeUnreachable = 1,
@@ -107,57 +107,58 @@ inline constexpr Field echoReplyData            {282, "Data ",             octet
 // clang-format on
 
 inline constexpr std::int32_t typeOctets = 1;
-inline constexpr std::int32_t octetsBehindType = 7;
+inline constexpr std::int32_t octetsAfterType = 7;
 
 // What stands behind the type: `fixed` are the fields of the header's second word.
 template <const Field &code, const Field &checksum, const Field &data, const Field &...fixed, class Pass>
-NETFLOOR_INLINE inline void body(Reader<Pass> &at) {
-    auto &variables = at.variables();
-    const Block<Pass> block{at, ""};
-    read<code>(at);
-    readCounted<checksum>(at, 2);
-    (read<fixed>(at), ...);
-    if (at.live) {
-        variables.payloadOctets -= octetsBehindType;
+NETFLOOR_INLINE inline void body(Reader<Pass> &reader) {
+    auto &variables = reader.variables();
+    const Block<Pass> block{reader, ""};
+    read<code>(reader);
+    readCounted<checksum>(reader, 2);
+    (read<fixed>(reader), ...);
+    if (reader.live) {
+        variables.payloadOctets -= octetsAfterType;
     }
-    readCounted<data>(at, variables.payloadOctets);
+    readCounted<data>(reader, variables.payloadOctets);
 }
 
 template <class Pass>
-NETFLOOR_INLINE inline void bodyOf(Reader<Pass> &at, std::uint32_t type) {
+NETFLOOR_INLINE inline void bodyOf(Reader<Pass> &reader, std::uint32_t type) {
     switch (type) {
-    case typeUnreachable: return body<unreachableCode, unreachableChecksum, unreachablePacket, unreachableUnused>(at);
-    case typeTooBig: return body<tooBigCode, tooBigChecksum, tooBigPacket, tooBigMtu>(at);
+    case typeUnreachable:
+        return body<unreachableCode, unreachableChecksum, unreachablePacket, unreachableUnused>(reader);
+    case typeTooBig: return body<tooBigCode, tooBigChecksum, tooBigPacket, tooBigMtu>(reader);
     case typeTimeExceeded:
-        return body<timeExceededCode, timeExceededChecksum, timeExceededPacket, timeExceededUnused>(at);
+        return body<timeExceededCode, timeExceededChecksum, timeExceededPacket, timeExceededUnused>(reader);
     case typeParameterProblem:
         return body<parameterProblemCode, parameterProblemChecksum, parameterProblemPacket, parameterProblemPointer>(
-            at);
+            reader);
     case typeEchoRequest:
         return body<echoRequestCode, echoRequestChecksum, echoRequestData, echoRequestIdentifier, echoRequestSequence>(
-            at);
+            reader);
     case typeEchoReply:
-        return body<echoReplyCode, echoReplyChecksum, echoReplyData, echoReplyIdentifier, echoReplySequence>(at);
+        return body<echoReplyCode, echoReplyChecksum, echoReplyData, echoReplyIdentifier, echoReplySequence>(reader);
     default:
         if (type >= typeFirstUndefined && type <= typeLastUndefined) {
-            apart<unknownData<Pass>>(at);
+            runOutOfLine<unknownData<Pass>>(reader);
         }
     }
 }
 
 template <class Pass>
-NETFLOOR_INLINE inline void message(Reader<Pass> &at) {
-    if (!at.live) {
+NETFLOOR_INLINE inline void message(Reader<Pass> &reader) {
+    if (!reader.live) {
         return;
     }
     std::uint32_t type = 0;
-    const Block<Pass> block{at, " IPv6 - ICMP"};
-    read<messageClass>(at);
-    read<messageType>(at, &type);
-    if (at.live) {
-        at.variables().payloadOctets -= typeOctets;
-        bodyOf(at, type);
+    const Block<Pass> block{reader, " IPv6 - ICMP"};
+    read<messageClass>(reader);
+    read<messageType>(reader, &type);
+    if (reader.live) {
+        reader.variables().payloadOctets -= typeOctets;
+        bodyOf(reader, type);
     }
 }
 
-} // namespace netfloor::icmpv6
+} // namespace netfloor::plugin::icmpv6

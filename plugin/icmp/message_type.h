@@ -6,10 +6,10 @@
 #include <cstdint>
 
 #include "frame/field.h"
-#include "frame/step.h"
-#include "ipv4/carriage.h"
+#include "frame/field_step.h"
+#include "ip/outer_protocol.h"
 
-namespace netfloor::icmp {
+namespace netfloor::plugin::icmp {
 
 enum : std::uint32_t {
     typeEchoReply = 0,
@@ -59,8 +59,8 @@ struct MessageVariables {
 };
 
 template <class Pass>
-NETFLOOR_INLINE inline void messageType(Reader<Pass> &at) {
-    readByCarriage<typeInIpInIp, typeInMinimal, type>(at, &at.variables().icmpType);
+NETFLOOR_INLINE inline void messageType(Reader<Pass> &reader) {
+    readByOuterProtocol<typeInIpInIp, typeInMinimal, type>(reader, &reader.variables().icmpType);
 }
 
-} // namespace netfloor::icmp
+} // namespace netfloor::plugin::icmp

@@ -20,9 +20,9 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
-#include "frame/step.h"
+#include "frame/field_step.h"
 
-namespace netfloor::icmp {
+namespace netfloor::plugin::icmp {
 
 // clang-format off
 inline constexpr Field echoCode              {542, "Code",                 octets(1),   "Code=%x"};
@@ -66,99 +66,99 @@ inline constexpr Field addressMask           {604, "Address Mask",         octet
 inline constexpr std::int32_t echoHeaderOctets = 8;
 
 template <class Pass>
-NETFLOOR_INLINE inline void echo(Reader<Pass> &at) {
-    if (!at.live) {
+NETFLOOR_INLINE inline void echo(Reader<Pass> &reader) {
+    if (!reader.live) {
         return;
     }
-    auto &variables = at.variables();
-    const Block<Pass> message{at, ""};
-    read<echoCode>(at);
-    read<echoChecksum>(at);
-    read<echoIdentifier>(at);
-    read<echoSequence>(at);
-    if (at.live) {
+    auto &variables = reader.variables();
+    const Block<Pass> message{reader, ""};
+    read<echoCode>(reader);
+    read<echoChecksum>(reader);
+    read<echoIdentifier>(reader);
+    read<echoSequence>(reader);
+    if (reader.live) {
         variables.payloadOctets -= echoHeaderOctets;
     }
     // A datagram too short for its message is a fault; data that is cut short is none.
-    readRepeated<echoData>(at, variables.payloadOctets);
+    readRepeated<echoData>(reader, variables.payloadOctets);
     if (variables.payloadOctets < 0) {
-        at.mark(Mark::count);
+        reader.raise(Flag::count);
     }
 }
 
 template <class Pass>
-NETFLOOR_INLINE inline void timestamp(Reader<Pass> &at) {
-    if (!at.live) {
+NETFLOOR_INLINE inline void timestamp(Reader<Pass> &reader) {
+    if (!reader.live) {
         return;
     }
-    const Block<Pass> message{at, ""};
-    read<timestampCode>(at);
-    read<timestampChecksum>(at);
-    read<timestampIdentifier>(at);
-    read<timestampSequence>(at);
-    read<originateTimestamp>(at);
-    read<receiveTimestamp>(at);
-    read<transmitTimestamp>(at);
+    const Block<Pass> message{reader, ""};
+    read<timestampCode>(reader);
+    read<timestampChecksum>(reader);
+    read<timestampIdentifier>(reader);
+    read<timestampSequence>(reader);
+    read<originateTimestamp>(reader);
+    read<receiveTimestamp>(reader);
+    read<transmitTimestamp>(reader);
 }
 
 template <class Pass>
-NETFLOOR_INLINE inline void information(Reader<Pass> &at) {
-    if (!at.live) {
+NETFLOOR_INLINE inline void information(Reader<Pass> &reader) {
+    if (!reader.live) {
         return;
     }
-    const Block<Pass> message{at, ""};
-    read<informationCode>(at);
-    read<informationChecksum>(at);
-    read<informationIdentifier>(at);
-    read<informationSequence>(at);
+    const Block<Pass> message{reader, ""};
+    read<informationCode>(reader);
+    read<informationChecksum>(reader);
+    read<informationIdentifier>(reader);
+    read<informationSequence>(reader);
 }
 
 // An entry is 8 octets, whatever the size of an entry says. One that is cut short counts as seen.
 template <class Pass>
-NETFLOOR_INLINE inline void routerAdvertisement(Reader<Pass> &at) {
-    if (!at.live) {
+NETFLOOR_INLINE inline void routerAdvertisement(Reader<Pass> &reader) {
+    if (!reader.live) {
         return;
     }
     std::uint32_t routerCount = 0;
-    const Block<Pass> message{at, ""};
-    read<advertisementCode>(at);
-    read<advertisementChecksum>(at);
-    read<routers>(at, &routerCount);
-    read<routerEntrySize>(at);
-    read<routerLifetime>(at);
+    const Block<Pass> message{reader, ""};
+    read<advertisementCode>(reader);
+    read<advertisementChecksum>(reader);
+    read<routers>(reader, &routerCount);
+    read<routerEntrySize>(reader);
+    read<routerLifetime>(reader);
     std::uint32_t seen = 0;
-    for (; at.live && seen < routerCount; ++seen) {
-        const Block<Pass> entry{at, ""};
-        read<routerAddress>(at);
-        read<routerPreference>(at);
+    for (; reader.live && seen < routerCount; ++seen) {
+        const Block<Pass> entry{reader, ""};
+        read<routerAddress>(reader);
+        read<routerPreference>(reader);
     }
     if (seen != routerCount) {
-        at.mark(Mark::count);
+        reader.raise(Flag::count);
     }
 }
 
 template <class Pass>
-NETFLOOR_INLINE inline void routerSolicitation(Reader<Pass> &at) {
-    if (!at.live) {
+NETFLOOR_INLINE inline void routerSolicitation(Reader<Pass> &reader) {
+    if (!reader.live) {
         return;
     }
-    const Block<Pass> message{at, ""};
-    read<solicitationCode>(at);
-    read<solicitationChecksum>(at);
-    read<solicitationReserved>(at);
+    const Block<Pass> message{reader, ""};
+    read<solicitationCode>(reader);
+    read<solicitationChecksum>(reader);
+    read<solicitationReserved>(reader);
 }
 
 template <class Pass>
-NETFLOOR_INLINE inline void addressMaskMessage(Reader<Pass> &at) {
-    if (!at.live) {
+NETFLOOR_INLINE inline void addressMaskMessage(Reader<Pass> &reader) {
+    if (!reader.live) {
         return;
     }
-    const Block<Pass> message{at, ""};
-    read<addressMaskCode>(at);
-    read<addressMaskChecksum>(at);
-    read<addressMaskIdentifier>(at);
-    read<addressMaskSequence>(at);
-    read<addressMask>(at);
+    const Block<Pass> message{reader, ""};
+    read<addressMaskCode>(reader);
+    read<addressMaskChecksum>(reader);
+    read<addressMaskIdentifier>(reader);
+    read<addressMaskSequence>(reader);
+    read<addressMask>(reader);
 }
 
-} // namespace netfloor::icmp
+} // namespace netfloor::plugin::icmp

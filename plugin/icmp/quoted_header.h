@@ -24,12 +24,12 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
-#include "frame/step.h"
+#include "frame/field_step.h"
 #include "icmp/message_type.h"
 #include "ipv4/options.h"
-#include "tables/protocol_numbers.h"
+#include "names/ip_protocols.h"
 
-namespace netfloor::icmp {
+namespace netfloor::plugin::icmp {
 
 // The values of the outer header have the same names in another spelling.
 inline constexpr std::array quotedPrecedenceRows = {
@@ -91,52 +91,53 @@ inline constexpr Field quotedDestination    {625, "IP Destination Address",  oct
 // clang-format on
 
 template <class Pass>
-NETFLOOR_INLINE inline void quotedProtocol(Reader<Pass> &at) {
-    if (!at.live) {
+NETFLOOR_INLINE inline void quotedProtocol(Reader<Pass> &reader) {
+    if (!reader.live) {
         return;
     }
-    const Block<Pass> block{at, "Embedded IP Protocols"};
-    const bool inTunnel = at.variables().outerProtocol == protocolIpInIp;
-    switch (at.variables().icmpType) {
-    case typeDestinationUnreachable: return inTunnel ? read<unreachableInTunnel>(at) : read<unreachableProtocol>(at);
-    case typeSourceQuench: return inTunnel ? read<sourceQuenchInTunnel>(at) : read<sourceQuenchProtocol>(at);
-    case typeRedirect: return inTunnel ? read<redirectInTunnel>(at) : read<redirectProtocol>(at);
-    case typeTimeExceeded: return inTunnel ? read<timeExceededInTunnel>(at) : read<timeExceededProtocol>(at);
-    default: return inTunnel ? read<problemInTunnel>(at) : read<problemProtocol>(at);
+    const Block<Pass> block{reader, "Embedded IP Protocols"};
+    const bool inTunnel = reader.variables().outerProtocol == protocolIpInIp;
+    switch (reader.variables().icmpType) {
+    case typeDestinationUnreachable:
+        return inTunnel ? read<unreachableInTunnel>(reader) : read<unreachableProtocol>(reader);
+    case typeSourceQuench: return inTunnel ? read<sourceQuenchInTunnel>(reader) : read<sourceQuenchProtocol>(reader);
+    case typeRedirect: return inTunnel ? read<redirectInTunnel>(reader) : read<redirectProtocol>(reader);
+    case typeTimeExceeded: return inTunnel ? read<timeExceededInTunnel>(reader) : read<timeExceededProtocol>(reader);
+    default: return inTunnel ? read<problemInTunnel>(reader) : read<problemProtocol>(reader);
     }
 }
 
 template <class Pass>
-NETFLOOR_INLINE inline void quotedHeader(Reader<Pass> &at) {
-    if (!at.live) {
+NETFLOOR_INLINE inline void quotedHeader(Reader<Pass> &reader) {
+    if (!reader.live) {
         return;
     }
     std::int32_t embeddedHeaderOctets = 0; // less the fixed header
-    const Block<Pass> block{at, "Internet Protocol Message in ICMP"};
-    read<quotedVersion>(at);
-    read<quotedHeaderLength>(at, [&](std::uint32_t words) {
+    const Block<Pass> block{reader, "Internet Protocol Message in ICMP"};
+    read<quotedVersion>(reader);
+    read<quotedHeaderLength>(reader, [&](std::uint32_t words) {
         embeddedHeaderOctets = static_cast<std::int32_t>(words * 4) - ipv4::fixedHeaderOctets;
     });
-    read<quotedPrecedence>(at);
-    read<quotedDelay>(at);
-    read<quotedThroughput>(at);
-    read<quotedReliability>(at);
-    read<quotedServiceFixed>(at);
-    read<quotedLength>(at);
-    read<quotedIdentification>(at);
-    read<quotedFlagsFixed>(at);
-    read<quotedDontFragment>(at);
-    read<quotedMoreFragments>(at);
-    read<quotedFragmentOffset>(at);
-    read<quotedTimeToLive>(at);
-    quotedProtocol(at);
-    read<quotedChecksum>(at);
-    read<quotedSource>(at);
-    read<quotedDestination>(at);
+    read<quotedPrecedence>(reader);
+    read<quotedDelay>(reader);
+    read<quotedThroughput>(reader);
+    read<quotedReliability>(reader);
+    read<quotedServiceFixed>(reader);
+    read<quotedLength>(reader);
+    read<quotedIdentification>(reader);
+    read<quotedFlagsFixed>(reader);
+    read<quotedDontFragment>(reader);
+    read<quotedMoreFragments>(reader);
+    read<quotedFragmentOffset>(reader);
+    read<quotedTimeToLive>(reader);
+    quotedProtocol(reader);
+    read<quotedChecksum>(reader);
+    read<quotedSource>(reader);
+    read<quotedDestination>(reader);
     // The options are as long as the quoted header says, whatever header the message itself stands behind.
     if (embeddedHeaderOctets >= 1) {
-        ipv4::options(at, embeddedHeaderOctets);
+        ipv4::options(reader, embeddedHeaderOctets);
     }
 }
 
-} // namespace netfloor::icmp
+} // namespace netfloor::plugin::icmp

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// The IPv4 header (RFC 791) and the dispatch on its protocol.
+// The IPv4 header (RFC 791).
 //
 //    0                   1                   2                   3
 //    0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1
@@ -22,22 +22,14 @@
 #pragma once
 
 #include "frame/block.h"
+#include "frame/checked_run.h"
 #include "frame/field.h"
-#include "frame/step.h"
-#include "frame/stretch.h"
-#include "icmp/icmp.h"
-#include "icmp/icmpv6.h"
+#include "frame/field_step.h"
 #include "ipv4/options.h"
 #include "ipv4/service_and_fragment.h"
-#include "ipv4/unknown_data.h"
-#include "sctp/sctp.h"
-#include "tables/protocol_numbers.h"
-#include "transport/tcp.h"
-#include "transport/udp.h"
-#include "tunnels/gre.h"
-#include "tunnels/tunnel.h"
+#include "names/ip_protocols.h"
 
-namespace netfloor::ipv4 {
+namespace netfloor::plugin::ipv4 {
 
 // clang-format off
 inline constexpr Field headerLength       {152, "Internet Header Length", piece(0, 3).advancing(8), "Internet Header Length=%u*4 octets"};
@@ -53,78 +45,58 @@ inline constexpr Field destinationAddress {160, "Destination Address",    octets
 // What the datagram holds in front of its limited block: the octets of version, service and Total Length.
 inline constexpr std::uint32_t bitsBeforeLimit = 32;
 
-// Runs the production of the payload. A later fragment is data, whatever its protocol; with DF set the offset
-// does not count.
 template <class Pass>
-NETFLOOR_INLINE inline void dispatch(Reader<Pass> &at) {
-    const auto &variables = at.variables();
-    if (variables.fragmentOffset >= 1 && variables.dontFragment == 0) {
-        return apart<unknownData<Pass>>(at);
-    }
-    switch (variables.ipProtocol) {
-    case protocolIcmp: return apart<icmp::message<Pass>>(at);
-    case protocolIpInIp:
-    case protocolMinimalEncapsulation: return apart<tunnel::packet<Pass>>(at);
-    case protocolGre: return apart<gre::packet<Pass>>(at);
-    case protocolTcp: return apart<tcp::segment<Pass>>(at);
-    case protocolUdp: return udp::datagram(at);
-    case protocolIcmpv6: return apart<icmpv6::message<Pass>>(at);
-    case protocolSctp: return apart<sctp::packet<Pass>>(at);
-    default: return apart<unknownData<Pass>>(at);
-    }
+NETFLOOR_INLINE inline void fieldsUpToTotalLength(Reader<Pass> &reader) {
+    auto &variables = reader.variables();
+    read<headerLength>(reader, [&](std::uint32_t words) { variables.ipHeaderOctets = words * 4; });
+    typeOfService(reader);
+    read<totalLength>(reader, &variables.ipTotalLength);
 }
 
 template <class Pass>
-NETFLOOR_INLINE inline void upToTotalLength(Reader<Pass> &at) {
-    auto &variables = at.variables();
-    read<headerLength>(at, [&](std::uint32_t words) { variables.ipHeaderOctets = words * 4; });
-    typeOfService(at);
-    read<totalLength>(at, &variables.ipTotalLength);
-}
-
-template <class Pass>
-NETFLOOR_INLINE inline void behindTotalLength(Reader<Pass> &at) {
-    auto &variables = at.variables();
-    read<identification>(at);
-    flagAndFragmentOffset(at);
-    read<timeToLive>(at);
+NETFLOOR_INLINE inline void fieldsAfterTotalLength(Reader<Pass> &reader) {
+    auto &variables = reader.variables();
+    read<identification>(reader);
+    flagAndFragmentOffset(reader);
+    read<timeToLive>(reader);
     {
-        const Block<Pass> block{at, "Protocol"};
-        read<protocol>(at, &variables.ipProtocol);
-        if (at.live) {
+        const Block<Pass> block{reader, "Protocol"};
+        read<protocol>(reader, &variables.ipProtocol);
+        if (reader.live) {
             variables.outerProtocol = variables.ipProtocol;
         }
     }
-    read<headerChecksum>(at);
-    read<sourceAddress>(at);
-    read<destinationAddress>(at);
+    read<headerChecksum>(reader);
+    read<sourceAddress>(reader);
+    read<destinationAddress>(reader);
 }
 
-template <class Pass>
-NETFLOOR_INLINE inline void datagram(Reader<Pass> &at) {
-    if (!at.live) {
+// Reads a datagram; `payload` is the production of what its header carries.
+template <auto payload, class Pass>
+NETFLOOR_INLINE inline void datagram(Reader<Pass> &reader) {
+    if (!reader.live) {
         return;
     }
-    auto &variables = at.variables();
-    const Block<Pass> header{at, "IPv4 Header"};
-    stretch<32, upToTotalLength<Pass>>(at);
+    auto &variables = reader.variables();
+    const Block<Pass> header{reader, "IPv4 Header"};
+    stretch<32, fieldsUpToTotalLength<Pass>>(reader);
 
-    if (!at.live) {
+    if (!reader.live) {
         return;
     }
     // A Total Length below 4 wraps to a huge number, which is more than any packet holds.
     const std::uint32_t limit = variables.ipTotalLength * bitsPerOctet - bitsBeforeLimit;
-    at.advance() = static_cast<std::int32_t>(limit);
-    if (limit > at.left) {
+    reader.advance() = static_cast<std::int32_t>(limit);
+    if (limit > reader.left) {
         return;
     }
-    const LimitedBlock<Pass> extra{at, "Extra", limit};
-    stretch<128, behindTotalLength<Pass>>(at);
-    options(at);
-    if (at.live) {
+    const LimitedBlock<Pass> extra{reader, "Extra", limit};
+    stretch<128, fieldsAfterTotalLength<Pass>>(reader);
+    options(reader);
+    if (reader.live) {
         variables.payloadOctets = static_cast<std::int32_t>(variables.ipTotalLength - variables.ipHeaderOctets);
     }
-    dispatch(at);
+    payload(reader);
 }
 
-} // namespace netfloor::ipv4
+} // namespace netfloor::plugin::ipv4

@@ -16,11 +16,11 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
-#include "frame/options.h"
-#include "frame/step.h"
-#include "ipv6/address.h"
+#include "frame/field_step.h"
+#include "ip/ipv6_address.h"
+#include "ip/option_list.h"
 
-namespace netfloor::ipv4 {
+namespace netfloor::plugin::ipv4 {
 
 // The levels of RFC 791, whose second octet is read as the more significant.
 inline constexpr std::array securityRows = {
@@ -108,135 +108,138 @@ struct OptionVariables {
 };
 
 template <class Pass>
-void securityOption(Reader<Pass> &at, OptionArea &area) {
-    const OptionBlock<Pass> option{at, "Type130"};
-    optionHead<security, securityLength>(at, area);
-    read<securityLevel>(at);
-    read<compartments>(at);
-    read<restrictions>(at);
-    read<transmissionControl>(at);
+void securityOption(Reader<Pass> &reader, OptionArea &area) {
+    const OptionBlock<Pass> option{reader, "Type130"};
+    optionHead<security, securityLength>(reader, area);
+    read<securityLevel>(reader);
+    read<compartments>(reader);
+    read<restrictions>(reader);
+    read<transmissionControl>(reader);
 }
 
 // In a packet that is not one of IPv4, a route is one of IPv6 addresses. No IPv6 header leads to an IPv4 header so far,
 // but the field tables publish the address as part of the routes.
 template <const Field &type, const Field &length, const Field &pointer, const Field &routeData, class Pass>
-void routeOption(Reader<Pass> &at, BlockName name, OptionArea &area) {
-    const OptionBlock<Pass> option{at, name};
-    optionHead<type, length>(at, area);
-    read<pointer>(at);
-    if (at.variables().ipVersion == 4) {
-        readRepeated<routeData>(at, mostEntries);
+void routeOption(Reader<Pass> &reader, BlockName name, OptionArea &area) {
+    const OptionBlock<Pass> option{reader, name};
+    optionHead<type, length>(reader, area);
+    read<pointer>(reader);
+    if (reader.variables().ipVersion == 4) {
+        readRepeated<routeData>(reader, mostEntries);
         return;
     }
-    for (std::int32_t entry = 0; at.live && entry < mostEntries; ++entry) {
-        ipv6::reversedAddress(at, ReversedBits<Pass>::Report::plain);
+    for (std::int32_t entry = 0; reader.live && entry < mostEntries; ++entry) {
+        ipv6::reversedAddress(reader, ReversedBits<Pass>::Report::plain);
     }
 }
 
 template <class Pass>
-void streamIdentifierOption(Reader<Pass> &at, OptionArea &area) {
-    const OptionBlock<Pass> option{at, "Type136"};
-    optionHead<streamIdentifier, streamLength>(at, area);
-    read<streamId>(at);
+void streamIdentifierOption(Reader<Pass> &reader, OptionArea &area) {
+    const OptionBlock<Pass> option{reader, "Type136"};
+    optionHead<streamIdentifier, streamLength>(reader, area);
+    read<streamId>(reader);
 }
 
 template <class Pass>
-void addressAndTimestamp(Reader<Pass> &at) {
-    const Block<Pass> block{at, "INLINE BLOCK"};
-    if (at.variables().ipVersion == 4) {
-        read<registeringAddress>(at);
+void addressAndTimestamp(Reader<Pass> &reader) {
+    const Block<Pass> block{reader, "INLINE BLOCK"};
+    if (reader.variables().ipVersion == 4) {
+        read<registeringAddress>(reader);
     } else {
-        ipv6::addressReadTwice<ipv6::address, ipv6::addressKey>(at);
+        ipv6::addressReadTwice<ipv6::address, ipv6::addressKey>(reader);
     }
-    read<registeredTimestamp>(at);
+    read<registeredTimestamp>(reader);
 }
 
 // With prespecified addresses these show as timestamps too.
 template <class Pass>
-void timestampOption(Reader<Pass> &at, OptionArea &area) {
-    const OptionBlock<Pass> option{at, "Type68"};
+void timestampOption(Reader<Pass> &reader, OptionArea &area) {
+    const OptionBlock<Pass> option{reader, "Type68"};
     std::uint32_t flag = 0;
-    optionHead<internetTimestamp, timestampLength>(at, area);
-    read<timestampPointer>(at);
-    read<timestampOverflow>(at);
-    read<timestampFlag>(at, &flag);
-    const Block<Pass> block{at, "INLINE BLOCK"};
+    optionHead<internetTimestamp, timestampLength>(reader, area);
+    read<timestampPointer>(reader);
+    read<timestampOverflow>(reader);
+    read<timestampFlag>(reader, &flag);
+    const Block<Pass> block{reader, "INLINE BLOCK"};
     if (flag == 0 || flag == 3) {
-        readRepeated<timestamp>(at, mostEntries);
+        readRepeated<timestamp>(reader, mostEntries);
     } else if (flag == 1) {
-        for (std::int32_t entry = 0; at.live && entry < mostEntries; ++entry) {
-            addressAndTimestamp(at);
+        for (std::int32_t entry = 0; reader.live && entry < mostEntries; ++entry) {
+            addressAndTimestamp(reader);
         }
     }
 }
 
 // Ends the list: there is no further round.
 template <class Pass>
-void endOfListOption(Reader<Pass> &at, OptionArea &area) {
-    optionOfOneOctet<endOfOptionPart>(at, "", area);
+void endOfListOption(Reader<Pass> &reader, OptionArea &area) {
+    optionOfOneOctet<endOfOptionPart>(reader, "", area);
     area.taken = false;
 }
 
 // Takes the option under the cursor, which is of a known type.
 template <class Pass>
-void option(Reader<Pass> &at, std::uint8_t type, OptionArea &area) {
+void option(Reader<Pass> &reader, std::uint8_t type, OptionArea &area) {
     switch (type) {
-    case 1: return optionOfOneOctet<noOperation>(at, "Type1", area);
-    case 130: return securityOption(at, area);
-    case 131: return routeOption<looseRoute, looseRouteLength, looseRoutePointer, looseRouteData>(at, "Type131", area);
+    case 1: return optionOfOneOctet<noOperation>(reader, "Type1", area);
+    case 130: return securityOption(reader, area);
+    case 131:
+        return routeOption<looseRoute, looseRouteLength, looseRoutePointer, looseRouteData>(reader, "Type131", area);
     case 137:
-        return routeOption<strictRoute, strictRouteLength, strictRoutePointer, strictRouteData>(at, "Type137", area);
-    case 7: return routeOption<recordRoute, recordRouteLength, recordRoutePointer, recordRouteData>(at, "Type7", area);
-    case 136: return streamIdentifierOption(at, area);
-    case 68: return timestampOption(at, area);
-    default: return endOfListOption(at, area);
+        return routeOption<strictRoute, strictRouteLength, strictRoutePointer, strictRouteData>(reader, "Type137",
+                                                                                                area);
+    case 7:
+        return routeOption<recordRoute, recordRouteLength, recordRoutePointer, recordRouteData>(reader, "Type7", area);
+    case 136: return streamIdentifierOption(reader, area);
+    case 68: return timestampOption(reader, area);
+    default: return endOfListOption(reader, area);
     }
 }
 
 template <class Pass>
-void optionRound(Reader<Pass> &at, OptionArea &area) {
+void optionRound(Reader<Pass> &reader, OptionArea &area) {
     area.taken = false;
-    for (std::size_t turn = 0; at.live && turn < optionTypes.size(); ++turn) {
-        turn = nextTaker<optionTypes>(at, turn);
+    for (std::size_t turn = 0; reader.live && turn < optionTypes.size(); ++turn) {
+        turn = nextTaker<optionTypes>(reader, turn);
         if (turn == optionTypes.size()) {
             return;
         }
-        option(at, optionTypes[turn], area);
+        option(reader, optionTypes[turn], area);
     }
 }
 
 template <class Pass>
-void optionArea(Reader<Pass> &at) {
-    OptionArea area{at.variables().optionOctets};
+void optionArea(Reader<Pass> &reader) {
+    OptionArea area{reader.variables().optionOctets};
     {
-        BlockChain<Pass> rounds{at};
+        BlockChain<Pass> rounds{reader};
         do {
             rounds.open("");
-            optionRound(at, area);
-        } while (at.live && area.taken && area.octets >= 1);
+            optionRound(reader, area);
+        } while (reader.live && area.taken && area.octets >= 1);
     }
     if (area.octets >= 1) {
-        readRun<optionPadding>(at, area.octets);
+        readRun<optionPadding>(reader, area.octets);
     }
 }
 
 // The options in an area of so many octets. A header without options costs no more than its block.
 template <class Pass>
-NETFLOOR_INLINE inline void options(Reader<Pass> &at, std::int32_t areaOctets) {
-    if (!at.live) {
+NETFLOOR_INLINE inline void options(Reader<Pass> &reader, std::int32_t areaOctets) {
+    if (!reader.live) {
         return;
     }
-    const Block<Pass> block{at, "Options"};
+    const Block<Pass> block{reader, "Options"};
     if (areaOctets >= 1) {
-        at.variables().optionOctets = areaOctets;
-        apart<optionArea<Pass>>(at);
+        reader.variables().optionOctets = areaOctets;
+        runOutOfLine<optionArea<Pass>>(reader);
     }
 }
 
 // The options of the header whose length was read last.
 template <class Pass>
-NETFLOOR_INLINE inline void options(Reader<Pass> &at) {
-    options(at, static_cast<std::int32_t>(at.variables().ipHeaderOctets) - fixedHeaderOctets);
+NETFLOOR_INLINE inline void options(Reader<Pass> &reader) {
+    options(reader, static_cast<std::int32_t>(reader.variables().ipHeaderOctets) - fixedHeaderOctets);
 }
 
-} // namespace netfloor::ipv4
+} // namespace netfloor::plugin::ipv4

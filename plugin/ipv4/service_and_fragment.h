@@ -11,9 +11,9 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
-#include "frame/step.h"
+#include "frame/field_step.h"
 
-namespace netfloor::ipv4 {
+namespace netfloor::plugin::ipv4 {
 
 inline constexpr std::array precedenceRows = {
     ValueName{0, "Routine"},
@@ -57,29 +57,29 @@ struct FragmentVariables {
 };
 
 template <class Pass>
-NETFLOOR_INLINE inline void typeOfService(Reader<Pass> &at) {
-    if (!at.live) {
+NETFLOOR_INLINE inline void typeOfService(Reader<Pass> &reader) {
+    if (!reader.live) {
         return;
     }
-    const Block<Pass> block{at, "Type of Service"};
-    read<precedence>(at);
-    read<delay>(at);
-    read<throughput>(at);
-    read<reliability>(at);
-    read<serviceReserved>(at);
+    const Block<Pass> block{reader, "Type of Service"};
+    read<precedence>(reader);
+    read<delay>(reader);
+    read<throughput>(reader);
+    read<reliability>(reader);
+    read<serviceReserved>(reader);
 }
 
 template <class Pass>
-NETFLOOR_INLINE inline void flagAndFragmentOffset(Reader<Pass> &at) {
-    if (!at.live) {
+NETFLOOR_INLINE inline void flagAndFragmentOffset(Reader<Pass> &reader) {
+    if (!reader.live) {
         return;
     }
-    auto &variables = at.variables();
-    const Block<Pass> block{at, "Flag and Fragment Offset"};
-    read<fragmentReserved>(at);
-    read<dontFragmentFlag>(at, &variables.dontFragment);
-    read<moreFragments>(at);
-    read<fragmentOffset>(at, &variables.fragmentOffset);
+    auto &variables = reader.variables();
+    const Block<Pass> block{reader, "Flag and Fragment Offset"};
+    read<fragmentReserved>(reader);
+    read<dontFragmentFlag>(reader, &variables.dontFragment);
+    read<moreFragments>(reader);
+    read<fragmentOffset>(reader, &variables.fragmentOffset);
 }
 
-} // namespace netfloor::ipv4
+} // namespace netfloor::plugin::ipv4

@@ -1,6 +1,5 @@
 // SPDX-License-Identifier: MIT
-// The chain of IPv6: extension headers (RFC 2460), each of which tells the next one, up to the header that
-// ends it. An IPv6 header is a link like the others, and the first one.
+// The extension headers of IPv6 (RFC 2460), each of which tells the next one.
 //
 //   Routing (43)                           Fragment (44)
 //   +--------+--------+--------+--------+  +--------+--------+-------------+--+-+
@@ -26,19 +25,12 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
-#include "frame/step.h"
-#include "icmp/icmpv6.h"
-#include "ipv4/unknown_data.h"
-#include "ipv6/address.h"
+#include "frame/field_step.h"
+#include "ip/ipv6_address.h"
 #include "ipv6/header.h"
 #include "ipv6/options.h"
-#include "sctp/sctp.h"
-#include "tables/protocol_numbers.h"
-#include "transport/tcp.h"
-#include "transport/udp.h"
-#include "tunnels/gre.h"
 
-namespace netfloor::ipv6 {
+namespace netfloor::plugin::ipv6 {
 
 inline constexpr std::array moreFragmentsRows = {ValueName{0, "last fragment"}, ValueName{1, "more fragment"}};
 inline constexpr ValueNames moreFragmentsNames{moreFragmentsRows};
@@ -84,19 +76,19 @@ inline constexpr std::uint32_t securityHeaderOctets = 8;
 
 // Counts a header off the payload.
 template <class Pass>
-NETFLOOR_INLINE inline void countOff(Reader<Pass> &at, std::uint32_t octetCount) {
-    if (at.live) {
-        at.variables().payloadOctets -= static_cast<std::int32_t>(octetCount);
+NETFLOOR_INLINE inline void countOff(Reader<Pass> &reader, std::uint32_t octetCount) {
+    if (reader.live) {
+        reader.variables().payloadOctets -= static_cast<std::int32_t>(octetCount);
     }
 }
 
 // Gives the length as it stands in the header.
 template <class Pass>
-[[nodiscard]] NETFLOOR_INLINE inline std::uint32_t headerLength(Reader<Pass> &at) {
+[[nodiscard]] NETFLOOR_INLINE inline std::uint32_t headerLength(Reader<Pass> &reader) {
     std::uint32_t length = 0;
-    if (at.live) {
-        const Block<Pass> block{at, "Header Extention Length"};
-        read<extensionLength>(at, &length);
+    if (reader.live) {
+        const Block<Pass> block{reader, "Header Extention Length"};
+        read<extensionLength>(reader, &length);
     }
     return length;
 }
@@ -104,142 +96,99 @@ template <class Pass>
 // The links of the chain. Their blocks stay open in `chain`; each gives whether the chain goes on behind it.
 
 template <class Pass>
-[[nodiscard]] NETFLOOR_INLINE inline bool optionsHeader(Reader<Pass> &at, BlockChain<Pass> &chain, BlockName name) {
+[[nodiscard]] NETFLOOR_INLINE inline bool optionsHeader(Reader<Pass> &reader, BlockChain<Pass> &chain, BlockName name) {
     chain.open(name);
-    nextHeader(at);
-    countOff(at, extensionOctets(headerLength(at)));
-    return at.live && option(at, chain);
+    nextHeader(reader);
+    countOff(reader, extensionOctets(headerLength(reader)));
+    return reader.live && option(reader, chain);
 }
 
 // "Sgmt Left" does not steer the addresses: all that the length has room for are read.
 template <class Pass>
-NETFLOOR_INLINE inline void type0Routing(Reader<Pass> &at) {
-    nextHeader(at);
-    const std::uint32_t length = headerLength(at);
-    read<routingType>(at);
-    read<segmentsLeft>(at);
-    read<routingReserved>(at);
-    for (std::uint32_t addresses = length / 2; addresses > 0 && at.live; --addresses) {
-        addressReadTwice<address, addressKey>(at);
+NETFLOOR_INLINE inline void type0Routing(Reader<Pass> &reader) {
+    nextHeader(reader);
+    const std::uint32_t length = headerLength(reader);
+    read<routingType>(reader);
+    read<segmentsLeft>(reader);
+    read<routingReserved>(reader);
+    for (std::uint32_t addresses = length / 2; addresses > 0 && reader.live; --addresses) {
+        addressReadTwice<address, addressKey>(reader);
     }
-    countOff(at, extensionOctets(length));
+    countOff(reader, extensionOctets(length));
 }
 
 // The header is read up to 4 octets in front of its end, and that is where the next one is looked for.
 template <class Pass>
-NETFLOOR_INLINE inline void unknownRouting(Reader<Pass> &at) {
-    nextHeader(at);
-    const std::uint32_t length = headerLength(at);
-    readRun<spare>(at, static_cast<std::int32_t>(length * 8 + 2));
-    countOff(at, extensionOctets(length));
+NETFLOOR_INLINE inline void unknownRouting(Reader<Pass> &reader) {
+    nextHeader(reader);
+    const std::uint32_t length = headerLength(reader);
+    readRun<spare>(reader, static_cast<std::int32_t>(length * 8 + 2));
+    countOff(reader, extensionOctets(length));
 }
 
 // A header of an unknown type that is not through with its segments is left unread, and ends the chain.
 template <class Pass>
-[[nodiscard]] NETFLOOR_INLINE inline bool routingHeader(Reader<Pass> &at, BlockChain<Pass> &chain) {
+[[nodiscard]] NETFLOOR_INLINE inline bool routingHeader(Reader<Pass> &reader, BlockChain<Pass> &chain) {
     std::uint32_t type = 0;
     chain.open("Ipv6 Routing Header");
-    read<routingTypeAhead>(at, &type);
-    if (!at.live) {
+    read<routingTypeAhead>(reader, &type);
+    if (!reader.live) {
         return false;
     }
     if (type == 0) {
         chain.open("Type 0 Routing Header");
-        type0Routing(at);
+        type0Routing(reader);
         return true;
     }
     std::uint32_t segments = 0;
     chain.open("Unknown Routing Header");
-    read<segmentsLeftAhead>(at, &segments);
+    read<segmentsLeftAhead>(reader, &segments);
     if (segments != 0) {
         return false;
     }
-    unknownRouting(at);
+    unknownRouting(reader);
     return true;
 }
 
 // The offset steers nothing: what a later fragment holds is read as the next header all the same.
 template <class Pass>
-[[nodiscard]] NETFLOOR_INLINE inline bool fragmentHeader(Reader<Pass> &at, BlockChain<Pass> &chain) {
+[[nodiscard]] NETFLOOR_INLINE inline bool fragmentHeader(Reader<Pass> &reader, BlockChain<Pass> &chain) {
     chain.open("IPv6 Fragment Header");
-    nextHeader(at);
-    read<fragmentReserved>(at);
-    read<fragmentOffset>(at);
-    read<fragmentSpare>(at);
-    read<moreFragments>(at);
-    read<identification>(at);
-    countOff(at, fragmentHeaderOctets);
+    nextHeader(reader);
+    read<fragmentReserved>(reader);
+    read<fragmentOffset>(reader);
+    read<fragmentSpare>(reader);
+    read<moreFragments>(reader);
+    read<identification>(reader);
+    countOff(reader, fragmentHeaderOctets);
     return true;
 }
 
 template <class Pass>
-[[nodiscard]] NETFLOOR_INLINE inline bool authenticationHeader(Reader<Pass> &at, BlockChain<Pass> &chain) {
-    auto &variables = at.variables();
+[[nodiscard]] NETFLOOR_INLINE inline bool authenticationHeader(Reader<Pass> &reader, BlockChain<Pass> &chain) {
+    auto &variables = reader.variables();
     std::uint32_t words = 0;
     chain.open("IP Authentication Header");
-    nextHeader(at);
-    read<authenticationLength>(at, &words);
-    readCounted<authenticationReserved>(at, 2);
-    read<authenticationIndex>(at);
-    read<authenticationSequence>(at);
-    if (at.live) {
+    nextHeader(reader);
+    read<authenticationLength>(reader, &words);
+    readCounted<authenticationReserved>(reader, 2);
+    read<authenticationIndex>(reader);
+    read<authenticationSequence>(reader);
+    if (reader.live) {
         variables.ahDataOctets = static_cast<std::int32_t>(words) * 4 - 4;
     }
-    readCounted<authenticationData>(at, variables.ahDataOctets);
-    countOff(at, words * 4 + 8);
+    readCounted<authenticationData>(reader, variables.ahDataOctets);
+    countOff(reader, words * 4 + 8);
     return true;
 }
 
 template <class Pass>
-void securityPayload(Reader<Pass> &at) {
-    const Block<Pass> block{at, ""};
-    read<securityIndex>(at);
-    read<securitySequence>(at);
-    countOff(at, securityHeaderOctets);
-    readCounted<encryptedData>(at, at.variables().payloadOctets);
+void securityPayload(Reader<Pass> &reader) {
+    const Block<Pass> block{reader, ""};
+    read<securityIndex>(reader);
+    read<securitySequence>(reader);
+    countOff(reader, securityHeaderOctets);
+    readCounted<encryptedData>(reader, reader.variables().payloadOctets);
 }
 
-// A protocol that ends the chain. The tunnels of IPv4 are not followed from here.
-template <class Pass>
-NETFLOOR_INLINE inline void upperProtocol(Reader<Pass> &at, std::uint32_t protocol) {
-    switch (protocol) {
-    case protocolIcmp:
-    case protocolIcmpv6: return apart<icmpv6::message<Pass>>(at);
-    case protocolTcp: return apart<tcp::segment<Pass>>(at);
-    case protocolUdp: return udp::datagram(at);
-    case protocolGre: return apart<gre::packet<Pass>>(at);
-    case protocolSctp: return apart<sctp::packet<Pass>>(at);
-    case protocolEsp: return apart<securityPayload<Pass>>(at);
-    default: return apart<unknownData<Pass>>(at);
-    }
-}
-
-template <class Pass>
-[[nodiscard]] NETFLOOR_INLINE inline bool link(Reader<Pass> &at, BlockChain<Pass> &chain, std::uint32_t protocol) {
-    switch (protocol) {
-    case protocolHopByHop:
-    case protocolDestinationOptions:
-        return optionsHeader(at, chain,
-                             protocol == protocolHopByHop ? BlockName{"IPv6 Hop-by-Hop Header"}
-                                                          : BlockName{"Destination Option Header"});
-    case protocolIpv6: return fixedHeader(at, chain);
-    case protocolRouting: return routingHeader(at, chain);
-    case protocolFragment: return fragmentHeader(at, chain);
-    case protocolAuthentication: return authenticationHeader(at, chain);
-    default: upperProtocol(at, protocol); return false;
-    }
-}
-
-// A packet: its IPv6 header, and what that leads to.
-template <class Pass>
-NETFLOOR_INLINE inline void datagram(Reader<Pass> &at) {
-    const auto &variables = at.variables();
-    BlockChain<Pass> chain{at};
-    std::uint32_t next = protocolIpv6;
-    while (link(at, chain, next) && at.live && variables.payloadOctets >= 1) {
-        chain.open("Choose Protocol");
-        next = variables.ipProtocol;
-    }
-}
-
-} // namespace netfloor::ipv6
+} // namespace netfloor::plugin::ipv6

@@ -19,13 +19,13 @@
 #include <cstdint>
 
 #include "frame/block.h"
+#include "frame/checked_run.h"
 #include "frame/field.h"
-#include "frame/step.h"
-#include "frame/stretch.h"
-#include "ipv6/address.h"
-#include "tables/protocol_numbers.h"
+#include "frame/field_step.h"
+#include "ip/ipv6_address.h"
+#include "names/ip_protocols.h"
 
-namespace netfloor::ipv6 {
+namespace netfloor::plugin::ipv6 {
 
 // The Payload Length is shown ahead (168), for the limit, and again inside the limit (171). The published tables do not
 // tell the two apart: both have the layout of two octets that the cursor moves over.
@@ -50,36 +50,36 @@ struct HeaderVariables {
 inline constexpr std::uint32_t payloadLengthBits = 16;
 
 // What stands between the Payload Length and the payload: Next Header, Hop Limit and the addresses.
-inline constexpr std::uint32_t bitsBehindLength = 272;
+inline constexpr std::uint32_t bitsAfterLength = 272;
 
 // The Next Header of any header of the chain.
 template <class Pass>
-NETFLOOR_INLINE inline void nextHeader(Reader<Pass> &at) {
-    if (!at.live) {
+NETFLOOR_INLINE inline void nextHeader(Reader<Pass> &reader) {
+    if (!reader.live) {
         return;
     }
-    auto &variables = at.variables();
-    const Block<Pass> block{at, "Next Header"};
-    read<nextHeaderField>(at, &variables.ipProtocol);
-    if (at.live) {
+    auto &variables = reader.variables();
+    const Block<Pass> block{reader, "Next Header"};
+    read<nextHeaderField>(reader, &variables.ipProtocol);
+    if (reader.live) {
         variables.outerProtocol = variables.ipProtocol;
     }
 }
 
 template <class Pass>
-NETFLOOR_INLINE inline void upToPayloadLength(Reader<Pass> &at) {
-    read<trafficClass>(at);
-    read<flowLabel>(at);
-    read<payloadLengthAhead>(at, &at.variables().ipv6PayloadLength);
+NETFLOOR_INLINE inline void fieldsUpToPayloadLength(Reader<Pass> &reader) {
+    read<trafficClass>(reader);
+    read<flowLabel>(reader);
+    read<payloadLengthAhead>(reader, &reader.variables().ipv6PayloadLength);
 }
 
 template <class Pass>
-NETFLOOR_INLINE inline void fromPayloadLength(Reader<Pass> &at) {
-    read<payloadLength>(at);
-    nextHeader(at);
-    read<hopLimit>(at);
-    addressReadTwice<sourceGroups, sourceNibbles>(at);
-    addressReadTwice<destinationGroups, destinationNibbles>(at);
+NETFLOOR_INLINE inline void fieldsFromPayloadLength(Reader<Pass> &reader) {
+    read<payloadLength>(reader);
+    nextHeader(reader);
+    read<hopLimit>(reader);
+    addressReadTwice<sourceGroups, sourceNibbles>(reader);
+    addressReadTwice<destinationGroups, destinationNibbles>(reader);
 }
 
 // Reads a fixed header, whose body stays open in `chain`. Gives whether the chain goes on behind it.
@@ -87,21 +87,21 @@ NETFLOOR_INLINE inline void fromPayloadLength(Reader<Pass> &at) {
 // The test of the length is made with what stands behind the Payload Length, while the body starts with it:
 // a packet one or two octets short is read as far as it goes.
 template <class Pass>
-[[nodiscard]] NETFLOOR_INLINE inline bool fixedHeader(Reader<Pass> &at, BlockChain<Pass> &chain) {
-    auto &variables = at.variables();
+[[nodiscard]] NETFLOOR_INLINE inline bool fixedHeader(Reader<Pass> &reader, BlockChain<Pass> &chain) {
+    auto &variables = reader.variables();
     chain.open("IPv6 Header");
-    stretch<48, upToPayloadLength<Pass>>(at);
+    stretch<48, fieldsUpToPayloadLength<Pass>>(reader);
 
-    const std::uint32_t restBits = variables.ipv6PayloadLength * bitsPerOctet + bitsBehindLength;
-    if (!at.live || restBits > at.left) {
+    const std::uint32_t restBits = variables.ipv6PayloadLength * bitsPerOctet + bitsAfterLength;
+    if (!reader.live || restBits > reader.left) {
         return false;
     }
     chain.openLimited("IPv6 Body", payloadLengthBits + restBits);
-    stretch<payloadLengthBits + bitsBehindLength, fromPayloadLength<Pass>>(at);
-    if (at.live) {
+    stretch<payloadLengthBits + bitsAfterLength, fieldsFromPayloadLength<Pass>>(reader);
+    if (reader.live) {
         variables.payloadOctets = static_cast<std::int32_t>(variables.ipv6PayloadLength);
     }
     return true;
 }
 
-} // namespace netfloor::ipv6
+} // namespace netfloor::plugin::ipv6

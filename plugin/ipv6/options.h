@@ -13,10 +13,10 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
-#include "frame/step.h"
-#include "ipv4/unknown_data.h"
+#include "frame/field_step.h"
+#include "ip/unknown_data.h"
 
-namespace netfloor::ipv6 {
+namespace netfloor::plugin::ipv6 {
 
 // clang-format off
 inline constexpr Field optionTypeAhead     {223, "Option type",          ahead(0, 7), "Option type=%x"};
@@ -43,60 +43,60 @@ inline constexpr std::uint32_t actionSkip = 0;
 inline constexpr std::int32_t nibblesPerOctet = 2;
 
 template <class Pass>
-NETFLOOR_INLINE inline void padN(Reader<Pass> &at) {
-    auto &variables = at.variables();
-    read<padNType>(at);
-    read<padNLength>(at, &variables.optionLength);
-    readRun<paddingData>(at, variables.optionLength * nibblesPerOctet);
+NETFLOOR_INLINE inline void padN(Reader<Pass> &reader) {
+    auto &variables = reader.variables();
+    read<padNType>(reader);
+    read<padNLength>(reader, &variables.optionLength);
+    readRun<paddingData>(reader, variables.optionLength * nibblesPerOctet);
 }
 
 template <class Pass>
-NETFLOOR_INLINE inline void skippedOption(Reader<Pass> &at) {
-    auto &variables = at.variables();
-    read<unknownOptionType>(at);
-    read<unknownOptionLength>(at, &variables.optionLength);
-    readCounted<skippedOctet>(at, variables.optionLength);
+NETFLOOR_INLINE inline void skippedOption(Reader<Pass> &reader) {
+    auto &variables = reader.variables();
+    read<unknownOptionType>(reader);
+    read<unknownOptionLength>(reader, &variables.optionLength);
+    readCounted<skippedOctet>(reader, variables.optionLength);
 }
 
 // The option forbids to go on. Its length is not read: all behind its type is data.
 template <class Pass>
-NETFLOOR_INLINE inline void discardedOption(Reader<Pass> &at) {
-    read<discardedOptionType>(at);
-    if (at.variables().payloadOctets >= 1) {
-        apart<unknownData<Pass>>(at);
+NETFLOOR_INLINE inline void discardedOption(Reader<Pass> &reader) {
+    read<discardedOptionType>(reader);
+    if (reader.variables().payloadOctets >= 1) {
+        runOutOfLine<unknownData<Pass>>(reader);
     }
 }
 
 // Reads an option, whose blocks stay open in `chain`. Gives whether the chain goes on behind it.
 template <class Pass>
-[[nodiscard]] NETFLOOR_INLINE inline bool option(Reader<Pass> &at, BlockChain<Pass> &chain) {
+[[nodiscard]] NETFLOOR_INLINE inline bool option(Reader<Pass> &reader, BlockChain<Pass> &chain) {
     std::uint32_t type = 0;
     chain.open("Options");
-    read<optionTypeAhead>(at, &type);
-    if (!at.live) {
+    read<optionTypeAhead>(reader, &type);
+    if (!reader.live) {
         return false;
     }
     switch (type) {
     case optionPad1:
         chain.open("Pad1 option");
-        read<pad1Type>(at);
+        read<pad1Type>(reader);
         return true;
     case optionPadN:
         chain.open("PadN Option");
-        padN(at);
+        padN(reader);
         return true;
     default: break;
     }
     std::uint32_t action = 0;
     chain.open("Unknown Option");
-    read<actionAhead>(at, &action);
+    read<actionAhead>(reader, &action);
     chain.open("");
     if (action != actionSkip) {
-        discardedOption(at);
+        discardedOption(reader);
         return false;
     }
-    skippedOption(at);
+    skippedOption(reader);
     return true;
 }
 
-} // namespace netfloor::ipv6
+} // namespace netfloor::plugin::ipv6

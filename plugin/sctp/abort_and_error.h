@@ -18,12 +18,12 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
-#include "frame/step.h"
+#include "frame/field_step.h"
 #include "sctp/chunk_head.h"
 #include "sctp/error_causes.h"
 #include "sctp/length.h"
 
-namespace netfloor::sctp {
+namespace netfloor::plugin::sctp {
 
 inline constexpr std::array abortTagRows = {ValueName{0, "Sender TCB"}, ValueName{1, "no sender TCB"}};
 inline constexpr ValueNames abortTagNames{abortTagRows};
@@ -38,22 +38,22 @@ inline constexpr Field errorLength   = chunkLengthField(910);
 // clang-format on
 
 template <class Pass>
-void abortChunk(Reader<Pass> &at) {
-    std::int32_t &errorOctets = at.variables().errorOctets;
-    LimitedBlock<Pass> block{at, "Abort Association"};
-    block.limit(limitFromLength<abortLengthAhead>(at, octetsBehindHead(errorOctets)));
-    read<abortReserved>(at);
-    read<abortTagBit>(at);
-    read<abortLength>(at, octetsBehindHead(errorOctets));
-    errorCauses(at);
+void abortChunk(Reader<Pass> &reader) {
+    std::int32_t &errorOctets = reader.variables().errorOctets;
+    LimitedBlock<Pass> block{reader, "Abort Association"};
+    block.limit(limitFromLength<abortLengthAhead>(reader, octetsAfterHead(errorOctets)));
+    read<abortReserved>(reader);
+    read<abortTagBit>(reader);
+    read<abortLength>(reader, octetsAfterHead(errorOctets));
+    errorCauses(reader);
 }
 
 template <class Pass>
-void errorChunk(Reader<Pass> &at) {
-    const Block<Pass> block{at, "Error"};
-    read<errorFlags>(at);
-    read<errorLength>(at, octetsBehindHead(at.variables().errorOctets));
-    errorCauses(at);
+void errorChunk(Reader<Pass> &reader) {
+    const Block<Pass> block{reader, "Error"};
+    read<errorFlags>(reader);
+    read<errorLength>(reader, octetsAfterHead(reader.variables().errorOctets));
+    errorCauses(reader);
 }
 
-} // namespace netfloor::sctp
+} // namespace netfloor::plugin::sctp

@@ -14,9 +14,9 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
-#include "frame/step.h"
+#include "frame/field_step.h"
 
-namespace netfloor::sctp {
+namespace netfloor::plugin::sctp {
 
 // clang-format off
 constexpr Field flagsField       (std::uint32_t id) { return {id, "  Chunk Flags",  octets(1), "  Chunk Flags=0x%x"}; }
@@ -29,12 +29,12 @@ constexpr Field lengthField      (std::uint32_t id) { return {id, "  Length",   
 inline constexpr Field chunkLength = chunkLengthField(808);
 
 template <class Pass>
-NETFLOOR_INLINE inline void readChunkLength(Reader<Pass> &at) {
-    if (!at.live) {
+NETFLOOR_INLINE inline void readChunkLength(Reader<Pass> &reader) {
+    if (!reader.live) {
         return;
     }
-    const Block<Pass> block{at, "Length"};
-    read<chunkLength>(at, &at.variables().chunkOctets);
+    const Block<Pass> block{reader, "Length"};
+    read<chunkLength>(reader, &reader.variables().chunkOctets);
 }
 
-} // namespace netfloor::sctp
+} // namespace netfloor::plugin::sctp

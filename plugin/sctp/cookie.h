@@ -14,11 +14,11 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
-#include "frame/step.h"
+#include "frame/field_step.h"
 #include "sctp/chunk_head.h"
 #include "sctp/length.h"
 
-namespace netfloor::sctp {
+namespace netfloor::plugin::sctp {
 
 // clang-format off
 inline constexpr Field cookieEchoFlags = lowerFlagsField(893);
@@ -29,22 +29,22 @@ inline constexpr Field cookieAckFlags  = lowerFlagsField(892);
 
 // `chunkOctets` stays without the head, so that the walk takes four octets fewer than the Length.
 template <class Pass>
-void cookieEchoChunk(Reader<Pass> &at) {
-    std::int32_t &chunkOctets = at.variables().chunkOctets;
-    const Block<Pass> block{at, "Cookie Echo"};
-    read<cookieEchoFlags>(at);
-    readChunkLength(at);
-    if (at.live) {
+void cookieEchoChunk(Reader<Pass> &reader) {
+    std::int32_t &chunkOctets = reader.variables().chunkOctets;
+    const Block<Pass> block{reader, "Cookie Echo"};
+    read<cookieEchoFlags>(reader);
+    readChunkLength(reader);
+    if (reader.live) {
         chunkOctets -= headOctets;
     }
-    readRun<cookie>(at, chunkOctets);
+    readRun<cookie>(reader, chunkOctets);
 }
 
 template <class Pass>
-void cookieAckChunk(Reader<Pass> &at) {
-    const Block<Pass> block{at, "Cookie Acknowledge"};
-    read<cookieAckFlags>(at);
-    readChunkLength(at);
+void cookieAckChunk(Reader<Pass> &reader) {
+    const Block<Pass> block{reader, "Cookie Acknowledge"};
+    read<cookieAckFlags>(reader);
+    readChunkLength(reader);
 }
 
-} // namespace netfloor::sctp
+} // namespace netfloor::plugin::sctp

@@ -6,23 +6,23 @@
 
 #include "frame/reader.h"
 
-namespace netfloor::sctp {
+namespace netfloor::plugin::sctp {
 
 // Reads a list of `count` elements. The count is believed as it stands: the list ends at it, or where a field does
 // not fit. An element counts once it is begun, so a list whose last element is cut short has its full count. Gives
 // whether that is so.
 template <class Pass, class Element>
-NETFLOOR_INLINE inline bool countedList(Reader<Pass> &at, std::int32_t count, Element element) {
+NETFLOOR_INLINE inline bool countedList(Reader<Pass> &reader, std::int32_t count, Element element) {
     std::int32_t begun = 0;
-    while (at.live && begun < count) {
+    while (reader.live && begun < count) {
         ++begun;
         element();
     }
     if (begun != count) {
-        at.mark(Mark::count);
+        reader.raise(Flag::count);
     }
-    at.test(true);
-    return begun > 0 && begun == count && !at.live;
+    reader.test(true);
+    return begun > 0 && begun == count && !reader.live;
 }
 
-} // namespace netfloor::sctp
+} // namespace netfloor::plugin::sctp

@@ -24,11 +24,11 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
-#include "frame/hand_off.h"
-#include "frame/step.h"
+#include "frame/field_step.h"
+#include "ip/hand_off.h"
 #include "sctp/chunk_head.h"
 
-namespace netfloor::sctp {
+namespace netfloor::plugin::sctp {
 
 inline constexpr std::array unorderedRows = {ValueName{0, "FALSE"}, ValueName{1, "TRUE"}};
 inline constexpr std::array fragmentRows = {
@@ -55,19 +55,19 @@ inline constexpr Field payloadProtocolIdentifier {820, "    Payload Protocol Ide
 inline constexpr std::int32_t emptyDataOctets = 16;
 
 template <class Pass>
-NETFLOOR_INLINE inline void dataChunk(Reader<Pass> &at) {
-    const Block<Pass> block{at, "Data"};
-    read<dataReserved>(at);
-    read<unorderedBit>(at);
-    read<fragmentBits>(at);
-    readChunkLength(at);
-    read<tsn>(at);
-    read<streamIdentifier>(at);
-    read<streamSequenceNumber>(at);
-    read<payloadProtocolIdentifier>(at);
-    if (at.test(at.variables().chunkOctets > emptyDataOctets)) {
-        handOff(at);
+NETFLOOR_INLINE inline void dataChunk(Reader<Pass> &reader) {
+    const Block<Pass> block{reader, "Data"};
+    read<dataReserved>(reader);
+    read<unorderedBit>(reader);
+    read<fragmentBits>(reader);
+    readChunkLength(reader);
+    read<tsn>(reader);
+    read<streamIdentifier>(reader);
+    read<streamSequenceNumber>(reader);
+    read<payloadProtocolIdentifier>(reader);
+    if (reader.test(reader.variables().chunkOctets > emptyDataOctets)) {
+        handOff(reader);
     }
 }
 
-} // namespace netfloor::sctp
+} // namespace netfloor::plugin::sctp

@@ -18,12 +18,12 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
-#include "frame/step.h"
+#include "frame/field_step.h"
 #include "sctp/counted_list.h"
 #include "sctp/length.h"
 #include "sctp/unrecognized_parameter.h"
 
-namespace netfloor::sctp {
+namespace netfloor::plugin::sctp {
 
 enum CauseCode : std::uint32_t {
     invalidStreamIdentifier = 1,
@@ -86,63 +86,63 @@ inline constexpr Field unknownCause          {938, "      Unknown Cause",       
 // clang-format on
 
 template <class Pass>
-void missingParameters(Reader<Pass> &at) {
-    std::int32_t &missingParameterCount = at.variables().missingParameterCount;
-    read<missingLength>(at);
-    read<missingNumber>(at, &missingParameterCount);
-    const bool cutShort = countedList(at, missingParameterCount, [&at] {
-        const Block<Pass> block{at, "INLINE BLOCK"};
-        read<missingType>(at);
+void missingParameters(Reader<Pass> &reader) {
+    std::int32_t &missingParameterCount = reader.variables().missingParameterCount;
+    read<missingLength>(reader);
+    read<missingNumber>(reader, &missingParameterCount);
+    const bool cutShort = countedList(reader, missingParameterCount, [&reader] {
+        const Block<Pass> block{reader, "INLINE BLOCK"};
+        read<missingType>(reader);
     });
     // The list of causes ends behind a last type that is cut short.
-    at.test(!cutShort);
+    reader.test(!cutShort);
 }
 
 // The list runs until a field does not fit: behind the last parameter that is the type of the next.
 template <class Pass>
-void unrecognizedParameterList(Reader<Pass> &at) {
-    std::int32_t &errorOctets = at.variables().errorOctets;
-    read<unrecognizedListLength>(at, octetsBehindHead(errorOctets));
-    if (!at.live) {
+void unrecognizedParameterList(Reader<Pass> &reader) {
+    std::int32_t &errorOctets = reader.variables().errorOctets;
+    read<unrecognizedListLength>(reader, octetsAfterHead(errorOctets));
+    if (!reader.live) {
         return;
     }
-    const LimitedBlock<Pass> list{at, "INLINE BLOCK", bitsOf(errorOctets)};
-    while (at.live) {
-        unrecognizedParameter(at);
+    const LimitedBlock<Pass> list{reader, "INLINE BLOCK", bitsOf(errorOctets)};
+    while (reader.live) {
+        unrecognizedParameter(reader);
     }
 }
 
 template <class Pass>
-void unknownCauseValue(Reader<Pass> &at) {
-    std::int32_t &errorOctets = at.variables().errorOctets;
-    read<unknownCauseLength>(at, octetsBehindHead(errorOctets));
-    if (at.test(errorOctets >= 1)) {
-        readRun<unknownCause>(at, errorOctets);
+void unknownCauseValue(Reader<Pass> &reader) {
+    std::int32_t &errorOctets = reader.variables().errorOctets;
+    read<unknownCauseLength>(reader, octetsAfterHead(errorOctets));
+    if (reader.test(errorOctets >= 1)) {
+        readRun<unknownCause>(reader, errorOctets);
     }
 }
 
 template <class Pass>
-void causeOf(Reader<Pass> &at, std::uint32_t code) {
-    std::int32_t &errorOctets = at.variables().errorOctets;
+void causeOf(Reader<Pass> &reader, std::uint32_t code) {
+    std::int32_t &errorOctets = reader.variables().errorOctets;
     switch (code) {
     case invalidStreamIdentifier:
-        read<invalidStreamLength>(at);
-        read<invalidStream>(at);
-        return read<invalidStreamReserved>(at);
-    case missingMandatoryParameter: return missingParameters(at);
-    case staleCookie: read<staleCookieLength>(at); return read<staleness>(at);
-    case outOfResource: return read<outOfResourceLength>(at);
+        read<invalidStreamLength>(reader);
+        read<invalidStream>(reader);
+        return read<invalidStreamReserved>(reader);
+    case missingMandatoryParameter: return missingParameters(reader);
+    case staleCookie: read<staleCookieLength>(reader); return read<staleness>(reader);
+    case outOfResource: return read<outOfResourceLength>(reader);
     case unresolvableAddress:
-        read<unresolvableLength>(at, octetsBehindHead(errorOctets));
-        return readRun<unresolvableValue>(at, errorOctets);
+        read<unresolvableLength>(reader, octetsAfterHead(errorOctets));
+        return readRun<unresolvableValue>(reader, errorOctets);
     case unrecognizedChunkType:
-        read<unrecognizedChunkLength>(at, octetsBehindHead(errorOctets));
-        return readRun<unrecognizedChunk>(at, errorOctets);
-    case invalidMandatoryParameter: return read<invalidMandatoryLength>(at);
-    case unrecognizedParametersCause: return unrecognizedParameterList(at);
-    case noUserData: read<noUserDataLength>(at, octetsBehindHead(errorOctets)); return read<noUserDataTsn>(at);
-    case cookieWhileShuttingDown: return read<shuttingDownLength>(at, octetsBehindHead(errorOctets));
-    default: return unknownCauseValue(at);
+        read<unrecognizedChunkLength>(reader, octetsAfterHead(errorOctets));
+        return readRun<unrecognizedChunk>(reader, errorOctets);
+    case invalidMandatoryParameter: return read<invalidMandatoryLength>(reader);
+    case unrecognizedParametersCause: return unrecognizedParameterList(reader);
+    case noUserData: read<noUserDataLength>(reader, octetsAfterHead(errorOctets)); return read<noUserDataTsn>(reader);
+    case cookieWhileShuttingDown: return read<shuttingDownLength>(reader, octetsAfterHead(errorOctets));
+    default: return unknownCauseValue(reader);
     }
 }
 
@@ -155,17 +155,17 @@ void causeOf(Reader<Pass> &at, std::uint32_t code) {
 // The list goes on as long as its rounds end with the condition true, mostly with a field that did fit, whether or
 // not anything is left. It ordinarily ends with a limit that is longer than what is left.
 template <class Pass>
-void errorCauses(Reader<Pass> &at) {
-    at.test(true);
-    while (at.live && at.condition() != 0) {
-        const LimitedBlock<Pass> cause{at, "Error Causes", bitsOf(at.variables().errorOctets)};
+void errorCauses(Reader<Pass> &reader) {
+    reader.test(true);
+    while (reader.live && reader.condition() != 0) {
+        const LimitedBlock<Pass> cause{reader, "Error Causes", bitsOf(reader.variables().errorOctets)};
         std::uint32_t code = 0;
-        read<causeCode>(at, &code);
-        if (at.live) {
-            const Block<Pass> block{at, causeBlock(code)};
-            causeOf(at, code);
+        read<causeCode>(reader, &code);
+        if (reader.live) {
+            const Block<Pass> block{reader, causeBlock(code)};
+            causeOf(reader, code);
         }
     }
 }
 
-} // namespace netfloor::sctp
+} // namespace netfloor::plugin::sctp

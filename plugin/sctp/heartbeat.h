@@ -16,11 +16,11 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
-#include "frame/step.h"
+#include "frame/field_step.h"
 #include "sctp/chunk_head.h"
 #include "sctp/length.h"
 
-namespace netfloor::sctp {
+namespace netfloor::plugin::sctp {
 
 // clang-format off
 inline constexpr Field heartbeatFlags      = flagsField(939);
@@ -35,37 +35,37 @@ inline constexpr std::uint32_t knownInfoType = 1;
 // Information of another type stays unread, and so does one whose type is cut short: the walk takes it for the next
 // chunk.
 template <class Pass>
-void heartbeatInformation(Reader<Pass> &at) {
-    if (!at.live) {
+void heartbeatInformation(Reader<Pass> &reader) {
+    if (!reader.live) {
         return;
     }
-    if (look(at, octets(2)) != knownInfoType) {
-        return at.mark(Mark::expectation);
+    if (peek(reader, octets(2)) != knownInfoType) {
+        return reader.raise(Flag::expectation);
     }
-    std::int32_t &errorOctets = at.variables().errorOctets;
-    LimitedBlock<Pass> block{at, "Heartbeat Information TLV"};
-    block.limit(limitFromLength<valueLengthAhead>(at, octetsBehindHead(errorOctets)));
-    read<heartbeatInfoType>(at);
-    read<heartbeatInfoLength>(at, octetsBehindHead(errorOctets));
-    readRun<heartbeatInfo>(at, errorOctets);
+    std::int32_t &errorOctets = reader.variables().errorOctets;
+    LimitedBlock<Pass> block{reader, "Heartbeat Information TLV"};
+    block.limit(limitFromLength<valueLengthAhead>(reader, octetsAfterHead(errorOctets)));
+    read<heartbeatInfoType>(reader);
+    read<heartbeatInfoLength>(reader, octetsAfterHead(errorOctets));
+    readRun<heartbeatInfo>(reader, errorOctets);
 }
 
 template <const Field &flags, class Pass>
-void heartbeatWith(Reader<Pass> &at, BlockName name) {
-    const Block<Pass> block{at, name};
-    read<flags>(at);
-    readChunkLength(at);
-    heartbeatInformation(at);
+void heartbeatWith(Reader<Pass> &reader, BlockName name) {
+    const Block<Pass> block{reader, name};
+    read<flags>(reader);
+    readChunkLength(reader);
+    heartbeatInformation(reader);
 }
 
 template <class Pass>
-void heartbeatChunk(Reader<Pass> &at) {
-    heartbeatWith<heartbeatFlags>(at, "Heartbeat Request");
+void heartbeatChunk(Reader<Pass> &reader) {
+    heartbeatWith<heartbeatFlags>(reader, "Heartbeat Request");
 }
 
 template <class Pass>
-void heartbeatAckChunk(Reader<Pass> &at) {
-    heartbeatWith<heartbeatAckFlags>(at, "Heartbeat Acknowledgement");
+void heartbeatAckChunk(Reader<Pass> &reader) {
+    heartbeatWith<heartbeatAckFlags>(reader, "Heartbeat Acknowledgement");
 }
 
-} // namespace netfloor::sctp
+} // namespace netfloor::plugin::sctp

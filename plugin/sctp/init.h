@@ -24,12 +24,12 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
-#include "frame/step.h"
+#include "frame/field_step.h"
 #include "sctp/chunk_head.h"
 #include "sctp/init_parameters.h"
 #include "sctp/length.h"
 
-namespace netfloor::sctp {
+namespace netfloor::plugin::sctp {
 
 // The two chunks have the same fields, whose ids run on from the first.
 inline constexpr std::uint32_t initIds = 823;
@@ -49,32 +49,32 @@ template <std::uint32_t ids> inline constexpr Field initialTsn      {ids + 6, " 
 inline constexpr std::int32_t octetsBeforeParameters = 20;
 
 template <std::uint32_t ids, auto parameters, class Pass>
-void initFields(Reader<Pass> &at) {
-    auto &variables = at.variables();
-    read<initFlags<ids>>(at);
-    read<initLength<ids>>(at, &variables.chunkOctets);
-    read<initiateTag<ids>>(at);
-    read<receiverWindow<ids>>(at);
-    read<outboundStreams<ids>>(at);
-    read<inboundStreams<ids>>(at);
-    read<initialTsn<ids>>(at);
-    if (at.live) {
+void initFields(Reader<Pass> &reader) {
+    auto &variables = reader.variables();
+    read<initFlags<ids>>(reader);
+    read<initLength<ids>>(reader, &variables.chunkOctets);
+    read<initiateTag<ids>>(reader);
+    read<receiverWindow<ids>>(reader);
+    read<outboundStreams<ids>>(reader);
+    read<inboundStreams<ids>>(reader);
+    read<initialTsn<ids>>(reader);
+    if (reader.live) {
         variables.chunkOctets -= octetsBeforeParameters;
     }
-    parameters(at);
+    parameters(reader);
 }
 
 template <class Pass>
-void initChunk(Reader<Pass> &at) {
-    LimitedBlock<Pass> block{at, "INIT"};
-    block.limit(limitFromLength<initLengthAhead>(at, &at.variables().chunkOctets));
-    initFields<initIds, initParameters<Pass>>(at);
+void initChunk(Reader<Pass> &reader) {
+    LimitedBlock<Pass> block{reader, "INIT"};
+    block.limit(limitFromLength<initLengthAhead>(reader, &reader.variables().chunkOctets));
+    initFields<initIds, initParameters<Pass>>(reader);
 }
 
 template <class Pass>
-void initAckChunk(Reader<Pass> &at) {
-    const Block<Pass> block{at, "Init Ack"};
-    initFields<initAckIds, initAckParameters<Pass>>(at);
+void initAckChunk(Reader<Pass> &reader) {
+    const Block<Pass> block{reader, "Init Ack"};
+    initFields<initAckIds, initAckParameters<Pass>>(reader);
 }
 
-} // namespace netfloor::sctp
+} // namespace netfloor::plugin::sctp

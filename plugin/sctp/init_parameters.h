@@ -19,12 +19,12 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
-#include "frame/step.h"
-#include "ipv6/address.h"
+#include "frame/field_step.h"
+#include "ip/ipv6_address.h"
 #include "sctp/length.h"
 #include "sctp/unrecognized_parameter.h"
 
-namespace netfloor::sctp {
+namespace netfloor::plugin::sctp {
 
 enum ParameterType : std::uint32_t {
     ipv4AddressType = 5,
@@ -78,138 +78,138 @@ inline constexpr Field stateCookie             {857, "        State Cookie",    
 // What a parameter takes from the octets of its list: its Length less 8, and not its Length. So a list seldom ends with
 // its last parameter; it ends where the bits do.
 template <class Pass>
-void reckonParameter(Reader<Pass> &at, std::int32_t &listOctets) {
-    if (at.live) {
-        listOctets -= at.variables().parameterOctets - headOctets;
+void reckonParameter(Reader<Pass> &reader, std::int32_t &listOctets) {
+    if (reader.live) {
+        listOctets -= reader.variables().parameterOctets - headOctets;
     }
 }
 
 // Whether the list has another parameter, by that reckoning. It is asked also behind a field that did not fit.
 template <class Pass>
-[[nodiscard]] bool listGoesOn(Reader<Pass> &at, std::int32_t listOctets) {
-    return at.test(listOctets >= 1) && at.live;
+[[nodiscard]] bool listGoesOn(Reader<Pass> &reader, std::int32_t listOctets) {
+    return reader.test(listOctets >= 1) && reader.live;
 }
 
 // A parameter whose value is one field, of fixed size or of as many octets as the Length tells.
 template <const Field &field, class Pass>
-void parameterOf(Reader<Pass> &at, BlockName name) {
-    if (!at.live) {
+void parameterOf(Reader<Pass> &reader, BlockName name) {
+    if (!reader.live) {
         return;
     }
-    const Block<Pass> block{at, name};
+    const Block<Pass> block{reader, name};
     if constexpr (field.place.isRun()) {
-        readRun<field>(at, at.variables().parameterOctets);
+        readRun<field>(reader, reader.variables().parameterOctets);
     } else {
-        read<field>(at);
+        read<field>(reader);
     }
 }
 
 template <class Pass>
-void ipv6AddressParameter(Reader<Pass> &at) {
-    if (!at.live) {
+void ipv6AddressParameter(Reader<Pass> &reader) {
+    if (!reader.live) {
         return;
     }
-    const Block<Pass> block{at, "IPv6 Address"};
-    ipv6::reversedAddress(at, ReversedBits<Pass>::Report::toldToHost);
+    const Block<Pass> block{reader, "IPv6 Address"};
+    ipv6::reversedAddress(reader, ReversedBits<Pass>::Report::toldToHost);
 }
 
 // The types that both lists know, and those that neither does.
 template <class Pass>
-void commonParameter(Reader<Pass> &at, std::uint32_t type) {
+void commonParameter(Reader<Pass> &reader, std::uint32_t type) {
     switch (type) {
-    case ipv4AddressType: return parameterOf<ipv4Address>(at, "IPv4 Address");
-    case ipv6AddressType: return ipv6AddressParameter(at);
-    case hostNameType: return parameterOf<hostName>(at, "Host Name Address");
-    case ecnCapableType: return parameterOf<ecnCapable>(at, "Reserved for ECN Capable");
-    default: return parameterOf<unknownParameter>(at, "Reserved for ECN Capable");
+    case ipv4AddressType: return parameterOf<ipv4Address>(reader, "IPv4 Address");
+    case ipv6AddressType: return ipv6AddressParameter(reader);
+    case hostNameType: return parameterOf<hostName>(reader, "Host Name Address");
+    case ecnCapableType: return parameterOf<ecnCapable>(reader, "Reserved for ECN Capable");
+    default: return parameterOf<unknownParameter>(reader, "Reserved for ECN Capable");
     }
 }
 
 // From here on `parameterOctets` counts the types, and the list reckons with that number.
 template <class Pass>
-void supportedAddressTypes(Reader<Pass> &at) {
-    if (!at.live) {
+void supportedAddressTypes(Reader<Pass> &reader) {
+    if (!reader.live) {
         return;
     }
-    std::int32_t &typeCount = at.variables().parameterOctets;
-    const Block<Pass> block{at, "Supported Address Types"};
+    std::int32_t &typeCount = reader.variables().parameterOctets;
+    const Block<Pass> block{reader, "Supported Address Types"};
     typeCount /= 2;
-    readCounted<supportedAddressType>(at, typeCount);
+    readCounted<supportedAddressType>(reader, typeCount);
 }
 
 template <class Pass>
-void initParameter(Reader<Pass> &at) {
+void initParameter(Reader<Pass> &reader) {
     std::uint32_t type = 0;
-    read<initParameterType>(at, &type);
-    read<initParameterLength>(at, octetsBehindHead(at.variables().parameterOctets));
+    read<initParameterType>(reader, &type);
+    read<initParameterLength>(reader, octetsAfterHead(reader.variables().parameterOctets));
     switch (type) {
-    case cookiePreservativeType: return parameterOf<cookieLifeSpanIncrement>(at, "Cookie Preservative");
-    case supportedAddressesType: return supportedAddressTypes(at);
-    default: return commonParameter(at, type);
+    case cookiePreservativeType: return parameterOf<cookieLifeSpanIncrement>(reader, "Cookie Preservative");
+    case supportedAddressesType: return supportedAddressTypes(reader);
+    default: return commonParameter(reader, type);
     }
 }
 
 template <class Pass>
-void initParameters(Reader<Pass> &at) {
-    auto &variables = at.variables();
-    BlockChain<Pass> chain{at};
-    while (listGoesOn(at, variables.chunkOctets)) {
+void initParameters(Reader<Pass> &reader) {
+    auto &variables = reader.variables();
+    BlockChain<Pass> chain{reader};
+    while (listGoesOn(reader, variables.chunkOctets)) {
         chain.open("Init Option Container");
-        const std::uint32_t start = at.cursor;
+        const std::uint32_t start = reader.cursor;
         {
-            LimitedBlock<Pass> parameter{at, "Init Option"};
-            parameter.limit(limitFromLength<valueLengthAhead>(at, octetsBehindHead(variables.parameterOctets)));
-            initParameter(at);
-            reckonParameter(at, variables.chunkOctets);
+            LimitedBlock<Pass> parameter{reader, "Init Option"};
+            parameter.limit(limitFromLength<valueLengthAhead>(reader, octetsAfterHead(variables.parameterOctets)));
+            initParameter(reader);
+            reckonParameter(reader, variables.chunkOctets);
         }
         // A parameter of Length 0 would be read again for ever. Where less than a type is left, the next limit is
         // another one, and ends the list with its mark.
-        if (at.cursor == start && at.left >= typeBits) {
-            at.live = false;
+        if (reader.cursor == start && reader.left >= typeBits) {
+            reader.live = false;
         }
     }
 }
 
 // The parameters set `parameterOctets` anew, so that the outer list reckons with the last of them.
 template <class Pass>
-void unrecognizedParameters(Reader<Pass> &at) {
-    if (!at.live) {
+void unrecognizedParameters(Reader<Pass> &reader) {
+    if (!reader.live) {
         return;
     }
-    std::int32_t unrecognizedOctets = at.variables().parameterOctets;
-    const Block<Pass> block{at, "Unrecognized Parameters"};
-    BlockChain<Pass> chain{at};
-    while (listGoesOn(at, unrecognizedOctets)) {
+    std::int32_t unrecognizedOctets = reader.variables().parameterOctets;
+    const Block<Pass> block{reader, "Unrecognized Parameters"};
+    BlockChain<Pass> chain{reader};
+    while (listGoesOn(reader, unrecognizedOctets)) {
         chain.open("");
-        unrecognizedParameter(at);
-        reckonParameter(at, unrecognizedOctets);
+        unrecognizedParameter(reader);
+        reckonParameter(reader, unrecognizedOctets);
     }
 }
 
 template <class Pass>
-void initAckParameter(Reader<Pass> &at) {
+void initAckParameter(Reader<Pass> &reader) {
     std::uint32_t type = 0;
-    read<initAckParameterType>(at, &type);
-    read<initAckParameterLength>(at, octetsBehindHead(at.variables().parameterOctets));
+    read<initAckParameterType>(reader, &type);
+    read<initAckParameterLength>(reader, octetsAfterHead(reader.variables().parameterOctets));
     switch (type) {
-    case stateCookieType: return parameterOf<stateCookie>(at, "State Cookie");
-    case unrecognizedParametersType: return unrecognizedParameters(at);
-    default: return commonParameter(at, type);
+    case stateCookieType: return parameterOf<stateCookie>(reader, "State Cookie");
+    case unrecognizedParametersType: return unrecognizedParameters(reader);
+    default: return commonParameter(reader, type);
     }
 }
 
 template <class Pass>
-void initAckParameters(Reader<Pass> &at) {
-    auto &variables = at.variables();
-    BlockChain<Pass> chain{at};
-    while (listGoesOn(at, variables.chunkOctets)) {
+void initAckParameters(Reader<Pass> &reader) {
+    auto &variables = reader.variables();
+    BlockChain<Pass> chain{reader};
+    while (listGoesOn(reader, variables.chunkOctets)) {
         chain.open("InitAck Options Container");
         {
-            const Block<Pass> parameter{at, "InitAck Option"};
-            initAckParameter(at);
+            const Block<Pass> parameter{reader, "InitAck Option"};
+            initAckParameter(reader);
         }
-        reckonParameter(at, variables.chunkOctets);
+        reckonParameter(reader, variables.chunkOctets);
     }
 }
 
-} // namespace netfloor::sctp
+} // namespace netfloor::plugin::sctp

@@ -8,16 +8,16 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
-#include "frame/step.h"
+#include "frame/field_step.h"
 #include "sctp/variables.h"
 
-namespace netfloor::sctp {
+namespace netfloor::plugin::sctp {
 
 // The head of a chunk, a parameter or a cause, which its Length counts in.
 inline constexpr std::int32_t headOctets = 4;
 
 // Stores a Length as the octets behind the head. Of a Length below 4 the number is negative, and nothing fits.
-[[nodiscard]] constexpr auto octetsBehindHead(std::int32_t &octets) {
+[[nodiscard]] constexpr auto octetsAfterHead(std::int32_t &octets) {
     return [&octets](std::uint32_t length) { octets = static_cast<std::int32_t>(length) - headOctets; };
 }
 
@@ -68,16 +68,16 @@ inline constexpr LengthAhead valueLengthAhead = {
 // parameter of a list that makes a limit which is longer than what is left, or 0. A Length that was read is kept, also
 // where the limit is then too short for the field itself.
 template <const LengthAhead &ahead, class Pass, class Store>
-[[nodiscard]] std::uint32_t limitFromLength(Reader<Pass> &at, Store into) {
-    if (at.over()) {
+[[nodiscard]] std::uint32_t limitFromLength(Reader<Pass> &reader, Store into) {
+    if (reader.ended()) {
         return 0;
     }
-    const std::uint32_t cursor = at.cursor;
-    const std::uint32_t left = at.left;
-    const auto stepOver = [&at](std::uint32_t width) {
-        at.advance() = static_cast<std::int32_t>(width);
-        at.cursor += width;
-        at.left -= width;
+    const std::uint32_t cursor = reader.cursor;
+    const std::uint32_t left = reader.left;
+    const auto stepOver = [&reader](std::uint32_t width) {
+        reader.advance() = static_cast<std::int32_t>(width);
+        reader.cursor += width;
+        reader.left -= width;
     };
 
     std::uint32_t sum = 0;
@@ -85,21 +85,21 @@ template <const LengthAhead &ahead, class Pass, class Store>
         if (part.needs == 0) {
             continue;
         }
-        if (at.test(at.left >= part.needs)) {
+        if (reader.test(reader.left >= part.needs)) {
             stepOver(part.width);
         }
-        sum += ahead.addsSkipped ? static_cast<std::uint32_t>(at.advance()) : 0;
+        sum += ahead.addsSkipped ? static_cast<std::uint32_t>(reader.advance()) : 0;
     }
-    const std::optional<std::uint32_t> length = look(at, octets(2));
-    if (at.test(length.has_value())) {
+    const std::optional<std::uint32_t> length = peek(reader, octets(2));
+    if (reader.test(length.has_value())) {
         store(into, *length);
         stepOver(lengthBits);
     }
-    sum += static_cast<std::uint32_t>(at.advance()) + length.value_or(0) * bitsPerOctet;
+    sum += static_cast<std::uint32_t>(reader.advance()) + length.value_or(0) * bitsPerOctet;
 
-    at.cursor = cursor;
-    at.left = left;
+    reader.cursor = cursor;
+    reader.left = left;
     return sum - ahead.takesOff;
 }
 
-} // namespace netfloor::sctp
+} // namespace netfloor::plugin::sctp

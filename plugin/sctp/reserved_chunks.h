@@ -5,11 +5,11 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
-#include "frame/step.h"
+#include "frame/field_step.h"
 #include "sctp/chunk_head.h"
 #include "sctp/length.h"
 
-namespace netfloor::sctp {
+namespace netfloor::plugin::sctp {
 
 // clang-format off
 inline constexpr Field ecneFlags        = flagsField(899);
@@ -23,43 +23,43 @@ inline constexpr Field reservedContents {813, "    Reserved contents", octetRun(
 // clang-format on
 
 template <const Field &flags, const Field &reserved, class Pass>
-void congestionChunk(Reader<Pass> &at, BlockName name) {
-    auto &variables = at.variables();
-    const Block<Pass> block{at, name};
-    read<flags>(at);
-    readChunkLength(at);
-    if (at.live) {
+void congestionChunk(Reader<Pass> &reader, BlockName name) {
+    auto &variables = reader.variables();
+    const Block<Pass> block{reader, name};
+    read<flags>(reader);
+    readChunkLength(reader);
+    if (reader.live) {
         variables.parameterOctets = variables.chunkOctets - headOctets;
     }
-    if (at.test(variables.parameterOctets >= 1)) {
-        readRun<reserved>(at, variables.parameterOctets);
+    if (reader.test(variables.parameterOctets >= 1)) {
+        readRun<reserved>(reader, variables.parameterOctets);
     }
 }
 
 template <class Pass>
-void ecneChunk(Reader<Pass> &at) {
-    congestionChunk<ecneFlags, ecneReserved>(at, "ECNE");
+void ecneChunk(Reader<Pass> &reader) {
+    congestionChunk<ecneFlags, ecneReserved>(reader, "ECNE");
 }
 
 template <class Pass>
-void cwrChunk(Reader<Pass> &at) {
-    congestionChunk<cwrFlags, cwrReserved>(at, "CWR");
+void cwrChunk(Reader<Pass> &reader) {
+    congestionChunk<cwrFlags, cwrReserved>(reader, "CWR");
 }
 
 // `chunkOctets` stays without the head where there are contents: the walk takes four octets fewer than the Length.
 template <class Pass>
-void reservedChunk(Reader<Pass> &at) {
-    std::int32_t &chunkOctets = at.variables().chunkOctets;
-    const Block<Pass> block{at, "Reserved chunks"};
-    read<unknownFlags>(at);
-    readChunkLength(at);
-    if (!at.test(chunkOctets > headOctets)) {
+void reservedChunk(Reader<Pass> &reader) {
+    std::int32_t &chunkOctets = reader.variables().chunkOctets;
+    const Block<Pass> block{reader, "Reserved chunks"};
+    read<unknownFlags>(reader);
+    readChunkLength(reader);
+    if (!reader.test(chunkOctets > headOctets)) {
         return;
     }
-    if (at.live) {
+    if (reader.live) {
         chunkOctets -= headOctets;
     }
-    readRun<reservedContents>(at, chunkOctets);
+    readRun<reservedContents>(reader, chunkOctets);
 }
 
-} // namespace netfloor::sctp
+} // namespace netfloor::plugin::sctp

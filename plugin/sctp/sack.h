@@ -22,11 +22,11 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
-#include "frame/step.h"
+#include "frame/field_step.h"
 #include "sctp/chunk_head.h"
 #include "sctp/counted_list.h"
 
-namespace netfloor::sctp {
+namespace netfloor::plugin::sctp {
 
 // clang-format off
 inline constexpr Field sackFlags          = flagsField(873);
@@ -41,24 +41,24 @@ inline constexpr Field duplicateTsn       {883, "    Duplicate TSN",            
 // clang-format on
 
 template <class Pass>
-NETFLOOR_INLINE inline void sackChunk(Reader<Pass> &at) {
-    auto &variables = at.variables();
-    const Block<Pass> block{at, "Selective Acknowledgement"};
-    read<sackFlags>(at);
-    read<sackLength>(at, &variables.chunkOctets);
-    read<cumulativeTsnAck>(at);
-    read<sackReceiverWindow>(at);
-    read<gapBlockNumber>(at, &variables.gapBlockCount);
-    read<duplicateNumber>(at, &variables.duplicateTsnCount);
-    countedList(at, variables.gapBlockCount, [&at] {
-        const Block<Pass> gapBlock{at, "Gap Ack Block"};
-        read<gapBlockStart>(at);
-        read<gapBlockEnd>(at);
+NETFLOOR_INLINE inline void sackChunk(Reader<Pass> &reader) {
+    auto &variables = reader.variables();
+    const Block<Pass> block{reader, "Selective Acknowledgement"};
+    read<sackFlags>(reader);
+    read<sackLength>(reader, &variables.chunkOctets);
+    read<cumulativeTsnAck>(reader);
+    read<sackReceiverWindow>(reader);
+    read<gapBlockNumber>(reader, &variables.gapBlockCount);
+    read<duplicateNumber>(reader, &variables.duplicateTsnCount);
+    countedList(reader, variables.gapBlockCount, [&reader] {
+        const Block<Pass> gapBlock{reader, "Gap Ack Block"};
+        read<gapBlockStart>(reader);
+        read<gapBlockEnd>(reader);
     });
-    countedList(at, variables.duplicateTsnCount, [&at] {
-        const Block<Pass> duplicate{at, "Duplicate TSN"};
-        read<duplicateTsn>(at);
+    countedList(reader, variables.duplicateTsnCount, [&reader] {
+        const Block<Pass> duplicate{reader, "Duplicate TSN"};
+        read<duplicateTsn>(reader);
     });
 }
 
-} // namespace netfloor::sctp
+} // namespace netfloor::plugin::sctp

@@ -29,7 +29,7 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
-#include "frame/step.h"
+#include "frame/field_step.h"
 #include "sctp/abort_and_error.h"
 #include "sctp/cookie.h"
 #include "sctp/data.h"
@@ -39,7 +39,7 @@
 #include "sctp/sack.h"
 #include "sctp/shutdown.h"
 
-namespace netfloor::sctp {
+namespace netfloor::plugin::sctp {
 
 enum ChunkType : std::uint32_t {
     dataType = 0,
@@ -101,86 +101,86 @@ inline constexpr Field laterChunkType  {805, "SCTP  Chunk Type",             oct
 inline constexpr std::int32_t commonHeaderOctets = 12;
 
 template <class Pass>
-NETFLOOR_INLINE inline void commonHeader(Reader<Pass> &at) {
-    auto &variables = at.variables();
-    const Block<Pass> block{at, "Common Header"};
-    read<sourcePort>(at, &variables.sourcePort);
-    read<destinationPort>(at, &variables.destinationPort);
-    read<verificationTag>(at);
-    read<checksum>(at);
-    if (at.live) {
+NETFLOOR_INLINE inline void commonHeader(Reader<Pass> &reader) {
+    auto &variables = reader.variables();
+    const Block<Pass> block{reader, "Common Header"};
+    read<sourcePort>(reader, &variables.sourcePort);
+    read<destinationPort>(reader, &variables.destinationPort);
+    read<verificationTag>(reader);
+    read<checksum>(reader);
+    if (reader.live) {
         variables.payloadOctets -= commonHeaderOctets;
     }
 }
 
 template <class Pass>
-NETFLOOR_INLINE inline std::uint32_t readChunkType(Reader<Pass> &at) {
-    std::uint32_t &chunksSeen = at.variables().chunksSeen;
+NETFLOOR_INLINE inline std::uint32_t readChunkType(Reader<Pass> &reader) {
+    std::uint32_t &chunksSeen = reader.variables().chunksSeen;
     std::uint32_t type = 0;
-    if (at.test(chunksSeen == 0)) {
-        read<firstChunkType>(at, &type);
-        chunksSeen += at.live ? 1 : 0;
+    if (reader.test(chunksSeen == 0)) {
+        read<firstChunkType>(reader, &type);
+        chunksSeen += reader.live ? 1 : 0;
     } else {
-        read<laterChunkType>(at, &type);
+        read<laterChunkType>(reader, &type);
     }
     return type;
 }
 
 // What a busy association consists of, DATA and SACK, is read in line, the rest out of line.
 template <class Pass>
-NETFLOOR_INLINE inline void chunkBody(Reader<Pass> &at, std::uint32_t type) {
+NETFLOOR_INLINE inline void chunkBody(Reader<Pass> &reader, std::uint32_t type) {
     switch (type) {
-    case dataType: return dataChunk(at);
-    case initType: return apart<initChunk<Pass>>(at);
-    case initAckType: return apart<initAckChunk<Pass>>(at);
-    case sackType: return sackChunk(at);
-    case heartbeatType: return apart<heartbeatChunk<Pass>>(at);
-    case heartbeatAckType: return apart<heartbeatAckChunk<Pass>>(at);
-    case abortType: return apart<abortChunk<Pass>>(at);
-    case shutdownType: return apart<shutdownChunk<Pass>>(at);
-    case shutdownAckType: return apart<shutdownAckChunk<Pass>>(at);
-    case errorType: return apart<errorChunk<Pass>>(at);
-    case cookieEchoType: return apart<cookieEchoChunk<Pass>>(at);
-    case cookieAckType: return apart<cookieAckChunk<Pass>>(at);
-    case ecneType: return apart<ecneChunk<Pass>>(at);
-    case cwrType: return apart<cwrChunk<Pass>>(at);
-    case shutdownCompleteType: return apart<shutdownCompleteChunk<Pass>>(at);
-    default: return apart<reservedChunk<Pass>>(at);
+    case dataType: return dataChunk(reader);
+    case initType: return runOutOfLine<initChunk<Pass>>(reader);
+    case initAckType: return runOutOfLine<initAckChunk<Pass>>(reader);
+    case sackType: return sackChunk(reader);
+    case heartbeatType: return runOutOfLine<heartbeatChunk<Pass>>(reader);
+    case heartbeatAckType: return runOutOfLine<heartbeatAckChunk<Pass>>(reader);
+    case abortType: return runOutOfLine<abortChunk<Pass>>(reader);
+    case shutdownType: return runOutOfLine<shutdownChunk<Pass>>(reader);
+    case shutdownAckType: return runOutOfLine<shutdownAckChunk<Pass>>(reader);
+    case errorType: return runOutOfLine<errorChunk<Pass>>(reader);
+    case cookieEchoType: return runOutOfLine<cookieEchoChunk<Pass>>(reader);
+    case cookieAckType: return runOutOfLine<cookieAckChunk<Pass>>(reader);
+    case ecneType: return runOutOfLine<ecneChunk<Pass>>(reader);
+    case cwrType: return runOutOfLine<cwrChunk<Pass>>(reader);
+    case shutdownCompleteType: return runOutOfLine<shutdownCompleteChunk<Pass>>(reader);
+    default: return runOutOfLine<reservedChunk<Pass>>(reader);
     }
 }
 
 // Each round reads one Chunk Type octet at least, or ends the walk, whatever the Lengths say and whatever a next layer
 // that led back into this pass has left in the variables.
 template <class Pass>
-NETFLOOR_INLINE inline void chunks(Reader<Pass> &at) {
-    auto &variables = at.variables();
-    BlockChain<Pass> chain{at};
-    while (at.live) {
+NETFLOOR_INLINE inline void chunks(Reader<Pass> &reader) {
+    auto &variables = reader.variables();
+    BlockChain<Pass> chain{reader};
+    while (reader.live) {
         chain.open("Chunk list");
-        if (!at.test(variables.payloadOctets >= 1)) {
+        if (!reader.test(variables.payloadOctets >= 1)) {
             return;
         }
         chain.open("Chunk");
-        const std::uint32_t type = readChunkType(at);
-        if (at.live) {
-            chunkBody(at, type);
+        const std::uint32_t type = readChunkType(reader);
+        if (reader.live) {
+            chunkBody(reader, type);
         }
-        if (at.live) {
+        if (reader.live) {
             variables.payloadOctets -= variables.chunkOctets;
         }
     }
 }
 
 template <class Pass>
-void packet(Reader<Pass> &at) {
-    if (!at.live) {
+void packet(Reader<Pass> &reader) {
+    if (!reader.live) {
         return;
     }
-    auto &variables = at.variables();
-    const LimitedBlock<Pass> body{at, "SCTP Body", bitsOf(variables.payloadOctets)};
+    auto &variables = reader.variables();
+    const LimitedBlock<Pass> body{reader, "SCTP Body", bitsOf(variables.payloadOctets)};
     variables.chunksSeen = 0;
-    commonHeader(at);
-    chunks(at);
+    commonHeader(reader);
+    chunks(reader);
 }
 
-} // namespace netfloor::sctp
+} // namespace netfloor::plugin::sctp

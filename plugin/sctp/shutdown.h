@@ -20,10 +20,10 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
-#include "frame/step.h"
+#include "frame/field_step.h"
 #include "sctp/chunk_head.h"
 
-namespace netfloor::sctp {
+namespace netfloor::plugin::sctp {
 
 inline constexpr std::array completeTagRows = {ValueName{0, "Sender TCB destroyed"}, ValueName{1, "no sender TCB"}};
 inline constexpr ValueNames completeTagNames{completeTagRows};
@@ -42,26 +42,26 @@ inline constexpr Field completeLength           = lengthField(891);
 // clang-format on
 
 template <class Pass>
-void shutdownChunk(Reader<Pass> &at) {
-    const Block<Pass> block{at, "Shutdown"};
-    read<shutdownFlags>(at);
-    read<shutdownLength>(at, &at.variables().chunkOctets);
-    read<shutdownCumulativeTsnAck>(at);
+void shutdownChunk(Reader<Pass> &reader) {
+    const Block<Pass> block{reader, "Shutdown"};
+    read<shutdownFlags>(reader);
+    read<shutdownLength>(reader, &reader.variables().chunkOctets);
+    read<shutdownCumulativeTsnAck>(reader);
 }
 
 template <class Pass>
-void shutdownAckChunk(Reader<Pass> &at) {
-    const Block<Pass> block{at, "Shutdown Acknowledge"};
-    read<shutdownAckFlags>(at);
-    read<shutdownAckLength>(at, &at.variables().chunkOctets);
+void shutdownAckChunk(Reader<Pass> &reader) {
+    const Block<Pass> block{reader, "Shutdown Acknowledge"};
+    read<shutdownAckFlags>(reader);
+    read<shutdownAckLength>(reader, &reader.variables().chunkOctets);
 }
 
 template <class Pass>
-void shutdownCompleteChunk(Reader<Pass> &at) {
-    const Block<Pass> block{at, "Shutdown Complete"};
-    read<completeReserved>(at);
-    read<completeTagBit>(at);
-    read<completeLength>(at, &at.variables().chunkOctets);
+void shutdownCompleteChunk(Reader<Pass> &reader) {
+    const Block<Pass> block{reader, "Shutdown Complete"};
+    read<completeReserved>(reader);
+    read<completeTagBit>(reader);
+    read<completeLength>(reader, &reader.variables().chunkOctets);
 }
 
-} // namespace netfloor::sctp
+} // namespace netfloor::plugin::sctp

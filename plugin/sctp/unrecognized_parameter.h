@@ -5,10 +5,10 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
-#include "frame/step.h"
+#include "frame/field_step.h"
 #include "sctp/length.h"
 
-namespace netfloor::sctp {
+namespace netfloor::plugin::sctp {
 
 // clang-format off
 inline constexpr Field unrecognizedType   {863, "        Unrecoginzed Parameter Type", octets(2),  "        Unrecoginzed Parameter Type=%u"};
@@ -17,12 +17,12 @@ inline constexpr Field unrecognizedValue  {865, "                Value",        
 // clang-format on
 
 template <class Pass>
-void unrecognizedParameter(Reader<Pass> &at) {
-    std::int32_t &parameterOctets = at.variables().parameterOctets;
-    const Block<Pass> block{at, "Unrecogonized Parameters"};
-    read<unrecognizedType>(at);
-    read<unrecognizedLength>(at, octetsBehindHead(parameterOctets));
-    readRun<unrecognizedValue>(at, parameterOctets);
+void unrecognizedParameter(Reader<Pass> &reader) {
+    std::int32_t &parameterOctets = reader.variables().parameterOctets;
+    const Block<Pass> block{reader, "Unrecogonized Parameters"};
+    read<unrecognizedType>(reader);
+    read<unrecognizedLength>(reader, octetsAfterHead(parameterOctets));
+    readRun<unrecognizedValue>(reader, parameterOctets);
 }
 
-} // namespace netfloor::sctp
+} // namespace netfloor::plugin::sctp

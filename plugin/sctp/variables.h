@@ -5,7 +5,7 @@
 
 #include <cstdint>
 
-namespace netfloor::sctp {
+namespace netfloor::plugin::sctp {
 
 struct Variables {
     std::uint32_t chunksSeen;       // 1 once a Chunk Type was read
@@ -17,4 +17,4 @@ struct Variables {
     std::int32_t missingParameterCount; // of an error cause
 };
 
-} // namespace netfloor::sctp
+} // namespace netfloor::plugin::sctp

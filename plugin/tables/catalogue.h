@@ -13,11 +13,12 @@
 #include "icmp/message_type.h"
 #include "icmp/query_messages.h"
 #include "icmp/quoted_header.h"
+#include "ip/ipv6_address.h"
+#include "ip/unknown_data.h"
+#include "ip/version.h"
 #include "ipv4/header.h"
 #include "ipv4/options.h"
 #include "ipv4/service_and_fragment.h"
-#include "ipv4/unknown_data.h"
-#include "ipv6/address.h"
 #include "ipv6/extension_headers.h"
 #include "ipv6/header.h"
 #include "ipv6/options.h"
@@ -28,9 +29,8 @@
 #include "tunnels/gre.h"
 #include "tunnels/ip_in_ip.h"
 #include "tunnels/minimal_encapsulation.h"
-#include "version.h"
 
-namespace netfloor {
+namespace netfloor::plugin {
 
 inline constexpr std::array<const Field *, 381> catalogue = {
     // the IPv4 header
@@ -442,4 +442,4 @@ inline constexpr std::array<const Field *, 381> catalogue = {
     return field.id;
 }
 
-} // namespace netfloor
+} // namespace netfloor::plugin

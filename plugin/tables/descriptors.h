@@ -11,17 +11,17 @@
 
 #include "netfloor/descriptors.h"
 #include "tables/catalogue.h"
+#include "tables/display_strings.h"
+#include "tables/field_layouts.h"
 #include "tables/key_fields.h"
-#include "tables/layouts.h"
-#include "tables/texts.h"
 
-namespace netfloor {
+namespace netfloor::plugin {
 
 // These bear another mark than the rest in the highest octet of their flags. Hosts keep the mark; what it stands
 // for is not known.
-inline constexpr std::uint32_t usualMark = 5;
-inline constexpr std::uint32_t otherMark = 6;
-inline constexpr std::array<std::uint32_t, 16> otherMarked = {
+inline constexpr std::uint32_t usualTopOctet = 5;
+inline constexpr std::uint32_t otherTopOctet = 6;
+inline constexpr std::array<std::uint32_t, 16> fieldsOfOtherTopOctet = {
     tcp::reservedBesideDataOffset.id,
     tcp::dataOffset.id,
     tcp::reservedBesideFlags.id,
@@ -65,9 +65,9 @@ inline constexpr std::uint32_t widthHead = 0xffff0000;
 }
 
 [[nodiscard]] constexpr std::uint32_t flagsOf(const Field &field) {
-    const bool marked = std::ranges::find(otherMarked, field.id) != otherMarked.end();
+    const bool marked = std::ranges::find(fieldsOfOtherTopOctet, field.id) != fieldsOfOtherTopOctet.end();
     return sizeClass(field.place) | (isListedAddress(field) ? 3u : 0u) << 8 | (isKeyField(field) ? 1u : 0u) << 16 |
-           (marked ? otherMark : usualMark) << 24;
+           (marked ? otherTopOctet : usualTopOctet) << 24;
 }
 
 // The zero-terminated name without blanks behind. Where there are none it is the field's own literal.
@@ -194,4 +194,4 @@ static_assert(textTables.texts.count() == 824);
 static_assert(valuePool.size() == 371);
 static_assert(layoutTable.records == 44 && layoutTable.size == 1453);
 
-} // namespace netfloor
+} // namespace netfloor::plugin

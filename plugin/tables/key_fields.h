@@ -12,7 +12,7 @@
 #include "netfloor/records.h"
 #include "tables/catalogue.h"
 
-namespace netfloor {
+namespace netfloor::plugin {
 
 // The key fields, a row each, in the order in which the grammar comes to them.
 inline constexpr std::array<const Field *, 112> keySites = {
@@ -155,4 +155,4 @@ inline constinit std::array<KeyFieldRow, keyRowCount> keyRows = [] {
     return rows;
 }();
 
-} // namespace netfloor
+} // namespace netfloor::plugin

@@ -26,15 +26,15 @@
 #include <cstdint>
 
 #include "frame/block.h"
+#include "frame/checked_run.h"
 #include "frame/field.h"
-#include "frame/hand_off.h"
-#include "frame/step.h"
-#include "frame/stretch.h"
-#include "ipv4/carriage.h"
-#include "tables/port_names.h"
+#include "frame/field_step.h"
+#include "ip/hand_off.h"
+#include "ip/outer_protocol.h"
+#include "names/ports.h"
 #include "transport/tcp_options.h"
 
-namespace netfloor::tcp {
+namespace netfloor::plugin::tcp {
 
 // clang-format off
 inline constexpr Field sourcePort               {384, "TCP Source Port",        octetPair(),              "  TCP Source Port=%-S (%u)",      &portNames, "TCP - %-s (%u)"};
@@ -70,42 +70,42 @@ inline constexpr std::uint32_t bitsPerWord = 32;
 
 // The fields that stand in the limited block.
 template <class Pass>
-NETFLOOR_INLINE inline void fromDataOffset(Reader<Pass> &at) {
-    read<dataOffset>(at);
-    read<reservedBesideFlags>(at);
-    read<urgent>(at);
-    read<acknowledgement>(at);
-    read<push>(at);
-    read<reset>(at);
-    read<synchronize>(at);
-    read<finish>(at);
-    read<windowSize>(at);
-    read<checksum>(at);
-    read<urgentPointer>(at);
+NETFLOOR_INLINE inline void fieldsFromDataOffset(Reader<Pass> &reader) {
+    read<dataOffset>(reader);
+    read<reservedBesideFlags>(reader);
+    read<urgent>(reader);
+    read<acknowledgement>(reader);
+    read<push>(reader);
+    read<reset>(reader);
+    read<synchronize>(reader);
+    read<finish>(reader);
+    read<windowSize>(reader);
+    read<checksum>(reader);
+    read<urgentPointer>(reader);
 }
 
 // Reads the header from the Data Offset on and gives its length in octets. A Data Offset of 3 or 4 has no room for the
 // fixed header: the header then counts for as many octets, not words, and what is behind its block for payload.
 template <class Pass>
-NETFLOOR_INLINE inline std::int32_t limitedPart(Reader<Pass> &at) {
-    LimitedBlock<Pass> block{at, "INLINE BLOCK"};
-    const std::uint32_t words = look(at, dataOffset.place).value_or(0);
+NETFLOOR_INLINE inline std::int32_t limitedPart(Reader<Pass> &reader) {
+    LimitedBlock<Pass> block{reader, "INLINE BLOCK"};
+    const std::uint32_t words = peek(reader, dataOffset.place).value_or(0);
     // Below three words this wraps to a huge number, which is more than any packet holds.
     block.limit((words - wordsBeforeLimit) * bitsPerWord);
-    stretch<64, fromDataOffset<Pass>>(at);
-    if (!at.live) {
+    stretch<64, fieldsFromDataOffset<Pass>>(reader);
+    if (!reader.live) {
         return static_cast<std::int32_t>(words);
     }
     const auto headerOctets = static_cast<std::int32_t>(words * bitsPerWord / bitsPerOctet);
-    at.variables().tcpOptions.octets = headerOctets - fixedHeaderOctets;
-    apart<options<Pass>>(at);
+    reader.variables().tcpOptions.octets = headerOctets - fixedHeaderOctets;
+    runOutOfLine<options<Pass>>(reader);
     return headerOctets;
 }
 
 // Takes the header off the payload. Once one was longer than its payload, no later one of the packet is taken off.
 template <class Pass>
-NETFLOOR_INLINE inline void accountFor(Reader<Pass> &at, std::int32_t headerOctets) {
-    auto &variables = at.variables();
+NETFLOOR_INLINE inline void accountFor(Reader<Pass> &reader, std::int32_t headerOctets) {
+    auto &variables = reader.variables();
     if (variables.payloadOctets < headerOctets) {
         variables.tcpLengthShort = 1;
         variables.payloadOctets = 0;
@@ -116,33 +116,34 @@ NETFLOOR_INLINE inline void accountFor(Reader<Pass> &at, std::int32_t headerOcte
 }
 
 template <class Pass>
-NETFLOOR_INLINE inline void upToDataOffset(Reader<Pass> &at) {
-    auto &variables = at.variables();
-    read<sourcePort>(at, &variables.sourcePort);
-    readByCarriage<destinationPortIpInIp, destinationPortMinimal, destinationPort>(at, &variables.destinationPort);
-    read<sequenceNumber>(at);
-    read<acknowledgementNumber>(at);
-    read<reservedBesideDataOffset>(at);
+NETFLOOR_INLINE inline void fieldsUpToDataOffset(Reader<Pass> &reader) {
+    auto &variables = reader.variables();
+    read<sourcePort>(reader, &variables.sourcePort);
+    readByOuterProtocol<destinationPortIpInIp, destinationPortMinimal, destinationPort>(reader,
+                                                                                        &variables.destinationPort);
+    read<sequenceNumber>(reader);
+    read<acknowledgementNumber>(reader);
+    read<reservedBesideDataOffset>(reader);
 }
 
 template <class Pass>
-NETFLOOR_INLINE inline void segment(Reader<Pass> &at) {
-    if (!at.live) {
+NETFLOOR_INLINE inline void segment(Reader<Pass> &reader) {
+    if (!reader.live) {
         return;
     }
-    const Block<Pass> header{at, "Transmission Control Protocol"};
-    stretch<100, upToDataOffset<Pass>>(at);
-    if (!at.live) {
+    const Block<Pass> header{reader, "Transmission Control Protocol"};
+    stretch<100, fieldsUpToDataOffset<Pass>>(reader);
+    if (!reader.live) {
         return;
     }
-    const std::int32_t headerOctets = limitedPart(at);
-    if (at.live) {
-        accountFor(at, headerOctets);
-        tellNextLayer(at);
+    const std::int32_t headerOctets = limitedPart(reader);
+    if (reader.live) {
+        accountFor(reader, headerOctets);
+        tellNextLayer(reader);
     }
-    if (at.left > handOffAbove) {
-        handOff(at);
+    if (reader.left > handOffAbove) {
+        handOff(reader);
     }
 }
 
-} // namespace netfloor::tcp
+} // namespace netfloor::plugin::tcp

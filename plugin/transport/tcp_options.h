@@ -20,12 +20,12 @@
 #include <cstdint>
 
 #include "frame/block.h"
+#include "frame/checked_run.h"
 #include "frame/field.h"
-#include "frame/options.h"
-#include "frame/step.h"
-#include "frame/stretch.h"
+#include "frame/field_step.h"
+#include "ip/option_list.h"
 
-namespace netfloor::tcp {
+namespace netfloor::plugin::tcp {
 
 // clang-format off
 inline constexpr Field endOfList         {441, "TCP Option Kind=0 (End of Option List)", octets(1),                  "TCP Option Kind=0 (End of Option List)=%x"};
@@ -74,81 +74,81 @@ struct OptionVariables {
 };
 
 template <class Pass>
-NETFLOOR_INLINE inline void maximumSegmentOption(Reader<Pass> &at, OptionArea &area) {
-    const OptionBlock<Pass> option{at, ""};
-    optionHead<maximumSegment, maximumLength>(at, area, maximumSegmentOctets);
-    read<maximumSize>(at);
+NETFLOOR_INLINE inline void maximumSegmentOption(Reader<Pass> &reader, OptionArea &area) {
+    const OptionBlock<Pass> option{reader, ""};
+    optionHead<maximumSegment, maximumLength>(reader, area, maximumSegmentOctets);
+    read<maximumSize>(reader);
 }
 
 template <class Pass>
-NETFLOOR_INLINE inline void windowScaleOption(Reader<Pass> &at, OptionArea &area) {
-    const OptionBlock<Pass> option{at, ""};
-    optionHead<windowScale, windowScaleLength>(at, area, windowScaleOctets);
-    read<shiftCount>(at);
+NETFLOOR_INLINE inline void windowScaleOption(Reader<Pass> &reader, OptionArea &area) {
+    const OptionBlock<Pass> option{reader, ""};
+    optionHead<windowScale, windowScaleLength>(reader, area, windowScaleOctets);
+    read<shiftCount>(reader);
 }
 
 template <class Pass>
-NETFLOOR_INLINE inline void sackPermittedOption(Reader<Pass> &at, OptionArea &area) {
-    const OptionBlock<Pass> option{at, ""};
-    optionHead<sackPermitted, permittedLength>(at, area, sackPermittedOctets);
+NETFLOOR_INLINE inline void sackPermittedOption(Reader<Pass> &reader, OptionArea &area) {
+    const OptionBlock<Pass> option{reader, ""};
+    optionHead<sackPermitted, permittedLength>(reader, area, sackPermittedOctets);
 }
 
 // The limit ends the blocks: the first edge that does not fit in.
 template <class Pass>
-NETFLOOR_INLINE inline void sackOption(Reader<Pass> &at, OptionArea &area) {
-    const OptionBlock<Pass> option{at, ""};
-    optionHead<sack, sackLength>(at, area);
-    while (at.live) {
-        const Block<Pass> edges{at, ""};
-        read<leftEdge>(at);
-        read<rightEdge>(at);
+NETFLOOR_INLINE inline void sackOption(Reader<Pass> &reader, OptionArea &area) {
+    const OptionBlock<Pass> option{reader, ""};
+    optionHead<sack, sackLength>(reader, area);
+    while (reader.live) {
+        const Block<Pass> edges{reader, ""};
+        read<leftEdge>(reader);
+        read<rightEdge>(reader);
     }
 }
 
 // The production of a stretch gets the reader alone.
 template <class Pass>
-NETFLOOR_INLINE inline void timestampsFields(Reader<Pass> &at) {
-    optionHead<timestamps, timestampsLength>(at, at.variables().tcpOptions, timestampsOctets);
-    read<timestampValue>(at);
-    read<timestampEcho>(at);
+NETFLOOR_INLINE inline void timestampsFields(Reader<Pass> &reader) {
+    optionHead<timestamps, timestampsLength>(reader, reader.variables().tcpOptions, timestampsOctets);
+    read<timestampValue>(reader);
+    read<timestampEcho>(reader);
 }
 
 // The one option that nearly every segment carries.
 template <class Pass>
-NETFLOOR_INLINE inline void timestampsOption(Reader<Pass> &at) {
-    const OptionBlock<Pass> option{at, ""};
-    stretch<timestampsOctets * bitsPerOctet, timestampsFields<Pass>>(at);
+NETFLOOR_INLINE inline void timestampsOption(Reader<Pass> &reader) {
+    const OptionBlock<Pass> option{reader, ""};
+    stretch<timestampsOctets * bitsPerOctet, timestampsFields<Pass>>(reader);
 }
 
 // The digest is what the length leaves, and one octet at least, so that it is cut short where nothing is left.
 template <class Pass>
-NETFLOOR_INLINE inline void md5SignatureOption(Reader<Pass> &at, OptionArea &area) {
-    const OptionBlock<Pass> option{at, ""};
-    optionHead<md5Signature, md5Length>(at, area);
-    const std::uint32_t digestOctets = std::clamp(at.left / bitsPerOctet, 1U, md5Digest.place.mostUnits);
-    readRun<md5Digest>(at, static_cast<std::int32_t>(digestOctets));
+NETFLOOR_INLINE inline void md5SignatureOption(Reader<Pass> &reader, OptionArea &area) {
+    const OptionBlock<Pass> option{reader, ""};
+    optionHead<md5Signature, md5Length>(reader, area);
+    const std::uint32_t digestOctets = std::clamp(reader.left / bitsPerOctet, 1U, md5Digest.place.mostUnits);
+    readRun<md5Digest>(reader, static_cast<std::int32_t>(digestOctets));
 }
 
 // Takes the option under the cursor, which is of a known kind.
 template <class Pass>
-NETFLOOR_INLINE inline void option(Reader<Pass> &at, std::uint8_t kind, OptionArea &area) {
+NETFLOOR_INLINE inline void option(Reader<Pass> &reader, std::uint8_t kind, OptionArea &area) {
     switch (kind) {
-    case 0: return optionOfOneOctet<endOfList>(at, "", area);
-    case 1: return optionOfOneOctet<noOperation>(at, "", area);
-    case 2: return maximumSegmentOption(at, area);
-    case 3: return windowScaleOption(at, area);
-    case 4: return sackPermittedOption(at, area);
-    case 5: return sackOption(at, area);
-    case 8: return timestampsOption(at);
-    default: return md5SignatureOption(at, area);
+    case 0: return optionOfOneOctet<endOfList>(reader, "", area);
+    case 1: return optionOfOneOctet<noOperation>(reader, "", area);
+    case 2: return maximumSegmentOption(reader, area);
+    case 3: return windowScaleOption(reader, area);
+    case 4: return sackPermittedOption(reader, area);
+    case 5: return sackOption(reader, area);
+    case 8: return timestampsOption(reader);
+    default: return md5SignatureOption(reader, area);
     }
 }
 
 template <class Pass>
-NETFLOOR_INLINE inline void padding(Reader<Pass> &at, OptionArea &area) {
-    const Block<Pass> block{at, "Padding"};
-    readRun<optionPadding>(at, area.octets);
-    if (at.live) {
+NETFLOOR_INLINE inline void padding(Reader<Pass> &reader, OptionArea &area) {
+    const Block<Pass> block{reader, "Padding"};
+    readRun<optionPadding>(reader, area.octets);
+    if (reader.live) {
         area.octets = 0;
     }
 }
@@ -156,44 +156,44 @@ NETFLOOR_INLINE inline void padding(Reader<Pass> &at, OptionArea &area) {
 // One turn for each kind, in order; once the area is used up none takes an option any more. A round in which none did
 // ends the list with padding.
 template <class Pass>
-NETFLOOR_INLINE inline void optionRound(Reader<Pass> &at, OptionArea &area) {
+NETFLOOR_INLINE inline void optionRound(Reader<Pass> &reader, OptionArea &area) {
     area.taken = false;
-    for (std::size_t turn = 0; at.live && turn < optionKinds.size(); ++turn) {
-        std::size_t taker = nextTaker<optionKinds>(at, turn);
+    for (std::size_t turn = 0; reader.live && turn < optionKinds.size(); ++turn) {
+        std::size_t taker = nextTaker<optionKinds>(reader, turn);
         if (area.octets < 1) {
             taker = optionKinds.size();
         }
         if (taker != turn) {
-            at.mark(Mark::expectation);
+            reader.raise(Flag::expectation);
         }
         turn = taker;
         if (turn < optionKinds.size()) {
-            option(at, optionKinds[turn], area);
+            option(reader, optionKinds[turn], area);
         }
     }
-    if (!at.live) {
+    if (!reader.live) {
         return;
     }
     if (!area.taken && area.octets >= 1) {
-        padding(at, area);
+        padding(reader, area);
     } else {
-        at.mark(Mark::expectation);
+        reader.raise(Flag::expectation);
     }
 }
 
 // The options stand in the block that the Data Offset limits, and their live flag is that block's: an option that
 // reaches past the header ends the list, but not the segment, whose payload starts where the Data Offset says.
 template <class Pass>
-NETFLOOR_INLINE inline void options(Reader<Pass> &at) {
-    if (!at.live) {
+NETFLOOR_INLINE inline void options(Reader<Pass> &reader) {
+    if (!reader.live) {
         return;
     }
-    OptionArea &area = at.variables().tcpOptions;
-    BlockChain<Pass> rounds{at};
+    OptionArea &area = reader.variables().tcpOptions;
+    BlockChain<Pass> rounds{reader};
     do {
         rounds.open("options");
-        optionRound(at, area);
-    } while (at.live && area.octets >= 1);
+        optionRound(reader, area);
+    } while (reader.live && area.octets >= 1);
 }
 
-} // namespace netfloor::tcp
+} // namespace netfloor::plugin::tcp

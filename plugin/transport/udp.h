@@ -13,14 +13,14 @@
 #pragma once
 
 #include "frame/block.h"
+#include "frame/checked_run.h"
 #include "frame/field.h"
-#include "frame/hand_off.h"
-#include "frame/step.h"
-#include "frame/stretch.h"
-#include "ipv4/carriage.h"
-#include "tables/port_names.h"
+#include "frame/field_step.h"
+#include "ip/hand_off.h"
+#include "ip/outer_protocol.h"
+#include "names/ports.h"
 
-namespace netfloor::udp {
+namespace netfloor::plugin::udp {
 
 // clang-format off
 inline constexpr Field sourcePort             {479, "UDP Source Port",      octetPair(), "  UDP Source Port=%-S (%u)",      &portNames, "UDP - %-s (%u)"};
@@ -38,36 +38,37 @@ inline constexpr std::int32_t headerOctets = 8;
 }
 
 template <class Pass>
-NETFLOOR_INLINE inline void headerAndPayload(Reader<Pass> &at) {
-    if (!at.live) {
+NETFLOOR_INLINE inline void headerAndPayload(Reader<Pass> &reader) {
+    if (!reader.live) {
         return;
     }
-    auto &variables = at.variables();
-    const Block<Pass> header{at, "User Datagram Protocol"};
-    read<sourcePort>(at, &variables.sourcePort);
-    readByCarriage<destinationPortIpInIp, destinationPortMinimal, destinationPort>(at, &variables.destinationPort);
-    if (!at.live) {
+    auto &variables = reader.variables();
+    const Block<Pass> header{reader, "User Datagram Protocol"};
+    read<sourcePort>(reader, &variables.sourcePort);
+    readByOuterProtocol<destinationPortIpInIp, destinationPortMinimal, destinationPort>(reader,
+                                                                                        &variables.destinationPort);
+    if (!reader.live) {
         return;
     }
-    const Block<Pass> rest{at, ""};
-    read<length>(at);
-    read<checksum>(at);
-    if (at.live) {
+    const Block<Pass> rest{reader, ""};
+    read<length>(reader);
+    read<checksum>(reader);
+    if (reader.live) {
         variables.payloadOctets -= headerOctets;
         // A server's reply goes to the next layer under the server's port.
         if (isRadius(variables.sourcePort)) {
             variables.destinationPort = variables.sourcePort;
         }
-        tellNextLayer(at);
+        tellNextLayer(reader);
     }
-    if (at.left > handOffAbove) {
-        handOff(at);
+    if (reader.left > handOffAbove) {
+        handOff(reader);
     }
 }
 
 template <class Pass>
-NETFLOOR_INLINE inline void datagram(Reader<Pass> &at) {
-    stretch<64, headerAndPayload<Pass>>(at);
+NETFLOOR_INLINE inline void datagram(Reader<Pass> &reader) {
+    stretch<64, headerAndPayload<Pass>>(reader);
 }
 
-} // namespace netfloor::udp
+} // namespace netfloor::plugin::udp

@@ -21,9 +21,9 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
-#include "frame/step.h"
+#include "frame/field_step.h"
 
-namespace netfloor::gre {
+namespace netfloor::plugin::gre {
 
 inline constexpr std::array presenceRows = {ValueName{0, "Not Present"}, ValueName{1, "Present"}};
 inline constexpr std::array carriedProtocolRows = {
@@ -81,88 +81,88 @@ inline constexpr std::uint32_t hdlcFlag = 0x7e;
 
 // Takes octets that were read off the payload.
 template <class Pass>
-NETFLOOR_INLINE inline void account(const Reader<Pass> &at, std::int32_t octetCount) {
-    if (at.live) {
-        at.variables().payloadOctets -= octetCount;
+NETFLOOR_INLINE inline void account(const Reader<Pass> &reader, std::int32_t octetCount) {
+    if (reader.live) {
+        reader.variables().payloadOctets -= octetCount;
     }
 }
 
 template <class Pass>
-NETFLOOR_INLINE inline void header(Reader<Pass> &at) {
+NETFLOOR_INLINE inline void header(Reader<Pass> &reader) {
     std::uint32_t greChecksumPresent = 0;
     std::uint32_t greKeyPresent = 0;
     std::uint32_t greSequencePresent = 0;
-    read<checksumPresent>(at, &greChecksumPresent);
-    read<unusedBit>(at);
-    read<keyPresent>(at, &greKeyPresent);
-    read<sequencePresent>(at, &greSequencePresent);
-    read<reserved0>(at);
-    read<version>(at);
-    read<protocol>(at);
-    account(at, partOctets);
+    read<checksumPresent>(reader, &greChecksumPresent);
+    read<unusedBit>(reader);
+    read<keyPresent>(reader, &greKeyPresent);
+    read<sequencePresent>(reader, &greSequencePresent);
+    read<reserved0>(reader);
+    read<version>(reader);
+    read<protocol>(reader);
+    account(reader, partOctets);
     if (greChecksumPresent == 1) {
-        read<checksum>(at);
-        read<reserved1>(at);
-        account(at, partOctets);
+        read<checksum>(reader);
+        read<reserved1>(reader);
+        account(reader, partOctets);
     }
     if (greKeyPresent == 1) {
-        read<key>(at);
-        account(at, partOctets);
+        read<key>(reader);
+        account(reader, partOctets);
     }
     if (greSequencePresent == 1) {
-        read<sequence>(at);
-        account(at, partOctets);
+        read<sequence>(reader);
+        account(reader, partOctets);
     }
 }
 
 template <class Pass>
-NETFLOOR_INLINE inline bool flagAhead(Reader<Pass> &at) {
-    return look(at, octets(1)) == hdlcFlag;
+NETFLOOR_INLINE inline bool flagAhead(Reader<Pass> &reader) {
+    return peek(reader, octets(1)) == hdlcFlag;
 }
 
 // The frame from its opening flag on, which stands under the cursor. A frame that the payload ends before its closing
 // flag just stops; one that the packet ends is a fault.
 template <class Pass>
-NETFLOOR_INLINE inline void frame(Reader<Pass> &at) {
-    const auto &variables = at.variables();
-    const Block<Pass> block{at, "HDLC Data"};
-    read<openingFlag>(at);
-    account(at, 1);
-    while (at.live && at.left >= bitsPerOctet && !flagAhead(at) && variables.payloadOctets >= 1) {
-        const Block<Pass> octet{at, "INLINE BLOCK"};
-        read<framePayload>(at);
-        account(at, 1);
+NETFLOOR_INLINE inline void frame(Reader<Pass> &reader) {
+    const auto &variables = reader.variables();
+    const Block<Pass> block{reader, "HDLC Data"};
+    read<openingFlag>(reader);
+    account(reader, 1);
+    while (reader.live && reader.left >= bitsPerOctet && !flagAhead(reader) && variables.payloadOctets >= 1) {
+        const Block<Pass> octet{reader, "INLINE BLOCK"};
+        read<framePayload>(reader);
+        account(reader, 1);
     }
-    if (!at.live || variables.payloadOctets < 1) {
+    if (!reader.live || variables.payloadOctets < 1) {
         return;
     }
-    if (!flagAhead(at)) {
-        return at.mark(Mark::expectation);
+    if (!flagAhead(reader)) {
+        return reader.raise(Flag::expectation);
     }
-    const Block<Pass> octet{at, "INLINE BLOCK"};
-    read<closingFlag>(at);
-    account(at, 1);
+    const Block<Pass> octet{reader, "INLINE BLOCK"};
+    read<closingFlag>(reader);
+    account(reader, 1);
 }
 
 template <class Pass>
-NETFLOOR_INLINE inline void packet(Reader<Pass> &at) {
-    if (!at.live) {
+NETFLOOR_INLINE inline void packet(Reader<Pass> &reader) {
+    if (!reader.live) {
         return;
     }
-    const auto &variables = at.variables();
-    const Block<Pass> block{at, "Generic Routing Encapsulation"};
-    header(at);
-    if (at.live) {
-        if (flagAhead(at)) {
-            frame(at);
+    const auto &variables = reader.variables();
+    const Block<Pass> block{reader, "Generic Routing Encapsulation"};
+    header(reader);
+    if (reader.live) {
+        if (flagAhead(reader)) {
+            frame(reader);
         } else {
-            at.mark(Mark::expectation);
+            reader.raise(Flag::expectation);
         }
     }
     const std::int32_t payloadOctets = variables.payloadOctets;
-    if (payloadOctets > 0 && readRepeated<payload>(at, payloadOctets) != payloadOctets) {
-        at.mark(Mark::count);
+    if (payloadOctets > 0 && readRepeated<payload>(reader, payloadOctets) != payloadOctets) {
+        reader.raise(Flag::count);
     }
 }
 
-} // namespace netfloor::gre
+} // namespace netfloor::plugin::gre

@@ -23,12 +23,12 @@
 #include <cstdint>
 
 #include "frame/field.h"
-#include "frame/step.h"
+#include "frame/field_step.h"
 #include "ipv4/options.h"
 #include "ipv4/service_and_fragment.h"
-#include "tables/protocol_numbers.h"
+#include "names/ip_protocols.h"
 
-namespace netfloor::ipinip {
+namespace netfloor::plugin::ipinip {
 
 // clang-format off
 inline constexpr Field version            {629, "Version",                         piece(4, 7),              "Version=%u"};
@@ -43,23 +43,23 @@ inline constexpr Field destinationAddress {637, "Original Dest Address",        
 // clang-format on
 
 template <class Pass>
-NETFLOOR_INLINE inline void header(Reader<Pass> &at) {
-    auto &variables = at.variables();
-    read<version>(at);
-    read<headerLength>(at, [&](std::uint32_t words) { variables.ipHeaderOctets = words * 4; });
-    ipv4::typeOfService(at);
-    read<totalLength>(at, &variables.ipTotalLength);
-    read<identification>(at);
-    ipv4::flagAndFragmentOffset(at);
-    read<timeToLive>(at);
-    read<protocol>(at, &variables.ipProtocol);
-    read<headerChecksum>(at);
-    read<sourceAddress>(at);
-    read<destinationAddress>(at);
-    ipv4::options(at);
-    if (at.live) {
+NETFLOOR_INLINE inline void header(Reader<Pass> &reader) {
+    auto &variables = reader.variables();
+    read<version>(reader);
+    read<headerLength>(reader, [&](std::uint32_t words) { variables.ipHeaderOctets = words * 4; });
+    ipv4::typeOfService(reader);
+    read<totalLength>(reader, &variables.ipTotalLength);
+    read<identification>(reader);
+    ipv4::flagAndFragmentOffset(reader);
+    read<timeToLive>(reader);
+    read<protocol>(reader, &variables.ipProtocol);
+    read<headerChecksum>(reader);
+    read<sourceAddress>(reader);
+    read<destinationAddress>(reader);
+    ipv4::options(reader);
+    if (reader.live) {
         variables.payloadOctets = static_cast<std::int32_t>(variables.ipTotalLength - variables.ipHeaderOctets);
     }
 }
 
-} // namespace netfloor::ipinip
+} // namespace netfloor::plugin::ipinip

@@ -18,10 +18,10 @@
 #include <cstdint>
 
 #include "frame/field.h"
-#include "frame/step.h"
-#include "tables/protocol_numbers.h"
+#include "frame/field_step.h"
+#include "names/ip_protocols.h"
 
-namespace netfloor::minimal {
+namespace netfloor::plugin::minimal {
 
 inline constexpr std::array sourcePresentRows = {
     ValueName{0, "Original Source Address NOT Present"},
@@ -43,26 +43,26 @@ inline constexpr std::uint32_t headerOctets = 8;
 inline constexpr std::uint32_t sourceAddressOctets = 4;
 
 template <class Pass>
-NETFLOOR_INLINE inline void header(Reader<Pass> &at) {
-    auto &variables = at.variables();
+NETFLOOR_INLINE inline void header(Reader<Pass> &reader) {
+    auto &variables = reader.variables();
     std::uint32_t minimalSourcePresent = 0;
-    read<protocol>(at, &variables.ipProtocol);
-    read<reserved>(at);
-    read<sourcePresent>(at, &minimalSourcePresent);
-    read<headerChecksum>(at);
-    read<destinationAddress>(at);
-    if (!at.live) {
+    read<protocol>(reader, &variables.ipProtocol);
+    read<reserved>(reader);
+    read<sourcePresent>(reader, &minimalSourcePresent);
+    read<headerChecksum>(reader);
+    read<destinationAddress>(reader);
+    if (!reader.live) {
         return;
     }
     variables.ipTotalLength -= headerOctets;
     if (minimalSourcePresent == 1) {
         variables.ipTotalLength -= sourceAddressOctets;
-        read<sourceAddress>(at);
+        read<sourceAddress>(reader);
     }
     // The options of the header around it stand in front of the forwarding header: what follows here is the payload.
-    if (at.live) {
+    if (reader.live) {
         variables.payloadOctets = static_cast<std::int32_t>(variables.ipTotalLength - variables.ipHeaderOctets);
     }
 }
 
-} // namespace netfloor::minimal
+} // namespace netfloor::plugin::minimal

@@ -18,7 +18,7 @@ std::string line(std::uint32_t id, std::string_view name, std::string_view displ
 // The output.
 std::string listOfFields() {
     std::string list;
-    for (const Field *const field : catalogue) {
+    for (const plugin::Field *const field : plugin::catalogue) {
         list += line(field->id, field->bareName(), field->line);
     }
     return list;

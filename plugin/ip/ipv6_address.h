@@ -5,9 +5,9 @@
 #include "frame/bit_order.h"
 #include "frame/block.h"
 #include "frame/field.h"
-#include "frame/step.h"
+#include "frame/field_step.h"
 
-namespace netfloor::ipv6 {
+namespace netfloor::plugin::ipv6 {
 
 // clang-format off
 inline constexpr Field listedAddress {856, "        IP Address", addressReversed(), R"(        IP Address=%-["%x":":"])"};
@@ -17,25 +17,25 @@ inline constexpr Field addressKey    {950, "IP Address",         addressNibbles(
 
 // An address is read twice: `shown` gives its text, and `key` what the key record keeps.
 template <const Field &shown, const Field &key, class Pass>
-NETFLOOR_INLINE inline void addressReadTwice(Reader<Pass> &at) {
-    if (!at.live) {
+NETFLOOR_INLINE inline void addressReadTwice(Reader<Pass> &reader) {
+    if (!reader.live) {
         return;
     }
-    const Block<Pass> block{at, "IP Address"};
-    read<shown>(at);
-    stepBack(at, addressBits);
-    read<key>(at);
+    const Block<Pass> block{reader, "IP Address"};
+    read<shown>(reader);
+    stepBack(reader, addressBits);
+    read<key>(reader);
 }
 
 // An address read with the bits of each octet reversed, twice over, so that its groups show in network order.
 template <class Pass>
-void reversedAddress(Reader<Pass> &at, typename ReversedBits<Pass>::Report report) {
-    if (!at.live) {
+void reversedAddress(Reader<Pass> &reader, typename ReversedBits<Pass>::Report report) {
+    if (!reader.live) {
         return;
     }
-    const ReversedBits<Pass> reversed{at, report};
-    const Block<Pass> block{at, "IPv6 Address"};
-    read<listedAddress>(at);
+    const ReversedBits<Pass> reversed{reader, report};
+    const Block<Pass> block{reader, "IPv6 Address"};
+    read<listedAddress>(reader);
 }
 
-} // namespace netfloor::ipv6
+} // namespace netfloor::plugin::ipv6

@@ -17,9 +17,9 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
-#include "frame/step.h"
+#include "frame/field_step.h"
 
-namespace netfloor {
+namespace netfloor::plugin {
 
 // The octets in which the options stand.
 struct OptionArea {
@@ -48,8 +48,8 @@ inline constexpr auto turnOf = turnsOf(types);
 
 // Looks whose turn, from `turn` on, takes the option under the cursor: types.size() where none does.
 template <const auto &types, class Pass>
-[[nodiscard]] NETFLOOR_INLINE inline std::size_t nextTaker(Reader<Pass> &at, std::size_t turn) {
-    const std::optional<std::uint32_t> type = look(at, octets(1));
+[[nodiscard]] NETFLOOR_INLINE inline std::size_t nextTaker(Reader<Pass> &reader, std::size_t turn) {
+    const std::optional<std::uint32_t> type = peek(reader, octets(1));
     if (!type || turnOf<types>[*type] < turn) {
         return types.size();
     }
@@ -58,10 +58,10 @@ template <const auto &types, class Pass>
 
 // An option of one octet.
 template <const Field &type, class Pass>
-NETFLOOR_INLINE inline void optionOfOneOctet(Reader<Pass> &at, BlockName name, OptionArea &area) {
-    const Block<Pass> option{at, name};
-    read<type>(at);
-    if (at.live) {
+NETFLOOR_INLINE inline void optionOfOneOctet(Reader<Pass> &reader, BlockName name, OptionArea &area) {
+    const Block<Pass> option{reader, name};
+    read<type>(reader);
+    if (reader.live) {
         area.take(1);
     }
 }
@@ -71,29 +71,29 @@ template <class Pass>
 class [[nodiscard]] OptionBlock : public LimitedBlock<Pass> {
 public:
     NETFLOOR_INLINE OptionBlock(Reader<Pass> &reader, BlockName name) : LimitedBlock<Pass>(reader, name) {
-        this->limit(look(reader, piece(8, 15)).value_or(0) * bitsPerOctet);
+        this->limit(peek(reader, piece(8, 15)).value_or(0) * bitsPerOctet);
     }
 };
 
 // Reads the type and the length of an option, which counts for as many octets as its length says.
 template <const Field &type, const Field &length, class Pass>
-NETFLOOR_INLINE inline void optionHead(Reader<Pass> &at, OptionArea &area) {
-    read<type>(at);
+NETFLOOR_INLINE inline void optionHead(Reader<Pass> &reader, OptionArea &area) {
+    read<type>(reader);
     std::int32_t lengthOctets = 0;
-    read<length>(at, &lengthOctets);
-    if (at.live) {
+    read<length>(reader, &lengthOctets);
+    if (reader.live) {
         area.take(lengthOctets);
     }
 }
 
 // The same for an option that counts for a fixed number of octets, whatever its length says.
 template <const Field &type, const Field &length, class Pass>
-NETFLOOR_INLINE inline void optionHead(Reader<Pass> &at, OptionArea &area, std::int32_t countedOctets) {
-    read<type>(at);
-    read<length>(at);
-    if (at.live) {
+NETFLOOR_INLINE inline void optionHead(Reader<Pass> &reader, OptionArea &area, std::int32_t countedOctets) {
+    read<type>(reader);
+    read<length>(reader);
+    if (reader.live) {
         area.take(countedOctets);
     }
 }
 
-} // namespace netfloor
+} // namespace netfloor::plugin

@@ -10,11 +10,11 @@
 #include <cstring>
 #include <type_traits>
 
-#include "frame/line.h"
 #include "frame/reader.h"
+#include "frame/text_line.h"
 #include "netfloor/host.h"
 
-namespace netfloor {
+namespace netfloor::plugin {
 
 inline constexpr std::int32_t faultyVerdict = -52;
 
@@ -49,7 +49,7 @@ struct PreDecodePass {
     static inline constinit LastRead last{};
     static inline constinit std::uint32_t savedDecoderId = 0;
 
-    static constexpr bool raises(Mark found) { return mode == NETFLOOR_MODE_MV || found == Mark::expectation; }
+    static constexpr bool raises(Flag flag) { return mode == NETFLOOR_MODE_MV || flag == Flag::expectation; }
 
     static void giveVerdict(PreDecodeContext &context) {
         if constexpr (mode == NETFLOOR_MODE_MV) {
@@ -95,19 +95,20 @@ struct MdPass : PreDecodePass<Grammar, NETFLOOR_MODE_MD> {
     static inline constinit Line::Buffer buffer{};
 
     template <const Field &field>
-    NETFLOOR_INLINE static void output(Reader<MdPass> &at, std::uint32_t value) {
+    NETFLOOR_INLINE static void output(Reader<MdPass> &reader, std::uint32_t value) {
         static constexpr Format format = parseFormat(field.line);
-        const FieldRecord &record = at.state->fieldRecord;
-        std::uint8_t *const decoded = at.context->fieldRecords + at.context->fieldRecordCount * decodedFieldOctets;
-        decoded[0] = at.context->layerNumber;
+        const FieldRecord &record = reader.state->fieldRecord;
+        std::uint8_t *const decoded =
+            reader.context->fieldRecords + reader.context->fieldRecordCount * decodedFieldOctets;
+        decoded[0] = reader.context->layerNumber;
         decoded[1] = 0;
         if constexpr (field.place.shape != Shape::groups) {
             decoded[2] = 0;
         }
         Line line(buffer);
         fill<field, format>(line, value, record);
-        hs_AddDecodedFieldsData(at.context, record.outputRangeCount, record.ranges, line.terminated(), 0,
-                                record.fieldName, field.id, 0, at.bitOrder);
+        hs_AddDecodedFieldsData(reader.context, record.outputRangeCount, record.ranges, line.terminated(), 0,
+                                record.fieldName, field.id, 0, reader.bitOrder);
     }
 };
 
@@ -117,11 +118,11 @@ struct ToPass : PreDecodePass<Grammar, NETFLOOR_MODE_TO> {
     static inline constinit Line::Buffer buffer{};
 
     template <const Field &field>
-    NETFLOOR_INLINE static void output(Reader<ToPass> &at, std::uint32_t value) {
+    NETFLOOR_INLINE static void output(Reader<ToPass> &reader, std::uint32_t value) {
         static constexpr Format format = parseFormat(field.display());
         Line line(buffer);
-        fill<field, format>(line, value, at.state->fieldRecord);
-        hs_AddFieldsToDisplayData(at.context, line.terminated(), Grammar::template displayId<field>);
+        fill<field, format>(line, value, reader.state->fieldRecord);
+        hs_AddFieldsToDisplayData(reader.context, line.terminated(), Grammar::template displayId<field>);
     }
 };
 
@@ -129,8 +130,8 @@ struct ToPass : PreDecodePass<Grammar, NETFLOOR_MODE_TO> {
 template <class Grammar>
 struct MvPass : PreDecodePass<Grammar, NETFLOOR_MODE_MV> {
     template <const Field &field>
-    NETFLOOR_INLINE static void output(Reader<MvPass> &at, std::uint32_t, std::uint32_t) {
-        at.check();
+    NETFLOOR_INLINE static void output(Reader<MvPass> &reader, std::uint32_t, std::uint32_t) {
+        reader.check();
     }
 };
 
@@ -147,7 +148,7 @@ struct XtrPass {
     static inline constinit std::int32_t keyFieldStatus = 0;
     static inline constinit std::uint16_t presenceRow = 0;
 
-    static constexpr bool raises(Mark found) { return found == Mark::expectation; }
+    static constexpr bool raises(Flag flag) { return flag == Flag::expectation; }
 
     static void giveVerdict(XtrContext &) {}
 
@@ -161,7 +162,7 @@ struct XtrPass {
             return false;
         }
         if (keyFieldStatus > 1 && presenceRow < Grammar::keyRows.size()) {
-            markPresent(context.keyRecord, Grammar::keyRows[presenceRow]);
+            setPresent(context.keyRecord, Grammar::keyRows[presenceRow]);
         }
         return true;
     }
@@ -172,25 +173,25 @@ struct XtrPass {
     static Outcome transfer(XtrContext &) { return Outcome::stopped; }
 
     template <const Field &field>
-    NETFLOOR_INLINE static void output(Reader<XtrPass> &at, std::uint32_t start, std::uint32_t units) {
+    NETFLOOR_INLINE static void output(Reader<XtrPass> &reader, std::uint32_t start, std::uint32_t units) {
         constexpr std::uint32_t row = Grammar::template keyRow<field>;
         if constexpr (row != Grammar::noKeyRow) {
             const KeyFieldRow &key = Grammar::keyRows[row];
-            std::uint8_t *const record = at.context->keyRecord;
-            markPresent(record, key);
+            std::uint8_t *const record = reader.context->keyRecord;
+            setPresent(record, key);
             if constexpr (field.place.shape == Shape::addressNibbles) {
-                if (!storeAddress(*at.context, key, at.data, start)) {
-                    at.giveState();
-                    at.end(Outcome::cutOff);
+                if (!storeAddress(*reader.context, key, reader.data, start)) {
+                    reader.giveState();
+                    reader.end(Outcome::cutOff);
                 }
             } else {
-                storeNumber<field>(record, key, at.data, start, units);
+                storeNumber<field>(record, key, reader.data, start, units);
             }
         }
     }
 
 private:
-    NETFLOOR_INLINE static void markPresent(std::uint8_t *record, const KeyFieldRow &row) {
+    NETFLOOR_INLINE static void setPresent(std::uint8_t *record, const KeyFieldRow &row) {
         std::uint8_t &presence = record[row.presenceOffset];
         presence = static_cast<std::uint8_t>(presence | row.presenceMask);
     }
@@ -231,4 +232,4 @@ private:
     }
 };
 
-} // namespace netfloor
+} // namespace netfloor::plugin

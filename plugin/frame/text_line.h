@@ -10,10 +10,10 @@
 #include <string_view>
 
 #include "frame/field.h"
-#include "frame/text.h"
+#include "frame/number_text.h"
 #include "netfloor/records.h"
 
-namespace netfloor {
+namespace netfloor::plugin {
 
 // A zero-terminated text of at most 255 characters; what does not fit is dropped. All formats are known to fit into
 // the buffer, so that only lists of elements ask for its end; what is copied may be longer than what counts.
@@ -145,4 +145,4 @@ NETFLOOR_INLINE inline void fill(Line &line, std::uint32_t value, const FieldRec
     }
 }
 
-} // namespace netfloor
+} // namespace netfloor::plugin

@@ -11,7 +11,7 @@
 #include <cstdint>
 #include <string_view>
 
-namespace netfloor {
+namespace netfloor::plugin {
 
 enum class Conversion : std::uint8_t { none, decimal, hexadecimal, character, name, briefName, list };
 
@@ -93,4 +93,4 @@ struct Format {
     return line;
 }
 
-} // namespace netfloor
+} // namespace netfloor::plugin

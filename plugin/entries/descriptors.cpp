@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: MIT
 // The exports that describe the plug-in.
-#include "frame/export.h"
 #include "netfloor/descriptors.h"
+#include "frame/export.h"
 #include "tables/descriptors.h"
-#include "tables/probes.h"
+#include "tables/layout_probes.h"
 
 namespace {
 
@@ -12,9 +12,9 @@ constexpr const char *interfaceVersion = "RW1.02.01";
 const void *pointerTo(std::int32_t index) {
     switch (index) {
     case NETFLOOR_TABLE_VERSION: return interfaceVersion;
-    case NETFLOOR_TABLE_IDENTITY: return &netfloor::identity;
-    case NETFLOOR_TABLE_FIELDS: return netfloor::fieldProbe.data();
-    case NETFLOOR_TABLE_SAMPLE: return netfloor::tableProbe.data();
+    case NETFLOOR_TABLE_IDENTITY: return &netfloor::plugin::identity;
+    case NETFLOOR_TABLE_FIELDS: return netfloor::plugin::fieldProbe.data();
+    case NETFLOOR_TABLE_SAMPLE: return netfloor::plugin::tableProbe.data();
     default: return nullptr;
     }
 }
@@ -22,13 +22,13 @@ const void *pointerTo(std::int32_t index) {
 const void *tableOf(std::int32_t index) {
     switch (index) {
     case NETFLOOR_TABLE_VERSION: return interfaceVersion;
-    case NETFLOOR_TABLE_IDENTITY: return &netfloor::identity.slots;
-    case NETFLOOR_TABLE_FIELDS: return &netfloor::fieldTable;
-    case NETFLOOR_TABLE_SAMPLE: return netfloor::tableProbe.data() + netfloor::probeHead;
-    case NETFLOOR_TABLE_VALUES: return netfloor::valueMap.data();
-    case NETFLOOR_TABLE_POOL: return netfloor::valuePool.data();
-    case NETFLOOR_TABLE_TEXTS: return netfloor::displayStrings.data();
-    case NETFLOOR_TABLE_LAYOUTS: return netfloor::layouts.data();
+    case NETFLOOR_TABLE_IDENTITY: return &netfloor::plugin::identity.slots;
+    case NETFLOOR_TABLE_FIELDS: return &netfloor::plugin::fieldTable;
+    case NETFLOOR_TABLE_SAMPLE: return netfloor::plugin::tableProbe.data() + netfloor::plugin::probeHead;
+    case NETFLOOR_TABLE_VALUES: return netfloor::plugin::valueMap.data();
+    case NETFLOOR_TABLE_POOL: return netfloor::plugin::valuePool.data();
+    case NETFLOOR_TABLE_TEXTS: return netfloor::plugin::displayStrings.data();
+    case NETFLOOR_TABLE_LAYOUTS: return netfloor::plugin::layouts.data();
     default: return nullptr;
     }
 }

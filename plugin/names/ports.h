@@ -7,7 +7,7 @@
 
 #include "frame/value_names.h"
 
-namespace netfloor {
+namespace netfloor::plugin {
 
 // clang-format off
 inline constexpr std::array<ValueName, 291> portNameRows = {{
@@ -308,4 +308,4 @@ inline constexpr std::array<ValueName, 291> portNameRows = {{
 // A port without a row shows its number, and in short nothing.
 inline constexpr ValueNames portNames = {portNameRows, "%u", "", true};
 
-} // namespace netfloor
+} // namespace netfloor::plugin

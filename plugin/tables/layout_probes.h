@@ -7,7 +7,7 @@
 #include <cstdint>
 #include <string_view>
 
-namespace netfloor {
+namespace netfloor::plugin {
 
 inline constexpr std::uint8_t probePadding = 60;
 
@@ -57,14 +57,15 @@ private:
     std::array<std::uint8_t, size> octets_{};
 };
 
-inline constexpr std::uint32_t pointerMark = 0xa5a5a5a5;
-inline constexpr std::uint32_t otherPointerMark = 0x4b4b4b4b;
+inline constexpr std::uint32_t pointerPlaceholder = 0xa5a5a5a5;
+inline constexpr std::uint32_t otherPointerPlaceholder = 0x4b4b4b4b;
 
 // A sample of a field row.
 alignas(8) inline constexpr auto fieldProbe = ProbeRecord<124>{}
                                                   .words(0, {4, 124, 92, probePadding})
-                                                  .words(16, {pointerMark, pointerMark, pointerMark, 1, 0xfffd, 0x106,
-                                                              0xffff, otherPointerMark})
+                                                  .words(16,
+                                                         {pointerPlaceholder, pointerPlaceholder, pointerPlaceholder, 1,
+                                                          0xfffd, 0x106, 0xffff, otherPointerPlaceholder})
                                                   .halves(48, {8, 13, 1, 3})
                                                   .text(56, "VEX Protocol Prototype dummy field")
                                                   .words(92, {16, 36, 20, 32, 24, 32, 44, 56})
@@ -73,8 +74,10 @@ alignas(8) inline constexpr auto fieldProbe = ProbeRecord<124>{}
 // A sample of a table of one row.
 alignas(8) inline constexpr auto tableProbe = ProbeRecord<220>{}
                                                   .words(0, {5, 220, 172, probePadding})
-                                                  .words(16, {pointerMark, pointerMark, pointerMark, pointerMark,
-                                                              pointerMark, 0, 0, pointerMark, 0, 0x10000, 1})
+                                                  .words(16,
+                                                         {pointerPlaceholder, pointerPlaceholder, pointerPlaceholder,
+                                                          pointerPlaceholder, pointerPlaceholder, 0, 0,
+                                                          pointerPlaceholder, 0, 0x10000, 1})
                                                   .text(60, "test_vex_protocol_DLL.dll")
                                                   .octets(86, {probePadding, probePadding})
                                                   .words(88, {1, 0, 0, 0})
@@ -94,4 +97,4 @@ alignas(8) inline constexpr auto tableProbe = ProbeRecord<220>{}
 // Where the body of a probe starts.
 inline constexpr std::size_t probeHead = 16;
 
-} // namespace netfloor
+} // namespace netfloor::plugin

@@ -12,7 +12,7 @@
 
 #include "frame/value_names.h"
 
-namespace netfloor {
+namespace netfloor::plugin {
 
 // The two digits of every number below 100, and of every octet in hexadecimal.
 inline constexpr auto decimalPairs = [] {
@@ -142,4 +142,4 @@ inline constexpr auto nameTexts = [] {
     return texts;
 }();
 
-} // namespace netfloor
+} // namespace netfloor::plugin

@@ -4,7 +4,7 @@
 
 #include <cstdint>
 
-namespace netfloor {
+namespace netfloor::plugin {
 
 struct SharedVariables {
     std::uint32_t ipVersion;       // of the outermost header
@@ -15,7 +15,6 @@ struct SharedVariables {
     std::int32_t payloadOctets;    // octets of IP payload that no header has accounted for
     std::uint32_t sourcePort;      // of TCP, UDP and SCTP alike
     std::uint32_t destinationPort; // of TCP, UDP and SCTP alike
-    bool copyRestored;             // the working copy was restored as a whole since the host last had the packet
 };
 
-} // namespace netfloor
+} // namespace netfloor::plugin

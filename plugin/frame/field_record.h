@@ -10,7 +10,7 @@
 #include "frame/for_each.h"
 #include "netfloor/records.h"
 
-namespace netfloor {
+namespace netfloor::plugin {
 
 // A value with a further piece of so many bits behind it.
 [[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t joined(std::uint32_t value, std::uint32_t piece,
@@ -154,4 +154,4 @@ NETFLOOR_INLINE inline void beginRecord(FieldRecord &record) {
     std::memcpy(record.fieldName, field.name.data(), field.name.size() + 1);
 }
 
-} // namespace netfloor
+} // namespace netfloor::plugin

@@ -9,7 +9,7 @@
 
 #include "tables/catalogue.h"
 
-namespace netfloor {
+namespace netfloor::plugin {
 
 // The octets of one record, its length word included.
 struct LayoutRecord {
@@ -166,4 +166,4 @@ inline constexpr LayoutTable layoutTable = [] {
     return table;
 }();
 
-} // namespace netfloor
+} // namespace netfloor::plugin

@@ -4,8 +4,8 @@
 
 #include "frame/field.h"
 
-namespace netfloor {
+namespace netfloor::plugin {
 
 inline constexpr Field version{150, "Version", piece(4, 7), "Version=%u"};
 
-} // namespace netfloor
+} // namespace netfloor::plugin

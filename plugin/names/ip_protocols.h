@@ -6,7 +6,7 @@
 
 #include "frame/value_names.h"
 
-namespace netfloor {
+namespace netfloor::plugin {
 
 // clang-format off
 inline constexpr std::array<ValueName, 139> protocolNameRows = {{
@@ -173,4 +173,4 @@ enum : std::uint32_t {
     protocolSctp = 132,
 };
 
-} // namespace netfloor
+} // namespace netfloor::plugin

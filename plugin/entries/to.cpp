@@ -1,11 +1,11 @@
 // SPDX-License-Identifier: MIT
 // The entry of the TO pass.
+#include "entries/grammar.h"
 #include "frame/entry.h"
 #include "frame/export.h"
-#include "frame/outputs.h"
-#include "grammar.h"
+#include "frame/passes.h"
 
 extern "C" NETFLOOR_EXPORT std::uint8_t NETFLOOR_CDECL vex_PreDecodeTO(PreDecodeContext *context) {
-    using namespace netfloor;
+    using namespace netfloor::plugin;
     return runPass<ToPass<Grammar>, Grammar>(*context) == Outcome::cutOff ? 0 : 1;
 }

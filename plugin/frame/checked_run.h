@@ -7,7 +7,7 @@
 #include "frame/block.h"
 #include "frame/reader.h"
 
-namespace netfloor {
+namespace netfloor::plugin {
 
 // The most elements of a field of fixed size.
 inline constexpr std::uint32_t mostFixedElements = addressGroupCount * nibblesPerGroup;
@@ -20,25 +20,25 @@ inline constexpr std::uint32_t mostStretchBlocks = 4;
 // whether they all fit, and then writes only what is left to be seen behind them; the rare packet that is cut
 // short there is read field by field, out of line.
 template <std::uint32_t bitCount, auto production, class Pass>
-NETFLOOR_INLINE inline void stretch(Reader<Pass> &at) {
+NETFLOOR_INLINE inline void stretch(Reader<Pass> &reader) {
     if constexpr (Pass::reports) {
-        production(at);
+        production(reader);
     } else {
-        const bool sure = at.live && at.left >= bitCount && onOctetBorder(at.cursor) && !at.unchecked &&
-                          at.state->fieldRecord.rangeCapacity > mostFixedElements &&
-                          at.state->blockStarts.capacity > at.blockDepth + mostStretchBlocks;
+        const bool sure = reader.live && reader.left >= bitCount && onOctetBorder(reader.cursor) && !reader.unchecked &&
+                          reader.state->fieldRecord.rangeCapacity > mostFixedElements &&
+                          reader.state->blockStarts.capacity > reader.blockDepth + mostStretchBlocks;
         if (!sure) [[unlikely]] {
-            return apart<production>(at);
+            return runOutOfLine<production>(reader);
         }
         // A live reader is never over; said again, so that the tests for it fall away.
-        at.outcome = Outcome::on;
-        at.inStretch = true;
-        at.sureBits = bitCount;
-        at.sureBlocks = mostStretchBlocks;
-        production(at);
-        at.settle();
-        at.forget();
+        reader.outcome = Outcome::on;
+        reader.inStretch = true;
+        reader.sureBits = bitCount;
+        reader.sureBlocks = mostStretchBlocks;
+        production(reader);
+        reader.settle();
+        reader.forget();
     }
 }
 
-} // namespace netfloor
+} // namespace netfloor::plugin

@@ -8,7 +8,7 @@
 
 #include "frame/reader.h"
 
-namespace netfloor {
+namespace netfloor::plugin {
 
 // For a field that sets no variable.
 struct Unstored {};
@@ -28,45 +28,45 @@ inline constexpr std::uint32_t neededBits = field.place.needs(field.place.count)
 // Whether the bits of a field are there. A field that is not tested needs them in the packet only; where they
 // are not all there it is not reported either, and clears the live flag like any other.
 template <const Field &field, class Pass>
-[[nodiscard]] NETFLOOR_INLINE inline bool fits(Reader<Pass> &at, std::uint32_t units) {
+[[nodiscard]] NETFLOOR_INLINE inline bool fits(Reader<Pass> &reader, std::uint32_t units) {
     constexpr const Place &place = field.place;
     if constexpr (!place.isTested()) {
-        return at.cursor + neededBits<field> <= at.state->totalBits + 1;
+        return reader.cursor + neededBits<field> <= reader.state->totalBits + 1;
     }
     const std::uint32_t needs = place.isRun() ? place.needs(units) : neededBits<field>;
-    at.condition() = at.left >= needs ? 1 : 0;
-    return at.left >= needs;
+    reader.condition() = reader.left >= needs ? 1 : 0;
+    return reader.left >= needs;
 }
 
 // Of an address in groups, what no other field writes in the record, so that it would be lost behind the next one.
 template <const Field &field, class Pass>
-NETFLOOR_INLINE inline void keepWide(Reader<Pass> &at) {
+NETFLOOR_INLINE inline void keepWide(Reader<Pass> &reader) {
     if constexpr (field.place.shape == Shape::groups) {
-        at.state->fieldRecord.wideStart = 0;
-        at.state->fieldRecord.wideBits = field.place.width();
+        reader.state->fieldRecord.wideStart = 0;
+        reader.state->fieldRecord.wideBits = field.place.width();
     }
 }
 
 // The step of a field that a stretch has made sure of. What the host can see of it is put off.
 template <const Field &field, class Pass, class Store>
-NETFLOOR_INLINE inline void sureStep(Reader<Pass> &at, Store into) {
+NETFLOOR_INLINE inline void sureStep(Reader<Pass> &reader, Store into) {
     constexpr const Place &place = field.place;
-    if (!onOctetBorder(at.cursor)) {
+    if (!onOctetBorder(reader.cursor)) {
         __builtin_unreachable(); // a stretch starts on one and moves in octets: the slow roads need no code here
     }
-    at.showBlock();
-    const std::uint32_t start = at.cursor;
+    reader.showBlock();
+    const std::uint32_t start = reader.cursor;
     if constexpr (!std::is_same_v<Store, Unstored>) {
-        store(into, valueAt<field>(at.data, start, place.count));
+        store(into, valueAt<field>(reader.data, start, place.count));
     }
-    at.left -= place.advance;
-    at.cursor += place.advance;
-    at.sureBits -= place.advance;
-    at.unsettled.writer = writeRecord<field>;
-    at.unsettled.cursor = start;
-    at.unsettled.advance = static_cast<std::int32_t>(place.advance);
-    keepWide<field>(at);
-    Pass::template output<field>(at, start, place.count);
+    reader.left -= place.advance;
+    reader.cursor += place.advance;
+    reader.sureBits -= place.advance;
+    reader.unsettled.writer = writeRecord<field>;
+    reader.unsettled.cursor = start;
+    reader.unsettled.advance = static_cast<std::int32_t>(place.advance);
+    keepWide<field>(reader);
+    Pass::template output<field>(reader, start, place.count);
 }
 
 // Whether a stretch can make sure of a field: all of fixed size that move in whole octets and are part of it.
@@ -76,78 +76,78 @@ inline constexpr bool canBeSure =
 
 // The step of a field of `units` units; see `read` and `readRun`.
 template <const Field &field, class Pass, class Store>
-NETFLOOR_INLINE inline void step(Reader<Pass> &at, std::uint32_t units, Store into) {
+NETFLOOR_INLINE inline void step(Reader<Pass> &reader, std::uint32_t units, Store into) {
     static_assert(consistent(field), "the declaration of this field contradicts itself");
     static_assert(std::is_same_v<Store, Unstored> || hasStoredValue(field.place), "this field has no number to store");
     constexpr const Place &place = field.place;
-    if (!at.live) {
+    if (!reader.live) {
         return;
     }
     if constexpr (!Pass::reports && canBeSure<field>) {
-        if (at.sureBits >= neededBits<field>) {
-            return sureStep<field>(at, into);
+        if (reader.sureBits >= neededBits<field>) {
+            return sureStep<field>(reader, into);
         }
     }
-    at.settle();
-    at.sureBits = 0;
-    if (!fits<field>(at, units)) {
-        at.live = false;
+    reader.settle();
+    reader.sureBits = 0;
+    if (!fits<field>(reader, units)) {
+        reader.live = false;
         return;
     }
     const std::uint32_t moves = place.isRun() ? place.moves(units) : place.advance;
-    at.showBlock();
+    reader.showBlock();
     if constexpr (Pass::reports) {
-        beginRecord<field>(at.state->fieldRecord);
+        beginRecord<field>(reader.state->fieldRecord);
     }
-    if (!at.roomFor(place.elements(units), beginRecord<field>)) {
+    if (!reader.roomFor(place.elements(units), beginRecord<field>)) {
         return;
     }
-    const std::uint32_t start = at.cursor;
+    const std::uint32_t start = reader.cursor;
     if constexpr (!std::is_same_v<Store, Unstored>) {
-        store(into, valueAt<field>(at.data, start, units));
+        store(into, valueAt<field>(reader.data, start, units));
     }
-    at.advance() = static_cast<std::int32_t>(moves);
-    at.left -= moves;
-    at.cursor += moves;
+    reader.advance() = static_cast<std::int32_t>(moves);
+    reader.left -= moves;
+    reader.cursor += moves;
     if constexpr (Pass::reports) {
-        const std::uint32_t value = writeElements<field>(at.state->fieldRecord, at.data, start, units);
-        at.givePosition();
-        Pass::template output<field>(at, value);
+        const std::uint32_t value = writeElements<field>(reader.state->fieldRecord, reader.data, start, units);
+        reader.givePosition();
+        Pass::template output<field>(reader, value);
     } else {
-        at.last().writer = writeRecord<field>;
-        at.last().cursor = start;
+        reader.last().writer = writeRecord<field>;
+        reader.last().cursor = start;
         if constexpr (place.isRun()) {
-            at.last().units = units;
+            reader.last().units = units;
         }
-        keepWide<field>(at);
-        at.last().seenPieces = 0;
-        Pass::template output<field>(at, start, units);
+        keepWide<field>(reader);
+        reader.last().seenPieces = 0;
+        Pass::template output<field>(reader, start, units);
     }
 }
 
 // Reads a field of fixed size. `into` takes its value: a pointer to a variable, or a function of the value.
 // A field that does not fit clears the live flag and the condition, and changes nothing else.
 template <const Field &field, class Pass, class Store = Unstored>
-NETFLOOR_INLINE inline void read(Reader<Pass> &at, Store into = {}) {
+NETFLOOR_INLINE inline void read(Reader<Pass> &reader, Store into = {}) {
     static_assert(!field.place.isRun(), "a run needs its number of units");
-    step<field>(at, field.place.count, into);
+    step<field>(reader, field.place.count, into);
 }
 
 // Reads a field of as many units (octets, nibbles) as the packet tells. The number counts as unsigned in the
 // test of the bits left, so that a negative one does not fit.
 template <const Field &field, class Pass>
-NETFLOOR_INLINE inline void readRun(Reader<Pass> &at, std::int32_t units) {
+NETFLOOR_INLINE inline void readRun(Reader<Pass> &reader, std::int32_t units) {
     static_assert(field.place.isRun(), "a field of fixed size has its number of units");
-    step<field>(at, static_cast<std::uint32_t>(units), Unstored{});
+    step<field>(reader, static_cast<std::uint32_t>(units), Unstored{});
 }
 
 // Reads a field again and again, up to `count` times, as long as its bits are left. Gives how often it was read.
 template <const Field &field, class Pass>
-NETFLOOR_INLINE inline std::int32_t readRepeated(Reader<Pass> &at, std::int32_t count) {
+NETFLOOR_INLINE inline std::int32_t readRepeated(Reader<Pass> &reader, std::int32_t count) {
     std::int32_t seen = 0;
-    while (at.live && seen < count) {
-        read<field>(at);
-        seen += at.live ? 1 : 0;
+    while (reader.live && seen < count) {
+        read<field>(reader);
+        seen += reader.live ? 1 : 0;
     }
     return seen;
 }
@@ -155,9 +155,9 @@ NETFLOOR_INLINE inline std::int32_t readRepeated(Reader<Pass> &at, std::int32_t 
 // Reads a field `count` times. Where it ends with another count, as bits ran out or the count is negative,
 // that is marked.
 template <const Field &field, class Pass>
-NETFLOOR_INLINE inline void readCounted(Reader<Pass> &at, std::int32_t count) {
-    if (readRepeated<field>(at, count) != count) {
-        at.mark(Mark::count);
+NETFLOOR_INLINE inline void readCounted(Reader<Pass> &reader, std::int32_t count) {
+    if (readRepeated<field>(reader, count) != count) {
+        reader.raise(Flag::count);
     }
 }
 
@@ -167,46 +167,47 @@ inline void keepRecord(FieldRecord &) {}
 // Looks at the bits of `place` without moving the cursor and without reporting anything; nothing where they
 // are not all left or the run is over. The field record keeps what was seen, under the name of the field before.
 template <class Pass>
-NETFLOOR_INLINE inline std::optional<std::uint32_t> look(Reader<Pass> &at, const Place &place) {
-    at.settle();
-    if (at.over() || at.left < place.needs(place.count) || !at.roomFor(place.count, keepRecord)) {
+NETFLOOR_INLINE inline std::optional<std::uint32_t> peek(Reader<Pass> &reader, const Place &place) {
+    reader.settle();
+    if (reader.ended() || reader.left < place.needs(place.count) || !reader.roomFor(place.count, keepRecord)) {
         return std::nullopt;
     }
     const bool whole = !place.isPieces();
-    const std::uint32_t first = at.cursor + (whole ? 0 : place.pieces[0].low);
+    const std::uint32_t first = reader.cursor + (whole ? 0 : place.pieces[0].low);
     const std::uint32_t width = whole ? bitsPerOctet : place.pieces[0].width();
     if constexpr (Pass::reports) {
-        return at.writeSeen(first, place.count, width);
+        return reader.writeSeen(first, place.count, width);
     }
-    at.last().seenFirst = first;
-    at.last().seenPieces = place.count;
-    at.last().seenWidth = width;
-    return width == bitsPerOctet ? octetsAt(at.data, first, place.count) : bits(at.data, first, first + width - 1);
+    reader.last().seenFirst = first;
+    reader.last().seenPieces = place.count;
+    reader.last().seenWidth = width;
+    return width == bitsPerOctet ? octetsAt(reader.data, first, place.count)
+                                 : bits(reader.data, first, first + width - 1);
 }
 
 // Moves the cursor back over `bitCount` bits, so that they can be read a second time.
 template <class Pass>
-NETFLOOR_INLINE inline void stepBack(Reader<Pass> &at, std::uint32_t bitCount) {
-    if (at.over()) {
+NETFLOOR_INLINE inline void stepBack(Reader<Pass> &reader, std::uint32_t bitCount) {
+    if (reader.ended()) {
         return;
     }
-    if (at.unsettled.advance == static_cast<std::int32_t>(bitCount)) {
+    if (reader.unsettled.advance == static_cast<std::int32_t>(bitCount)) {
         // An address that a stretch has just read: outside of one the number is 0, and inside the bits are there.
-        at.unsettled.advance = -at.unsettled.advance;
-        at.sureBits += bitCount;
-        at.cursor -= bitCount;
-        at.left += bitCount;
+        reader.unsettled.advance = -reader.unsettled.advance;
+        reader.sureBits += bitCount;
+        reader.cursor -= bitCount;
+        reader.left += bitCount;
         return;
     }
-    at.settle();
-    at.sureBits = 0;
-    at.advance() = -static_cast<std::int32_t>(bitCount);
-    if (!at.live || at.cursor < bitCount) {
-        at.live = false;
+    reader.settle();
+    reader.sureBits = 0;
+    reader.advance() = -static_cast<std::int32_t>(bitCount);
+    if (!reader.live || reader.cursor < bitCount) {
+        reader.live = false;
         return;
     }
-    at.cursor -= bitCount;
-    at.left += bitCount;
+    reader.cursor -= bitCount;
+    reader.left += bitCount;
 }
 
-} // namespace netfloor
+} // namespace netfloor::plugin

@@ -4,22 +4,22 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
-#include "frame/step.h"
+#include "frame/field_step.h"
 
-namespace netfloor {
+namespace netfloor::plugin {
 
 inline constexpr Field unknownProtocolData{285, "Unknown Protocol Data", octets(1), "Unknown Protocol Data=%x"};
 
 template <class Pass>
-void unknownData(Reader<Pass> &at) {
-    if (!at.live) {
+void unknownData(Reader<Pass> &reader) {
+    if (!reader.live) {
         return;
     }
-    const Block<Pass> block{at, ""};
-    const std::int32_t payloadOctets = at.variables().payloadOctets;
+    const Block<Pass> block{reader, ""};
+    const std::int32_t payloadOctets = reader.variables().payloadOctets;
     if (payloadOctets > 0) {
-        readCounted<unknownProtocolData>(at, payloadOctets);
+        readCounted<unknownProtocolData>(reader, payloadOctets);
     }
 }
 
-} // namespace netfloor
+} // namespace netfloor::plugin

@@ -11,7 +11,7 @@
 #include "netfloor/descriptors.h"
 #include "tables/catalogue.h"
 
-namespace netfloor {
+namespace netfloor::plugin {
 
 // Gives each distinct text a number, in the order of first use.
 template <std::size_t most>
@@ -139,4 +139,4 @@ inline constexpr TextTables textTables = [] {
     return tables;
 }();
 
-} // namespace netfloor
+} // namespace netfloor::plugin

@@ -1,0 +1,30 @@
+// SPDX-License-Identifier: MIT
+// What the passes need to know of the grammar and of its fields.
+#pragma once
+
+#include <cstdint>
+
+#include "packet/packet.h"
+#include "tables/catalogue.h"
+#include "tables/key_fields.h"
+
+namespace netfloor::plugin {
+
+struct Grammar {
+    using Variables = plugin::Variables;
+
+    static constexpr std::uint32_t noKeyRow = plugin::noKeyRow;
+    static constexpr auto &keyRows = plugin::keyRows;
+
+    template <const Field &field>
+    static constexpr std::uint32_t displayId = displayIdOf(field);
+    template <const Field &field>
+    static constexpr std::uint32_t keyRow = keyRowOf(field);
+
+    template <class Pass>
+    NETFLOOR_INLINE static void packet(Reader<Pass> &reader) {
+        plugin::packet(reader);
+    }
+};
+
+} // namespace netfloor::plugin

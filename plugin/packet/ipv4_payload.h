@@ -1,0 +1,39 @@
+// SPDX-License-Identifier: MIT
+// What an IPv4 datagram carries.
+#pragma once
+
+#include "frame/block.h"
+#include "icmp/icmp.h"
+#include "icmp/icmpv6.h"
+#include "ip/unknown_data.h"
+#include "names/ip_protocols.h"
+#include "packet/tunnels.h"
+#include "sctp/sctp.h"
+#include "transport/tcp.h"
+#include "transport/udp.h"
+#include "tunnels/gre.h"
+
+namespace netfloor::plugin {
+
+// Runs the production of the payload. A later fragment is data, whatever its protocol; with DF set the offset
+// does not count.
+template <class Pass>
+NETFLOOR_INLINE inline void ipv4Payload(Reader<Pass> &reader) {
+    const auto &variables = reader.variables();
+    if (variables.fragmentOffset >= 1 && variables.dontFragment == 0) {
+        return runOutOfLine<unknownData<Pass>>(reader);
+    }
+    switch (variables.ipProtocol) {
+    case protocolIcmp: return runOutOfLine<icmp::message<Pass>>(reader);
+    case protocolIpInIp:
+    case protocolMinimalEncapsulation: return runOutOfLine<tunnels<Pass>>(reader);
+    case protocolGre: return runOutOfLine<gre::packet<Pass>>(reader);
+    case protocolTcp: return runOutOfLine<tcp::segment<Pass>>(reader);
+    case protocolUdp: return udp::datagram(reader);
+    case protocolIcmpv6: return runOutOfLine<icmpv6::message<Pass>>(reader);
+    case protocolSctp: return runOutOfLine<sctp::packet<Pass>>(reader);
+    default: return runOutOfLine<unknownData<Pass>>(reader);
+    }
+}
+
+} // namespace netfloor::plugin

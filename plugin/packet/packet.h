@@ -1,0 +1,44 @@
+// SPDX-License-Identifier: MIT
+// A packet: the start of the grammar, and the variables of all its productions.
+#pragma once
+
+#include "frame/bit_order.h"
+#include "frame/block.h"
+#include "frame/field_step.h"
+#include "icmp/message_type.h"
+#include "ip/variables.h"
+#include "ip/version.h"
+#include "ipv4/header.h"
+#include "packet/ipv4_payload.h"
+#include "packet/ipv6_packet.h"
+#include "sctp/variables.h"
+
+namespace netfloor::plugin {
+
+// All variables of a pass, cleared at its entry.
+struct Variables : BitOrderVariables,
+                   SharedVariables,
+                   ipv4::FragmentVariables,
+                   ipv4::OptionVariables,
+                   ipv6::HeaderVariables,
+                   ipv6::OptionVariables,
+                   ipv6::ExtensionHeaderVariables,
+                   icmp::MessageVariables,
+                   tcp::TcpVariables,
+                   sctp::Variables {};
+
+// One packet, from its version on. With a version other than 4 and 6 nothing further is read.
+template <class Pass>
+NETFLOOR_INLINE inline void packet(Reader<Pass> &reader) {
+    auto &variables = reader.variables();
+    const Block<Pass> ip{reader, "Ip"};
+    const Block<Pass> header{reader, "Ip Header"};
+    read<version>(reader, &variables.ipVersion);
+    if (variables.ipVersion == 4) {
+        ipv4::datagram<ipv4Payload<Pass>>(reader);
+    } else if (variables.ipVersion == 6) {
+        runOutOfLine<ipv6Packet<Pass>>(reader);
+    }
+}
+
+} // namespace netfloor::plugin
