@@ -12,6 +12,7 @@ namespace netfloor::plugin {
 
 struct Grammar {
     using Variables = plugin::Variables;
+    using Fields = CatalogueFields;
 
     static constexpr std::uint32_t noKeyRow = plugin::noKeyRow;
     static constexpr auto &keyRows = plugin::keyRows;

@@ -5,6 +5,7 @@
 #include <cstdint>
 
 #include "frame/block.h"
+#include "frame/field_list.h"
 #include "frame/reader.h"
 
 namespace netfloor::plugin {
@@ -16,14 +17,16 @@ inline constexpr std::uint32_t mostFixedElements = addressGroupCount * nibblesPe
 // road.
 inline constexpr std::uint32_t mostStretchBlocks = 4;
 
-// Runs a production whose first `bitCount` bits are fields of fixed size. A pass that reports nothing asks once
-// whether they all fit, and then writes only what is left to be seen behind them; the rare packet that is cut
+// Runs a production that starts with the fields from `first` to `last`, all of fixed size. A pass that reports nothing
+// asks once whether they all fit, and then writes only what is left to be seen behind them; the rare packet that is cut
 // short there is read field by field, out of line.
-template <std::uint32_t bitCount, auto production, class Pass>
-NETFLOOR_INLINE inline void stretch(Reader<Pass> &reader) {
+template <const Field &first, const Field &last, auto production, class Pass>
+NETFLOOR_INLINE inline void checkedRun(Reader<Pass> &reader) {
     if constexpr (Pass::reports) {
         production(reader);
     } else {
+        constexpr std::uint32_t bitCount = bitsFromTo<typename Pass::Fields>(first, last);
+        static_assert(bitCount != 0, "a checked run goes from a field of the catalogue to a later one");
         const bool sure = reader.live && reader.left >= bitCount && onOctetBorder(reader.cursor) && !reader.unchecked &&
                           reader.state->fieldRecord.rangeCapacity > mostFixedElements &&
                           reader.state->blockStarts.capacity > reader.blockDepth + mostStretchBlocks;

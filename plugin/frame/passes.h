@@ -42,6 +42,7 @@ template <class Grammar, std::uint32_t mode>
 struct PreDecodePass {
     using Context = PreDecodeContext;
     using Variables = typename Grammar::Variables;
+    using Fields = typename Grammar::Fields;
 
     static constexpr bool reports = mode != NETFLOOR_MODE_MV; // hands each field to the host
 
@@ -96,7 +97,7 @@ struct MdPass : PreDecodePass<Grammar, NETFLOOR_MODE_MD> {
 
     template <const Field &field>
     NETFLOOR_INLINE static void output(Reader<MdPass> &reader, std::uint32_t value) {
-        static constexpr Format format = parseFormat(field.line);
+        static constexpr Format format = parseFormat(longText<field>);
         const FieldRecord &record = reader.state->fieldRecord;
         std::uint8_t *const decoded =
             reader.context->fieldRecords + reader.context->fieldRecordCount * decodedFieldOctets;
@@ -119,7 +120,7 @@ struct ToPass : PreDecodePass<Grammar, NETFLOOR_MODE_TO> {
 
     template <const Field &field>
     NETFLOOR_INLINE static void output(Reader<ToPass> &reader, std::uint32_t value) {
-        static constexpr Format format = parseFormat(field.display());
+        static constexpr Format format = parseFormat(shortText<field>);
         Line line(buffer);
         fill<field, format>(line, value, reader.state->fieldRecord);
         hs_AddFieldsToDisplayData(reader.context, line.terminated(), Grammar::template displayId<field>);
@@ -140,6 +141,7 @@ template <class Grammar>
 struct XtrPass {
     using Context = XtrContext;
     using Variables = typename Grammar::Variables;
+    using Fields = typename Grammar::Fields;
 
     static constexpr bool reports = false;
 

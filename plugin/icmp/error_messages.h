@@ -19,6 +19,7 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
+#include "frame/field_list.h"
 #include "frame/field_step.h"
 #include "icmp/quoted_header.h"
 
@@ -51,32 +52,32 @@ inline constexpr ValueNames problemCodeNames{problemCodeRows};
 
 // The short text of the original data has its last four octets only.
 // clang-format off
-inline constexpr Field unreachableCode      {548, "Code",                          octets(1),          "  Code=%-S", &unreachableCodeNames};
-inline constexpr Field unreachableChecksum  {549, "Checksum",                      octetPair(),        "  Checksum=%x"};
-inline constexpr Field unreachableUnused    {550, "Unused",                        octets(4),          "  Unused=%x"};
-inline constexpr Field unreachableData      {551, "64-bit Original Data Datagram", octets(8),          R"(  64-bit Original Data Datagram=%-["%x"])", noNames, "%x"};
-inline constexpr Field unreachableTail      {555, "",                              octetRunBackward(), "", noNames, "%x"};
+inline constexpr Field unreachableCode      {548, "Code",                          octets(1),          "  %n=%-S",             &unreachableCodeNames};
+inline constexpr Field unreachableChecksum  {549, "Checksum",                      octetPair(),        "  %n=%x"};
+inline constexpr Field unreachableUnused    {550, "Unused",                        octets(4),          "  %n=%x"};
+inline constexpr Field unreachableData      {551, "64-bit Original Data Datagram", octets(8),          R"(  %n=%-["%x"])",     noNames,                "%x"};
+inline constexpr Field unreachableTail      {555, "",                              octetRunBackward(), "",                     noNames,                "%x"};
 
-inline constexpr Field sourceQuenchCode     {556, "Code",                          octets(1),          "Code=%x"};
-inline constexpr Field sourceQuenchChecksum {557, "Checksum",                      octetPair(),        "  Checksum=%x"};
-inline constexpr Field sourceQuenchUnused   {558, "Unused",                        octets(4),          "  Unused=%x"};
-inline constexpr Field sourceQuenchData     {559, "64-bit Original Data Datagram", octets(8),          R"(  64-bit Original Data Datagram=%-["%x"])", noNames, "%x"};
+inline constexpr Field sourceQuenchCode     {556, "Code",                          octets(1),          "%n=%x"};
+inline constexpr Field sourceQuenchChecksum {557, "Checksum",                      octetPair(),        "  %n=%x"};
+inline constexpr Field sourceQuenchUnused   {558, "Unused",                        octets(4),          "  %n=%x"};
+inline constexpr Field sourceQuenchData     {559, "64-bit Original Data Datagram", octets(8),          R"(  %n=%-["%x"])",     noNames,                "%x"};
 
-inline constexpr Field redirectCode         {560, "Code",                          octets(1),          "  Code=%-S", &redirectCodeNames};
-inline constexpr Field redirectChecksum     {561, "Checksum",                      octetPair(),        "  Checksum=%x"};
-inline constexpr Field redirectGateway      {564, "Gateway Internet Address",      octets(4),          R"(  Gateway Internet Address=%-["%u":"."])"};
-inline constexpr Field redirectData         {566, "64-bit Original Data Datagram", octets(8),          R"(  64-bit Original Data Datagram=%-["%x"])", noNames, "%x"};
+inline constexpr Field redirectCode         {560, "Code",                          octets(1),          "  %n=%-S",             &redirectCodeNames};
+inline constexpr Field redirectChecksum     {561, "Checksum",                      octetPair(),        "  %n=%x"};
+inline constexpr Field redirectGateway      {564, "Gateway Internet Address",      octets(4),          R"(  %n=%-["%u":"."])"};
+inline constexpr Field redirectData         {566, "64-bit Original Data Datagram", octets(8),          R"(  %n=%-["%x"])",     noNames,                "%x"};
 
-inline constexpr Field timeExceededCode     {567, "Code",                          octets(1),          "  Code=%-S", &timeExceededCodeNames};
-inline constexpr Field timeExceededChecksum {568, "Checksum",                      octetPair(),        "  Checksum=%x"};
-inline constexpr Field timeExceededUnused   {569, "Unused",                        octets(4),          "  Unused=%x"};
-inline constexpr Field timeExceededData     {570, "64-bit Original Data Datagram", octets(8),          R"(  64-bit Original Data Datagram=%-["%x"])", noNames, "%x"};
+inline constexpr Field timeExceededCode     {567, "Code",                          octets(1),          "  %n=%-S",             &timeExceededCodeNames};
+inline constexpr Field timeExceededChecksum {568, "Checksum",                      octetPair(),        "  %n=%x"};
+inline constexpr Field timeExceededUnused   {569, "Unused",                        octets(4),          "  %n=%x"};
+inline constexpr Field timeExceededData     {570, "64-bit Original Data Datagram", octets(8),          R"(  %n=%-["%x"])",     noNames,                "%x"};
 
-inline constexpr Field problemCode          {571, "Code",                          octets(1),          "  Code=%-S", &problemCodeNames};
-inline constexpr Field problemChecksum      {572, "Checksum",                      octetPair(),        "  Checksum=%x"};
-inline constexpr Field problemPointer       {573, "Pointer",                       octets(1),          "  Pointer=%x"};
-inline constexpr Field problemUnused        {574, "Unused",                        octets(3),          "  Unused=%x"};
-inline constexpr Field problemData          {575, "64-bit Original Data Datagram", octets(8),          R"(  64-bit Original Data Datagram=%-["%x"])", noNames, "%x"};
+inline constexpr Field problemCode          {571, "Code",                          octets(1),          "  %n=%-S",             &problemCodeNames};
+inline constexpr Field problemChecksum      {572, "Checksum",                      octetPair(),        "  %n=%x"};
+inline constexpr Field problemPointer       {573, "Pointer",                       octets(1),          "  %n=%x"};
+inline constexpr Field problemUnused        {574, "Unused",                        octets(3),          "  %n=%x"};
+inline constexpr Field problemData          {575, "64-bit Original Data Datagram", octets(8),          R"(  %n=%-["%x"])",     noNames,                "%x"};
 // clang-format on
 
 // Many senders quote more than 64 bits of data. Here what is left goes to the host as one field without a name; in
@@ -150,5 +151,20 @@ NETFLOOR_INLINE inline void parameterProblem(Reader<Pass> &reader) {
     runOutOfLine<quotedHeader<Pass>>(reader);
     read<problemData>(reader);
 }
+
+// The quoted header is first read in the first message.
+// clang-format off
+using ErrorRows = Rows<
+    Joined<
+        FieldList<unreachableCode, unreachableChecksum, unreachableUnused>,
+        QuotedHeaderRows::Fields,
+        FieldList<
+            unreachableData, unreachableTail,
+            sourceQuenchCode, sourceQuenchChecksum, sourceQuenchUnused, sourceQuenchData,
+            redirectCode, redirectChecksum, redirectGateway, redirectData,
+            timeExceededCode, timeExceededChecksum, timeExceededUnused, timeExceededData,
+            problemCode, problemChecksum, problemPointer, problemUnused, problemData>>,
+    FieldList<unreachableCode, sourceQuenchCode, redirectCode, timeExceededCode, problemCode>>;
+// clang-format on
 
 } // namespace netfloor::plugin::icmp

@@ -16,6 +16,7 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
+#include "frame/field_list.h"
 #include "frame/field_step.h"
 #include "icmp/error_messages.h"
 #include "icmp/message_type.h"
@@ -23,7 +24,7 @@
 
 namespace netfloor::plugin::icmp {
 
-inline constexpr Field reservedData{541, "ICMP Reserved Data", octets(1), "ICMP Reserved Data=%x"};
+inline constexpr Field reservedData{541, "ICMP Reserved Data", octets(1), "%n=%x"};
 
 // A message of a type without a meaning: what stands behind the type is data, octet by octet.
 template <class Pass>
@@ -81,5 +82,14 @@ NETFLOOR_INLINE inline void message(Reader<Pass> &reader) {
     default: return runOutOfLine<reservedMessage<Pass>>(reader);
     }
 }
+
+// The protocols of the quoted headers have their key rows after those of all messages.
+// clang-format off
+using MessageRows = Rows<
+    Joined<
+        TypeRows::Fields, EchoRows::Fields, ErrorRows::Fields, QueryRows::Fields, FieldList<reservedData>>,
+    Joined<
+        TypeRows::Keys, EchoRows::Keys, ErrorRows::Keys, QueryRows::Keys, QuotedHeaderRows::Keys>>;
+// clang-format on
 
 } // namespace netfloor::plugin::icmp

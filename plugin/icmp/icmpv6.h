@@ -19,6 +19,7 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
+#include "frame/field_list.h"
 #include "frame/field_step.h"
 #include "ip/unknown_data.h"
 
@@ -70,40 +71,40 @@ inline constexpr ValueNames parameterProblemNames{parameterProblemRows};
 
 // The octets of the checksum, the data and the invoking packet are fields of their own.
 // clang-format off
-inline constexpr Field messageClass             {246, "Message Type",      bit(7),    "Message Type=%-S",      &classNames};
-inline constexpr Field messageType              {247, "ICMP Message Type", octets(1), "ICMP Message Type=%-S", &typeNames};
+inline constexpr Field messageClass             {246, "Message Type",      bit(7),    "%n=%-S", &classNames};
+inline constexpr Field messageType              {247, "ICMP Message Type", octets(1), "%n=%-S", &typeNames};
 
-inline constexpr Field unreachableCode          {251, "Code ",             octets(1), "Code =%-S",             &unreachableNames};
-inline constexpr Field unreachableChecksum      {252, "Checksum ",         octets(1), "Checksum =%x"};
-inline constexpr Field unreachableUnused        {253, "Unused",            octets(4), "Unused",                noNames, "%x"};
-inline constexpr Field unreachablePacket        {255, "Invoking Packet ",  octets(1), "Invoking Packet =%x"};
+inline constexpr Field unreachableCode          {251, "Code ",             octets(1), "%n=%-S", &unreachableNames};
+inline constexpr Field unreachableChecksum      {252, "Checksum ",         octets(1), "%n=%x"};
+inline constexpr Field unreachableUnused        {253, "Unused",            octets(4), "%n",     noNames,                "%x"};
+inline constexpr Field unreachablePacket        {255, "Invoking Packet ",  octets(1), "%n=%x"};
 
-inline constexpr Field tooBigCode               {256, "Code ",             octets(1), "Code =%u"};
-inline constexpr Field tooBigChecksum           {257, "Checksum ",         octets(1), "Checksum =%x"};
-inline constexpr Field tooBigMtu                {258, "MTU ",              octets(4), "MTU =%u"};
-inline constexpr Field tooBigPacket             {260, "Invoking Packet ",  octets(1), "Invoking Packet =%x"};
+inline constexpr Field tooBigCode               {256, "Code ",             octets(1), "%n=%u"};
+inline constexpr Field tooBigChecksum           {257, "Checksum ",         octets(1), "%n=%x"};
+inline constexpr Field tooBigMtu                {258, "MTU ",              octets(4), "%n=%u"};
+inline constexpr Field tooBigPacket             {260, "Invoking Packet ",  octets(1), "%n=%x"};
 
-inline constexpr Field timeExceededCode         {261, "Code ",             octets(1), "Code =%-S",             &timeExceededNames};
-inline constexpr Field timeExceededChecksum     {262, "Checksum ",         octets(1), "Checksum =%x"};
-inline constexpr Field timeExceededUnused       {263, "Unused",            octets(4), "Unused",                noNames, "%x"};
-inline constexpr Field timeExceededPacket       {265, "Invoking Packet ",  octets(1), "Invoking Packet =%x"};
+inline constexpr Field timeExceededCode         {261, "Code ",             octets(1), "%n=%-S", &timeExceededNames};
+inline constexpr Field timeExceededChecksum     {262, "Checksum ",         octets(1), "%n=%x"};
+inline constexpr Field timeExceededUnused       {263, "Unused",            octets(4), "%n",     noNames,                "%x"};
+inline constexpr Field timeExceededPacket       {265, "Invoking Packet ",  octets(1), "%n=%x"};
 
-inline constexpr Field parameterProblemCode     {266, "Code ",             octets(1), "Code =%-S",             &parameterProblemNames};
-inline constexpr Field parameterProblemChecksum {267, "Checksum ",         octets(1), "Checksum =%x"};
-inline constexpr Field parameterProblemPointer  {268, "Pointer ",          octets(4), "Pointer =%x"};
-inline constexpr Field parameterProblemPacket   {270, "Invoking Packet ",  octets(1), "Invoking Packet =%x"};
+inline constexpr Field parameterProblemCode     {266, "Code ",             octets(1), "%n=%-S", &parameterProblemNames};
+inline constexpr Field parameterProblemChecksum {267, "Checksum ",         octets(1), "%n=%x"};
+inline constexpr Field parameterProblemPointer  {268, "Pointer ",          octets(4), "%n=%x"};
+inline constexpr Field parameterProblemPacket   {270, "Invoking Packet ",  octets(1), "%n=%x"};
 
-inline constexpr Field echoRequestCode          {271, "Code ",             octets(1), "Code =%u"};
-inline constexpr Field echoRequestChecksum      {272, "Checksum ",         octets(1), "Checksum =%x"};
-inline constexpr Field echoRequestIdentifier    {273, "Identifier ",       octets(2), "Identifier =%x"};
-inline constexpr Field echoRequestSequence      {274, "Sequence Number ",  octets(2), "Sequence Number =%x"};
-inline constexpr Field echoRequestData          {276, "Data ",             octets(1), "Data =%x"};
+inline constexpr Field echoRequestCode          {271, "Code ",             octets(1), "%n=%u"};
+inline constexpr Field echoRequestChecksum      {272, "Checksum ",         octets(1), "%n=%x"};
+inline constexpr Field echoRequestIdentifier    {273, "Identifier ",       octets(2), "%n=%x"};
+inline constexpr Field echoRequestSequence      {274, "Sequence Number ",  octets(2), "%n=%x"};
+inline constexpr Field echoRequestData          {276, "Data ",             octets(1), "%n=%x"};
 
-inline constexpr Field echoReplyCode            {277, "Code ",             octets(1), "Code =%u"};
-inline constexpr Field echoReplyChecksum        {278, "Checksum ",         octets(1), "Checksum =%x"};
-inline constexpr Field echoReplyIdentifier      {279, "Identifier ",       octets(2), "Identifier =%x"};
-inline constexpr Field echoReplySequence        {280, "Sequence Number ",  octets(2), "Sequence Number =%x"};
-inline constexpr Field echoReplyData            {282, "Data ",             octets(1), "Data =%x"};
+inline constexpr Field echoReplyCode            {277, "Code ",             octets(1), "%n=%u"};
+inline constexpr Field echoReplyChecksum        {278, "Checksum ",         octets(1), "%n=%x"};
+inline constexpr Field echoReplyIdentifier      {279, "Identifier ",       octets(2), "%n=%x"};
+inline constexpr Field echoReplySequence        {280, "Sequence Number ",  octets(2), "%n=%x"};
+inline constexpr Field echoReplyData            {282, "Data ",             octets(1), "%n=%x"};
 // clang-format on
 
 inline constexpr std::int32_t typeOctets = 1;
@@ -160,5 +161,20 @@ NETFLOOR_INLINE inline void message(Reader<Pass> &reader) {
         bodyOf(reader, type);
     }
 }
+
+// clang-format off
+using MessageRows = Rows<
+    FieldList<
+        messageClass, messageType,
+        unreachableCode, unreachableChecksum, unreachableUnused, unreachablePacket,
+        tooBigCode, tooBigChecksum, tooBigMtu, tooBigPacket,
+        timeExceededCode, timeExceededChecksum, timeExceededUnused, timeExceededPacket,
+        parameterProblemCode, parameterProblemChecksum, parameterProblemPointer, parameterProblemPacket,
+        echoRequestCode, echoRequestChecksum, echoRequestIdentifier, echoRequestSequence, echoRequestData,
+        echoReplyCode, echoReplyChecksum, echoReplyIdentifier, echoReplySequence, echoReplyData>,
+    FieldList<
+        messageType, unreachableCode, tooBigCode, timeExceededCode, parameterProblemCode,
+        echoRequestCode, echoReplyCode>>;
+// clang-format on
 
 } // namespace netfloor::plugin::icmpv6

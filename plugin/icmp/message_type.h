@@ -6,6 +6,7 @@
 #include <cstdint>
 
 #include "frame/field.h"
+#include "frame/field_list.h"
 #include "frame/field_step.h"
 #include "ip/outer_protocol.h"
 
@@ -49,9 +50,9 @@ inline constexpr std::array typeRows = {
 };
 inline constexpr ValueNames typeNames{typeRows, "Reserved", "Rsvd", true};
 
-inline constexpr Field typeInIpInIp  {531, "ICMP Message Type", octets(1), "ICMP Message Type=%-S", &typeNames, "IPinIP - ICMP - %-s (%u)"};
-inline constexpr Field typeInMinimal {535, "ICMP Message Type", octets(1), "ICMP Message Type=%-S", &typeNames, "MIPinIP - ICMP - %-s (%u)"};
-inline constexpr Field type          {537, "ICMP Message Type", octets(1), "ICMP Message Type=%-S", &typeNames, "ICMP - %-s (%u)"};
+inline constexpr Field typeInIpInIp  {531, "ICMP Message Type", octets(1), "%n=%-S", &typeNames, "IPinIP - ICMP - %-s (%u)"};
+inline constexpr Field typeInMinimal {535, "ICMP Message Type", octets(1), "%n=%-S", &typeNames, "MIPinIP - ICMP - %-s (%u)"};
+inline constexpr Field type          {537, "ICMP Message Type", octets(1), "%n=%-S", &typeNames, "ICMP - %-s (%u)"};
 // clang-format on
 
 struct MessageVariables {
@@ -62,5 +63,7 @@ template <class Pass>
 NETFLOOR_INLINE inline void messageType(Reader<Pass> &reader) {
     readByOuterProtocol<typeInIpInIp, typeInMinimal, type>(reader, &reader.variables().icmpType);
 }
+
+using TypeRows = Rows<FieldList<typeInIpInIp, typeInMinimal, type>, FieldList<typeInIpInIp, typeInMinimal, type>>;
 
 } // namespace netfloor::plugin::icmp

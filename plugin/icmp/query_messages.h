@@ -20,47 +20,48 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
+#include "frame/field_list.h"
 #include "frame/field_step.h"
 
 namespace netfloor::plugin::icmp {
 
 // clang-format off
-inline constexpr Field echoCode              {542, "Code",                 octets(1),   "Code=%x"};
-inline constexpr Field echoChecksum          {543, "Checksum",             octetPair(), "  Checksum=%x"};
-inline constexpr Field echoIdentifier        {544, "Identifier",           octetPair(), "  Identifier=%x"};
-inline constexpr Field echoSequence          {545, "ICMP Sequence Number", octetPair(), "  ICMP Sequence Number=%u"};
-inline constexpr Field echoData              {547, "  Message Data",       octets(1),   "  Message Data=%c"};
+inline constexpr Field echoCode              {542, "Code",                 octets(1),   "%n=%x"};
+inline constexpr Field echoChecksum          {543, "Checksum",             octetPair(), "  %n=%x"};
+inline constexpr Field echoIdentifier        {544, "Identifier",           octetPair(), "  %n=%x"};
+inline constexpr Field echoSequence          {545, "ICMP Sequence Number", octetPair(), "  %n=%u"};
+inline constexpr Field echoData              {547, "  Message Data",       octets(1),   "  %n=%c"};
 
-inline constexpr Field timestampCode         {576, "Code",                 octets(1),   "Code=%x"};
-inline constexpr Field timestampChecksum     {577, "Checksum",             octetPair(), "  Checksum=%x"};
-inline constexpr Field timestampIdentifier   {578, "Identifier",           octetPair(), "  Identifier=%x"};
-inline constexpr Field timestampSequence     {579, "ICMP Sequence Number", octetPair(), "  ICMP Sequence Number=%u"};
-inline constexpr Field originateTimestamp    {580, "Originate Timestamp",  octets(4),   "  Originate Timestamp=%x"};
-inline constexpr Field receiveTimestamp      {581, "Receive Timestamp",    octets(4),   "  Receive Timestamp=%x"};
-inline constexpr Field transmitTimestamp     {582, "Transmit Timestamp",   octets(4),   "  Transmit Timestamp=%x"};
+inline constexpr Field timestampCode         {576, "Code",                 octets(1),   "%n=%x"};
+inline constexpr Field timestampChecksum     {577, "Checksum",             octetPair(), "  %n=%x"};
+inline constexpr Field timestampIdentifier   {578, "Identifier",           octetPair(), "  %n=%x"};
+inline constexpr Field timestampSequence     {579, "ICMP Sequence Number", octetPair(), "  %n=%u"};
+inline constexpr Field originateTimestamp    {580, "Originate Timestamp",  octets(4),   "  %n=%x"};
+inline constexpr Field receiveTimestamp      {581, "Receive Timestamp",    octets(4),   "  %n=%x"};
+inline constexpr Field transmitTimestamp     {582, "Transmit Timestamp",   octets(4),   "  %n=%x"};
 
-inline constexpr Field informationCode       {583, "Code",                 octets(1),   "Code=%x"};
-inline constexpr Field informationChecksum   {584, "Checksum",             octetPair(), "  Checksum=%x"};
-inline constexpr Field informationIdentifier {585, "Identifier",           octetPair(), "  Identifier=%x"};
-inline constexpr Field informationSequence   {586, "ICMP Sequence Number", octetPair(), "  ICMP Sequence Number=%u"};
+inline constexpr Field informationCode       {583, "Code",                 octets(1),   "%n=%x"};
+inline constexpr Field informationChecksum   {584, "Checksum",             octetPair(), "  %n=%x"};
+inline constexpr Field informationIdentifier {585, "Identifier",           octetPair(), "  %n=%x"};
+inline constexpr Field informationSequence   {586, "ICMP Sequence Number", octetPair(), "  %n=%u"};
 
-inline constexpr Field advertisementCode     {587, "Code",                 octets(1),   "Code=%x"};
-inline constexpr Field advertisementChecksum {588, "Checksum",             octetPair(), "  Checksum=%x"};
-inline constexpr Field routers               {589, "Num Addr",             octets(1),   "  Num Addr=%u"};
-inline constexpr Field routerEntrySize       {590, "Addr Entry Size",      octets(1),   "  Addr Entry Size=%u"};
-inline constexpr Field routerLifetime        {591, "Lifetime",             octetPair(), "  Lifetime=%x"};
-inline constexpr Field routerAddress         {595, "Router Address",       octets(4),   "  Router Address=%x"};
-inline constexpr Field routerPreference      {596, "Preference Level",     octets(4),   "  Preference Level=%x"};
+inline constexpr Field advertisementCode     {587, "Code",                 octets(1),   "%n=%x"};
+inline constexpr Field advertisementChecksum {588, "Checksum",             octetPair(), "  %n=%x"};
+inline constexpr Field routers               {589, "Num Addr",             octets(1),   "  %n=%u"};
+inline constexpr Field routerEntrySize       {590, "Addr Entry Size",      octets(1),   "  %n=%u"};
+inline constexpr Field routerLifetime        {591, "Lifetime",             octetPair(), "  %n=%x"};
+inline constexpr Field routerAddress         {595, "Router Address",       octets(4),   "  %n=%x"};
+inline constexpr Field routerPreference      {596, "Preference Level",     octets(4),   "  %n=%x"};
 
-inline constexpr Field solicitationCode      {597, "Code",                 octets(1),   "Code=%x"};
-inline constexpr Field solicitationChecksum  {598, "Checksum",             octetPair(), "  Checksum=%x"};
-inline constexpr Field solicitationReserved  {599, "Reserved",             octets(4),   "  Reserved=%x"};
+inline constexpr Field solicitationCode      {597, "Code",                 octets(1),   "%n=%x"};
+inline constexpr Field solicitationChecksum  {598, "Checksum",             octetPair(), "  %n=%x"};
+inline constexpr Field solicitationReserved  {599, "Reserved",             octets(4),   "  %n=%x"};
 
-inline constexpr Field addressMaskCode       {600, "Code",                 octets(1),   "Code=%x"};
-inline constexpr Field addressMaskChecksum   {601, "Checksum",             octetPair(), "  Checksum=%x"};
-inline constexpr Field addressMaskIdentifier {602, "Identifier",           octetPair(), "  Identifier=%x"};
-inline constexpr Field addressMaskSequence   {603, "ICMP Sequence Number", octetPair(), "  ICMP Sequence Number=%u"};
-inline constexpr Field addressMask           {604, "Address Mask",         octets(4),   "  Address Mask=%x"};
+inline constexpr Field addressMaskCode       {600, "Code",                 octets(1),   "%n=%x"};
+inline constexpr Field addressMaskChecksum   {601, "Checksum",             octetPair(), "  %n=%x"};
+inline constexpr Field addressMaskIdentifier {602, "Identifier",           octetPair(), "  %n=%x"};
+inline constexpr Field addressMaskSequence   {603, "ICMP Sequence Number", octetPair(), "  %n=%u"};
+inline constexpr Field addressMask           {604, "Address Mask",         octets(4),   "  %n=%x"};
 // clang-format on
 
 inline constexpr std::int32_t echoHeaderOctets = 8;
@@ -160,5 +161,28 @@ NETFLOOR_INLINE inline void addressMaskMessage(Reader<Pass> &reader) {
     read<addressMaskSequence>(reader);
     read<addressMask>(reader);
 }
+
+// Where two types share a message, its key fields have a row for each type.
+// clang-format off
+using EchoRows = Rows<
+    FieldList<echoCode, echoChecksum, echoIdentifier, echoSequence, echoData>,
+    FieldList<echoCode, echoSequence, echoCode, echoSequence>>;
+
+using QueryRows = Rows<
+    FieldList<
+        timestampCode, timestampChecksum, timestampIdentifier, timestampSequence,
+        originateTimestamp, receiveTimestamp, transmitTimestamp,
+        informationCode, informationChecksum, informationIdentifier, informationSequence,
+        advertisementCode, advertisementChecksum, routers, routerEntrySize, routerLifetime,
+        routerAddress, routerPreference,
+        solicitationCode, solicitationChecksum, solicitationReserved,
+        addressMaskCode, addressMaskChecksum, addressMaskIdentifier, addressMaskSequence, addressMask>,
+    FieldList<
+        timestampCode, timestampSequence, timestampCode, timestampSequence,
+        informationCode, informationSequence, informationCode, informationSequence,
+        advertisementCode,
+        solicitationCode,
+        addressMaskCode, addressMaskSequence, addressMask, addressMaskCode, addressMaskSequence, addressMask>>;
+// clang-format on
 
 } // namespace netfloor::plugin::icmp

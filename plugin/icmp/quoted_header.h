@@ -24,6 +24,7 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
+#include "frame/field_list.h"
 #include "frame/field_step.h"
 #include "icmp/message_type.h"
 #include "ipv4/options.h"
@@ -58,36 +59,36 @@ inline constexpr ValueNames quotedMoreFragmentsNames{quotedMoreFragmentsRows};
 
 // The cursor moves over the first octet of the Fragment Offset only: the TTL takes the second one with it.
 // clang-format off
-inline constexpr Field quotedVersion        {605, "Version",                 piece(4, 7),                                   "  Version=%u"};
-inline constexpr Field quotedHeaderLength   {606, "IHL",                     piece(0, 3).advancing(8),                      "  IHL=%u*4 octet(s)"};
-inline constexpr Field quotedPrecedence     {607, "Precedence",              piece(5, 7),                                   "  Precedence=%-S", &quotedPrecedenceNames};
-inline constexpr Field quotedDelay          {608, "D",                       bit(4),                                        "  D=%-S",          &quotedDelayNames};
-inline constexpr Field quotedThroughput     {609, "T",                       bit(3),                                        "  T=%-S",          &quotedThroughputNames};
-inline constexpr Field quotedReliability    {610, "R",                       bit(2),                                        "  R=%-S",          &quotedReliabilityNames};
-inline constexpr Field quotedServiceFixed   {611, "Fixed Value",             piece(0, 1).advancing(8),                      "  Fixed Value=%x"};
-inline constexpr Field quotedLength         {612, "Original Length",         octets(2),                                     "  Original Length=%u"};
-inline constexpr Field quotedIdentification {615, "Original Identification", octets(2),                                     "  Original Identification=%x"};
-inline constexpr Field quotedFlagsFixed     {616, "Flags Fixed Value",       bit(7),                                        "  Flags Fixed Value=%x"};
-inline constexpr Field quotedDontFragment   {617, "Flags DF",                bit(6),                                        "  Flags DF=%-S",   &quotedDontFragmentNames};
-inline constexpr Field quotedMoreFragments  {618, "Flags MF",                bit(5),                                        "  Flags MF=%-S",   &quotedMoreFragmentsNames};
-inline constexpr Field quotedFragmentOffset {619, "Fragment Offset",         pieces({0, 4}, {8, 15}).advancing(8).times(8), "  Fragment Offset=%u"};
-inline constexpr Field quotedTimeToLive     {620, "TTL",                     piece(8, 15).advancing(16),                    "  TTL=%u"};
+inline constexpr Field quotedVersion        {605, "Version",                 piece(4, 7),                                   "  %n=%u"};
+inline constexpr Field quotedHeaderLength   {606, "IHL",                     piece(0, 3).advancing(8),                      "  %n=%u*4 octet(s)"};
+inline constexpr Field quotedPrecedence     {607, "Precedence",              piece(5, 7),                                   "  %n=%-S",           &quotedPrecedenceNames};
+inline constexpr Field quotedDelay          {608, "D",                       bit(4),                                        "  %n=%-S",           &quotedDelayNames};
+inline constexpr Field quotedThroughput     {609, "T",                       bit(3),                                        "  %n=%-S",           &quotedThroughputNames};
+inline constexpr Field quotedReliability    {610, "R",                       bit(2),                                        "  %n=%-S",           &quotedReliabilityNames};
+inline constexpr Field quotedServiceFixed   {611, "Fixed Value",             piece(0, 1).advancing(8),                      "  %n=%x"};
+inline constexpr Field quotedLength         {612, "Original Length",         octets(2),                                     "  %n=%u"};
+inline constexpr Field quotedIdentification {615, "Original Identification", octets(2),                                     "  %n=%x"};
+inline constexpr Field quotedFlagsFixed     {616, "Flags Fixed Value",       bit(7),                                        "  %n=%x"};
+inline constexpr Field quotedDontFragment   {617, "Flags DF",                bit(6),                                        "  %n=%-S",           &quotedDontFragmentNames};
+inline constexpr Field quotedMoreFragments  {618, "Flags MF",                bit(5),                                        "  %n=%-S",           &quotedMoreFragmentsNames};
+inline constexpr Field quotedFragmentOffset {619, "Fragment Offset",         pieces({0, 4}, {8, 15}).advancing(8).times(8), "  %n=%u"};
+inline constexpr Field quotedTimeToLive     {620, "TTL",                     piece(8, 15).advancing(16),                    "  %n=%u"};
 
 // The protocol: its short text tells which message quotes it, and whether that came through an IP in IP tunnel.
-inline constexpr Field unreachableInTunnel  {663, "Embedded IP Protocols",   octets(1),                                     "Embedded IP Protocols=%-S", &protocolNames, "IPinIP - ICMP - DUM - %-S"};
-inline constexpr Field sourceQuenchInTunnel {666, "Embedded IP Protocols",   octets(1),                                     "Embedded IP Protocols=%-S", &protocolNames, "IPinIP- ICMP - SQM - %-S"};
-inline constexpr Field redirectInTunnel     {669, "Embedded IP Protocols",   octets(1),                                     "Embedded IP Protocols=%-S", &protocolNames, "IPinIP - ICMP - RM - %-S"};
-inline constexpr Field timeExceededInTunnel {672, "Embedded IP Protocols",   octets(1),                                     "Embedded IP Protocols=%-S", &protocolNames, "IPinIP - ICMP - TEM - %-S"};
-inline constexpr Field problemInTunnel      {675, "Embedded IP Protocols",   octets(1),                                     "Embedded IP Protocols=%-S", &protocolNames, "IPinIP - ICMP - PPM - %-S"};
-inline constexpr Field unreachableProtocol  {679, "Embedded IP Protocols",   octets(1),                                     "Embedded IP Protocols=%-S", &protocolNames, "ICMP - DUM- %-S"};
-inline constexpr Field sourceQuenchProtocol {682, "Embedded IP Protocols",   octets(1),                                     "Embedded IP Protocols=%-S", &protocolNames, "ICMP - SQM- %-S"};
-inline constexpr Field redirectProtocol     {685, "Embedded IP Protocols",   octets(1),                                     "Embedded IP Protocols=%-S", &protocolNames, "ICMP - RM - %-S"};
-inline constexpr Field timeExceededProtocol {688, "Embedded IP Protocols",   octets(1),                                     "Embedded IP Protocols=%-S", &protocolNames, "ICMP - TEM - %-S"};
-inline constexpr Field problemProtocol      {691, "Embedded IP Protocols",   octets(1),                                     "Embedded IP Protocols=%-S", &protocolNames, "ICMP - PPM - %-S"};
+inline constexpr Field unreachableInTunnel  {663, "Embedded IP Protocols",  octets(1), "%n=%-S",               &protocolNames, "IPinIP - ICMP - DUM - %-S"};
+inline constexpr Field sourceQuenchInTunnel {666, "Embedded IP Protocols",  octets(1), "%n=%-S",               &protocolNames, "IPinIP- ICMP - SQM - %-S"};
+inline constexpr Field redirectInTunnel     {669, "Embedded IP Protocols",  octets(1), "%n=%-S",               &protocolNames, "IPinIP - ICMP - RM - %-S"};
+inline constexpr Field timeExceededInTunnel {672, "Embedded IP Protocols",  octets(1), "%n=%-S",               &protocolNames, "IPinIP - ICMP - TEM - %-S"};
+inline constexpr Field problemInTunnel      {675, "Embedded IP Protocols",  octets(1), "%n=%-S",               &protocolNames, "IPinIP - ICMP - PPM - %-S"};
+inline constexpr Field unreachableProtocol  {679, "Embedded IP Protocols",  octets(1), "%n=%-S",               &protocolNames, "ICMP - DUM- %-S"};
+inline constexpr Field sourceQuenchProtocol {682, "Embedded IP Protocols",  octets(1), "%n=%-S",               &protocolNames, "ICMP - SQM- %-S"};
+inline constexpr Field redirectProtocol     {685, "Embedded IP Protocols",  octets(1), "%n=%-S",               &protocolNames, "ICMP - RM - %-S"};
+inline constexpr Field timeExceededProtocol {688, "Embedded IP Protocols",  octets(1), "%n=%-S",               &protocolNames, "ICMP - TEM - %-S"};
+inline constexpr Field problemProtocol      {691, "Embedded IP Protocols",  octets(1), "%n=%-S",               &protocolNames, "ICMP - PPM - %-S"};
 
-inline constexpr Field quotedChecksum       {621, "Header Checksum",         octets(2),                                     "  Header Checksum=%x"};
-inline constexpr Field quotedSource         {624, "IP Source Address",       octets(4),                                     R"(  IP Source Address=%-["%u":"."])"};
-inline constexpr Field quotedDestination    {625, "IP Destination Address",  octets(4),                                     R"(  IP Destination Address=%-["%u":"."])"};
+inline constexpr Field quotedChecksum       {621, "Header Checksum",        octets(2), "  %n=%x"};
+inline constexpr Field quotedSource         {624, "IP Source Address",      octets(4), R"(  %n=%-["%u":"."])"};
+inline constexpr Field quotedDestination    {625, "IP Destination Address", octets(4), R"(  %n=%-["%u":"."])"};
 // clang-format on
 
 template <class Pass>
@@ -139,5 +140,21 @@ NETFLOOR_INLINE inline void quotedHeader(Reader<Pass> &reader) {
         ipv4::options(reader, embeddedHeaderOctets);
     }
 }
+
+// clang-format off
+using QuotedHeaderRows = Rows<
+    FieldList<
+        quotedVersion, quotedHeaderLength,
+        quotedPrecedence, quotedDelay, quotedThroughput, quotedReliability, quotedServiceFixed,
+        quotedLength, quotedIdentification,
+        quotedFlagsFixed, quotedDontFragment, quotedMoreFragments, quotedFragmentOffset,
+        quotedTimeToLive,
+        unreachableInTunnel, sourceQuenchInTunnel, redirectInTunnel, timeExceededInTunnel, problemInTunnel,
+        unreachableProtocol, sourceQuenchProtocol, redirectProtocol, timeExceededProtocol, problemProtocol,
+        quotedChecksum, quotedSource, quotedDestination>,
+    FieldList<
+        unreachableInTunnel, sourceQuenchInTunnel, redirectInTunnel, timeExceededInTunnel, problemInTunnel,
+        unreachableProtocol, sourceQuenchProtocol, redirectProtocol, timeExceededProtocol, problemProtocol>>;
+// clang-format on
 
 } // namespace netfloor::plugin::icmp

@@ -10,8 +10,8 @@
 namespace netfloor::plugin::ipv6 {
 
 // clang-format off
-inline constexpr Field listedAddress {856, "        IP Address", addressReversed(), R"(        IP Address=%-["%x":":"])"};
-inline constexpr Field address       {948, "IP Address",         addressGroups(),   R"(IP Address=%-["%x":"."])"};
+inline constexpr Field listedAddress {856, "        IP Address", addressReversed(), R"(        %n=%-["%x":":"])"};
+inline constexpr Field address       {948, "IP Address",         addressGroups(),   R"(%n=%-["%x":"."])"};
 inline constexpr Field addressKey    {950, "IP Address",         addressNibbles(),  ""};
 // clang-format on
 

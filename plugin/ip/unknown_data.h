@@ -4,11 +4,12 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
+#include "frame/field_list.h"
 #include "frame/field_step.h"
 
 namespace netfloor::plugin {
 
-inline constexpr Field unknownProtocolData{285, "Unknown Protocol Data", octets(1), "Unknown Protocol Data=%x"};
+inline constexpr Field unknownProtocolData{285, "Unknown Protocol Data", octets(1), "%n=%x"};
 
 template <class Pass>
 void unknownData(Reader<Pass> &reader) {
@@ -21,5 +22,7 @@ void unknownData(Reader<Pass> &reader) {
         readCounted<unknownProtocolData>(reader, payloadOctets);
     }
 }
+
+using UnknownDataRows = Rows<FieldList<unknownProtocolData>>;
 
 } // namespace netfloor::plugin

@@ -3,9 +3,12 @@
 #pragma once
 
 #include "frame/field.h"
+#include "frame/field_list.h"
 
 namespace netfloor::plugin {
 
-inline constexpr Field version{150, "Version", piece(4, 7), "Version=%u"};
+inline constexpr Field version{150, "Version", piece(4, 7), "%n=%u"};
+
+using VersionRows = Rows<FieldList<version>, FieldList<version>>;
 
 } // namespace netfloor::plugin

@@ -24,6 +24,7 @@
 #include "frame/block.h"
 #include "frame/checked_run.h"
 #include "frame/field.h"
+#include "frame/field_list.h"
 #include "frame/field_step.h"
 #include "ipv4/options.h"
 #include "ipv4/service_and_fragment.h"
@@ -32,14 +33,14 @@
 namespace netfloor::plugin::ipv4 {
 
 // clang-format off
-inline constexpr Field headerLength       {152, "Internet Header Length", piece(0, 3).advancing(8), "Internet Header Length=%u*4 octets"};
-inline constexpr Field totalLength        {153, "Total Length",           octets(2),                "Total Length=%u octets"};
-inline constexpr Field identification     {156, "Identification",         octets(2),                "Identification=%x"};
-inline constexpr Field timeToLive         {157, "Time to Live",           octets(1),                "Time to Live=%u"};
-inline constexpr Field protocol           {295, "Protocol",               octets(1),                "Protocol=%-S", &protocolNames};
-inline constexpr Field headerChecksum     {158, "Header Checksum",        octets(2),                "Header Checksum=%x"};
-inline constexpr Field sourceAddress      {159, "Source Address",         octets(4),                R"(Source Address= %-["%u":"."])"};
-inline constexpr Field destinationAddress {160, "Destination Address",    octets(4),                R"(Destination Address= %-["%u":"."])"};
+inline constexpr Field headerLength       {152, "Internet Header Length", piece(0, 3).advancing(8), "%n=%u*4 octets"};
+inline constexpr Field totalLength        {153, "Total Length",           octets(2),                "%n=%u octets"};
+inline constexpr Field identification     {156, "Identification",         octets(2),                "%n=%x"};
+inline constexpr Field timeToLive         {157, "Time to Live",           octets(1),                "%n=%u"};
+inline constexpr Field protocol           {295, "Protocol",               octets(1),                "%n=%-S",              &protocolNames};
+inline constexpr Field headerChecksum     {158, "Header Checksum",        octets(2),                "%n=%x"};
+inline constexpr Field sourceAddress      {159, "Source Address",         octets(4),                R"(%n= %-["%u":"."])"};
+inline constexpr Field destinationAddress {160, "Destination Address",    octets(4),                R"(%n= %-["%u":"."])"};
 // clang-format on
 
 // What the datagram holds in front of its limited block: the octets of version, service and Total Length.
@@ -79,7 +80,7 @@ NETFLOOR_INLINE inline void datagram(Reader<Pass> &reader) {
     }
     auto &variables = reader.variables();
     const Block<Pass> header{reader, "IPv4 Header"};
-    stretch<32, fieldsUpToTotalLength<Pass>>(reader);
+    checkedRun<headerLength, totalLength, fieldsUpToTotalLength<Pass>>(reader);
 
     if (!reader.live) {
         return;
@@ -91,12 +92,25 @@ NETFLOOR_INLINE inline void datagram(Reader<Pass> &reader) {
         return;
     }
     const LimitedBlock<Pass> extra{reader, "Extra", limit};
-    stretch<128, fieldsAfterTotalLength<Pass>>(reader);
+    checkedRun<identification, destinationAddress, fieldsAfterTotalLength<Pass>>(reader);
     options(reader);
     if (reader.live) {
         variables.payloadOctets = static_cast<std::int32_t>(variables.ipTotalLength - variables.ipHeaderOctets);
     }
     payload(reader);
 }
+
+// clang-format off
+using HeaderRows = Rows<
+    FieldList<
+        headerLength,
+        precedence, delay, throughput, reliability, serviceReserved,
+        totalLength, identification,
+        fragmentReserved, dontFragmentFlag, moreFragments, fragmentOffset,
+        timeToLive, protocol, headerChecksum, sourceAddress, destinationAddress>,
+    FieldList<
+        totalLength, identification, timeToLive, protocol, sourceAddress, destinationAddress,
+        dontFragmentFlag, moreFragments, fragmentOffset>>;
+// clang-format on
 
 } // namespace netfloor::plugin::ipv4

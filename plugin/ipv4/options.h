@@ -16,6 +16,7 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
+#include "frame/field_list.h"
 #include "frame/field_step.h"
 #include "ip/ipv6_address.h"
 #include "ip/option_list.h"
@@ -54,45 +55,45 @@ inline constexpr ValueNames compartmentNames{
 inline constexpr ValueNames timestampFlagNames{timestampFlagRows};
 
 // clang-format off
-inline constexpr Field noOperation         {318, "Type1, No Operation",                     octets(1),                  "Type1, No Operation", noNames, "%u"};
+inline constexpr Field noOperation         {318, "Type1, No Operation",                     octets(1),                  "%n",                 noNames,             "%u"};
 
-inline constexpr Field security            {321, "Type130, Security",                       octets(1),                  "Type130, Security", noNames, "%u"};
-inline constexpr Field securityLength      {322, "Length",                                  octets(1),                  "Length=%u octets"};
-inline constexpr Field securityLevel       {325, "Security (S Field)",                      piece(0, 15).advancing(16), "Security (S Field)=%-S", &securityNames};
-inline constexpr Field compartments        {326, "Compartments (C Field)",                  octets(2),                  "Compartments (C Field)=%-S", &compartmentNames};
-inline constexpr Field restrictions        {327, "Handling Restrictions (H Field)",         octets(2),                  "Handling Restrictions (H Field)=%x"};
-inline constexpr Field transmissionControl {328, "Transmission Control Code (TCC Field)",   octets(3),                  "Transmission Control Code (TCC Field)=%x"};
+inline constexpr Field security            {321, "Type130, Security",                       octets(1),                  "%n",                 noNames,             "%u"};
+inline constexpr Field securityLength      {322, "Length",                                  octets(1),                  "%n=%u octets"};
+inline constexpr Field securityLevel       {325, "Security (S Field)",                      piece(0, 15).advancing(16), "%n=%-S",             &securityNames};
+inline constexpr Field compartments        {326, "Compartments (C Field)",                  octets(2),                  "%n=%-S",             &compartmentNames};
+inline constexpr Field restrictions        {327, "Handling Restrictions (H Field)",         octets(2),                  "%n=%x"};
+inline constexpr Field transmissionControl {328, "Transmission Control Code (TCC Field)",   octets(3),                  "%n=%x"};
 
-inline constexpr Field looseRoute          {329, "Type131, Loose Source and Record Route",  octets(1),                  "Type131, Loose Source and Record Route", noNames, "%u"};
-inline constexpr Field looseRouteLength    {330, "Length",                                  octets(1),                  "Length=%u octets"};
-inline constexpr Field looseRoutePointer   {333, "Pointer",                                 octets(1),                  "Pointer=%u(th) octet"};
-inline constexpr Field looseRouteData      {336, "Route Data",                              octets(4),                  R"(Route Data=%-["%u":"."])"};
+inline constexpr Field looseRoute          {329, "Type131, Loose Source and Record Route",  octets(1),                  "%n",                 noNames,             "%u"};
+inline constexpr Field looseRouteLength    {330, "Length",                                  octets(1),                  "%n=%u octets"};
+inline constexpr Field looseRoutePointer   {333, "Pointer",                                 octets(1),                  "%n=%u(th) octet"};
+inline constexpr Field looseRouteData      {336, "Route Data",                              octets(4),                  R"(%n=%-["%u":"."])"};
 
-inline constexpr Field strictRoute         {339, "Type137, Strict Source and Record Route", octets(1),                  "Type137, Strict Source and Record Route", noNames, "%u"};
-inline constexpr Field strictRouteLength   {340, "Length",                                  octets(1),                  "Length=%u octets"};
-inline constexpr Field strictRoutePointer  {343, "Pointer",                                 octets(1),                  "Pointer=%u(th) octet"};
-inline constexpr Field strictRouteData     {346, "Route Data",                              octets(4),                  R"(Route Data=%-["%u":"."])"};
+inline constexpr Field strictRoute         {339, "Type137, Strict Source and Record Route", octets(1),                  "%n",                 noNames,             "%u"};
+inline constexpr Field strictRouteLength   {340, "Length",                                  octets(1),                  "%n=%u octets"};
+inline constexpr Field strictRoutePointer  {343, "Pointer",                                 octets(1),                  "%n=%u(th) octet"};
+inline constexpr Field strictRouteData     {346, "Route Data",                              octets(4),                  R"(%n=%-["%u":"."])"};
 
-inline constexpr Field recordRoute         {348, "Type7, Record Route",                     octets(1),                  "Type7, Record Route", noNames, "%u"};
-inline constexpr Field recordRouteLength   {349, "Length",                                  octets(1),                  "Length=%u octets"};
-inline constexpr Field recordRoutePointer  {352, "Pointer",                                 octets(1),                  "Pointer=%u(th) octet"};
-inline constexpr Field recordRouteData     {355, "Route Data",                              octets(4),                  R"(Route Data=%-["%u":"."])"};
+inline constexpr Field recordRoute         {348, "Type7, Record Route",                     octets(1),                  "%n",                 noNames,             "%u"};
+inline constexpr Field recordRouteLength   {349, "Length",                                  octets(1),                  "%n=%u octets"};
+inline constexpr Field recordRoutePointer  {352, "Pointer",                                 octets(1),                  "%n=%u(th) octet"};
+inline constexpr Field recordRouteData     {355, "Route Data",                              octets(4),                  R"(%n=%-["%u":"."])"};
 
-inline constexpr Field streamIdentifier    {357, "Type136, Stream Identifier",              octets(1),                  "Type136, Stream Identifier", noNames, "%u"};
-inline constexpr Field streamLength        {358, "Length",                                  octets(1),                  "Length=%u octets"};
-inline constexpr Field streamId            {361, "Stream ID",                               octets(2),                  "Stream ID=%x"};
+inline constexpr Field streamIdentifier    {357, "Type136, Stream Identifier",              octets(1),                  "%n",                 noNames,             "%u"};
+inline constexpr Field streamLength        {358, "Length",                                  octets(1),                  "%n=%u octets"};
+inline constexpr Field streamId            {361, "Stream ID",                               octets(2),                  "%n=%x"};
 
-inline constexpr Field internetTimestamp   {362, "Type68, Internet Timestamp",              octets(1),                  "Type68, Internet Timestamp", noNames, "%u"};
-inline constexpr Field timestampLength     {363, "Length",                                  octets(1),                  "Length=%u octets"};
-inline constexpr Field timestampPointer    {366, "Pointer",                                 octets(1),                  "Pointer=%u(th) octet"};
-inline constexpr Field timestampOverflow   {367, "Overflow",                                piece(4, 7),                "Overflow=%u"};
-inline constexpr Field timestampFlag       {368, "Flag",                                    piece(0, 3).advancing(8),   "Flag=%-S", &timestampFlagNames};
-inline constexpr Field timestamp           {372, "Timestamp",                               octets(4),                  "Timestamp=%x"};
-inline constexpr Field registeringAddress  {378, "Internet Address",                        octets(4),                  R"(Internet Address=%-["%u":"."])"};
-inline constexpr Field registeredTimestamp {380, "Timestamp",                               octets(4),                  "Timestamp=%x"};
+inline constexpr Field internetTimestamp   {362, "Type68, Internet Timestamp",              octets(1),                  "%n",                 noNames,             "%u"};
+inline constexpr Field timestampLength     {363, "Length",                                  octets(1),                  "%n=%u octets"};
+inline constexpr Field timestampPointer    {366, "Pointer",                                 octets(1),                  "%n=%u(th) octet"};
+inline constexpr Field timestampOverflow   {367, "Overflow",                                piece(4, 7),                "%n=%u"};
+inline constexpr Field timestampFlag       {368, "Flag",                                    piece(0, 3).advancing(8),   "%n=%-S",             &timestampFlagNames};
+inline constexpr Field timestamp           {372, "Timestamp",                               octets(4),                  "%n=%x"};
+inline constexpr Field registeringAddress  {378, "Internet Address",                        octets(4),                  R"(%n=%-["%u":"."])"};
+inline constexpr Field registeredTimestamp {380, "Timestamp",                               octets(4),                  "%n=%x"};
 
-inline constexpr Field endOfOptionPart     {381, "End Of Option Part",                      octets(1),                  "End Of Option Part", noNames, "%u"};
-inline constexpr Field optionPadding       {306, "Padding",                                 octetRun(),                 "Padding=%x"};
+inline constexpr Field endOfOptionPart     {381, "End Of Option Part",                      octets(1),                  "%n",                 noNames,             "%u"};
+inline constexpr Field optionPadding       {306, "Padding",                                 octetRun(),                 "%n=%x"};
 // clang-format on
 
 inline constexpr std::int32_t fixedHeaderOctets = 20;
@@ -241,5 +242,20 @@ template <class Pass>
 NETFLOOR_INLINE inline void options(Reader<Pass> &reader) {
     options(reader, static_cast<std::int32_t>(reader.variables().ipHeaderOctets) - fixedHeaderOctets);
 }
+
+// clang-format off
+using OptionRows = Rows<
+    FieldList<
+        noOperation,
+        security, securityLength, securityLevel, compartments, restrictions, transmissionControl,
+        looseRoute, looseRouteLength, looseRoutePointer, looseRouteData, ipv6::listedAddress,
+        strictRoute, strictRouteLength, strictRoutePointer, strictRouteData,
+        recordRoute, recordRouteLength, recordRoutePointer, recordRouteData,
+        streamIdentifier, streamLength, streamId,
+        internetTimestamp, timestampLength, timestampPointer, timestampOverflow, timestampFlag, timestamp,
+        registeringAddress, ipv6::address, ipv6::addressKey, registeredTimestamp,
+        endOfOptionPart, optionPadding>,
+    FieldList<ipv6::addressKey>>;
+// clang-format on
 
 } // namespace netfloor::plugin::ipv4

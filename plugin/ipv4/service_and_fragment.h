@@ -39,16 +39,16 @@ inline constexpr ValueNames dontFragmentNames{dontFragmentRows};
 inline constexpr ValueNames moreFragmentsNames{moreFragmentsRows};
 
 // clang-format off
-inline constexpr Field precedence       {286, "Precedence",      piece(5, 7),                                    "Precedence=%-S",  &precedenceNames};
-inline constexpr Field delay            {287, "Delay",           bit(4),                                         "Delay=%-S",       &delayNames};
-inline constexpr Field throughput       {288, "Throughput",      bit(3),                                         "Throughput=%-S",  &throughputNames};
-inline constexpr Field reliability      {289, "Reliability",     bit(2),                                         "Reliability=%-S", &reliabilityNames};
-inline constexpr Field serviceReserved  {290, "Reserved",        piece(0, 1).advancing(8),                       "Reserved=%x"};
+inline constexpr Field precedence       {286, "Precedence",      piece(5, 7),                                    "%n=%-S",       &precedenceNames};
+inline constexpr Field delay            {287, "Delay",           bit(4),                                         "%n=%-S",       &delayNames};
+inline constexpr Field throughput       {288, "Throughput",      bit(3),                                         "%n=%-S",       &throughputNames};
+inline constexpr Field reliability      {289, "Reliability",     bit(2),                                         "%n=%-S",       &reliabilityNames};
+inline constexpr Field serviceReserved  {290, "Reserved",        piece(0, 1).advancing(8),                       "%n=%x"};
 
-inline constexpr Field fragmentReserved {291, "Reserved",        bit(7),                                         "Reserved=%x"};
-inline constexpr Field dontFragmentFlag {292, "DF",              bit(6),                                         "DF=%-S",          &dontFragmentNames};
-inline constexpr Field moreFragments    {293, "MF",              bit(5),                                         "MF=%-S",          &moreFragmentsNames};
-inline constexpr Field fragmentOffset   {294, "Fragment Offset", pieces({0, 4}, {8, 15}).advancing(16).times(8), "Fragment Offset=%u octets"};
+inline constexpr Field fragmentReserved {291, "Reserved",        bit(7),                                         "%n=%x"};
+inline constexpr Field dontFragmentFlag {292, "DF",              bit(6),                                         "%n=%-S",       &dontFragmentNames};
+inline constexpr Field moreFragments    {293, "MF",              bit(5),                                         "%n=%-S",       &moreFragmentsNames};
+inline constexpr Field fragmentOffset   {294, "Fragment Offset", pieces({0, 4}, {8, 15}).advancing(16).times(8), "%n=%u octets"};
 // clang-format on
 
 struct FragmentVariables {

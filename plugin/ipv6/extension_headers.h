@@ -25,6 +25,7 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
+#include "frame/field_list.h"
 #include "frame/field_step.h"
 #include "ip/ipv6_address.h"
 #include "ipv6/header.h"
@@ -36,30 +37,30 @@ inline constexpr std::array moreFragmentsRows = {ValueName{0, "last fragment"}, 
 inline constexpr ValueNames moreFragmentsNames{moreFragmentsRows};
 
 // clang-format off
-inline constexpr Field extensionLength        {222, "Header Extention length", octets(1),                "Header Extention length=%u*8 octet(s)"};
+inline constexpr Field extensionLength        {222, "Header Extention length", octets(1),                "%n=%u*8 octet(s)"};
 
-inline constexpr Field routingTypeAhead       {177, "Routing Type",            ahead(16, 23),            "Routing Type=%x"};
-inline constexpr Field segmentsLeftAhead      {188, "Segments Left",           ahead(24, 31),            "Segments Left=%x"};
-inline constexpr Field spare                  {193, "Spare",                   octetRun(),               "Spare=%x"};
-inline constexpr Field routingType            {180, "Routing Type",            octets(1),                "Routing Type=%u"};
-inline constexpr Field segmentsLeft           {181, "Sgmt Left",               octets(1),                "Sgmt Left=%u"};
-inline constexpr Field routingReserved        {182, "Reserved",                octets(4),                R"(Reserved=%-["%x"])"};
+inline constexpr Field routingTypeAhead       {177, "Routing Type",            ahead(16, 23),            "%n=%x"};
+inline constexpr Field segmentsLeftAhead      {188, "Segments Left",           ahead(24, 31),            "%n=%x"};
+inline constexpr Field spare                  {193, "Spare",                   octetRun(),               "%n=%x"};
+inline constexpr Field routingType            {180, "Routing Type",            octets(1),                "%n=%u"};
+inline constexpr Field segmentsLeft           {181, "Sgmt Left",               octets(1),                "%n=%u"};
+inline constexpr Field routingReserved        {182, "Reserved",                octets(4),                R"(%n=%-["%x"])"};
 
-inline constexpr Field fragmentReserved       {197, "Reserved",                octets(1),                "Reserved=%x"};
-inline constexpr Field fragmentOffset         {198, "fragment Offset",         pieces({0, 7}, {11, 15}), " fragment Offset=%u*8 octet(s)"};
-inline constexpr Field fragmentSpare          {199, "Res",                     piece(9, 10),             "Res=%u"};
-inline constexpr Field moreFragments          {200, "M Flag",                  bit(8).advancing(16),     "M Flag=%-S", &moreFragmentsNames};
-inline constexpr Field identification         {201, "Identification",          octetsBackward(4),        R"(Identification=%-["%x"])"};
+inline constexpr Field fragmentReserved       {197, "Reserved",                octets(1),                "%n=%x"};
+inline constexpr Field fragmentOffset         {198, "fragment Offset",         pieces({0, 7}, {11, 15}), " %n=%u*8 octet(s)"};
+inline constexpr Field fragmentSpare          {199, "Res",                     piece(9, 10),             "%n=%u"};
+inline constexpr Field moreFragments          {200, "M Flag",                  bit(8).advancing(16),     "%n=%-S",            &moreFragmentsNames};
+inline constexpr Field identification         {201, "Identification",          octetsBackward(4),        R"(%n=%-["%x"])"};
 
-inline constexpr Field securityIndex          {215, "SPI",                     octetsBackward(4),        " SPI=%u"};
-inline constexpr Field securitySequence       {216, "Sequence Number",         octetsBackward(4),        " Sequence Number=%u"};
-inline constexpr Field encryptedData          {218, "Encrypted Data",          octets(1),                "Encrypted Data=%x"};
+inline constexpr Field securityIndex          {215, "SPI",                     octetsBackward(4),        " %n=%u"};
+inline constexpr Field securitySequence       {216, "Sequence Number",         octetsBackward(4),        " %n=%u"};
+inline constexpr Field encryptedData          {218, "Encrypted Data",          octets(1),                "%n=%x"};
 
-inline constexpr Field authenticationLength   {206, "Payload Length",          octets(1),                "Payload Length=%u*4 octets"};
-inline constexpr Field authenticationReserved {207, "reserved",                octets(1),                "reserved=%x"};
-inline constexpr Field authenticationIndex    {208, "SPI",                     octetsBackward(4),        " SPI=%u"};
-inline constexpr Field authenticationSequence {209, "Sequency Number",         octetsBackward(4),        " Sequency Number=%u"};
-inline constexpr Field authenticationData     {211, "Authentication Data",     octets(1),                "Authentication Data=%x"};
+inline constexpr Field authenticationLength   {206, "Payload Length",          octets(1),                "%n=%u*4 octets"};
+inline constexpr Field authenticationReserved {207, "reserved",                octets(1),                "%n=%x"};
+inline constexpr Field authenticationIndex    {208, "SPI",                     octetsBackward(4),        " %n=%u"};
+inline constexpr Field authenticationSequence {209, "Sequency Number",         octetsBackward(4),        " %n=%u"};
+inline constexpr Field authenticationData     {211, "Authentication Data",     octets(1),                "%n=%x"};
 // clang-format on
 
 struct ExtensionHeaderVariables {
@@ -190,5 +191,23 @@ void securityPayload(Reader<Pass> &reader) {
     countOff(reader, securityHeaderOctets);
     readCounted<encryptedData>(reader, reader.variables().payloadOctets);
 }
+
+// clang-format off
+using ExtensionHeaderRows = Rows<
+    Joined<
+        FieldList<extensionLength>,
+        OptionRows::Fields,
+        FieldList<
+            routingTypeAhead, routingType, segmentsLeft, routingReserved, segmentsLeftAhead, spare,
+            fragmentReserved, fragmentOffset, fragmentSpare, moreFragments, identification,
+            securityIndex, securitySequence, encryptedData,
+            authenticationLength, authenticationReserved, authenticationIndex, authenticationSequence,
+            authenticationData>>,
+    Joined<
+        FieldList<
+            addressKey, fragmentOffset, moreFragments, securityIndex, securitySequence,
+            authenticationIndex, authenticationSequence, extensionLength>,
+        OptionRows::Keys>>;
+// clang-format on
 
 } // namespace netfloor::plugin::ipv6

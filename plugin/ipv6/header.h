@@ -21,6 +21,7 @@
 #include "frame/block.h"
 #include "frame/checked_run.h"
 #include "frame/field.h"
+#include "frame/field_list.h"
 #include "frame/field_step.h"
 #include "ip/ipv6_address.h"
 #include "names/ip_protocols.h"
@@ -31,15 +32,15 @@ namespace netfloor::plugin::ipv6 {
 // tell the two apart: both have the layout of two octets that the cursor moves over.
 //
 // clang-format off
-inline constexpr Field trafficClass       {166, "Traffic Class",          pieces({0, 3}, {12, 15}),                          "Traffic Class=%u"};
-inline constexpr Field flowLabel          {167, "Flow Label",             pieces({8, 11}, {16, 23}, {24, 31}).advancing(32), "Flow Label=%u"};
-inline constexpr Field payloadLengthAhead {168, "Payload Length",         octets(2).advancing(0),                            "Payload Length=%u octets"};
-inline constexpr Field payloadLength      {171, "Payload Length",         octets(2),                                         "Payload Length=%u octets"};
-inline constexpr Field nextHeaderField    {220, "Next Header",            octets(1),                                         "Next Header=%-S", &protocolNames};
-inline constexpr Field hopLimit           {172, "Hop Limit",              octets(1),                                         "Hop Limit=%u"};
-inline constexpr Field sourceGroups       {956, "Source IP Address",      addressGroups(),                                   R"(Source IP Address=%-["%x":"."])"};
+inline constexpr Field trafficClass       {166, "Traffic Class",          pieces({0, 3}, {12, 15}),                          "%n=%u"};
+inline constexpr Field flowLabel          {167, "Flow Label",             pieces({8, 11}, {16, 23}, {24, 31}).advancing(32), "%n=%u"};
+inline constexpr Field payloadLengthAhead {168, "Payload Length",         octets(2).advancing(0),                            "%n=%u octets"};
+inline constexpr Field payloadLength      {171, "Payload Length",         octets(2),                                         "%n=%u octets"};
+inline constexpr Field nextHeaderField    {220, "Next Header",            octets(1),                                         "%n=%-S",             &protocolNames};
+inline constexpr Field hopLimit           {172, "Hop Limit",              octets(1),                                         "%n=%u"};
+inline constexpr Field sourceGroups       {956, "Source IP Address",      addressGroups(),                                   R"(%n=%-["%x":"."])"};
 inline constexpr Field sourceNibbles      {958, "Source IP Address",      addressNibbles(),                                  ""};
-inline constexpr Field destinationGroups  {952, "Destination IP Address", addressGroups(),                                   R"(Destination IP Address=%-["%x":"."])"};
+inline constexpr Field destinationGroups  {952, "Destination IP Address", addressGroups(),                                   R"(%n=%-["%x":"."])"};
 inline constexpr Field destinationNibbles {954, "Destination IP Address", addressNibbles(),                                  ""};
 // clang-format on
 
@@ -90,18 +91,26 @@ template <class Pass>
 [[nodiscard]] NETFLOOR_INLINE inline bool fixedHeader(Reader<Pass> &reader, BlockChain<Pass> &chain) {
     auto &variables = reader.variables();
     chain.open("IPv6 Header");
-    stretch<48, fieldsUpToPayloadLength<Pass>>(reader);
+    checkedRun<trafficClass, payloadLengthAhead, fieldsUpToPayloadLength<Pass>>(reader);
 
     const std::uint32_t restBits = variables.ipv6PayloadLength * bitsPerOctet + bitsAfterLength;
     if (!reader.live || restBits > reader.left) {
         return false;
     }
     chain.openLimited("IPv6 Body", payloadLengthBits + restBits);
-    stretch<payloadLengthBits + bitsAfterLength, fieldsFromPayloadLength<Pass>>(reader);
+    checkedRun<payloadLength, destinationNibbles, fieldsFromPayloadLength<Pass>>(reader);
     if (reader.live) {
         variables.payloadOctets = static_cast<std::int32_t>(variables.ipv6PayloadLength);
     }
     return true;
 }
+
+// clang-format off
+using HeaderRows = Rows<
+    FieldList<
+        trafficClass, flowLabel, payloadLengthAhead, payloadLength, nextHeaderField, hopLimit,
+        sourceGroups, sourceNibbles, destinationGroups, destinationNibbles>,
+    FieldList<payloadLengthAhead, payloadLength, sourceNibbles, destinationNibbles, nextHeaderField>>;
+// clang-format on
 
 } // namespace netfloor::plugin::ipv6

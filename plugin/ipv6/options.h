@@ -13,22 +13,23 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
+#include "frame/field_list.h"
 #include "frame/field_step.h"
 #include "ip/unknown_data.h"
 
 namespace netfloor::plugin::ipv6 {
 
 // clang-format off
-inline constexpr Field optionTypeAhead     {223, "Option type",          ahead(0, 7), "Option type=%x"};
-inline constexpr Field pad1Type            {232, "Option Type",          octets(1),   " Option Type=Pad1 option", noNames, "%u"};
-inline constexpr Field padNType            {226, "Option Type",          octets(1),   " Option Type=PadN option", noNames, "%u"};
-inline constexpr Field padNLength          {227, "Option Length",        octets(1),   "Option Length=%u Octetc(s)"};
-inline constexpr Field paddingData         {229, "Padding Data",         nibbleRun(), R"(Padding Data=%-["%x"] (Hex))"};
-inline constexpr Field actionAhead         {235, "highest-order 2 bits", ahead(6, 7), "highest-order 2 bits=%x"};
-inline constexpr Field unknownOptionType   {238, "Option Type",          octets(1),   " Option Type=Unknown", noNames, "%u"};
-inline constexpr Field unknownOptionLength {239, "Opt Data Length",      octets(1),   " Opt Data Length=%u Octet(s)", noNames, "%u"};
-inline constexpr Field skippedOctet        {240, "Skip",                 octets(1),   "Skip=%x"};
-inline constexpr Field discardedOptionType {243, "discard packet",       octets(1),   "unkown option type, discard packet", noNames, "%u", "unkown option type, discard packet"};
+inline constexpr Field optionTypeAhead     {223, "Option type",          ahead(0, 7), "%n=%x"};
+inline constexpr Field pad1Type            {232, "Option Type",          octets(1),   " %n=Pad1 option",                    noNames, "%u"};
+inline constexpr Field padNType            {226, "Option Type",          octets(1),   " %n=PadN option",                    noNames, "%u"};
+inline constexpr Field padNLength          {227, "Option Length",        octets(1),   "%n=%u Octetc(s)"};
+inline constexpr Field paddingData         {229, "Padding Data",         nibbleRun(), R"(%n=%-["%x"] (Hex))"};
+inline constexpr Field actionAhead         {235, "highest-order 2 bits", ahead(6, 7), "%n=%x"};
+inline constexpr Field unknownOptionType   {238, "Option Type",          octets(1),   " %n=Unknown",                        noNames, "%u"};
+inline constexpr Field unknownOptionLength {239, "Opt Data Length",      octets(1),   " %n=%u Octet(s)",                    noNames, "%u"};
+inline constexpr Field skippedOctet        {240, "Skip",                 octets(1),   "%n=%x"};
+inline constexpr Field discardedOptionType {243, "discard packet",       octets(1),   "unkown option type, %n", noNames, "%u", "unkown option type, discard packet"};
 // clang-format on
 
 struct OptionVariables {
@@ -98,5 +99,15 @@ template <class Pass>
     skippedOption(reader);
     return true;
 }
+
+// clang-format off
+using OptionRows = Rows<
+    FieldList<
+        optionTypeAhead,
+        pad1Type,
+        padNType, padNLength, paddingData,
+        actionAhead, unknownOptionType, unknownOptionLength, skippedOctet, discardedOptionType>,
+    FieldList<pad1Type, padNType, unknownOptionType, unknownOptionLength>>;
+// clang-format on
 
 } // namespace netfloor::plugin::ipv6

@@ -18,6 +18,7 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
+#include "frame/field_list.h"
 #include "frame/field_step.h"
 #include "sctp/chunk_head.h"
 #include "sctp/error_causes.h"
@@ -29,8 +30,8 @@ inline constexpr std::array abortTagRows = {ValueName{0, "Sender TCB"}, ValueNam
 inline constexpr ValueNames abortTagNames{abortTagRows};
 
 // clang-format off
-inline constexpr Field abortReserved {944, "  Reserved", piece(1, 7),         "  Reserved=%x"};
-inline constexpr Field abortTagBit   {945, "  T bit",    bit(0).advancing(8), "  T bit=%-S", &abortTagNames};
+inline constexpr Field abortReserved {944, "  Reserved", piece(1, 7),         "  %n=%x"};
+inline constexpr Field abortTagBit   {945, "  T bit",    bit(0).advancing(8), "  %n=%-S", &abortTagNames};
 inline constexpr Field abortLength   = chunkLengthField(946);
 
 inline constexpr Field errorFlags    = lowerFlagsField(909);
@@ -55,5 +56,9 @@ void errorChunk(Reader<Pass> &reader) {
     read<errorLength>(reader, octetsAfterHead(reader.variables().errorOctets));
     errorCauses(reader);
 }
+
+// The causes are first read in ABORT.
+using AbortRows = Rows<Joined<FieldList<abortReserved, abortTagBit, abortLength>, CauseFields>>;
+using ErrorRows = Rows<FieldList<errorFlags, errorLength>>;
 
 } // namespace netfloor::plugin::sctp

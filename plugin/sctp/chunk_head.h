@@ -19,10 +19,10 @@
 namespace netfloor::plugin::sctp {
 
 // clang-format off
-constexpr Field flagsField       (std::uint32_t id) { return {id, "  Chunk Flags",  octets(1), "  Chunk Flags=0x%x"}; }
-constexpr Field lowerFlagsField  (std::uint32_t id) { return {id, "  Chunk flags",  octets(1), "  Chunk flags=%x"}; }
-constexpr Field chunkLengthField (std::uint32_t id) { return {id, "  Chunk Length", octets(2), "  Chunk Length=%u"}; }
-constexpr Field lengthField      (std::uint32_t id) { return {id, "  Length",       octets(2), "  Length=%u"}; }
+constexpr Field flagsField      (std::uint32_t id) { return {id, "  Chunk Flags",  octets(1), "  %n=0x%x"}; }
+constexpr Field lowerFlagsField (std::uint32_t id) { return {id, "  Chunk flags",  octets(1), "  %n=%x"}; }
+constexpr Field chunkLengthField(std::uint32_t id) { return {id, "  Chunk Length", octets(2), "  %n=%u"}; }
+constexpr Field lengthField     (std::uint32_t id) { return {id, "  Length",       octets(2), "  %n=%u"}; }
 // clang-format on
 
 // The Length that several chunks share.

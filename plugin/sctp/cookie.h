@@ -14,6 +14,7 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
+#include "frame/field_list.h"
 #include "frame/field_step.h"
 #include "sctp/chunk_head.h"
 #include "sctp/length.h"
@@ -22,7 +23,7 @@ namespace netfloor::plugin::sctp {
 
 // clang-format off
 inline constexpr Field cookieEchoFlags = lowerFlagsField(893);
-inline constexpr Field cookie {895, "    Cookie", octetRunBackward(), R"(    Cookie=%-["%x"])"};
+inline constexpr Field cookie          {895, "    Cookie", octetRunBackward(), R"(    %n=%-["%x"])"};
 
 inline constexpr Field cookieAckFlags  = lowerFlagsField(892);
 // clang-format on
@@ -46,5 +47,7 @@ void cookieAckChunk(Reader<Pass> &reader) {
     read<cookieAckFlags>(reader);
     readChunkLength(reader);
 }
+
+using CookieRows = Rows<FieldList<cookieEchoFlags, cookie, cookieAckFlags>>;
 
 } // namespace netfloor::plugin::sctp

@@ -24,6 +24,7 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
+#include "frame/field_list.h"
 #include "frame/field_step.h"
 #include "ip/hand_off.h"
 #include "sctp/chunk_head.h"
@@ -42,13 +43,13 @@ inline constexpr ValueNames unorderedNames{unorderedRows};
 inline constexpr ValueNames fragmentNames{fragmentRows};
 
 // clang-format off
-inline constexpr Field dataReserved              {814, "  Reserved",                      piece(3, 7),              "  Reserved=%x"};
-inline constexpr Field unorderedBit              {815, "  Unordered Data Chunk(U) Bit",   bit(2),                   "  Unordered Data Chunk(U) Bit=%-S", &unorderedNames};
-inline constexpr Field fragmentBits              {816, "  BE bits",                       piece(0, 1).advancing(8), "  BE bits=%-S",                     &fragmentNames};
-inline constexpr Field tsn                       {817, "    TSN",                         octets(4),                "    TSN=0x%x"};
-inline constexpr Field streamIdentifier          {818, "    Stream Indetifier S",         octets(2),                "    Stream Indetifier S=%u"};
-inline constexpr Field streamSequenceNumber      {819, "    Stream Sequence Number n",    octets(2),                "    Stream Sequence Number n=%u"};
-inline constexpr Field payloadProtocolIdentifier {820, "    Payload Protocol Identifier", octets(4),                "    Payload Protocol Identifier=0x%x"};
+inline constexpr Field dataReserved              {814, "  Reserved",                      piece(3, 7),              "  %n=%x"};
+inline constexpr Field unorderedBit              {815, "  Unordered Data Chunk(U) Bit",   bit(2),                   "  %n=%-S",    &unorderedNames};
+inline constexpr Field fragmentBits              {816, "  BE bits",                       piece(0, 1).advancing(8), "  %n=%-S",    &fragmentNames};
+inline constexpr Field tsn                       {817, "    TSN",                         octets(4),                "    %n=0x%x"};
+inline constexpr Field streamIdentifier          {818, "    Stream Indetifier S",         octets(2),                "    %n=%u"};
+inline constexpr Field streamSequenceNumber      {819, "    Stream Sequence Number n",    octets(2),                "    %n=%u"};
+inline constexpr Field payloadProtocolIdentifier {820, "    Payload Protocol Identifier", octets(4),                "    %n=0x%x"};
 // clang-format on
 
 // A Length of so many octets is that of a chunk without user data.
@@ -69,5 +70,13 @@ NETFLOOR_INLINE inline void dataChunk(Reader<Pass> &reader) {
         handOff(reader);
     }
 }
+
+// clang-format off
+using DataRows = Rows<
+    FieldList<
+        dataReserved, unorderedBit, fragmentBits, chunkLength,
+        tsn, streamIdentifier, streamSequenceNumber, payloadProtocolIdentifier>,
+    FieldList<tsn, streamIdentifier, streamSequenceNumber, payloadProtocolIdentifier>>;
+// clang-format on
 
 } // namespace netfloor::plugin::sctp

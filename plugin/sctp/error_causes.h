@@ -18,6 +18,7 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
+#include "frame/field_list.h"
 #include "frame/field_step.h"
 #include "sctp/counted_list.h"
 #include "sctp/length.h"
@@ -54,35 +55,35 @@ inline constexpr ValueNames causeCodeNames{.rows = causeCodeRows, .otherwise = "
 
 // Each cause has an id of its own for its Length: that is how the host tells the causes apart.
 constexpr Field causeLengthField(std::uint32_t id) {
-    return {id, "      Length", octetPair(), "      Length=%u"};
+    return {id, "      Length", octetPair(), "      %n=%u"};
 }
 
 constexpr Field longCauseLengthField(std::uint32_t id) {
-    return {id, "      Cause Length", octetPair(), "      Cause Length=%u"};
+    return {id, "      Cause Length", octetPair(), "      %n=%u"};
 }
 
 // clang-format off
-inline constexpr Field causeCode             {912, "    Cause Code",                       octetPair(),        "    Cause Code=%-S", &causeCodeNames};
-inline constexpr Field invalidStreamLength       = causeLengthField(914);
-inline constexpr Field invalidStream         {915, "        Stream Identifier",            octetPair(),        "        Stream Identifier=%u"};
-inline constexpr Field invalidStreamReserved {916, "        Reserved",                     octetPair(),        "        Reserved=%u"};
-inline constexpr Field missingLength             = causeLengthField(917);
-inline constexpr Field missingNumber         {918, "        Number of missing params",     octets(4),          "        Number of missing params=%u"};
-inline constexpr Field missingType           {920, "        Missing Parameters Type",      octetPair(),        "        Missing Parameters Type=%u"};
-inline constexpr Field staleCookieLength         = longCauseLengthField(921);
-inline constexpr Field staleness             {922, "        Measure of staleness (usec.)", octets(4),          "        Measure of staleness (usec.)=%u"};
-inline constexpr Field outOfResourceLength       = longCauseLengthField(923);
-inline constexpr Field unresolvableLength        = causeLengthField(924);
-inline constexpr Field unresolvableValue     {925, "        Unrecognized Address",         octetRunBackward(), R"(        Unrecognized Address=%-["%x"])"};
-inline constexpr Field unrecognizedChunkLength   = causeLengthField(926);
-inline constexpr Field unrecognizedChunk     {927, "        Unrecognized Chunk",           octetRunBackward(), R"(        Unrecognized Chunk=%-["%x"])"};
-inline constexpr Field invalidMandatoryLength    = causeLengthField(928);
-inline constexpr Field unrecognizedListLength    = causeLengthField(929);
-inline constexpr Field noUserDataLength          = causeLengthField(932);
-inline constexpr Field noUserDataTsn         {933, "        TSN value",                    octets(4),          "        TSN value=%u"};
-inline constexpr Field shuttingDownLength        = causeLengthField(934);
-inline constexpr Field unknownCauseLength        = causeLengthField(935);
-inline constexpr Field unknownCause          {938, "      Unknown Cause",                  octetRun(),         "      Unknown Cause=%x"};
+inline constexpr Field causeCode               {912, "    Cause Code",                       octetPair(),        "    %n=%-S",             &causeCodeNames};
+inline constexpr Field invalidStreamLength     = causeLengthField(914);
+inline constexpr Field invalidStream           {915, "        Stream Identifier",            octetPair(),        "        %n=%u"};
+inline constexpr Field invalidStreamReserved   {916, "        Reserved",                     octetPair(),        "        %n=%u"};
+inline constexpr Field missingLength           = causeLengthField(917);
+inline constexpr Field missingNumber           {918, "        Number of missing params",     octets(4),          "        %n=%u"};
+inline constexpr Field missingType             {920, "        Missing Parameters Type",      octetPair(),        "        %n=%u"};
+inline constexpr Field staleCookieLength       = longCauseLengthField(921);
+inline constexpr Field staleness               {922, "        Measure of staleness (usec.)", octets(4),          "        %n=%u"};
+inline constexpr Field outOfResourceLength     = longCauseLengthField(923);
+inline constexpr Field unresolvableLength      = causeLengthField(924);
+inline constexpr Field unresolvableValue       {925, "        Unrecognized Address",         octetRunBackward(), R"(        %n=%-["%x"])"};
+inline constexpr Field unrecognizedChunkLength = causeLengthField(926);
+inline constexpr Field unrecognizedChunk       {927, "        Unrecognized Chunk",           octetRunBackward(), R"(        %n=%-["%x"])"};
+inline constexpr Field invalidMandatoryLength  = causeLengthField(928);
+inline constexpr Field unrecognizedListLength  = causeLengthField(929);
+inline constexpr Field noUserDataLength        = causeLengthField(932);
+inline constexpr Field noUserDataTsn           {933, "        TSN value",                    octets(4),          "        %n=%u"};
+inline constexpr Field shuttingDownLength      = causeLengthField(934);
+inline constexpr Field unknownCauseLength      = causeLengthField(935);
+inline constexpr Field unknownCause            {938, "      Unknown Cause",                  octetRun(),         "      %n=%x"};
 // clang-format on
 
 template <class Pass>
@@ -167,5 +168,21 @@ void errorCauses(Reader<Pass> &reader) {
         }
     }
 }
+
+// clang-format off
+using CauseFields = FieldList<
+    causeCode,
+    invalidStreamLength, invalidStream, invalidStreamReserved,
+    missingLength, missingNumber, missingType,
+    staleCookieLength, staleness,
+    outOfResourceLength,
+    unresolvableLength, unresolvableValue,
+    unrecognizedChunkLength, unrecognizedChunk,
+    invalidMandatoryLength,
+    unrecognizedListLength,
+    noUserDataLength, noUserDataTsn,
+    shuttingDownLength,
+    unknownCauseLength, unknownCause>;
+// clang-format on
 
 } // namespace netfloor::plugin::sctp

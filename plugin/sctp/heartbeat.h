@@ -16,6 +16,7 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
+#include "frame/field_list.h"
 #include "frame/field_step.h"
 #include "sctp/chunk_head.h"
 #include "sctp/length.h"
@@ -25,9 +26,9 @@ namespace netfloor::plugin::sctp {
 // clang-format off
 inline constexpr Field heartbeatFlags      = flagsField(939);
 inline constexpr Field heartbeatAckFlags   = flagsField(940);
-inline constexpr Field heartbeatInfoType   {941, "    Heartbeat Info Type",         octets(2),  "    Heartbeat Info Type=%u"};
-inline constexpr Field heartbeatInfoLength {942, "      HB Info length",            octets(2),  "      HB Info length=%u"};
-inline constexpr Field heartbeatInfo       {943, "        Sender-specific HB Info", octetRun(), R"(        Sender-specific HB Info=%-["%x"])"};
+inline constexpr Field heartbeatInfoType   {941, "    Heartbeat Info Type",         octets(2),  "    %n=%u"};
+inline constexpr Field heartbeatInfoLength {942, "      HB Info length",            octets(2),  "      %n=%u"};
+inline constexpr Field heartbeatInfo       {943, "        Sender-specific HB Info", octetRun(), R"(        %n=%-["%x"])"};
 // clang-format on
 
 inline constexpr std::uint32_t knownInfoType = 1;
@@ -67,5 +68,8 @@ template <class Pass>
 void heartbeatAckChunk(Reader<Pass> &reader) {
     heartbeatWith<heartbeatAckFlags>(reader, "Heartbeat Acknowledgement");
 }
+
+using HeartbeatRows =
+    Rows<FieldList<heartbeatFlags, heartbeatInfoType, heartbeatInfoLength, heartbeatInfo, heartbeatAckFlags>>;
 
 } // namespace netfloor::plugin::sctp

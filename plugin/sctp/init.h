@@ -24,6 +24,7 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
+#include "frame/field_list.h"
 #include "frame/field_step.h"
 #include "sctp/chunk_head.h"
 #include "sctp/init_parameters.h"
@@ -38,11 +39,11 @@ inline constexpr std::uint32_t initAckIds = 835;
 // clang-format off
 template <std::uint32_t ids> inline constexpr Field initFlags       = flagsField(ids);
 template <std::uint32_t ids> inline constexpr Field initLength      = lengthField(ids + 1);
-template <std::uint32_t ids> inline constexpr Field initiateTag     {ids + 2, "    Initiate Tag",                                octets(4), "    Initiate Tag=0x%x"};
-template <std::uint32_t ids> inline constexpr Field receiverWindow  {ids + 3, "    Advertised Receiver Window Credit (a_rwnd)",  octets(4), "    Advertised Receiver Window Credit (a_rwnd)=%u(dec)"};
-template <std::uint32_t ids> inline constexpr Field outboundStreams {ids + 4, "    Number of Outbound Streams",                  octets(2), "    Number of Outbound Streams=%u(dec)"};
-template <std::uint32_t ids> inline constexpr Field inboundStreams  {ids + 5, "    Number of Inbound Streams",                   octets(2), "    Number of Inbound Streams=%u(dec)"};
-template <std::uint32_t ids> inline constexpr Field initialTsn      {ids + 6, "    Initial Transmission Sequence Number(I_TSN)", octets(4), "    Initial Transmission Sequence Number(I_TSN)=%u"};
+template <std::uint32_t ids> inline constexpr Field initiateTag     {ids + 2, "    Initiate Tag",                                octets(4), "    %n=0x%x"};
+template <std::uint32_t ids> inline constexpr Field receiverWindow  {ids + 3, "    Advertised Receiver Window Credit (a_rwnd)",  octets(4), "    %n=%u(dec)"};
+template <std::uint32_t ids> inline constexpr Field outboundStreams {ids + 4, "    Number of Outbound Streams",                  octets(2), "    %n=%u(dec)"};
+template <std::uint32_t ids> inline constexpr Field inboundStreams  {ids + 5, "    Number of Inbound Streams",                   octets(2), "    %n=%u(dec)"};
+template <std::uint32_t ids> inline constexpr Field initialTsn      {ids + 6, "    Initial Transmission Sequence Number(I_TSN)", octets(4), "    %n=%u"};
 // clang-format on
 
 // The Length counts in so many octets in front of the parameters.
@@ -76,5 +77,16 @@ void initAckChunk(Reader<Pass> &reader) {
     const Block<Pass> block{reader, "Init Ack"};
     initFields<initAckIds, initAckParameters<Pass>>(reader);
 }
+
+// clang-format off
+template <std::uint32_t ids>
+using InitFields = FieldList<
+    initFlags<ids>, initLength<ids>, initiateTag<ids>, receiverWindow<ids>,
+    outboundStreams<ids>, inboundStreams<ids>, initialTsn<ids>>;
+
+using InitRows = Rows<
+    Joined<InitFields<initIds>, InitParameterFields, InitFields<initAckIds>, InitAckParameterFields>,
+    FieldList<initialTsn<initIds>, initialTsn<initAckIds>>>;
+// clang-format on
 
 } // namespace netfloor::plugin::sctp

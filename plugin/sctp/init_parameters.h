@@ -19,6 +19,7 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
+#include "frame/field_list.h"
 #include "frame/field_step.h"
 #include "ip/ipv6_address.h"
 #include "sctp/length.h"
@@ -61,18 +62,18 @@ inline constexpr ValueNames initAckParameterNames{.rows = initAckParameterRows, 
 inline constexpr ValueNames addressTypeNames{.rows = addressTypeRows, .otherwise = "Unknow Address Type"};
 
 // clang-format off
-inline constexpr Field initParameterType       {847, "Parameter Type",                               octets(2),  "Parameter Type=%-S", &initParameterNames};
-inline constexpr Field initParameterLength     {848, "      Length",                                 octets(2),  "      Length=%u octet(s)"};
-inline constexpr Field initAckParameterType    {851, "Parameter Type",                               octets(2),  "Parameter Type=%-S", &initAckParameterNames};
-inline constexpr Field initAckParameterLength  {852, "      Length",                                 octets(2),  "      Length=%u octet(s)"};
+inline constexpr Field initParameterType       {847, "Parameter Type",                               octets(2),  "%n=%-S",                     &initParameterNames};
+inline constexpr Field initParameterLength     {848, "      Length",                                 octets(2),  "      %n=%u octet(s)"};
+inline constexpr Field initAckParameterType    {851, "Parameter Type",                               octets(2),  "%n=%-S",                     &initAckParameterNames};
+inline constexpr Field initAckParameterLength  {852, "      Length",                                 octets(2),  "      %n=%u octet(s)"};
 
-inline constexpr Field ipv4Address             {855, "        IP Address",                           octets(4),  R"(        IP Address=%-["%u":"."])"};
-inline constexpr Field cookieLifeSpanIncrement {867, "        Suggested Cookie Life-span Increment", octets(4),  "        Suggested Cookie Life-span Increment=%u (msec.)"};
-inline constexpr Field hostName                {868, "        Host Name",                            octetRun(), R"(        Host Name=%-["%c"])"};
-inline constexpr Field supportedAddressType    {870, "        Address Type",                         octets(2),  "        Address Type=%-S", &addressTypeNames};
-inline constexpr Field ecnCapable              {871, "        Reserved",                             octetRun(), "        Reserved", noNames, "%x"};
-inline constexpr Field unknownParameter        {872, "        Reserved",                             octetRun(), "        Reserved", noNames, "%x"};
-inline constexpr Field stateCookie             {857, "        State Cookie",                         octetRun(), R"(        State Cookie=%-["%x"])"};
+inline constexpr Field ipv4Address             {855, "        IP Address",                           octets(4),  R"(        %n=%-["%u":"."])"};
+inline constexpr Field cookieLifeSpanIncrement {867, "        Suggested Cookie Life-span Increment", octets(4),  "        %n=%u (msec.)"};
+inline constexpr Field hostName                {868, "        Host Name",                            octetRun(), R"(        %n=%-["%c"])"};
+inline constexpr Field supportedAddressType    {870, "        Address Type",                         octets(2),  "        %n=%-S",             &addressTypeNames};
+inline constexpr Field ecnCapable              {871, "        Reserved",                             octetRun(), "        %n",                 noNames,                "%x"};
+inline constexpr Field unknownParameter        {872, "        Reserved",                             octetRun(), "        %n",                 noNames,                "%x"};
+inline constexpr Field stateCookie             {857, "        State Cookie",                         octetRun(), R"(        %n=%-["%x"])"};
 // clang-format on
 
 // What a parameter takes from the octets of its list: its Length less 8, and not its Length. So a list seldom ends with
@@ -211,5 +212,18 @@ void initAckParameters(Reader<Pass> &reader) {
         reckonParameter(reader, variables.chunkOctets);
     }
 }
+
+// The parameters that both chunks know stand with INIT, the first one that has them.
+// clang-format off
+using InitParameterFields = FieldList<
+    initParameterType, initParameterLength,
+    ipv4Address, cookieLifeSpanIncrement, ecnCapable, hostName, supportedAddressType, unknownParameter>;
+
+using InitAckParameterFields = Joined<
+    FieldList<initAckParameterType, initAckParameterLength, stateCookie>,
+    UnrecognizedParameterFields>;
+
+using FieldsOfTopOctet6 = FieldList<initParameterLength, initAckParameterLength>;
+// clang-format on
 
 } // namespace netfloor::plugin::sctp

@@ -5,6 +5,7 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
+#include "frame/field_list.h"
 #include "frame/field_step.h"
 #include "sctp/chunk_head.h"
 #include "sctp/length.h"
@@ -13,13 +14,13 @@ namespace netfloor::plugin::sctp {
 
 // clang-format off
 inline constexpr Field ecneFlags        = flagsField(899);
-inline constexpr Field ecneReserved     {903, "    Reserved",          octetRun(), "    Reserved", noNames, "%x"};
+inline constexpr Field ecneReserved     {903, "    Reserved",          octetRun(), "    %n",             noNames, "%x"};
 
 inline constexpr Field cwrFlags         = flagsField(904);
-inline constexpr Field cwrReserved      {908, "    Reserved",          octetRun(), "    Reserved", noNames, "%x"};
+inline constexpr Field cwrReserved      {908, "    Reserved",          octetRun(), "    %n",             noNames, "%x"};
 
 inline constexpr Field unknownFlags     = flagsField(809);
-inline constexpr Field reservedContents {813, "    Reserved contents", octetRun(), R"(    Reserved contents=%-["%x"])"};
+inline constexpr Field reservedContents {813, "    Reserved contents", octetRun(), R"(    %n=%-["%x"])"};
 // clang-format on
 
 template <const Field &flags, const Field &reserved, class Pass>
@@ -61,5 +62,8 @@ void reservedChunk(Reader<Pass> &reader) {
     }
     readRun<reservedContents>(reader, chunkOctets);
 }
+
+using ReservedChunkRows = Rows<FieldList<ecneFlags, ecneReserved, cwrFlags, cwrReserved>>;
+using UnknownChunkRows = Rows<FieldList<unknownFlags, reservedContents>>;
 
 } // namespace netfloor::plugin::sctp

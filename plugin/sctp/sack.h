@@ -22,6 +22,7 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
+#include "frame/field_list.h"
 #include "frame/field_step.h"
 #include "sctp/chunk_head.h"
 #include "sctp/counted_list.h"
@@ -31,13 +32,13 @@ namespace netfloor::plugin::sctp {
 // clang-format off
 inline constexpr Field sackFlags          = flagsField(873);
 inline constexpr Field sackLength         = lengthField(874);
-inline constexpr Field cumulativeTsnAck   {875, "    Cumulative TSN Ack",                         octets(4), "    Cumulative TSN Ack=0x%x"};
-inline constexpr Field sackReceiverWindow {876, "    Advertised Receiver Window Credit (a_rwnd)", octets(4), "    Advertised Receiver Window Credit (a_rwnd)=%u(dec)"};
-inline constexpr Field gapBlockNumber     {877, "    Number of Gap Ack Blocks",                   octets(2), "    Number of Gap Ack Blocks=%u(dec)"};
-inline constexpr Field duplicateNumber    {878, "    Number of Duplicate TSNs",                   octets(2), "    Number of Duplicate TSNs=%u(dec)"};
-inline constexpr Field gapBlockStart      {881, "    Gap Ack Block Start",                        octets(2), "    Gap Ack Block Start=%u"};
-inline constexpr Field gapBlockEnd        {882, "    Gap Ack Block End",                          octets(2), "    Gap Ack Block End=%u"};
-inline constexpr Field duplicateTsn       {883, "    Duplicate TSN",                              octets(4), "    Duplicate TSN=0x%x"};
+inline constexpr Field cumulativeTsnAck   {875, "    Cumulative TSN Ack",                         octets(4), "    %n=0x%x"};
+inline constexpr Field sackReceiverWindow {876, "    Advertised Receiver Window Credit (a_rwnd)", octets(4), "    %n=%u(dec)"};
+inline constexpr Field gapBlockNumber     {877, "    Number of Gap Ack Blocks",                   octets(2), "    %n=%u(dec)"};
+inline constexpr Field duplicateNumber    {878, "    Number of Duplicate TSNs",                   octets(2), "    %n=%u(dec)"};
+inline constexpr Field gapBlockStart      {881, "    Gap Ack Block Start",                        octets(2), "    %n=%u"};
+inline constexpr Field gapBlockEnd        {882, "    Gap Ack Block End",                          octets(2), "    %n=%u"};
+inline constexpr Field duplicateTsn       {883, "    Duplicate TSN",                              octets(4), "    %n=0x%x"};
 // clang-format on
 
 template <class Pass>
@@ -60,5 +61,13 @@ NETFLOOR_INLINE inline void sackChunk(Reader<Pass> &reader) {
         read<duplicateTsn>(reader);
     });
 }
+
+// clang-format off
+using SackRows = Rows<
+    FieldList<
+        sackFlags, sackLength, cumulativeTsnAck, sackReceiverWindow, gapBlockNumber, duplicateNumber,
+        gapBlockStart, gapBlockEnd, duplicateTsn>,
+    FieldList<cumulativeTsnAck>>;
+// clang-format on
 
 } // namespace netfloor::plugin::sctp

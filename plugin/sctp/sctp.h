@@ -29,6 +29,7 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
+#include "frame/field_list.h"
 #include "frame/field_step.h"
 #include "sctp/abort_and_error.h"
 #include "sctp/cookie.h"
@@ -90,12 +91,12 @@ inline constexpr ValueNames chunkTypeNames{.rows = chunkTypeRows, .hasBriefs = t
 
 // Only the first chunk of a packet has a key and a summary in its short text.
 // clang-format off
-inline constexpr Field sourcePort      {795, "SCTP Source Port Number",      octets(2), "SCTP Source Port Number=%u"};
-inline constexpr Field destinationPort {796, "SCTP Destination Port Number", octets(2), "SCTP Destination Port Number=%u"};
-inline constexpr Field verificationTag {797, "Verification Tag",             octets(4), "Verification Tag=0x%x"};
-inline constexpr Field checksum        {798, "Checksum",                     octets(4), "Checksum=0x%x"};
-inline constexpr Field firstChunkType  {802, "SCTP Chunk Type",              octets(1), "SCTP Chunk Type=%-S",  &chunkTypeNames, "SCTP - %-s (%u)"};
-inline constexpr Field laterChunkType  {805, "SCTP  Chunk Type",             octets(1), "SCTP  Chunk Type=%-S", &chunkTypeNames};
+inline constexpr Field sourcePort      {795, "SCTP Source Port Number",      octets(2), "%n=%u"};
+inline constexpr Field destinationPort {796, "SCTP Destination Port Number", octets(2), "%n=%u"};
+inline constexpr Field verificationTag {797, "Verification Tag",             octets(4), "%n=0x%x"};
+inline constexpr Field checksum        {798, "Checksum",                     octets(4), "%n=0x%x"};
+inline constexpr Field firstChunkType  {802, "SCTP Chunk Type",              octets(1), "%n=%-S",  &chunkTypeNames, "SCTP - %-s (%u)"};
+inline constexpr Field laterChunkType  {805, "SCTP  Chunk Type",             octets(1), "%n=%-S",  &chunkTypeNames};
 // clang-format on
 
 inline constexpr std::int32_t commonHeaderOctets = 12;
@@ -182,5 +183,15 @@ void packet(Reader<Pass> &reader) {
     commonHeader(reader);
     chunks(reader);
 }
+
+// The chunks stand in the order of their types.
+// clang-format off
+using PacketRows = JoinedRows<
+    Rows<
+        FieldList<sourcePort, destinationPort, verificationTag, checksum, firstChunkType, laterChunkType>,
+        FieldList<sourcePort, destinationPort, firstChunkType>>,
+    DataRows, InitRows, SackRows, HeartbeatRows, AbortRows, ShutdownRows, ShutdownAckRows, ErrorRows, CookieRows,
+    ReservedChunkRows, ShutdownCompleteRows, UnknownChunkRows>;
+// clang-format on
 
 } // namespace netfloor::plugin::sctp

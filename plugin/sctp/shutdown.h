@@ -20,6 +20,7 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
+#include "frame/field_list.h"
 #include "frame/field_step.h"
 #include "sctp/chunk_head.h"
 
@@ -31,13 +32,13 @@ inline constexpr ValueNames completeTagNames{completeTagRows};
 // clang-format off
 inline constexpr Field shutdownFlags            = lowerFlagsField(884);
 inline constexpr Field shutdownLength           = lengthField(885);
-inline constexpr Field shutdownCumulativeTsnAck {886, "    Cumulative TSN Ack", octets(4),           "    Cumulative TSN Ack=%u"};
+inline constexpr Field shutdownCumulativeTsnAck {886, "    Cumulative TSN Ack", octets(4),           "    %n=%u"};
 
 inline constexpr Field shutdownAckFlags         = lowerFlagsField(887);
 inline constexpr Field shutdownAckLength        = lengthField(888);
 
-inline constexpr Field completeReserved         {889, "  Reserved",             piece(1, 7),         "  Reserved=%x"};
-inline constexpr Field completeTagBit           {890, "  T bit",                bit(0).advancing(8), "  T bit=%-S", &completeTagNames};
+inline constexpr Field completeReserved         {889, "  Reserved",             piece(1, 7),         "  %n=%x"};
+inline constexpr Field completeTagBit           {890, "  T bit",                bit(0).advancing(8), "  %n=%-S",  &completeTagNames};
 inline constexpr Field completeLength           = lengthField(891);
 // clang-format on
 
@@ -63,5 +64,10 @@ void shutdownCompleteChunk(Reader<Pass> &reader) {
     read<completeTagBit>(reader);
     read<completeLength>(reader, &reader.variables().chunkOctets);
 }
+
+using ShutdownRows =
+    Rows<FieldList<shutdownFlags, shutdownLength, shutdownCumulativeTsnAck>, FieldList<shutdownCumulativeTsnAck>>;
+using ShutdownAckRows = Rows<FieldList<shutdownAckFlags, shutdownAckLength>>;
+using ShutdownCompleteRows = Rows<FieldList<completeReserved, completeTagBit, completeLength>>;
 
 } // namespace netfloor::plugin::sctp

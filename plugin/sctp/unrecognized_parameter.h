@@ -5,15 +5,16 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
+#include "frame/field_list.h"
 #include "frame/field_step.h"
 #include "sctp/length.h"
 
 namespace netfloor::plugin::sctp {
 
 // clang-format off
-inline constexpr Field unrecognizedType   {863, "        Unrecoginzed Parameter Type", octets(2),  "        Unrecoginzed Parameter Type=%u"};
-inline constexpr Field unrecognizedLength {864, "        Length",                      octets(2),  "        Length=%u octet(s)"};
-inline constexpr Field unrecognizedValue  {865, "                Value",               octetRun(), "                Value", noNames, "0x%x"};
+inline constexpr Field unrecognizedType   {863, "        Unrecoginzed Parameter Type", octets(2),  "        %n=%u"};
+inline constexpr Field unrecognizedLength {864, "        Length",                      octets(2),  "        %n=%u octet(s)"};
+inline constexpr Field unrecognizedValue  {865, "                Value",               octetRun(), "                %n",     noNames, "0x%x"};
 // clang-format on
 
 template <class Pass>
@@ -24,5 +25,7 @@ void unrecognizedParameter(Reader<Pass> &reader) {
     read<unrecognizedLength>(reader, octetsAfterHead(parameterOctets));
     readRun<unrecognizedValue>(reader, parameterOctets);
 }
+
+using UnrecognizedParameterFields = FieldList<unrecognizedType, unrecognizedLength, unrecognizedValue>;
 
 } // namespace netfloor::plugin::sctp

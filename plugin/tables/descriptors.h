@@ -17,28 +17,9 @@
 
 namespace netfloor::plugin {
 
-// These bear another mark than the rest in the highest octet of their flags. Hosts keep the mark; what it stands
-// for is not known.
+// The highest octet of a field's flags.
 inline constexpr std::uint32_t usualTopOctet = 5;
 inline constexpr std::uint32_t otherTopOctet = 6;
-inline constexpr std::array<std::uint32_t, 16> fieldsOfOtherTopOctet = {
-    tcp::reservedBesideDataOffset.id,
-    tcp::dataOffset.id,
-    tcp::reservedBesideFlags.id,
-    tcp::urgent.id,
-    tcp::acknowledgement.id,
-    tcp::push.id,
-    tcp::reset.id,
-    tcp::synchronize.id,
-    tcp::finish.id,
-    tcp::windowSize.id,
-    tcp::checksum.id,
-    tcp::urgentPointer.id,
-    udp::length.id,
-    udp::checksum.id,
-    sctp::initParameterLength.id,
-    sctp::initAckParameterLength.id,
-};
 
 inline constexpr std::uint32_t widthHead = 0xffff0000;
 
@@ -56,19 +37,17 @@ inline constexpr std::uint32_t widthHead = 0xffff0000;
 }
 
 // An address of fixed width, shown as elements with something between them.
-[[nodiscard]] constexpr bool isListedAddress(const Field &field) {
-    return hasFixedWidth(field.place) && !parseFormat(field.line).separator.empty();
-}
+template <const Field &field>
+inline constexpr bool isListedAddress = hasFixedWidth(field.place) && !parseFormat(longText<field>).separator.empty();
 
 [[nodiscard]] constexpr bool isKeyField(const Field &field) {
     return keyRowOf(field) != noKeyRow;
 }
 
-[[nodiscard]] constexpr std::uint32_t flagsOf(const Field &field) {
-    const bool marked = std::ranges::find(fieldsOfOtherTopOctet, field.id) != fieldsOfOtherTopOctet.end();
-    return sizeClass(field.place) | (isListedAddress(field) ? 3u : 0u) << 8 | (isKeyField(field) ? 1u : 0u) << 16 |
-           (marked ? otherTopOctet : usualTopOctet) << 24;
-}
+template <const Field &field>
+inline constexpr std::uint32_t flagsOf = sizeClass(field.place) | (isListedAddress<field> ? 3u : 0u) << 8 |
+                                         (isKeyField(field) ? 1u : 0u) << 16 |
+                                         (isListed<CatalogueOfTopOctet6>(field) ? otherTopOctet : usualTopOctet) << 24;
 
 // The zero-terminated name without blanks behind. Where there are none it is the field's own literal.
 template <std::size_t index>
@@ -99,7 +78,7 @@ template <std::size_t index>
 [[nodiscard]] constexpr FieldDescriptor descriptorOf() {
     constexpr const Field &field = *catalogue[index];
     return {
-        .flags = flagsOf(field),
+        .flags = flagsOf<field>,
         .fieldId = field.id,
         .keyIndex = 0, // counted over all rows
         .name = field.title.empty() ? field.tableName().data() : field.title.data(),
@@ -186,12 +165,5 @@ inline constexpr ProtocolIdentity identity = {
               {.number = 0xffff},
               {.number = 0}},
 };
-
-// What the description comes to. A change that moves one of these moves what hosts have stored.
-static_assert(catalogue.size() == 381);
-static_assert(allValueRows == 4539);
-static_assert(textTables.texts.count() == 824);
-static_assert(valuePool.size() == 371);
-static_assert(layoutTable.records == 44 && layoutTable.size == 1453);
 
 } // namespace netfloor::plugin

@@ -105,6 +105,12 @@ inline constexpr std::size_t allValueRows = [] {
     return rows;
 }();
 
+// The display line of each field.
+inline constexpr auto displayLines = []<const Field &...fields>(FieldList<fields...>) {
+    return std::array{longText<fields>...};
+}
+(CatalogueFields{});
+
 // Texts and value names, worked out together since both stand in the order of the fields.
 struct TextTables {
     TextNumbers<2048> texts;
@@ -119,7 +125,7 @@ inline constexpr TextTables textTables = [] {
     std::size_t row = 0;
     for (std::size_t i = 0; i < catalogue.size(); ++i) {
         const Field &field = *catalogue[i];
-        tables.lines[i] = tables.texts.numberOf(field.line);
+        tables.lines[i] = tables.texts.numberOf(displayLines[i]);
         tables.valueStart[i] = field.hasNames() ? static_cast<std::int32_t>(row) : -1;
         if (!field.hasNames()) {
             continue;

@@ -28,6 +28,7 @@
 #include "frame/block.h"
 #include "frame/checked_run.h"
 #include "frame/field.h"
+#include "frame/field_list.h"
 #include "frame/field_step.h"
 #include "ip/hand_off.h"
 #include "ip/outer_protocol.h"
@@ -37,25 +38,25 @@
 namespace netfloor::plugin::tcp {
 
 // clang-format off
-inline constexpr Field sourcePort               {384, "TCP Source Port",        octetPair(),              "  TCP Source Port=%-S (%u)",      &portNames, "TCP - %-s (%u)"};
-inline constexpr Field destinationPortIpInIp    {387, "TCP Destination Port",   octetPair(),              "  TCP Destination Port=%-S (%u)", &portNames, "IPinIP - TCP - %-s (%u)"};
-inline constexpr Field destinationPortMinimal   {391, "TCP Destination Port",   octetPair(),              "  TCP Destination Port=%-S (%u)", &portNames, "MIPinIP - TCP - %-s (%u)"};
-inline constexpr Field destinationPort          {393, "TCP Destination Port",   octetPair(),              "  TCP Destination Port=%-S (%u)", &portNames, "TCP - %-s (%u)"};
-inline constexpr Field sequenceNumber           {394, "Sequence Number",        octets(4),                "Sequence Number=%u(dec)"};
-inline constexpr Field acknowledgementNumber    {395, "Acknowledgement Number", octets(4),                "Acknowledgement Number=%u(dec)"};
-inline constexpr Field reservedBesideDataOffset {396, "Reserved",               piece(0, 3),              "  Reserved=%u"};
+inline constexpr Field sourcePort               {384, "TCP Source Port",        octetPair(),              "  %n=%-S (%u)",    &portNames, "TCP - %-s (%u)"};
+inline constexpr Field destinationPortIpInIp    {387, "TCP Destination Port",   octetPair(),              "  %n=%-S (%u)",    &portNames, "IPinIP - TCP - %-s (%u)"};
+inline constexpr Field destinationPortMinimal   {391, "TCP Destination Port",   octetPair(),              "  %n=%-S (%u)",    &portNames, "MIPinIP - TCP - %-s (%u)"};
+inline constexpr Field destinationPort          {393, "TCP Destination Port",   octetPair(),              "  %n=%-S (%u)",    &portNames, "TCP - %-s (%u)"};
+inline constexpr Field sequenceNumber           {394, "Sequence Number",        octets(4),                "%n=%u(dec)"};
+inline constexpr Field acknowledgementNumber    {395, "Acknowledgement Number", octets(4),                "%n=%u(dec)"};
+inline constexpr Field reservedBesideDataOffset {396, "Reserved",               piece(0, 3),              "  %n=%u"};
 
-inline constexpr Field dataOffset               {398, "Data Offset",            piece(4, 7).advancing(8), "  Data Offset=%u*4 octets"};
-inline constexpr Field reservedBesideFlags      {399, "Reserved",               piece(6, 7),              "  Reserved=%u"};
-inline constexpr Field urgent                   {400, "URG",                    bit(5),                   "  URG=%u"};
-inline constexpr Field acknowledgement          {401, "ACK",                    bit(4),                   "  ACK=%u"};
-inline constexpr Field push                     {402, "PSH",                    bit(3),                   "  PSH=%u"};
-inline constexpr Field reset                    {403, "RST",                    bit(2),                   "  RST=%u"};
-inline constexpr Field synchronize              {404, "SYN",                    bit(1),                   "  SYN=%u"};
-inline constexpr Field finish                   {405, "FIN",                    bit(0).advancing(8),      "  FIN=%u"};
-inline constexpr Field windowSize               {406, "Window Size",            octetPair(),              "  Window Size=%u(dec)", noNames, "%u"};
-inline constexpr Field checksum                 {407, "Checksum",               octetPair(),              "  Checksum=%x"};
-inline constexpr Field urgentPointer            {408, "Urgent Pointer",         octetPair(),              "  Urgent Pointer=%x"};
+inline constexpr Field dataOffset               {398, "Data Offset",            piece(4, 7).advancing(8), "  %n=%u*4 octets"};
+inline constexpr Field reservedBesideFlags      {399, "Reserved",               piece(6, 7),              "  %n=%u"};
+inline constexpr Field urgent                   {400, "URG",                    bit(5),                   "  %n=%u"};
+inline constexpr Field acknowledgement          {401, "ACK",                    bit(4),                   "  %n=%u"};
+inline constexpr Field push                     {402, "PSH",                    bit(3),                   "  %n=%u"};
+inline constexpr Field reset                    {403, "RST",                    bit(2),                   "  %n=%u"};
+inline constexpr Field synchronize              {404, "SYN",                    bit(1),                   "  %n=%u"};
+inline constexpr Field finish                   {405, "FIN",                    bit(0).advancing(8),      "  %n=%u"};
+inline constexpr Field windowSize               {406, "Window Size",            octetPair(),              "  %n=%u(dec)",     noNames,    "%u"};
+inline constexpr Field checksum                 {407, "Checksum",               octetPair(),              "  %n=%x"};
+inline constexpr Field urgentPointer            {408, "Urgent Pointer",         octetPair(),              "  %n=%x"};
 // clang-format on
 
 struct TcpVariables : OptionVariables {
@@ -92,7 +93,7 @@ NETFLOOR_INLINE inline std::int32_t limitedPart(Reader<Pass> &reader) {
     const std::uint32_t words = peek(reader, dataOffset.place).value_or(0);
     // Below three words this wraps to a huge number, which is more than any packet holds.
     block.limit((words - wordsBeforeLimit) * bitsPerWord);
-    stretch<64, fieldsFromDataOffset<Pass>>(reader);
+    checkedRun<dataOffset, urgentPointer, fieldsFromDataOffset<Pass>>(reader);
     if (!reader.live) {
         return static_cast<std::int32_t>(words);
     }
@@ -132,7 +133,7 @@ NETFLOOR_INLINE inline void segment(Reader<Pass> &reader) {
         return;
     }
     const Block<Pass> header{reader, "Transmission Control Protocol"};
-    stretch<100, fieldsUpToDataOffset<Pass>>(reader);
+    checkedRun<sourcePort, reservedBesideDataOffset, fieldsUpToDataOffset<Pass>>(reader);
     if (!reader.live) {
         return;
     }
@@ -145,5 +146,25 @@ NETFLOOR_INLINE inline void segment(Reader<Pass> &reader) {
         handOff(reader);
     }
 }
+
+// clang-format off
+using SegmentRows = Rows<
+    Joined<
+        FieldList<
+            sourcePort, destinationPortIpInIp, destinationPortMinimal, destinationPort,
+            sequenceNumber, acknowledgementNumber,
+            reservedBesideDataOffset, dataOffset, reservedBesideFlags,
+            urgent, acknowledgement, push, reset, synchronize, finish,
+            windowSize, checksum, urgentPointer>,
+        OptionFields>,
+    FieldList<
+        sourcePort, destinationPortIpInIp, destinationPortMinimal, destinationPort,
+        sequenceNumber, acknowledgementNumber, dataOffset, reset, synchronize, finish>>;
+
+using FieldsOfTopOctet6 = FieldList<
+    reservedBesideDataOffset, dataOffset, reservedBesideFlags,
+    urgent, acknowledgement, push, reset, synchronize, finish,
+    windowSize, checksum, urgentPointer>;
+// clang-format on
 
 } // namespace netfloor::plugin::tcp

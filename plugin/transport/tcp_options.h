@@ -22,42 +22,43 @@
 #include "frame/block.h"
 #include "frame/checked_run.h"
 #include "frame/field.h"
+#include "frame/field_list.h"
 #include "frame/field_step.h"
 #include "ip/option_list.h"
 
 namespace netfloor::plugin::tcp {
 
 // clang-format off
-inline constexpr Field endOfList         {441, "TCP Option Kind=0 (End of Option List)", octets(1),                  "TCP Option Kind=0 (End of Option List)=%x"};
-inline constexpr Field noOperation       {444, "TCP Option Kind",                        octets(1),                  "TCP Option Kind=%u (No Operation)"};
+inline constexpr Field endOfList         {441, "TCP Option Kind=0 (End of Option List)", octets(1),   "%n=%x"};
+inline constexpr Field noOperation       {444, "TCP Option Kind",                        octets(1),   "%n=%u (No Operation)"};
 
-inline constexpr Field maximumSegment    {447, "TCP Option Kind",                        octets(1),                  "TCP Option Kind=%u (Maximum Segment Size)"};
-inline constexpr Field maximumLength     {448, "Length",                                 octets(1),                  "  Length=%u octet(s)"};
-inline constexpr Field maximumSize       {451, "max seg size",                           octetPair(),                "  max seg size=%u"};
+inline constexpr Field maximumSegment    {447, "TCP Option Kind",                        octets(1),   "%n=%u (Maximum Segment Size)"};
+inline constexpr Field maximumLength     {448, "Length",                                 octets(1),   "  %n=%u octet(s)"};
+inline constexpr Field maximumSize       {451, "max seg size",                           octetPair(), "  %n=%u"};
 
-inline constexpr Field windowScale       {452, "TCP Option Kind",                        octets(1),                  "TCP Option Kind=%u (Window Scale Option)"};
-inline constexpr Field windowScaleLength {453, "Length",                                 octets(1),                  "  Length=%u octet(s)"};
-inline constexpr Field shiftCount        {456, "shift count",                            octets(1),                  "  shift count=%u"};
+inline constexpr Field windowScale       {452, "TCP Option Kind",                        octets(1),   "%n=%u (Window Scale Option)"};
+inline constexpr Field windowScaleLength {453, "Length",                                 octets(1),   "  %n=%u octet(s)"};
+inline constexpr Field shiftCount        {456, "shift count",                            octets(1),   "  %n=%u"};
 
-inline constexpr Field sackPermitted     {457, "TCP Option Kind",                        octets(1),                  "TCP Option Kind=%u (SACK-Permitted)"};
-inline constexpr Field permittedLength   {458, "Length",                                 octets(1),                  "  Length=%u octet(s)"};
+inline constexpr Field sackPermitted     {457, "TCP Option Kind",                        octets(1),   "%n=%u (SACK-Permitted)"};
+inline constexpr Field permittedLength   {458, "Length",                                 octets(1),   "  %n=%u octet(s)"};
 
-inline constexpr Field sack              {461, "TCP Option Kind",                        octets(1),                  "TCP Option Kind=%u (SACK Option)"};
-inline constexpr Field sackLength        {462, "Length",                                 octets(1),                  "  Length=%u octet(s)"};
-inline constexpr Field leftEdge          {466, "Left Edge of Block",                     octets(4),                  "  Left Edge of Block=%x"};
-inline constexpr Field rightEdge         {467, "Right Edge of Block",                    octets(4),                  "  Right Edge of Block=%x"};
+inline constexpr Field sack              {461, "TCP Option Kind",                        octets(1),   "%n=%u (SACK Option)"};
+inline constexpr Field sackLength        {462, "Length",                                 octets(1),   "  %n=%u octet(s)"};
+inline constexpr Field leftEdge          {466, "Left Edge of Block",                     octets(4),   "  %n=%x"};
+inline constexpr Field rightEdge         {467, "Right Edge of Block",                    octets(4),   "  %n=%x"};
 
 // Both stamps are taken as little-endian numbers.
-inline constexpr Field timestamps        {468, "TCP Option Kind",                        octets(1),                  "TCP Option Kind=%u (Timestamps Option)"};
-inline constexpr Field timestampsLength  {469, "Length",                                 octets(1),                  "  Length=%u octet(s)"};
-inline constexpr Field timestampValue    {472, "TS value",                               piece(0, 31).advancing(32), "  TS value=%u"};
-inline constexpr Field timestampEcho     {473, "TS Echo Reply",                          piece(0, 31).advancing(32), "  TS Echo Reply=%u"};
+inline constexpr Field timestamps       {468, "TCP Option Kind", octets(1),                  "%n=%u (Timestamps Option)"};
+inline constexpr Field timestampsLength {469, "Length",          octets(1),                  "  %n=%u octet(s)"};
+inline constexpr Field timestampValue   {472, "TS value",        piece(0, 31).advancing(32), "  %n=%u"};
+inline constexpr Field timestampEcho    {473, "TS Echo Reply",   piece(0, 31).advancing(32), "  %n=%u"};
 
-inline constexpr Field md5Signature      {474, "TCP Option Kind",                        octets(1),                  "TCP Option Kind=%u (MD5 Signature Option)"};
-inline constexpr Field md5Length         {475, "Length",                                 octets(1),                  "  Length=%u octet(s)"};
-inline constexpr Field md5Digest         {478, "MD5 digest",                             octetRun().atMost(16),      R"(    MD5 digest=%-["%x"])", noNames, "%x"};
+inline constexpr Field md5Signature     {474, "TCP Option Kind", octets(1),                  "%n=%u (MD5 Signature Option)"};
+inline constexpr Field md5Length        {475, "Length",          octets(1),                  "  %n=%u octet(s)"};
+inline constexpr Field md5Digest        {478, "MD5 digest",      octetRun().atMost(16),      R"(    %n=%-["%x"])",           noNames, "%x"};
 
-inline constexpr Field optionPadding     {439, "Padding",                                octetRun(),                 "  Padding=%x"};
+inline constexpr Field optionPadding    {439, "Padding",         octetRun(),                 "  %n=%x"};
 // clang-format on
 
 // The kinds, in the order of their turns in a round.
@@ -117,7 +118,7 @@ NETFLOOR_INLINE inline void timestampsFields(Reader<Pass> &reader) {
 template <class Pass>
 NETFLOOR_INLINE inline void timestampsOption(Reader<Pass> &reader) {
     const OptionBlock<Pass> option{reader, ""};
-    stretch<timestampsOctets * bitsPerOctet, timestampsFields<Pass>>(reader);
+    checkedRun<timestamps, timestampEcho, timestampsFields<Pass>>(reader);
 }
 
 // The digest is what the length leaves, and one octet at least, so that it is cut short where nothing is left.
@@ -195,5 +196,17 @@ NETFLOOR_INLINE inline void options(Reader<Pass> &reader) {
         optionRound(reader, area);
     } while (reader.live && area.octets >= 1);
 }
+
+// clang-format off
+using OptionFields = FieldList<
+    endOfList, noOperation,
+    maximumSegment, maximumLength, maximumSize,
+    windowScale, windowScaleLength, shiftCount,
+    sackPermitted, permittedLength,
+    sack, sackLength, leftEdge, rightEdge,
+    timestamps, timestampsLength, timestampValue, timestampEcho,
+    md5Signature, md5Length, md5Digest,
+    optionPadding>;
+// clang-format on
 
 } // namespace netfloor::plugin::tcp

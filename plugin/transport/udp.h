@@ -15,6 +15,7 @@
 #include "frame/block.h"
 #include "frame/checked_run.h"
 #include "frame/field.h"
+#include "frame/field_list.h"
 #include "frame/field_step.h"
 #include "ip/hand_off.h"
 #include "ip/outer_protocol.h"
@@ -23,12 +24,12 @@
 namespace netfloor::plugin::udp {
 
 // clang-format off
-inline constexpr Field sourcePort             {479, "UDP Source Port",      octetPair(), "  UDP Source Port=%-S (%u)",      &portNames, "UDP - %-s (%u)"};
-inline constexpr Field destinationPortIpInIp  {482, "UDP Destination Port", octetPair(), "  UDP Destination Port=%-S (%u)", &portNames, "IPinIP - UDP - %-s (%u)"};
-inline constexpr Field destinationPortMinimal {486, "UDP Destination Port", octetPair(), "  UDP Destination Port=%-S (%u)", &portNames, "MIPinIP - UDP - %-s (%u)"};
-inline constexpr Field destinationPort        {488, "UDP Destination Port", octetPair(), "  UDP Destination Port=%-S (%u)", &portNames, "UDP - %-s (%u)"};
-inline constexpr Field length                 {489, "UDP Length",           octetPair(), "  UDP Length=%u octet(s)"};
-inline constexpr Field checksum               {490, "Checksum",             octetPair(), "  Checksum=%x"};
+inline constexpr Field sourcePort             {479, "UDP Source Port",      octetPair(), "  %n=%-S (%u)",    &portNames, "UDP - %-s (%u)"};
+inline constexpr Field destinationPortIpInIp  {482, "UDP Destination Port", octetPair(), "  %n=%-S (%u)",    &portNames, "IPinIP - UDP - %-s (%u)"};
+inline constexpr Field destinationPortMinimal {486, "UDP Destination Port", octetPair(), "  %n=%-S (%u)",    &portNames, "MIPinIP - UDP - %-s (%u)"};
+inline constexpr Field destinationPort        {488, "UDP Destination Port", octetPair(), "  %n=%-S (%u)",    &portNames, "UDP - %-s (%u)"};
+inline constexpr Field length                 {489, "UDP Length",           octetPair(), "  %n=%u octet(s)"};
+inline constexpr Field checksum               {490, "Checksum",             octetPair(), "  %n=%x"};
 // clang-format on
 
 inline constexpr std::int32_t headerOctets = 8;
@@ -68,7 +69,15 @@ NETFLOOR_INLINE inline void headerAndPayload(Reader<Pass> &reader) {
 
 template <class Pass>
 NETFLOOR_INLINE inline void datagram(Reader<Pass> &reader) {
-    stretch<64, headerAndPayload<Pass>>(reader);
+    checkedRun<sourcePort, checksum, headerAndPayload<Pass>>(reader);
 }
+
+// clang-format off
+using DatagramRows = Rows<
+    FieldList<sourcePort, destinationPortIpInIp, destinationPortMinimal, destinationPort, length, checksum>,
+    FieldList<sourcePort, destinationPortIpInIp, destinationPortMinimal, destinationPort>>;
+
+using FieldsOfTopOctet6 = FieldList<length, checksum>;
+// clang-format on
 
 } // namespace netfloor::plugin::udp

@@ -21,6 +21,7 @@
 
 #include "frame/block.h"
 #include "frame/field.h"
+#include "frame/field_list.h"
 #include "frame/field_step.h"
 
 namespace netfloor::plugin::gre {
@@ -57,21 +58,21 @@ inline constexpr ValueNames presenceNames{presenceRows};
 inline constexpr ValueNames carriedProtocolNames{carriedProtocolRows, "%x"};
 
 // clang-format off
-inline constexpr Field checksumPresent {692, "Checksum Present",        bit(7),                     "Checksum Present=%-S",        &presenceNames};
-inline constexpr Field unusedBit       {693, "Unused bit",              bit(6),                     "Unused bit=%u"};
-inline constexpr Field keyPresent      {694, "Key Present",             bit(5),                     "Key Present=%-S",             &presenceNames};
-inline constexpr Field sequencePresent {695, "Sequence Number Present", bit(4),                     "Sequence Number Present=%-S", &presenceNames};
-inline constexpr Field reserved0       {696, "Reserved0",               pieces({0, 3}, {11, 15}),   "Reserved0=%u"};
-inline constexpr Field version         {697, "Version",                 piece(8, 10).advancing(16), "Version=%u"};
-inline constexpr Field protocol        {698, "GRE Protocol",            octetPair(),                "GRE Protocol=%-S",            &carriedProtocolNames};
-inline constexpr Field checksum        {702, "CheckSum (hex)",          octetPair(),                "CheckSum (hex)=%x"};
-inline constexpr Field reserved1       {703, "Reserved1",               octetPair(),                "Reserved1=%u"};
-inline constexpr Field key             {707, "GRE Key",                 octets(4),                  "GRE Key=%u"};
-inline constexpr Field sequence        {711, "Sequence Number",         octets(4),                  "Sequence Number=%u"};
-inline constexpr Field openingFlag     {716, "HDLC Flag",               octets(1),                  "HDLC Flag=0x%x"};
-inline constexpr Field framePayload    {719, "HDLC Payload",            octets(1),                  "HDLC Payload=0x%x"};
-inline constexpr Field closingFlag     {724, "HDLC Flag",               octets(1),                  "HDLC Flag=0x%x"};
-inline constexpr Field payload         {715, "GRE Payload",             octets(1),                  "GRE Payload=0x%x"};
+inline constexpr Field checksumPresent {692, "Checksum Present",        bit(7),                     "%n=%-S",  &presenceNames};
+inline constexpr Field unusedBit       {693, "Unused bit",              bit(6),                     "%n=%u"};
+inline constexpr Field keyPresent      {694, "Key Present",             bit(5),                     "%n=%-S",  &presenceNames};
+inline constexpr Field sequencePresent {695, "Sequence Number Present", bit(4),                     "%n=%-S",  &presenceNames};
+inline constexpr Field reserved0       {696, "Reserved0",               pieces({0, 3}, {11, 15}),   "%n=%u"};
+inline constexpr Field version         {697, "Version",                 piece(8, 10).advancing(16), "%n=%u"};
+inline constexpr Field protocol        {698, "GRE Protocol",            octetPair(),                "%n=%-S",  &carriedProtocolNames};
+inline constexpr Field checksum        {702, "CheckSum (hex)",          octetPair(),                "%n=%x"};
+inline constexpr Field reserved1       {703, "Reserved1",               octetPair(),                "%n=%u"};
+inline constexpr Field key             {707, "GRE Key",                 octets(4),                  "%n=%u"};
+inline constexpr Field sequence        {711, "Sequence Number",         octets(4),                  "%n=%u"};
+inline constexpr Field openingFlag     {716, "HDLC Flag",               octets(1),                  "%n=0x%x"};
+inline constexpr Field framePayload    {719, "HDLC Payload",            octets(1),                  "%n=0x%x"};
+inline constexpr Field closingFlag     {724, "HDLC Flag",               octets(1),                  "%n=0x%x"};
+inline constexpr Field payload         {715, "GRE Payload",             octets(1),                  "%n=0x%x"};
 // clang-format on
 
 // What the fixed header takes, and so does each of its additions.
@@ -164,5 +165,14 @@ NETFLOOR_INLINE inline void packet(Reader<Pass> &reader) {
         reader.raise(Flag::count);
     }
 }
+
+// clang-format off
+using PacketRows = Rows<
+    FieldList<
+        checksumPresent, unusedBit, keyPresent, sequencePresent, reserved0, version, protocol,
+        checksum, reserved1, key, sequence,
+        openingFlag, framePayload, closingFlag, payload>,
+    FieldList<checksumPresent, keyPresent, sequencePresent, protocol, key, sequence>>;
+// clang-format on
 
 } // namespace netfloor::plugin::gre

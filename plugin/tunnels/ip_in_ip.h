@@ -23,6 +23,7 @@
 #include <cstdint>
 
 #include "frame/field.h"
+#include "frame/field_list.h"
 #include "frame/field_step.h"
 #include "ipv4/options.h"
 #include "ipv4/service_and_fragment.h"
@@ -31,15 +32,15 @@
 namespace netfloor::plugin::ipinip {
 
 // clang-format off
-inline constexpr Field version            {629, "Version",                         piece(4, 7),              "Version=%u"};
-inline constexpr Field headerLength       {630, "Original Internet Header Length", piece(0, 3).advancing(8), "Original Internet Header Length=%u*4 octets"};
-inline constexpr Field totalLength        {631, "Original IP Total Length",        octetPair(),              "Original IP Total Length=%u octets"};
-inline constexpr Field identification     {632, "Original Identification",         octetPair(),              "Original Identification=%x"};
-inline constexpr Field timeToLive         {633, "Time to Live",                    octets(1),                "Time to Live=%u"};
-inline constexpr Field protocol           {634, "IPinIP Protocol",                 octets(1),                "IPinIP Protocol=%-S", &protocolNames, "IPinIP - %-S"};
-inline constexpr Field headerChecksum     {635, "Header Checksum",                 octetPair(),              "  Header Checksum=%x"};
-inline constexpr Field sourceAddress      {636, "Original Src Address",            octets(4),                R"(  Original Src Address=%-["%u":"."])"};
-inline constexpr Field destinationAddress {637, "Original Dest Address",           octets(4),                R"(  Original Dest Address=%-["%u":"."])"};
+inline constexpr Field version            {629, "Version",                         piece(4, 7),              "%n=%u"};
+inline constexpr Field headerLength       {630, "Original Internet Header Length", piece(0, 3).advancing(8), "%n=%u*4 octets"};
+inline constexpr Field totalLength        {631, "Original IP Total Length",        octetPair(),              "%n=%u octets"};
+inline constexpr Field identification     {632, "Original Identification",         octetPair(),              "%n=%x"};
+inline constexpr Field timeToLive         {633, "Time to Live",                    octets(1),                "%n=%u"};
+inline constexpr Field protocol           {634, "IPinIP Protocol",                 octets(1),                "%n=%-S",               &protocolNames, "IPinIP - %-S"};
+inline constexpr Field headerChecksum     {635, "Header Checksum",                 octetPair(),              "  %n=%x"};
+inline constexpr Field sourceAddress      {636, "Original Src Address",            octets(4),                R"(  %n=%-["%u":"."])"};
+inline constexpr Field destinationAddress {637, "Original Dest Address",           octets(4),                R"(  %n=%-["%u":"."])"};
 // clang-format on
 
 template <class Pass>
@@ -61,5 +62,13 @@ NETFLOOR_INLINE inline void header(Reader<Pass> &reader) {
         variables.payloadOctets = static_cast<std::int32_t>(variables.ipTotalLength - variables.ipHeaderOctets);
     }
 }
+
+// clang-format off
+using HeaderRows = Rows<
+    FieldList<
+        version, headerLength, totalLength, identification, timeToLive, protocol, headerChecksum,
+        sourceAddress, destinationAddress>,
+    FieldList<headerLength, totalLength, protocol, sourceAddress, destinationAddress>>;
+// clang-format on
 
 } // namespace netfloor::plugin::ipinip

@@ -18,6 +18,7 @@
 #include <cstdint>
 
 #include "frame/field.h"
+#include "frame/field_list.h"
 #include "frame/field_step.h"
 #include "names/ip_protocols.h"
 
@@ -31,12 +32,12 @@ inline constexpr ValueNames sourcePresentNames{sourcePresentRows};
 
 // The checksum is shown digit by digit.
 // clang-format off
-inline constexpr Field protocol           {640, "MIPinIP Protocol",      octets(1),                                               "MIPinIP Protocol=%-S", &protocolNames, "MIPinIP - %-S"};
-inline constexpr Field reserved           {641, "  Reserved",            piece(0, 6),                                             "  Reserved=%x"};
-inline constexpr Field sourcePresent      {642, "  S",                   bit(7).advancing(8),                                     "  S=%-S", &sourcePresentNames};
-inline constexpr Field headerChecksum     {643, "Header Checksum",       pieces({4, 7}, {0, 3}, {12, 15}, {8, 11}).advancing(16), R"(  Header Checksum=%-["%x"](hex))", noNames, "%x"};
-inline constexpr Field destinationAddress {646, "Original Dest Address", octets(4),                                               R"(  Original Dest Address=%-["%u":"."])"};
-inline constexpr Field sourceAddress      {651, "Original Src Address",  octets(4),                                               R"(  Original Src Address=%-["%u":"."])"};
+inline constexpr Field protocol           {640, "MIPinIP Protocol",      octets(1),                                               "%n=%-S",                &protocolNames,      "MIPinIP - %-S"};
+inline constexpr Field reserved           {641, "  Reserved",            piece(0, 6),                                             "  %n=%x"};
+inline constexpr Field sourcePresent      {642, "  S",                   bit(7).advancing(8),                                     "  %n=%-S",              &sourcePresentNames};
+inline constexpr Field headerChecksum     {643, "Header Checksum",       pieces({4, 7}, {0, 3}, {12, 15}, {8, 11}).advancing(16), R"(  %n=%-["%x"](hex))", noNames,             "%x"};
+inline constexpr Field destinationAddress {646, "Original Dest Address", octets(4),                                               R"(  %n=%-["%u":"."])"};
+inline constexpr Field sourceAddress      {651, "Original Src Address",  octets(4),                                               R"(  %n=%-["%u":"."])"};
 // clang-format on
 
 inline constexpr std::uint32_t headerOctets = 8;
@@ -64,5 +65,11 @@ NETFLOOR_INLINE inline void header(Reader<Pass> &reader) {
         variables.payloadOctets = static_cast<std::int32_t>(variables.ipTotalLength - variables.ipHeaderOctets);
     }
 }
+
+// clang-format off
+using HeaderRows = Rows<
+    FieldList<protocol, reserved, sourcePresent, headerChecksum, destinationAddress, sourceAddress>,
+    FieldList<protocol, destinationAddress, sourceAddress>>;
+// clang-format on
 
 } // namespace netfloor::plugin::minimal
