@@ -5,6 +5,7 @@
 #include <array>
 #include <cstddef>
 #include <cstdint>
+#include <type_traits>
 
 #include "frame/field.h"
 
@@ -52,15 +53,19 @@ struct JoinedRows {
     using Keys = Joined<typename Protocols::Keys...>;
 };
 
+// Whether a list holds a field. It is asked wherever a field is read, so that a search through the list would cost the
+// compiler seconds: a set has its fields as base classes instead.
+template <const Field &field>
+struct SetMember {};
+
 template <class List>
-[[nodiscard]] consteval bool isListed(const Field &field) {
-    for (const Field *const listed : List::pointers) {
-        if (listed == &field) {
-            return true;
-        }
-    }
-    return false;
-}
+struct FieldSet;
+
+template <const Field &...fields>
+struct FieldSet<FieldList<fields...>> : SetMember<fields>... {};
+
+template <class List, const Field &field>
+inline constexpr bool isListed = std::is_base_of_v<SetMember<field>, FieldSet<List>>;
 
 // The bits from the start of `first` to the end of `last`, which stand in one list of fields in reading order. Fields
 // of one name in a row are forms of one field, of which one is read, and count once.
@@ -94,7 +99,7 @@ struct RequireDistinctIds {
 // Fails to compile where a key field is no field of the catalogue. The field stands in the compiler's message.
 template <const Field &field, class Catalogue>
 struct RequireFieldOfKey {
-    static_assert(isListed<Catalogue>(field),
+    static_assert(isListed<Catalogue, field>,
                   "a key row has no field: add the field to the Fields of its protocol, or take the row away");
 };
 
@@ -104,11 +109,12 @@ struct SharedId {
     std::size_t second = 0;
 };
 
-template <class List>
-[[nodiscard]] consteval SharedId findSharedId() {
-    for (std::size_t second = 1; second < List::size; ++second) {
+template <const Field &...fields>
+[[nodiscard]] consteval SharedId findSharedId(FieldList<fields...>) {
+    const std::uint32_t ids[] = {fields.id...}; // evaluated much faster than a std::array of pointers
+    for (std::size_t second = 1; second < sizeof...(fields); ++second) {
         for (std::size_t first = 0; first < second; ++first) {
-            if (List::pointers[first]->id == List::pointers[second]->id) {
+            if (ids[first] == ids[second]) {
                 return {first, second};
             }
         }
@@ -116,12 +122,18 @@ template <class List>
     return {};
 }
 
-// What must hold of a catalogue: each id once, and a field for each key row.
+// What must hold of a catalogue: consistent declarations, each id once, and a field for each key row.
 template <class Fields, class Keys>
 struct CheckedCatalogue {
-    static constexpr SharedId shared = findSharedId<Fields>();
+    static constexpr SharedId shared = findSharedId(Fields{});
     static_assert(shared.second == 0 ||
                   sizeof(RequireDistinctIds<*Fields::pointers[shared.first], *Fields::pointers[shared.second]>) > 0);
+
+    template <const Field &...fields>
+    static consteval bool areConsistent(FieldList<fields...>) {
+        return ((sizeof(RequireConsistent<fields>) > 0) && ...);
+    }
+    static_assert(areConsistent(Fields{}));
 
     template <const Field &...keys>
     static consteval bool keysHaveFields(FieldList<keys...>) {

@@ -78,8 +78,7 @@ inline constexpr bool canBeSure =
 // The step of a field of `units` units; see `read` and `readRun`.
 template <const Field &field, class Pass, class Store>
 NETFLOOR_INLINE inline void step(Reader<Pass> &reader, std::uint32_t units, Store into) {
-    static_assert(sizeof(RequireConsistent<field>) > 0);
-    static_assert(isListed<typename Pass::Fields>(field),
+    static_assert(isListed<typename Pass::Fields, field>,
                   "this field is read and stands in no list: add it to the rows at the end of its protocol's file, and "
                   "those rows to tables/catalogue.h");
     static_assert(std::is_same_v<Store, Unstored> || hasStoredValue(field.place), "this field has no number to store");

@@ -44,8 +44,6 @@ using CatalogueRows = JoinedRows<
 using CatalogueFields = CatalogueRows::Fields;
 using CatalogueKeys = CatalogueRows::Keys;
 
-static_assert(sizeof(CheckedCatalogue<CatalogueFields, CatalogueKeys>) > 0);
-
 inline constexpr auto &catalogue = CatalogueFields::pointers;
 
 // These have another number than the rest in the highest octet of their flags. Hosts keep the number; what it means

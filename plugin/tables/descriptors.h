@@ -17,6 +17,9 @@
 
 namespace netfloor::plugin {
 
+// Here, as this file is compiled once.
+static_assert(sizeof(CheckedCatalogue<CatalogueFields, CatalogueKeys>) > 0);
+
 // The highest octet of a field's flags.
 inline constexpr std::uint32_t usualTopOctet = 5;
 inline constexpr std::uint32_t otherTopOctet = 6;
@@ -40,14 +43,10 @@ inline constexpr std::uint32_t widthHead = 0xffff0000;
 template <const Field &field>
 inline constexpr bool isListedAddress = hasFixedWidth(field.place) && !parseFormat(longText<field>).separator.empty();
 
-[[nodiscard]] constexpr bool isKeyField(const Field &field) {
-    return keyRowOf(field) != noKeyRow;
-}
-
 template <const Field &field>
 inline constexpr std::uint32_t flagsOf = sizeClass(field.place) | (isListedAddress<field> ? 3u : 0u) << 8 |
                                          (isKeyField(field) ? 1u : 0u) << 16 |
-                                         (isListed<CatalogueOfTopOctet6>(field) ? otherTopOctet : usualTopOctet) << 24;
+                                         (isListed<CatalogueOfTopOctet6, field> ? otherTopOctet : usualTopOctet) << 24;
 
 // The zero-terminated name without blanks behind. Where there are none it is the field's own literal.
 template <std::size_t index>

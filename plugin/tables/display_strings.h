@@ -3,6 +3,7 @@
 // distinct text once.
 #pragma once
 
+#include <algorithm>
 #include <array>
 #include <cstddef>
 #include <cstdint>
@@ -120,6 +121,29 @@ struct TextTables {
     std::array<std::int32_t, catalogue.size()> valueStart{}; // of each field: its first value row, or -1
 };
 
+// The field before `index` that has the same list of names; `index` itself where there is none.
+[[nodiscard]] constexpr std::size_t firstWithNamesOf(std::size_t index) {
+    for (std::size_t other = 0; other < index; ++other) {
+        if (catalogue[other]->names == catalogue[index]->names) {
+            return other;
+        }
+    }
+    return index;
+}
+
+constexpr void addValueRows(TextTables &tables, std::size_t row, const ValueNames &names) {
+    if (!names.otherwise.empty()) {
+        const std::uint32_t index = tables.pool.indexOfRange(anyFrom, anyTo);
+        tables.values[row++] = {NETFLOOR_VALUE_RANGE, index, tables.texts.numberOf(names.otherwise)};
+    }
+    for (const ValueName &name : names.rows) {
+        const bool one = name.from == name.to;
+        const std::uint32_t index = one ? tables.pool.indexOf(name.from) : tables.pool.indexOfRange(name.from, name.to);
+        const std::uint32_t kind = one ? NETFLOOR_VALUE_ONE : NETFLOOR_VALUE_RANGE;
+        tables.values[row++] = {kind, index, tables.texts.numberOf(name.text)};
+    }
+}
+
 inline constexpr TextTables textTables = [] {
     TextTables tables;
     std::size_t row = 0;
@@ -130,17 +154,14 @@ inline constexpr TextTables textTables = [] {
         if (!field.hasNames()) {
             continue;
         }
-        if (!field.names->otherwise.empty()) {
-            const std::uint32_t index = tables.pool.indexOfRange(anyFrom, anyTo);
-            tables.values[row++] = {NETFLOOR_VALUE_RANGE, index, tables.texts.numberOf(field.names->otherwise)};
+        // The rows of a list are the same wherever it comes again.
+        if (const std::size_t first = firstWithNamesOf(i); first != i) {
+            std::copy_n(tables.values.begin() + tables.valueStart[first], valueRowCount(field),
+                        tables.values.begin() + tables.valueStart[i]);
+        } else {
+            addValueRows(tables, row, *field.names);
         }
-        for (const ValueName &name : field.names->rows) {
-            const bool one = name.from == name.to;
-            const std::uint32_t index =
-                one ? tables.pool.indexOf(name.from) : tables.pool.indexOfRange(name.from, name.to);
-            const std::uint32_t kind = one ? NETFLOOR_VALUE_ONE : NETFLOOR_VALUE_RANGE;
-            tables.values[row++] = {kind, index, tables.texts.numberOf(name.text)};
-        }
+        row += valueRowCount(field);
     }
     return tables;
 }();

@@ -22,15 +22,25 @@ inline constexpr std::uint32_t noKeyRow = 0xffffffff;
 // The table ends with a row without a name, which no field fills: a host can mark it present.
 inline constexpr std::uint32_t keyRowCount = keySites.size() + 1;
 
-// Whether a field is a key field goes by its id, as other fields may bear its name. Fields of one name share a row.
-[[nodiscard]] constexpr std::uint32_t keyRowOf(const Field &field) {
-    bool isKey = false;
-    std::uint32_t last = noKeyRow;
-    for (std::uint32_t row = 0; row < keySites.size(); ++row) {
-        isKey = isKey || keySites[row]->id == field.id;
-        last = keySites[row]->tableName() == field.tableName() ? row : last;
+// Whether a field is a key field goes by its id, as other fields may bear its name.
+[[nodiscard]] constexpr bool isKeyField(const Field &field) {
+    for (const Field *const key : keySites) {
+        if (key->id == field.id) {
+            return true;
+        }
     }
-    return isKey ? last : noKeyRow;
+    return false;
+}
+
+// The row that the XTR pass fills: fields of one name share the last one of that name.
+[[nodiscard]] constexpr std::uint32_t keyRowOf(const Field &field) {
+    if (!isKeyField(field)) {
+        return noKeyRow;
+    }
+    std::uint32_t row = keySites.size();
+    while (keySites[--row]->tableName() != field.tableName()) {
+    }
+    return row;
 }
 
 // The host fills the first three words of each row; the rest stays as it is.
