@@ -14,6 +14,9 @@ struct BitOrderVariables {
     bool copyRestored; // the working copy was restored as a whole since the host last had the packet
 };
 
+// Whether the host is told that the bits of a field were reversed.
+enum class Report : bool { plain, toldToHost };
+
 // Reverses the working copy from the cursor on as long as it lives, and restores it then from the source, with
 // whatever a lower layer has changed in it. The passes that report nothing, where no host has a field to look at
 // meanwhile, reverse no more than the one address that is read, and restore the whole once; a host that looks while
@@ -21,8 +24,6 @@ struct BitOrderVariables {
 template <class Pass>
 class [[nodiscard]] ReversedBits {
 public:
-    enum class Report : bool { plain, toldToHost };
-
     ReversedBits(Reader<Pass> &reader, Report report) : reader_(reader), outerOrder_(reader.bitOrder) {
         if (reader_.ended()) {
             return;
@@ -30,11 +31,10 @@ public:
         if (report == Report::toldToHost) {
             reader_.bitOrder = bitsPerOctet;
         }
-        reader_.settle();
-        reader_.writeLastRead();
+        reader_.writer.flush(reader_, *reader_.state, reader_.data);
         start_ = (reader_.cursor - 1) / bitsPerOctet;
         end_ = reader_.state->totalBits / bitsPerOctet;
-        if (!Pass::reports) {
+        if (!Pass::reportsFields) {
             // Off an octet border an address reaches into one octet more.
             end_ = std::min(end_, start_ + addressBits / bitsPerOctet + 1);
         }
@@ -46,8 +46,7 @@ public:
         if (reader_.ended()) {
             return;
         }
-        reader_.settle();
-        reader_.writeLastRead();
+        reader_.writer.flush(reader_, *reader_.state, reader_.data);
         restore();
         const std::uint32_t blockStart = reader_.state->blockStarts.base[reader_.blockDepth];
         if (const std::uint32_t odd = (reader_.cursor - blockStart) % bitsPerOctet; odd != 0) {
@@ -64,7 +63,7 @@ public:
 private:
     void restore() {
         bool &copyRestored = reader_.variables().copyRestored;
-        const bool whole = Pass::reports || !copyRestored;
+        const bool whole = Pass::reportsFields || !copyRestored;
         const std::uint32_t from = whole ? 0 : std::min(start_, end_);
         const std::uint32_t to = whole ? reader_.state->totalBits / bitsPerOctet : end_;
         std::memcpy(reader_.data + from, reader_.state->sourceData + from, to - from);

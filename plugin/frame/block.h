@@ -58,7 +58,7 @@ public:
     // Sets the limit. A length that reaches behind the bits left does not narrow anything: the block is read
     // as far as bits last, and the enclosing production reads no further.
     NETFLOOR_INLINE void limit(std::uint32_t bitCount) {
-        if (!reader_.ended() && !reader_.narrow(bitCount)) {
+        if (!reader_.ended() && !reader_.openLimit(bitCount)) {
             outerLive_ = false;
         }
     }
@@ -70,7 +70,7 @@ public:
         }
         reader_.skipRest();
         reader_.closeBlock();
-        reader_.popLimit();
+        reader_.closeLimit();
         reader_.live = outerLive_;
     }
 
@@ -105,7 +105,7 @@ public:
         open(name);
         if (!reader_.ended()) {
             reader_.live = true;
-            reader_.narrow(bitCount);
+            reader_.openLimit(bitCount);
             ++limits_;
         }
     }
@@ -115,7 +115,7 @@ public:
     NETFLOOR_INLINE ~BlockChain() {
         for (; limits_ > 0 && !reader_.ended(); --limits_) {
             reader_.skipRest();
-            reader_.popLimit();
+            reader_.closeLimit();
         }
         for (; blocks_ > 0 && !reader_.ended(); --blocks_) {
             reader_.closeBlock();
@@ -139,7 +139,7 @@ template <auto production, class Pass>
 [[gnu::noinline, gnu::flatten]] void outOfLineBody(typename Pass::Context &context, Position &position) {
     Reader<Pass> reader(context, position);
     production(reader);
-    reader.settle();
+    reader.writer.flushRun(*reader.state);
     position = reader;
 }
 
@@ -148,10 +148,10 @@ NETFLOOR_INLINE inline void runOutOfLine(Reader<Pass> &reader) {
     if (!reader.live) {
         return;
     }
-    reader.settle();
+    reader.writer.flushRun(*reader.state);
     Position position = reader;
     outOfLineBody<production, Pass>(*reader.context, position);
-    reader.stand(position);
+    reader.resumeAt(position);
 }
 
 } // namespace netfloor::plugin

@@ -76,11 +76,10 @@ inline void writeGroups(FieldRecord &record, const std::uint8_t *data, std::uint
     return value;
 }
 
-// Writes the elements and the value of a field that lies at `cursor`, and its id. There is room for the
-// elements. Gives the value.
+// Writes the elements and the value of a field that lies at `cursor`, and its id. There is room for the elements.
 template <const Field &field>
-NETFLOOR_INLINE inline std::uint32_t writeElements(FieldRecord &record, const std::uint8_t *data, std::uint32_t cursor,
-                                                   std::uint32_t units) {
+NETFLOOR_INLINE inline void writeElements(FieldRecord &record, const std::uint8_t *data, std::uint32_t cursor,
+                                          std::uint32_t units) {
     constexpr const Place &place = field.place;
     BitRange *const ranges = record.ranges;
     std::uint32_t value = 0;
@@ -140,7 +139,6 @@ NETFLOOR_INLINE inline std::uint32_t writeElements(FieldRecord &record, const st
     record.rangeCount = elements;
     record.outputRangeCount = outputElements;
     record.fieldId = field.id;
-    return value;
 }
 
 // Resets the record for a field and gives it the field's name.

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// The field step: how a field is read, stored and reported. And the look ahead, which does neither.
+// The field step: how a field is read, stored and reported. And the peek, which does neither.
 #pragma once
 
 #include <cstdint>
@@ -35,44 +35,31 @@ template <const Field &field, class Pass>
         return reader.cursor + neededBits<field> <= reader.state->totalBits + 1;
     }
     const std::uint32_t needs = place.isRun() ? place.needs(units) : neededBits<field>;
-    reader.condition() = reader.left >= needs ? 1 : 0;
+    reader.setCondition(reader.left >= needs);
     return reader.left >= needs;
 }
 
-// Of an address in groups, what no other field writes in the record, so that it would be lost behind the next one.
-template <const Field &field, class Pass>
-NETFLOOR_INLINE inline void keepWide(Reader<Pass> &reader) {
-    if constexpr (field.place.shape == Shape::groups) {
-        reader.state->fieldRecord.wideStart = 0;
-        reader.state->fieldRecord.wideBits = field.place.width();
-    }
-}
-
-// The step of a field that a stretch has made sure of. What the host can see of it is put off.
+// The step of a field whose bits a checked run has found to be left.
 template <const Field &field, class Pass, class Store>
-NETFLOOR_INLINE inline void sureStep(Reader<Pass> &reader, Store into) {
+NETFLOOR_INLINE inline void stepInRun(Reader<Pass> &reader, Store into) {
     constexpr const Place &place = field.place;
     if (!onOctetBorder(reader.cursor)) {
-        __builtin_unreachable(); // a stretch starts on one and moves in octets: the slow roads need no code here
+        __builtin_unreachable(); // a run starts on one and moves in octets: reading across octets needs no code here
     }
-    reader.showBlock();
+    reader.writer.nameBlock(reader, *reader.state);
     const std::uint32_t start = reader.cursor;
     if constexpr (!std::is_same_v<Store, Unstored>) {
         store(into, valueAt<field>(reader.data, start, place.count));
     }
     reader.left -= place.advance;
     reader.cursor += place.advance;
-    reader.sureBits -= place.advance;
-    reader.unsettled.writer = writeRecord<field>;
-    reader.unsettled.cursor = start;
-    reader.unsettled.advance = static_cast<std::int32_t>(place.advance);
-    keepWide<field>(reader);
+    reader.writer.template writeFieldInRun<field>(*reader.state, start);
     Pass::template output<field>(reader, start, place.count);
 }
 
-// Whether a stretch can make sure of a field: all of fixed size that move in whole octets and are part of it.
+// Whether a field can be part of a checked run: all of fixed size that move in whole octets.
 template <const Field &field>
-inline constexpr bool canBeSure =
+inline constexpr bool canBeInRun =
     !field.place.isRun() && field.place.shape != Shape::ahead && field.place.advance % bitsPerOctet == 0;
 
 // The step of a field of `units` units; see `read` and `readRun`.
@@ -86,22 +73,20 @@ NETFLOOR_INLINE inline void step(Reader<Pass> &reader, std::uint32_t units, Stor
     if (!reader.live) {
         return;
     }
-    if constexpr (!Pass::reports && canBeSure<field>) {
-        if (reader.sureBits >= neededBits<field>) {
-            return sureStep<field>(reader, into);
+    if constexpr (Pass::Writer::hasCheckedRuns && canBeInRun<field>) {
+        if (reader.writer.checkedBits() >= neededBits<field>) {
+            return stepInRun<field>(reader, into);
         }
     }
-    reader.settle();
-    reader.sureBits = 0;
+    reader.writer.flushRun(*reader.state);
+    reader.writer.leaveRun();
     if (!fits<field>(reader, units)) {
         reader.live = false;
         return;
     }
     const std::uint32_t moves = place.isRun() ? place.moves(units) : place.advance;
-    reader.showBlock();
-    if constexpr (Pass::reports) {
-        beginRecord<field>(reader.state->fieldRecord);
-    }
+    reader.writer.nameBlock(reader, *reader.state);
+    reader.writer.template beginField<field>(reader.state->fieldRecord);
     if (!reader.roomFor(place.elements(units), beginRecord<field>)) {
         return;
     }
@@ -109,23 +94,11 @@ NETFLOOR_INLINE inline void step(Reader<Pass> &reader, std::uint32_t units, Stor
     if constexpr (!std::is_same_v<Store, Unstored>) {
         store(into, valueAt<field>(reader.data, start, units));
     }
-    reader.advance() = static_cast<std::int32_t>(moves);
+    reader.setAdvance(static_cast<std::int32_t>(moves));
     reader.left -= moves;
     reader.cursor += moves;
-    if constexpr (Pass::reports) {
-        const std::uint32_t value = writeElements<field>(reader.state->fieldRecord, reader.data, start, units);
-        reader.givePosition();
-        Pass::template output<field>(reader, value);
-    } else {
-        reader.last().writer = writeRecord<field>;
-        reader.last().cursor = start;
-        if constexpr (place.isRun()) {
-            reader.last().units = units;
-        }
-        keepWide<field>(reader);
-        reader.last().seenPieces = 0;
-        Pass::template output<field>(reader, start, units);
-    }
+    reader.writer.template writeField<field>(reader, *reader.state, reader.data, start, units);
+    Pass::template output<field>(reader, start, units);
 }
 
 // Reads a field of fixed size. `into` takes its value: a pointer to a variable, or a function of the value.
@@ -156,7 +129,7 @@ NETFLOOR_INLINE inline std::int32_t readRepeated(Reader<Pass> &reader, std::int3
 }
 
 // Reads a field `count` times. Where it ends with another count, as bits ran out or the count is negative,
-// that is marked.
+// a flag says so.
 template <const Field &field, class Pass>
 NETFLOOR_INLINE inline void readCounted(Reader<Pass> &reader, std::int32_t count) {
     if (readRepeated<field>(reader, count) != count) {
@@ -164,28 +137,24 @@ NETFLOOR_INLINE inline void readCounted(Reader<Pass> &reader, std::int32_t count
     }
 }
 
-// A look ahead keeps the record of the field before.
+// A peek keeps the record of the field before.
 inline void keepRecord(FieldRecord &) {}
 
-// Looks at the bits of `place` without moving the cursor and without reporting anything; nothing where they
-// are not all left or the run is over. The field record keeps what was seen, under the name of the field before.
+// Gives the bits of `place` without moving the cursor and without reporting anything; nothing where they
+// are not all left or the run has ended. The field record keeps what was seen, under the name of the field before.
 template <class Pass>
 NETFLOOR_INLINE inline std::optional<std::uint32_t> peek(Reader<Pass> &reader, const Place &place) {
-    reader.settle();
+    reader.writer.flushRun(*reader.state);
     if (reader.ended() || reader.left < place.needs(place.count) || !reader.roomFor(place.count, keepRecord)) {
         return std::nullopt;
     }
     const bool whole = !place.isPieces();
-    const std::uint32_t first = reader.cursor + (whole ? 0 : place.pieces[0].low);
-    const std::uint32_t width = whole ? bitsPerOctet : place.pieces[0].width();
-    if constexpr (Pass::reports) {
-        return reader.writeSeen(first, place.count, width);
-    }
-    reader.last().seenFirst = first;
-    reader.last().seenPieces = place.count;
-    reader.last().seenWidth = width;
-    return width == bitsPerOctet ? octetsAt(reader.data, first, place.count)
-                                 : bits(reader.data, first, first + width - 1);
+    const Peek found = {
+        .first = reader.cursor + (whole ? 0 : place.pieces[0].low),
+        .pieces = place.count,
+        .width = whole ? bitsPerOctet : place.pieces[0].width(),
+    };
+    return reader.writer.peek(reader.state->fieldRecord, reader.data, found);
 }
 
 // Moves the cursor back over `bitCount` bits, so that they can be read a second time.
@@ -194,20 +163,13 @@ NETFLOOR_INLINE inline void stepBack(Reader<Pass> &reader, std::uint32_t bitCoun
     if (reader.ended()) {
         return;
     }
-    if (reader.unsettled.advance == static_cast<std::int32_t>(bitCount)) {
-        // An address that a stretch has just read: outside of one the number is 0, and inside the bits are there.
-        reader.unsettled.advance = -reader.unsettled.advance;
-        reader.sureBits += bitCount;
-        reader.cursor -= bitCount;
-        reader.left += bitCount;
-        return;
-    }
-    reader.settle();
-    reader.sureBits = 0;
-    reader.advance() = -static_cast<std::int32_t>(bitCount);
-    if (!reader.live || reader.cursor < bitCount) {
-        reader.live = false;
-        return;
+    if (!reader.writer.stepBackInRun(bitCount)) {
+        reader.writer.leaveRun();
+        reader.setAdvance(-static_cast<std::int32_t>(bitCount));
+        if (!reader.live || reader.cursor < bitCount) {
+            reader.live = false;
+            return;
+        }
     }
     reader.cursor -= bitCount;
     reader.left += bitCount;

@@ -35,7 +35,7 @@ NETFLOOR_INLINE inline void handOffTo(Reader<Pass> &reader, const NextLayer &nex
     reader.giveState();
     reader.context->bitsLeft = reader.left;
     const std::uint32_t payload = reader.cursor;
-    if (const Outcome outcome = Pass::transfer(*reader.context); outcome != Outcome::on) {
+    if (const Outcome outcome = Pass::transfer(*reader.context); outcome != Outcome::running) {
         reader.end(outcome);
         return;
     }

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// The four passes: what each does with a field once it is read, which marks it raises, and how it hands on.
+// The four passes: what each does with a field once it is read, which flags it raises, and how it hands on.
 //
 // `Grammar` gives the variables and, for each field, the id under which the TO pass reports it and its row
 // in the key-field table.
@@ -10,7 +10,7 @@
 #include <cstring>
 #include <type_traits>
 
-#include "frame/reader.h"
+#include "frame/pass.h"
 #include "frame/text_line.h"
 #include "netfloor/host.h"
 
@@ -44,10 +44,9 @@ struct PreDecodePass {
     using Variables = typename Grammar::Variables;
     using Fields = typename Grammar::Fields;
 
-    static constexpr bool reports = mode != NETFLOOR_MODE_MV; // hands each field to the host
+    static constexpr bool reportsFields = mode != NETFLOOR_MODE_MV;
 
     static inline constinit Variables variables{};
-    static inline constinit LastRead last{};
     static inline constinit std::uint32_t savedDecoderId = 0;
 
     static constexpr bool raises(Flag flag) { return mode == NETFLOOR_MODE_MV || flag == Flag::expectation; }
@@ -59,7 +58,7 @@ struct PreDecodePass {
     }
 
     static bool enter(PreDecodeContext &context) {
-        if constexpr (reports) {
+        if constexpr (reportsFields) {
             openLayerInfo(context, context.decoderId);
         }
         savedDecoderId = context.decoderId;
@@ -67,7 +66,7 @@ struct PreDecodePass {
     }
 
     static void leave(PreDecodeContext &context) {
-        if constexpr (reports) {
+        if constexpr (reportsFields) {
             closeLayerInfo(context);
         }
     }
@@ -75,28 +74,30 @@ struct PreDecodePass {
     // Runs the owner of the next layer. A nested run of this pass leaves its own
     // decoder id behind; that is the one put back.
     static Outcome transfer(PreDecodeContext &context) {
-        if constexpr (reports) {
+        if constexpr (reportsFields) {
             closeLayerInfo(context);
         }
         ++context.layerNumber;
         if (hd_PreDecode(&context, mode) < 0) {
             return Outcome::cutOff;
         }
-        if constexpr (reports) {
+        if constexpr (reportsFields) {
             openLayerInfo(context, savedDecoderId);
         }
         context.decoderId = savedDecoderId;
-        return Outcome::on;
+        return Outcome::running;
     }
 };
 
 // MD: the long text of each field, with its name, id and bit ranges.
 template <class Grammar>
 struct MdPass : PreDecodePass<Grammar, NETFLOOR_MODE_MD> {
+    using Writer = ImmediateWriter;
+
     static inline constinit Line::Buffer buffer{};
 
-    template <const Field &field>
-    NETFLOOR_INLINE static void output(Reader<MdPass> &reader, std::uint32_t value) {
+    template <const Field &field, class Reader>
+    NETFLOOR_INLINE static void output(Reader &reader, std::uint32_t, std::uint32_t) {
         static constexpr Format format = parseFormat(longText<field>);
         const FieldRecord &record = reader.state->fieldRecord;
         std::uint8_t *const decoded =
@@ -107,7 +108,7 @@ struct MdPass : PreDecodePass<Grammar, NETFLOOR_MODE_MD> {
             decoded[2] = 0;
         }
         Line line(buffer);
-        fill<field, format>(line, value, record);
+        fill<field, format>(line, record);
         hs_AddDecodedFieldsData(reader.context, record.outputRangeCount, record.ranges, line.terminated(), 0,
                                 record.fieldName, field.id, 0, reader.bitOrder);
     }
@@ -116,13 +117,15 @@ struct MdPass : PreDecodePass<Grammar, NETFLOOR_MODE_MD> {
 // TO: the short text of each field.
 template <class Grammar>
 struct ToPass : PreDecodePass<Grammar, NETFLOOR_MODE_TO> {
+    using Writer = ImmediateWriter;
+
     static inline constinit Line::Buffer buffer{};
 
-    template <const Field &field>
-    NETFLOOR_INLINE static void output(Reader<ToPass> &reader, std::uint32_t value) {
+    template <const Field &field, class Reader>
+    NETFLOOR_INLINE static void output(Reader &reader, std::uint32_t, std::uint32_t) {
         static constexpr Format format = parseFormat(shortText<field>);
         Line line(buffer);
-        fill<field, format>(line, value, reader.state->fieldRecord);
+        fill<field, format>(line, reader.state->fieldRecord);
         hs_AddFieldsToDisplayData(reader.context, line.terminated(), Grammar::template displayId<field>);
     }
 };
@@ -130,8 +133,10 @@ struct ToPass : PreDecodePass<Grammar, NETFLOOR_MODE_TO> {
 // MV: the verdict.
 template <class Grammar>
 struct MvPass : PreDecodePass<Grammar, NETFLOOR_MODE_MV> {
-    template <const Field &field>
-    NETFLOOR_INLINE static void output(Reader<MvPass> &reader, std::uint32_t, std::uint32_t) {
+    using Writer = DeferredWriter<MvPass>;
+
+    template <const Field &field, class Reader>
+    NETFLOOR_INLINE static void output(Reader &reader, std::uint32_t, std::uint32_t) {
         reader.check();
     }
 };
@@ -140,13 +145,13 @@ struct MvPass : PreDecodePass<Grammar, NETFLOOR_MODE_MV> {
 template <class Grammar>
 struct XtrPass {
     using Context = XtrContext;
+    using Writer = DeferredWriter<XtrPass>;
     using Variables = typename Grammar::Variables;
     using Fields = typename Grammar::Fields;
 
-    static constexpr bool reports = false;
+    static constexpr bool reportsFields = false;
 
     static inline constinit Variables variables{};
-    static inline constinit LastRead last{};
     static inline constinit std::int32_t keyFieldStatus = 0;
     static inline constinit std::uint16_t presenceRow = 0;
 
@@ -174,8 +179,8 @@ struct XtrPass {
     // The pass ends at a hand-off: the host goes on by itself.
     static Outcome transfer(XtrContext &) { return Outcome::stopped; }
 
-    template <const Field &field>
-    NETFLOOR_INLINE static void output(Reader<XtrPass> &reader, std::uint32_t start, std::uint32_t units) {
+    template <const Field &field, class Reader>
+    NETFLOOR_INLINE static void output(Reader &reader, std::uint32_t start, std::uint32_t units) {
         constexpr std::uint32_t row = Grammar::template keyRow<field>;
         if constexpr (row != Grammar::noKeyRow) {
             const KeyFieldRow &key = Grammar::keyRows[row];

@@ -127,9 +127,10 @@ inline constexpr std::size_t mostWritten = [] {
     }
 }();
 
-// Builds the text of a field.
+// Builds the text of the field whose record this is.
 template <const Field &field, const Format &format>
-NETFLOOR_INLINE inline void fill(Line &line, std::uint32_t value, const FieldRecord &record) {
+NETFLOOR_INLINE inline void fill(Line &line, const FieldRecord &record) {
+    const std::uint32_t value = record.value;
     static_assert(format.literal[0].size() + mostWritten<field, format, 0> + format.literal[1].size() +
                           mostWritten<field, format, 1> + format.literal[2].size() <=
                       Line::most + Line::slack,

@@ -28,8 +28,8 @@ NETFLOOR_INLINE inline void addressReadTwice(Reader<Pass> &reader) {
 }
 
 // An address read with the bits of each octet reversed, twice over, so that its groups show in network order.
-template <class Pass>
-void reversedAddress(Reader<Pass> &reader, typename ReversedBits<Pass>::Report report) {
+template <Report report, class Pass>
+void reversedAddress(Reader<Pass> &reader) {
     if (!reader.live) {
         return;
     }

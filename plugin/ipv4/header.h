@@ -87,7 +87,7 @@ NETFLOOR_INLINE inline void datagram(Reader<Pass> &reader) {
     }
     // A Total Length below 4 wraps to a huge number, which is more than any packet holds.
     const std::uint32_t limit = variables.ipTotalLength * bitsPerOctet - bitsBeforeLimit;
-    reader.advance() = static_cast<std::int32_t>(limit);
+    reader.setAdvance(static_cast<std::int32_t>(limit));
     if (limit > reader.left) {
         return;
     }

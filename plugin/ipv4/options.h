@@ -130,7 +130,7 @@ void routeOption(Reader<Pass> &reader, BlockName name, OptionArea &area) {
         return;
     }
     for (std::int32_t entry = 0; reader.live && entry < mostEntries; ++entry) {
-        ipv6::reversedAddress(reader, ReversedBits<Pass>::Report::plain);
+        runOutOfLine<ipv6::reversedAddress<Report::plain, Pass>>(reader);
     }
 }
 

@@ -156,9 +156,8 @@ void causeOf(Reader<Pass> &reader, std::uint32_t code) {
 // The list goes on as long as its rounds end with the condition true, mostly with a field that did fit, whether or
 // not anything is left. It ordinarily ends with a limit that is longer than what is left.
 template <class Pass>
-void errorCauses(Reader<Pass> &reader) {
-    reader.test(true);
-    while (reader.live && reader.condition() != 0) {
+void causeList(Reader<Pass> &reader) {
+    while (reader.live && reader.state->condition != 0) {
         const LimitedBlock<Pass> cause{reader, "Error Causes", bitsOf(reader.variables().errorOctets)};
         std::uint32_t code = 0;
         read<causeCode>(reader, &code);
@@ -167,6 +166,12 @@ void errorCauses(Reader<Pass> &reader) {
             causeOf(reader, code);
         }
     }
+}
+
+template <class Pass>
+void errorCauses(Reader<Pass> &reader) {
+    reader.test(true);
+    runOutOfLine<causeList<Pass>>(reader);
 }
 
 // clang-format off

@@ -56,7 +56,7 @@ void heartbeatWith(Reader<Pass> &reader, BlockName name) {
     const Block<Pass> block{reader, name};
     read<flags>(reader);
     readChunkLength(reader);
-    heartbeatInformation(reader);
+    runOutOfLine<heartbeatInformation<Pass>>(reader);
 }
 
 template <class Pass>

@@ -111,7 +111,7 @@ void ipv6AddressParameter(Reader<Pass> &reader) {
         return;
     }
     const Block<Pass> block{reader, "IPv6 Address"};
-    ipv6::reversedAddress(reader, ReversedBits<Pass>::Report::toldToHost);
+    runOutOfLine<ipv6::reversedAddress<Report::toldToHost, Pass>>(reader);
 }
 
 // The types that both lists know, and those that neither does.

@@ -75,7 +75,7 @@ template <const LengthAhead &ahead, class Pass, class Store>
     const std::uint32_t cursor = reader.cursor;
     const std::uint32_t left = reader.left;
     const auto stepOver = [&reader](std::uint32_t width) {
-        reader.advance() = static_cast<std::int32_t>(width);
+        reader.setAdvance(static_cast<std::int32_t>(width));
         reader.cursor += width;
         reader.left -= width;
     };
@@ -88,14 +88,14 @@ template <const LengthAhead &ahead, class Pass, class Store>
         if (reader.test(reader.left >= part.needs)) {
             stepOver(part.width);
         }
-        sum += ahead.addsSkipped ? static_cast<std::uint32_t>(reader.advance()) : 0;
+        sum += ahead.addsSkipped ? static_cast<std::uint32_t>(reader.state->advance) : 0;
     }
     const std::optional<std::uint32_t> length = peek(reader, octets(2));
     if (reader.test(length.has_value())) {
         store(into, *length);
         stepOver(lengthBits);
     }
-    sum += static_cast<std::uint32_t>(reader.advance()) + length.value_or(0) * bitsPerOctet;
+    sum += static_cast<std::uint32_t>(reader.state->advance) + length.value_or(0) * bitsPerOctet;
 
     reader.cursor = cursor;
     reader.left = left;

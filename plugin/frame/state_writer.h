@@ -1,0 +1,252 @@
+// SPDX-License-Identifier: MIT
+// How what was read gets into the host's records. A pass that reports each field writes it at once. One that reports
+// nothing puts it off: the host looks at its records only where it is called, and of all that was read before it then
+// sees the last field, the last peek and the last block alone.
+#pragma once
+
+#include <cstdint>
+
+#include "frame/bits.h"
+#include "frame/field.h"
+#include "frame/field_record.h"
+#include "frame/inline.h"
+#include "frame/position.h"
+#include "netfloor/records.h"
+
+namespace netfloor::plugin {
+
+// Octets of one width that were looked at without being read.
+struct Peek {
+    std::uint32_t first = 0;  // bit
+    std::uint32_t pieces = 0; // 0: there was none
+    std::uint32_t width = 0;  // bits of a piece
+};
+
+// What a peek leaves in the field record: value and elements, under the name of the field before. Gives the value.
+NETFLOOR_INLINE inline std::uint32_t writePeek(FieldRecord &record, const std::uint8_t *data, const Peek &peek) {
+    record.value = 0;
+    for (std::uint32_t i = 0; i < peek.pieces; ++i) {
+        BitRange &range = record.ranges[i];
+        range.firstBit = peek.first + i * peek.width;
+        range.lastBit = range.firstBit + peek.width - 1;
+        range.value = bits(data, range.firstBit, range.lastBit);
+        range.flagWord = 0;
+        record.value = record.value << peek.width | range.value;
+    }
+    record.rangeCount = peek.pieces;
+    return record.value;
+}
+
+class ImmediateWriter {
+public:
+    static constexpr bool hasCheckedRuns = false;
+
+    NETFLOOR_INLINE void reset() {}
+    NETFLOOR_INLINE void endRun() {}
+    NETFLOOR_INLINE void flushRun(DecodeState &) {}
+    NETFLOOR_INLINE void flush(const Position &, DecodeState &, const std::uint8_t *) {}
+
+    NETFLOOR_INLINE void pushed(BitStack &stack) { ++stack.top; }
+    NETFLOOR_INLINE void popped(BitStack &stack) { --stack.top; }
+    NETFLOOR_INLINE bool pushedBlockInRun(DecodeState &, std::uint32_t, std::uint32_t) { return false; }
+
+    NETFLOOR_INLINE void nameBlock(Position &position, DecodeState &state) { position.block.copyTo(state.blockName); }
+
+    template <const Field &field>
+    NETFLOOR_INLINE void beginField(FieldRecord &record) {
+        beginRecord<field>(record);
+    }
+
+    template <const Field &field>
+    NETFLOOR_INLINE void writeField(const Position &position, DecodeState &state, const std::uint8_t *data,
+                                    std::uint32_t start, std::uint32_t units) {
+        writeElements<field>(state.fieldRecord, data, start, units);
+        state.cursor = position.cursor;
+        state.bitsLeft = position.left;
+    }
+
+    NETFLOOR_INLINE std::uint32_t peek(FieldRecord &record, const std::uint8_t *data, const Peek &peek) {
+        return writePeek(record, data, peek);
+    }
+
+    NETFLOOR_INLINE bool stepBackInRun(std::uint32_t) { return false; }
+    NETFLOOR_INLINE void leaveRun() {}
+};
+
+// Writes a field that was read at `cursor` into the field record.
+using RecordWriter = void (*)(FieldRecord &record, const std::uint8_t *data, std::uint32_t cursor, std::uint32_t units);
+
+template <const Field &field>
+void writeRecord(FieldRecord &record, const std::uint8_t *data, std::uint32_t cursor, std::uint32_t units) {
+    beginRecord<field>(record);
+    writeElements<field>(record, data, cursor, field.place.isRun() ? units : field.place.count);
+}
+
+// What was read last.
+struct LastRead {
+    RecordWriter writer = nullptr; // of the last field; null: the record is up to date
+    std::uint32_t cursor = 0;      // where that field lies
+    std::uint32_t units = 0;       // of a run of octets or nibbles
+    Peek peek = {};                // after that field
+};
+
+// Puts off what the host cannot see yet. In a checked run (see checked_run.h) it puts off more: what is known there
+// are constants where the compiler looks, and what has to be written after the run is kept in registers.
+template <class Pass>
+class DeferredWriter {
+public:
+    static constexpr bool hasCheckedRuns = true;
+
+    // Starts a run of so many bits and blocks: bits that are left, from an octet border on, for fields that the record
+    // has room for.
+    NETFLOOR_INLINE void startRun(std::uint32_t bitCount, std::uint32_t blockCount) {
+        inRun_ = true;
+        checkedBits_ = bitCount;
+        checkedBlocks_ = blockCount;
+    }
+
+    [[nodiscard]] NETFLOOR_INLINE std::uint32_t checkedBits() const { return checkedBits_; }
+
+    // What was checked does not hold from here on. What is put off stays so.
+    NETFLOOR_INLINE void leaveRun() { checkedBits_ = 0; }
+
+    // Nothing is put off: the state is as the host left it.
+    NETFLOOR_INLINE void reset() {
+        last_.writer = nullptr;
+        last_.peek.pieces = 0;
+        endRun();
+    }
+
+    // Nothing of the run is put off.
+    NETFLOOR_INLINE void endRun() {
+        inRun_ = false;
+        checkedBits_ = 0;
+        checkedBlocks_ = 0;
+        field_ = {};
+        blocks_ = 0;
+    }
+
+    // Writes what the run has put off.
+    NETFLOOR_INLINE void flushRun(DecodeState &state) {
+        if (!inRun_) {
+            return;
+        }
+        if (field_.writer != nullptr) {
+            state.condition = 1;
+            state.advance = field_.advance;
+            last_.writer = field_.writer;
+            last_.cursor = field_.cursor;
+            last_.peek.pieces = 0;
+        }
+        if (blocks_ != 0) {
+            state.blockStarts.count = blocks_;
+        }
+        field_ = {};
+        blocks_ = 0;
+    }
+
+    // Writes all that was put off: before the host looks at the state, and before the working copy changes.
+    NETFLOOR_INLINE void flush(const Position &position, DecodeState &state, const std::uint8_t *data) {
+        flushRun(state);
+        flushRecord(state.fieldRecord, data);
+        if (position.fieldBlock.text != nullptr) {
+            position.fieldBlock.copyTo(state.blockName);
+        }
+    }
+
+    NETFLOOR_INLINE void flushRecord(FieldRecord &record, const std::uint8_t *data) {
+        if (last_.writer != nullptr) {
+            last_.writer(record, data, last_.cursor, last_.units);
+        }
+        if (last_.peek.pieces != 0) {
+            writePeek(record, data, last_.peek);
+        }
+        last_.writer = nullptr;
+        last_.peek.pieces = 0;
+    }
+
+    NETFLOOR_INLINE void pushed(BitStack &) {}
+    NETFLOOR_INLINE void popped(BitStack &) {}
+
+    // Notes that the block at `depth` opened at `cursor`. False where the run has checked no room for it.
+    NETFLOOR_INLINE bool pushedBlockInRun(DecodeState &state, std::uint32_t depth, std::uint32_t cursor) {
+        if (checkedBlocks_ == 0) {
+            return false;
+        }
+        --checkedBlocks_;
+        blocks_ = depth;
+        state.blockStarts.base[depth] = cursor;
+        return true;
+    }
+
+    NETFLOOR_INLINE void nameBlock(Position &position, DecodeState &) { position.fieldBlock = position.block; }
+
+    template <const Field &field>
+    NETFLOOR_INLINE void beginField(FieldRecord &) {}
+
+    // Of an address in groups it writes at once what no other field writes, so that the next field does not hide it.
+    template <const Field &field>
+    NETFLOOR_INLINE void writeField(const Position &, DecodeState &state, const std::uint8_t *, std::uint32_t start,
+                                    std::uint32_t units) {
+        last_.writer = writeRecord<field>;
+        last_.cursor = start;
+        if constexpr (field.place.isRun()) {
+            last_.units = units;
+        }
+        writeWide<field>(state.fieldRecord);
+        last_.peek.pieces = 0;
+    }
+
+    // The same for a field whose bits the run has checked.
+    template <const Field &field>
+    NETFLOOR_INLINE void writeFieldInRun(DecodeState &state, std::uint32_t start) {
+        checkedBits_ -= field.place.advance;
+        field_.writer = writeRecord<field>;
+        field_.cursor = start;
+        field_.advance = static_cast<std::int32_t>(field.place.advance);
+        writeWide<field>(state.fieldRecord);
+    }
+
+    NETFLOOR_INLINE std::uint32_t peek(FieldRecord &, const std::uint8_t *data, const Peek &peek) {
+        last_.peek = peek;
+        return peek.width == bitsPerOctet ? octetsAt(data, peek.first, peek.pieces)
+                                          : bits(data, peek.first, peek.first + peek.width - 1);
+    }
+
+    // Moves back over an address that the run has just read: inside a run its bits are there. False elsewhere, where
+    // the last advance is 0.
+    NETFLOOR_INLINE bool stepBackInRun(std::uint32_t bitCount) {
+        if (field_.advance != static_cast<std::int32_t>(bitCount)) {
+            return false;
+        }
+        field_.advance = -field_.advance;
+        checkedBits_ += bitCount;
+        return true;
+    }
+
+private:
+    template <const Field &field>
+    NETFLOOR_INLINE static void writeWide(FieldRecord &record) {
+        if constexpr (field.place.shape == Shape::groups) {
+            record.wideStart = 0;
+            record.wideBits = field.place.width();
+        }
+    }
+
+    // Of the run: its last field, and the blocks on the stack after its last push (0: there was none).
+    struct RunField {
+        RecordWriter writer = nullptr; // null: there was none
+        std::uint32_t cursor = 0;
+        std::int32_t advance = 0;
+    };
+
+    static inline constinit LastRead last_{};
+
+    bool inRun_ = false;
+    std::uint32_t checkedBits_ = 0;
+    std::uint32_t checkedBlocks_ = 0;
+    RunField field_ = {};
+    std::uint32_t blocks_ = 0;
+};
+
+} // namespace netfloor::plugin
