@@ -1,0 +1,157 @@
+// SPDX-License-Identifier: MIT
+// Compares two builds of the plug-in: whether a host sees the same of both, call by call.
+//
+//     compare_plugins OLD.so NEW.so [--packets N] [--first N] [--seed S] [--captures DIR]... [--strict]
+//
+// The exit code is 0 when it does, 1 when it does not, 2 when the comparison could not be made.
+#include <chrono>
+#include <cstdio>
+#include <exception>
+#include <stdexcept>
+
+#include <CLI/CLI.hpp>
+
+#include "exports.h"
+#include "inputs.h"
+
+namespace netfloor::compare {
+namespace {
+
+// What the plug-ins keep from one packet to the next is part of what is compared. For a repetition to be short,
+// they start as loaded after so many packets.
+constexpr std::uint64_t packetsTogether = 64;
+
+struct Options {
+    std::string oldPath, newPath;
+    std::uint64_t packets = 100'000;
+    std::uint64_t first = 0;
+    std::uint64_t seed = 1;
+    std::vector<std::string> captures;
+    bool strict = false;
+};
+
+class Comparison {
+public:
+    explicit Comparison(const Options &options)
+        : options_(options), old_(options.oldPath), new_(options.newPath), inputs_(options.captures, options.seed) {
+        if (old_.handle() == new_.handle()) {
+            throw std::runtime_error("both are the same file");
+        }
+        host_.strict = options.strict;
+    }
+
+    bool run() {
+        if (const std::string differences = exportDifferences(old_, new_); !differences.empty()) {
+            std::printf("DIFFERENCE in the exports\n%s", differences.c_str());
+            return false;
+        }
+        const auto start = std::chrono::steady_clock::now();
+        const std::uint64_t from = options_.first / packetsTogether * packetsTogether;
+        for (std::uint64_t number = from; number < options_.first + options_.packets; ++number) {
+            if (number % packetsTogether == 0) {
+                setAsLoaded();
+            }
+            if (!same(number)) {
+                return false;
+            }
+        }
+        const std::chrono::duration<double> took = std::chrono::steady_clock::now() - start;
+        std::printf(
+            "no difference in %llu packets, four passes each, %llu host calls and results; %zu fields; %.1f s\n",
+            static_cast<unsigned long long>(options_.packets), static_cast<unsigned long long>(events_),
+            host_.fieldsSeen().count(), took.count());
+        return true;
+    }
+
+private:
+    void setAsLoaded() const {
+        old_.setAsLoaded();
+        new_.setAsLoaded();
+    }
+
+    bool same(std::uint64_t number) {
+        const Input input = inputs_.input(number);
+        if (input.plan.needsFreshPlugin()) {
+            setAsLoaded();
+        }
+        for (const Pass pass : {Pass::md, Pass::to, Pass::mv, Pass::xtr}) {
+            if (!samePass(number, input, pass)) {
+                return false;
+            }
+        }
+        if (input.plan.needsFreshPlugin()) {
+            setAsLoaded();
+        }
+        return true;
+    }
+
+    bool samePass(std::uint64_t number, const Input &input, Pass pass) {
+        const Variables olds = old_.variables();
+        const Variables news = new_.variables();
+        runBoth(input, pass, false);
+        events_ += oldTrace_.events();
+        if (good_ && oldTrace_ == newTrace_) {
+            return true;
+        }
+        old_.setVariables(olds);
+        new_.setVariables(news);
+        runBoth(input, pass, true);
+        tell(number, input, pass);
+        return false;
+    }
+
+    void runBoth(const Input &input, Pass pass, bool keepsTexts) {
+        oldTrace_.start(keepsTexts);
+        newTrace_.start(keepsTexts);
+        const bool oldGood = host_.run(old_, pass, input, oldTrace_);
+        const bool newGood = host_.run(new_, pass, input, newTrace_);
+        good_ = oldGood && newGood;
+    }
+
+    void tell(std::uint64_t number, const Input &input, Pass pass) const {
+        const Plan &plan = input.plan;
+        std::printf("DIFFERENCE in packet %llu, %s pass%s\n%s", static_cast<unsigned long long>(number), nameOf(pass),
+                    good_ ? "" : " (a plug-in crashed, did not end or wrote outside its storage)",
+                    firstDifference(oldTrace_, newTrace_).c_str());
+        std::printf("packet (%s): %s\n", input.origin, test::hexText(input.packet).c_str());
+        std::printf("host: capacities %u %u %u %u %u, refused growth %u, odd owners %d, key status %d, byte area %u,\n"
+                    "      cursor %u, missing bits %u, outer bits %u, flags 0x%x, layer %u, source mask 0x%x\n",
+                    plan.blockCapacity, plan.limitCapacity, plan.layerCapacity, plan.rangeCapacity,
+                    plan.layerInfoCapacity, plan.refusedGrowth, plan.oddOwners, plan.keyStatus, plan.byteAreaSize,
+                    plan.cursor, plan.missingBits, plan.outerBits, plan.flags, plan.layerIndex, plan.sourceMask);
+        std::printf("again: the same captures, --seed %llu --first %llu --packets 1%s\n",
+                    static_cast<unsigned long long>(options_.seed), static_cast<unsigned long long>(number),
+                    options_.strict ? " --strict" : "");
+    }
+
+    const Options &options_;
+    const Plugin old_, new_;
+    const Inputs inputs_;
+    Host host_;
+    Trace oldTrace_, newTrace_;
+    bool good_ = true;
+    std::uint64_t events_ = 0;
+};
+
+} // namespace
+} // namespace netfloor::compare
+
+int main(int argumentCount, char **arguments) {
+    netfloor::compare::Options options;
+    options.captures = {NETFLOOR_CAPTURES};
+    CLI::App app("Compares two builds of the plug-in, call by call");
+    app.add_option("OLD", options.oldPath, "the plug-in as it was")->required();
+    app.add_option("NEW", options.newPath, "the plug-in as it is")->required();
+    app.add_option("--packets", options.packets, "how many packets")->capture_default_str();
+    app.add_option("--first", options.first, "number of the first one");
+    app.add_option("--seed", options.seed, "of what is drawn")->capture_default_str();
+    app.add_option("--captures", options.captures, "folders with captures, in place of those of the tests");
+    app.add_flag("--strict", options.strict, "compare also what has no meaning: all storage, used or not");
+    CLI11_PARSE(app, argumentCount, arguments);
+    try {
+        return netfloor::compare::Comparison(options).run() ? 0 : 1;
+    } catch (const std::exception &error) {
+        std::fprintf(stderr, "compare_plugins: %s\n", error.what());
+        return 2;
+    }
+}
