@@ -11,22 +11,23 @@
 
 #include <CLI/CLI.hpp>
 
-#include "exports.h"
 #include "inputs.h"
 
 namespace netfloor::compare {
 namespace {
 
-// What the plug-ins keep from one packet to the next is part of what is compared. For a repetition to be short,
-// they start as loaded after so many packets.
+// What a plug-in keeps from one packet to the next is part of what is compared. So that a difference can be found again
+// soon, both start as loaded after so many packets.
 constexpr std::uint64_t packetsTogether = 64;
+
+constexpr const char *passNames[] = {"TO", "MD", "MV", "XTR"};
 
 struct Options {
     std::string oldPath, newPath;
     std::uint64_t packets = 100'000;
     std::uint64_t first = 0;
     std::uint64_t seed = 1;
-    std::vector<std::string> captures;
+    std::vector<std::string> captures = {NETFLOOR_CAPTURES};
     bool strict = false;
 };
 
@@ -34,44 +35,51 @@ class Comparison {
 public:
     explicit Comparison(const Options &options)
         : options_(options), old_(options.oldPath), new_(options.newPath), inputs_(options.captures, options.seed) {
-        if (old_.handle() == new_.handle()) {
+        if (old_.handle == new_.handle) {
             throw std::runtime_error("both are the same file");
         }
-        host_.strict = options.strict;
     }
 
+    // False at the first difference, which is then shown.
     bool run() {
-        if (const std::string differences = exportDifferences(old_, new_); !differences.empty()) {
-            std::printf("DIFFERENCE in the exports\n%s", differences.c_str());
+        if (!sameExports()) {
             return false;
         }
         const auto start = std::chrono::steady_clock::now();
         const std::uint64_t from = options_.first / packetsTogether * packetsTogether;
         for (std::uint64_t number = from; number < options_.first + options_.packets; ++number) {
-            if (number % packetsTogether == 0) {
-                setAsLoaded();
-            }
-            if (!same(number)) {
+            if (!sameRuns(number)) {
                 return false;
             }
         }
         const std::chrono::duration<double> took = std::chrono::steady_clock::now() - start;
-        std::printf(
-            "no difference in %llu packets, four passes each, %llu host calls and results; %zu fields; %.1f s\n",
-            static_cast<unsigned long long>(options_.packets), static_cast<unsigned long long>(events_),
-            host_.fieldsSeen().count(), took.count());
+        std::printf("no difference: %llu packets in four passes, %llu host calls and results, %zu fields, %.1f s\n",
+                    static_cast<unsigned long long>(options_.packets), static_cast<unsigned long long>(events_),
+                    fieldsSeen().count(), took.count());
         return true;
     }
 
 private:
-    void setAsLoaded() const {
-        old_.setAsLoaded();
-        new_.setAsLoaded();
+    [[nodiscard]] bool sameExports() const {
+        Trace olds(true);
+        Trace news(true);
+        traceExports(old_, olds);
+        traceExports(new_, news);
+        if (!(olds == news)) {
+            std::printf("DIFFERENCE in the exports\n%s", Trace::firstDifference(olds, news).c_str());
+        }
+        return olds == news;
     }
 
-    bool same(std::uint64_t number) {
+    void setAsLoaded() const {
+        old_.setVariables(old_.asLoaded);
+        new_.setVariables(new_.asLoaded);
+    }
+
+    bool sameRuns(std::uint64_t number) {
         const Input input = inputs_.input(number);
-        if (input.plan.needsFreshPlugin()) {
+        const bool ownKeys = input.plan.keyStatus != 1;
+        if (ownKeys || number % packetsTogether == 0) {
             setAsLoaded();
         }
         for (const Pass pass : {Pass::md, Pass::to, Pass::mv, Pass::xtr}) {
@@ -79,7 +87,7 @@ private:
                 return false;
             }
         }
-        if (input.plan.needsFreshPlugin()) {
+        if (ownKeys) {
             setAsLoaded();
         }
         return true;
@@ -88,38 +96,37 @@ private:
     bool samePass(std::uint64_t number, const Input &input, Pass pass) {
         const Variables olds = old_.variables();
         const Variables news = new_.variables();
-        runBoth(input, pass, false);
+        const bool oldGood = netfloor::compare::run(old_, pass, input, options_.strict, oldTrace_);
+        const bool newGood = netfloor::compare::run(new_, pass, input, options_.strict, newTrace_);
         events_ += oldTrace_.events();
-        if (good_ && oldTrace_ == newTrace_) {
+        if (oldGood && newGood && oldTrace_ == newTrace_) {
             return true;
         }
         old_.setVariables(olds);
         new_.setVariables(news);
-        runBoth(input, pass, true);
-        tell(number, input, pass);
+        show(number, input, pass);
         return false;
     }
 
-    void runBoth(const Input &input, Pass pass, bool keepsTexts) {
-        oldTrace_.start(keepsTexts);
-        newTrace_.start(keepsTexts);
-        const bool oldGood = host_.run(old_, pass, input, oldTrace_);
-        const bool newGood = host_.run(new_, pass, input, newTrace_);
-        good_ = oldGood && newGood;
-    }
-
-    void tell(std::uint64_t number, const Input &input, Pass pass) const {
+    // Runs both once more, with texts.
+    void show(std::uint64_t number, const Input &input, Pass pass) const {
+        Trace olds(true);
+        Trace news(true);
+        const bool oldGood = netfloor::compare::run(old_, pass, input, options_.strict, olds);
+        const bool newGood = netfloor::compare::run(new_, pass, input, options_.strict, news);
         const Plan &plan = input.plan;
-        std::printf("DIFFERENCE in packet %llu, %s pass%s\n%s", static_cast<unsigned long long>(number), nameOf(pass),
-                    good_ ? "" : " (a plug-in crashed, did not end or wrote outside its storage)",
-                    firstDifference(oldTrace_, newTrace_).c_str());
+        std::printf("DIFFERENCE in packet %llu, %s pass%s%s\n%s", static_cast<unsigned long long>(number),
+                    passNames[static_cast<std::size_t>(pass)], oldGood ? "" : ", old FAILED",
+                    newGood ? "" : ", new FAILED", Trace::firstDifference(olds, news).c_str());
         std::printf("packet (%s): %s\n", input.origin, test::hexText(input.packet).c_str());
-        std::printf("host: capacities %u %u %u %u %u, refused growth %u, odd owners %d, key status %d, byte area %u,\n"
-                    "      cursor %u, missing bits %u, outer bits %u, flags 0x%x, layer %u, source mask 0x%x\n",
-                    plan.blockCapacity, plan.limitCapacity, plan.layerCapacity, plan.rangeCapacity,
-                    plan.layerInfoCapacity, plan.refusedGrowth, plan.oddOwners, plan.keyStatus, plan.byteAreaSize,
-                    plan.cursor, plan.missingBits, plan.outerBits, plan.flags, plan.layerIndex, plan.sourceMask);
-        std::printf("again: the same captures, --seed %llu --first %llu --packets 1%s\n",
+        std::printf(
+            "host: capacities of blocks %u, limits %u, layers %u, ranges %u, layer infos %u; refused growth %u; "
+            "odd owners %d; key status %d; byte area %u; cursor %u; bits missing %u, outside %u; flags 0x%x; "
+            "layer index %u; source mask 0x%x\n",
+            plan.blockCapacity, plan.limitCapacity, plan.layerCapacity, plan.rangeCapacity, plan.layerInfoCapacity,
+            plan.refusedGrowth, plan.oddOwners, plan.keyStatus, plan.byteAreaSize, plan.cursor, plan.missingBits,
+            plan.outerBits, plan.flags, plan.layerIndex, plan.sourceMask);
+        std::printf("again: --seed %llu --first %llu --packets 1%s, and the same captures\n",
                     static_cast<unsigned long long>(options_.seed), static_cast<unsigned long long>(number),
                     options_.strict ? " --strict" : "");
     }
@@ -127,9 +134,7 @@ private:
     const Options &options_;
     const Plugin old_, new_;
     const Inputs inputs_;
-    Host host_;
     Trace oldTrace_, newTrace_;
-    bool good_ = true;
     std::uint64_t events_ = 0;
 };
 
@@ -138,7 +143,6 @@ private:
 
 int main(int argumentCount, char **arguments) {
     netfloor::compare::Options options;
-    options.captures = {NETFLOOR_CAPTURES};
     CLI::App app("Compares two builds of the plug-in, call by call");
     app.add_option("OLD", options.oldPath, "the plug-in as it was")->required();
     app.add_option("NEW", options.newPath, "the plug-in as it is")->required();

@@ -1,12 +1,8 @@
 // SPDX-License-Identifier: MIT
-#include "exports.h"
-
 #include <algorithm>
 #include <cstring>
-#include <type_traits>
 
-#include "random.h"
-#include "trace.h"
+#include "plugin.h"
 
 namespace netfloor::compare {
 namespace {
@@ -16,137 +12,104 @@ const Row *rows(const void *table) {
     return static_cast<const Row *>(table);
 }
 
-void tellText(Trace &trace, const char *label, const char *text) {
-    trace.text(label, text == nullptr ? "(null)" : text, SIZE_MAX);
-}
-
-void tellSlots(Trace &trace, const void *table) {
-    const auto *const slots = rows<std::remove_extent_t<decltype(ProtocolIdentity::slots)>>(table);
-    for (std::size_t i = 0; i < std::size(ProtocolIdentity{}.slots); ++i) {
+void traceIdentity(Trace &trace, const void *table) {
+    const auto *const slot = rows<std::remove_extent_t<decltype(ProtocolIdentity::slots)>>(table);
+    for (std::size_t i = 0; i < std::extent_v<decltype(ProtocolIdentity::slots)>; ++i) {
         const bool isNumber = (i >= 16 && i <= 18) || i >= 21;
-        isNumber ? trace.number("slot", slots[i].number) : tellText(trace, "slot", slots[i].text);
+        isNumber ? trace.number("slot", slot[i].number) : trace.text("slot", slot[i].text);
     }
 }
 
-void tellFields(Trace &trace, const void *table) {
+void traceFields(Trace &trace, const void *table) {
     const auto *row = rows<FieldDescriptor>(table);
     for (; row->flags != NETFLOOR_NO_FIELD; ++row) {
+        trace.event("field");
         FieldDescriptor numbers = *row;
         numbers.name = numbers.shortName = nullptr;
-        trace.event("field");
-        trace.words("row", &numbers, sizeof numbers / 4);
-        tellText(trace, "name", row->name);
-        tellText(trace, "shortName", row->shortName);
+        trace.words("word", &numbers, sizeof numbers);
+        trace.text("name", row->name);
+        trace.text("shortName", row->shortName);
     }
     FieldTableEnd end{};
     std::memcpy(&end, row, sizeof end);
-    tellText(trace, "marker", end.marker);
+    trace.text("marker", end.marker);
     end.marker = nullptr;
-    trace.words("end", &end, sizeof end / 4);
+    trace.words("end", &end, sizeof end);
 }
 
-void tellTexts(Trace &trace, const void *table) {
+void traceTexts(Trace &trace, const void *table) {
     const auto *text = rows<const char *>(table);
     do {
-        tellText(trace, "text", *text);
+        trace.text("text", *text);
     } while (std::strcmp(*text++, NETFLOOR_LAST_TEXT) != 0);
 }
 
-// The numbers, of which only the rows know how many there are, after the rows themselves.
-void tellValues(Trace &trace, const Plugin &plugin, const void *table) {
+// With the numbers of the pool, of which the rows alone tell how many there are.
+void traceValues(Trace &trace, const void *table, const void *pool) {
     std::uint32_t numbers = 0;
-    const auto *const first = rows<ValueMapRow>(table);
-    const auto *row = first;
+    const auto *row = rows<ValueMapRow>(table);
     for (; row->kind != 0; ++row) {
+        trace.words("value", row, sizeof *row);
         numbers = std::max(numbers, row->poolIndex + (row->kind == NETFLOOR_VALUE_RANGE ? 2 : 1));
     }
-    trace.words("value", first, static_cast<std::size_t>(row + 1 - first) * sizeof *row / 4);
-    const void *pool = nullptr;
-    plugin.getTable(NETFLOOR_TABLE_POOL, &pool);
-    trace.words("pool", pool, numbers);
+    trace.words("end", row, sizeof *row);
+    trace.words("pool", pool, numbers * sizeof(std::int32_t));
 }
 
-void tellLayouts(Trace &trace, const void *table) {
-    const auto *const octets = rows<std::uint8_t>(table);
-    std::size_t end = 0;
+void traceLayouts(Trace &trace, const void *table) {
+    const auto *const first = rows<std::uint8_t>(table);
     std::uint16_t length = 0;
+    const std::uint8_t *at = first;
     do {
-        std::memcpy(&length, octets + end, sizeof length);
-        end += sizeof length + length;
+        std::memcpy(&length, at, sizeof length);
+        at += sizeof length + length;
     } while (length != 0);
-    trace.octets("layouts", octets, end);
+    trace.octets("layouts", first, static_cast<std::size_t>(at - first));
 }
 
-void tellProbe(Trace &trace, const void *table, std::size_t skipped) {
-    std::uint32_t size = 0;
-    std::memcpy(&size, rows<std::uint8_t>(table) - skipped + 4, sizeof size);
-    trace.octets("probe", table, size - skipped);
-}
-
-void tellTable(Trace &trace, const Plugin &plugin, std::int32_t index, const void *table) {
-    switch (index) {
-    case NETFLOOR_TABLE_VERSION: return tellText(trace, "version", rows<char>(table));
-    case NETFLOOR_TABLE_IDENTITY: return tellSlots(trace, table);
-    case NETFLOOR_TABLE_FIELDS: return tellFields(trace, table);
-    case NETFLOOR_TABLE_SAMPLE: return tellProbe(trace, table, 16);
-    case NETFLOOR_TABLE_VALUES: return tellValues(trace, plugin, table);
-    case NETFLOOR_TABLE_TEXTS: return tellTexts(trace, table);
-    case NETFLOOR_TABLE_LAYOUTS: return tellLayouts(trace, table);
-    default: return;
-    }
-}
-
-void tellPointer(Trace &trace, std::int32_t index, const void *table) {
-    switch (index) {
-    case NETFLOOR_TABLE_VERSION: return tellText(trace, "version", rows<char>(table));
-    case NETFLOOR_TABLE_IDENTITY:
-        trace.words("head", table, 4);
-        return tellSlots(trace, rows<ProtocolIdentity>(table)->slots);
-    case NETFLOOR_TABLE_FIELDS:
-    case NETFLOOR_TABLE_SAMPLE: return tellProbe(trace, table, 0);
-    default: return;
-    }
-}
-
-void tellTimes(Trace &trace, const Plugin &plugin) {
-    Random random(1);
-    DecodeState state{};
-    for (int i = 0; i < 2000; ++i) {
-        state.fieldRecord.value = i % 2 == 0 ? random.below(0x100000000) : static_cast<std::uint32_t>(i) * 43200;
-        char text[64] = "at ";
-        trace.event("date_conv");
-        trace.number("same", plugin.dateConv(text, nullptr, &state) == text);
-        trace.octets("time", text, sizeof text);
-    }
-}
-
-Trace exportsOf(const Plugin &plugin) {
-    Trace trace;
-    trace.start(true);
-    for (std::int32_t index = -2; index < 20; ++index) {
-        const void *table = &trace;
-        trace.event("vx_DLLGetPtr");
-        trace.number("index", index);
-        trace.number("result", plugin.getPtr(index, &table));
-        trace.number("found", table != nullptr);
-        tellPointer(trace, index, table);
-        table = &trace;
-        trace.event("vx_DLLGetTable");
-        trace.number("index", index);
-        trace.number("result", plugin.getTable(index, &table));
-        trace.number("found", table != nullptr);
-        tellTable(trace, plugin, index, table);
-    }
-    tellTimes(trace, plugin);
-    return trace;
+// A probe tells its own size.
+void traceProbe(Trace &trace, const void *probe) {
+    trace.octets("probe", probe, rows<std::uint32_t>(probe)[1]);
 }
 
 } // namespace
 
-std::string exportDifferences(const Plugin &before, const Plugin &after) {
-    const Trace old = exportsOf(before);
-    const Trace now = exportsOf(after);
-    return old == now ? "" : firstDifference(old, now);
+void traceExports(const Plugin &plugin, Trace &trace) {
+    const void *pointers[20] = {};
+    const void *tables[20] = {};
+    for (std::int32_t index = -1; index < 19; ++index) {
+        trace.event("tables");
+        trace.number("index", index);
+        trace.number("result of Ptr", plugin.getPtr(index, &pointers[std::max(index, 0)]));
+        trace.number("result of Table", plugin.getTable(index, &tables[std::max(index, 0)]));
+        trace.number("pointer", pointers[std::max(index, 0)] != nullptr);
+        trace.number("table", tables[std::max(index, 0)] != nullptr);
+    }
+    for (std::int32_t index = NETFLOOR_TABLE_VERSION; index <= NETFLOOR_TABLE_LAYOUTS; ++index) {
+        const bool hasPointer = index != 3 && index <= NETFLOOR_TABLE_SAMPLE;
+        if ((index != 3 && tables[index] == nullptr) || (hasPointer && pointers[index] == nullptr)) {
+            return; // one is missing, which is told above
+        }
+    }
+    trace.text("version", rows<char>(pointers[NETFLOOR_TABLE_VERSION]));
+    trace.text("version", rows<char>(tables[NETFLOOR_TABLE_VERSION]));
+    trace.words("head", pointers[NETFLOOR_TABLE_IDENTITY], sizeof(ProtocolIdentity::head));
+    traceIdentity(trace, rows<ProtocolIdentity>(pointers[NETFLOOR_TABLE_IDENTITY])->slots);
+    traceIdentity(trace, tables[NETFLOOR_TABLE_IDENTITY]);
+    traceProbe(trace, pointers[NETFLOOR_TABLE_FIELDS]);
+    traceProbe(trace, pointers[NETFLOOR_TABLE_SAMPLE]);
+    traceProbe(trace, rows<std::uint32_t>(tables[NETFLOOR_TABLE_SAMPLE]) - 4);
+    traceFields(trace, tables[NETFLOOR_TABLE_FIELDS]);
+    traceTexts(trace, tables[NETFLOOR_TABLE_TEXTS]);
+    traceLayouts(trace, tables[NETFLOOR_TABLE_LAYOUTS]);
+    traceValues(trace, tables[NETFLOOR_TABLE_VALUES], tables[NETFLOOR_TABLE_POOL]);
+    DecodeState state{};
+    for (std::uint32_t i = 0; i < 4000; ++i) {
+        state.fieldRecord.value = i % 2 == 0 ? i * 43200 : i * 2654435761u;
+        char text[64] = "at ";
+        trace.number("date_conv", plugin.dateConv(text, nullptr, &state) == text);
+        trace.octets("time", text, sizeof text);
+    }
 }
 
 } // namespace netfloor::compare

@@ -9,36 +9,32 @@
 #include <vector>
 
 #include <netfloor/descriptors.h>
+#include <netfloor/host.h>
+
+#include "trace.h"
 
 namespace netfloor::compare {
 
 // What the variables of a plug-in held at a moment.
 using Variables = std::vector<std::vector<std::uint8_t>>;
 
-class Plugin {
-public:
-    // Throws std::runtime_error.
+struct Plugin {
+    // It stays loaded. Throws std::runtime_error.
     explicit Plugin(const std::string &path);
 
-    // The modes of the boundary are the indices.
-    std::array<NetfloorPreDecode, 3> passes{};
-    NetfloorExtract extract = nullptr;
-    NetfloorDateConv dateConv = nullptr;
-    NetfloorGetTable getPtr = nullptr;
-    NetfloorGetTable getTable = nullptr;
+    void *handle;
+    std::array<NetfloorPreDecode, 3> passes; // by the modes of the boundary
+    NetfloorExtract extract;
+    NetfloorDateConv dateConv;
+    NetfloorGetTable getPtr, getTable;
+    std::vector<std::span<std::uint8_t>> writable; // where its variables are
+    Variables asLoaded;
 
     [[nodiscard]] Variables variables() const;
     void setVariables(const Variables &values) const;
-
-    // As if it had been loaded just now.
-    void setAsLoaded() const { setVariables(asLoaded_); }
-
-    [[nodiscard]] const void *handle() const { return handle_; }
-
-private:
-    void *handle_ = nullptr; // never unloaded: both plug-ins live as long as the program
-    std::vector<std::span<std::uint8_t>> writable_;
-    Variables asLoaded_;
 };
+
+// All that the exports tell without a packet: the tables of both, and the formatter.
+void traceExports(const Plugin &plugin, Trace &trace);
 
 } // namespace netfloor::compare

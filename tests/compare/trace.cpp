@@ -2,97 +2,95 @@
 #include "trace.h"
 
 #include <algorithm>
-#include <map>
+#include <cstring>
+#include <iterator>
+
+#include "support/packets.h"
 
 namespace netfloor::compare {
 namespace {
 
-// Events in front of the difference that are shown, and octets of each row of a long value.
-constexpr std::size_t shownEvents = 6;
-constexpr std::size_t rowOctets = 32;
+constexpr std::size_t shownEvents = 6; // before the difference
+constexpr std::size_t shownLines = 16;
 
-// Events are told by what was read: other labels of an event that is no different say nothing.
-bool tells(const std::string &label) {
-    return label == "event" || label == "display" || label == "fieldId" || label == "cursor" || label == "bitsLeft";
-}
-
-std::string eventTold(const std::vector<TraceLine> &lines, std::size_t event) {
-    std::string told = "  " + std::to_string(event) + ':';
-    for (const TraceLine &line : lines) {
-        if (line.event == event && tells(line.label)) {
-            told += ' ' + (line.label == "event" ? line.value : line.label + '=' + line.value);
-        }
+// Words as numbers, longer pieces as octets.
+std::string valueText(const std::uint8_t *from, std::size_t octets) {
+    if (octets > sizeof(std::uint64_t)) {
+        return test::hexText({from, octets});
     }
-    return told + '\n';
-}
-
-using Values = std::map<std::string, std::string>;
-
-Values valuesOf(const std::vector<TraceLine> &lines, std::size_t event) {
-    Values values;
-    for (const TraceLine &line : lines) {
-        if (line.event == event) {
-            values[line.label] = line.value;
-        }
-    }
-    return values;
-}
-
-std::string valueIn(const Values &values, const std::string &label) {
-    const auto found = values.find(label);
-    return found == values.end() ? "nothing" : found->second;
+    std::uint64_t value = 0;
+    std::memcpy(&value, from, octets);
+    char hexadecimal[32];
+    std::snprintf(hexadecimal, sizeof hexadecimal, " (0x%llx)", static_cast<unsigned long long>(value));
+    return std::to_string(value) + hexadecimal;
 }
 
 } // namespace
 
-void Trace::octets(const char *label, const void *from, std::size_t count) {
-    append(&count, sizeof count);
-    append(from, count);
-    if (!keepsTexts_) {
-        return;
-    }
-    const auto *const octets = static_cast<const std::uint8_t *>(from);
-    for (std::size_t row = 0; row < count; row += rowOctets) {
-        std::string text;
-        for (std::size_t i = row; i < std::min(count, row + rowOctets); ++i) {
-            char digits[4];
-            std::snprintf(digits, sizeof digits, "%02x ", octets[i]);
-            text += digits;
-        }
-        line(std::string(label) + "+" + std::to_string(row), text);
+void Trace::clear() {
+    octets_.clear();
+    lines_.clear();
+    events_ = 0;
+}
+
+void Trace::event(const char *name) {
+    ++events_;
+    text("event", name);
+}
+
+void Trace::words(const char *label, const void *from, std::size_t octets, std::size_t wordOctets) {
+    const auto *const first = static_cast<const std::uint8_t *>(from);
+    octets_.insert(octets_.end(), first, first + octets);
+    for (std::size_t at = 0; keepsTexts_ && at < octets; at += wordOctets) {
+        const std::string index = octets > wordOctets ? '[' + std::to_string(at / wordOctets) + ']' : "";
+        lines_.push_back({events_, label + index, valueText(first + at, std::min(wordOctets, octets - at))});
     }
 }
 
-std::string firstDifference(const Trace &before, const Trace &after) {
-    const auto &olds = before.lines();
-    const auto &news = after.lines();
-    const auto [inOld, inNew] = std::mismatch(olds.begin(), olds.end(), news.begin(), news.end());
-    if (inOld == olds.end() && inNew == news.end()) {
-        std::string told = "none; the last events of both are:\n";
-        for (std::size_t i = before.events() - std::min(before.events(), shownEvents); i < before.events(); ++i) {
-            told += eventTold(olds, i);
+void Trace::text(const char *label, const char *from, std::size_t most) {
+    const std::size_t length = strnlen(from, most);
+    octets_.insert(octets_.end(), from, from + length);
+    octets_.push_back(0);
+    if (keepsTexts_) {
+        lines_.push_back({events_, label, std::string(from, length)});
+    }
+}
+
+std::vector<Trace::Line> Trace::linesOf(std::size_t event) const {
+    std::vector<Line> lines;
+    std::ranges::copy_if(lines_, std::back_inserter(lines), [&](const Line &line) { return line.event == event; });
+    return lines;
+}
+
+std::string Trace::eventText(std::size_t event) const {
+    std::string text = "  " + std::to_string(event);
+    for (const Line &line : linesOf(event)) {
+        const bool tells = line.label == "event" || line.label == "cursor" || line.label == "fieldId" ||
+                           line.label == "display" || line.label == "result";
+        text += tells ? "  " + line.label + ' ' + line.value : "";
+    }
+    return text + '\n';
+}
+
+std::string Trace::firstDifference(const Trace &old, const Trace &now) {
+    const auto [inOld, inNew] = std::ranges::mismatch(old.lines_, now.lines_);
+    const std::size_t event = std::min(inOld == old.lines_.end() ? old.events_ : inOld->event,
+                                       inNew == now.lines_.end() ? now.events_ : inNew->event);
+    std::string text = "events before it, which are the same:\n";
+    for (std::size_t i = event - std::min(event, shownEvents); i < event; ++i) {
+        text += old.eventText(i);
+    }
+    text += "old:\n" + old.eventText(event) + "new:\n" + now.eventText(event) + "what differs in it first:\n";
+    const auto olds = old.linesOf(event);
+    const auto news = now.linesOf(event);
+    std::size_t shown = 0;
+    // Where one has other lines from here on, what follows is no longer side by side.
+    for (std::size_t i = 0; i < std::min(olds.size(), news.size()) && olds[i].label == news[i].label; ++i) {
+        if (olds[i] != news[i] && ++shown <= shownLines) {
+            text += "  " + olds[i].label + ": old " + olds[i].value + ", new " + news[i].value + '\n';
         }
-        return told;
     }
-    const std::size_t event = std::min(inOld == olds.end() ? before.events() : inOld->event,
-                                       inNew == news.end() ? after.events() : inNew->event);
-    std::string told = "events before, which are the same:\n";
-    for (std::size_t i = event < shownEvents ? 0 : event - shownEvents; i < event; ++i) {
-        told += eventTold(olds, i);
-    }
-    told += "old:\n" + eventTold(olds, event) + "new:\n" + eventTold(news, event) + "what differs in it:\n";
-    const Values oldValues = valuesOf(olds, event);
-    const Values newValues = valuesOf(news, event);
-    Values all = oldValues;
-    all.insert(newValues.begin(), newValues.end());
-    for (const auto &[label, value] : all) {
-        const std::string was = valueIn(oldValues, label);
-        const std::string is = valueIn(newValues, label);
-        if (was != is) {
-            told += "  " + label + ": old " + was + ", new " + is + '\n';
-        }
-    }
-    return told;
+    return text;
 }
 
 } // namespace netfloor::compare

@@ -1,97 +1,53 @@
 // SPDX-License-Identifier: MIT
 // What a host saw during a run, as octets: two runs are the same if their traces are. A trace that keeps
-// texts says in addition which octets are what.
+// texts says in addition what each of them is.
 #pragma once
 
+#include <concepts>
 #include <cstdint>
-#include <cstring>
 #include <string>
-#include <type_traits>
 #include <vector>
 
 namespace netfloor::compare {
 
-struct TraceLine {
-    std::size_t event; // number of the event, from 0
-    std::string label;
-    std::string value;
-
-    bool operator==(const TraceLine &) const = default;
-};
-
 class Trace {
 public:
-    void start(bool keepsTexts) {
-        octets_.clear();
-        lines_.clear();
-        events_ = 0;
-        keepsTexts_ = keepsTexts;
-    }
+    explicit Trace(bool keepsTexts = false) : keepsTexts_(keepsTexts) {}
 
-    // A call of the host, or a result.
-    void event(const char *name) {
-        ++events_;
-        append(name, std::strlen(name) + 1);
-        if (keepsTexts_) {
-            line("event", name);
-        }
-    }
+    void clear();
 
-    template <class Number>
-    void number(const char *label, Number value) {
-        static_assert(std::is_integral_v<Number>);
-        append(&value, sizeof value);
-        if (keepsTexts_) {
-            const auto word = static_cast<std::int64_t>(value);
-            char hexadecimal[24];
-            std::snprintf(hexadecimal, sizeof hexadecimal, " (0x%llx)", static_cast<unsigned long long>(word));
-            line(label, std::to_string(word) + hexadecimal);
-        }
-    }
+    // A call of the host, or a result; what follows belongs to it.
+    void event(const char *name);
 
-    // `count` words, of which each has a line of its own.
-    void words(const char *label, const void *from, std::size_t count) {
-        append(from, count * sizeof(std::uint32_t));
-        for (std::size_t i = 0; keepsTexts_ && i < count; ++i) {
-            std::uint32_t word = 0;
-            std::memcpy(&word, static_cast<const char *>(from) + i * sizeof word, sizeof word);
-            line(std::string(label) + "[" + std::to_string(i) + "]", std::to_string(word));
-        }
-    }
+    void number(const char *label, std::integral auto value) { words(label, &value, sizeof value, sizeof value); }
 
-    void octets(const char *label, const void *from, std::size_t count);
+    // Words, of which each has a text of its own.
+    void words(const char *label, const void *from, std::size_t octets, std::size_t wordOctets = 4);
+    void octets(const char *label, const void *from, std::size_t count) { words(label, from, count, 32); }
 
-    // A zero-terminated text in a buffer of `size` octets.
-    void text(const char *label, const char *from, std::size_t size) {
-        const std::size_t length = strnlen(from, size);
-        append(&length, sizeof length);
-        append(from, length);
-        if (keepsTexts_) {
-            line(label, '"' + std::string(from, length) + '"' + (length == size ? " without an end" : ""));
-        }
-    }
+    // A zero-terminated text, which may be cut at `most` octets.
+    void text(const char *label, const char *from, std::size_t most = SIZE_MAX);
 
     [[nodiscard]] std::size_t events() const { return events_; }
-    [[nodiscard]] const std::vector<TraceLine> &lines() const { return lines_; }
     [[nodiscard]] bool operator==(const Trace &other) const { return octets_ == other.octets_; }
 
+    // Of two traces that keep texts: the first event that differs, and the events before it.
+    [[nodiscard]] static std::string firstDifference(const Trace &old, const Trace &now);
+
 private:
-    void append(const void *from, std::size_t count) {
-        const auto *const octets = static_cast<const std::uint8_t *>(from);
-        octets_.insert(octets_.end(), octets, octets + count);
-    }
+    struct Line {
+        std::size_t event; // from 1
+        std::string label;
+        std::string value;
+        bool operator==(const Line &) const = default;
+    };
+    [[nodiscard]] std::string eventText(std::size_t event) const;
+    [[nodiscard]] std::vector<Line> linesOf(std::size_t event) const;
 
-    void line(std::string label, std::string value) {
-        lines_.push_back({events_ == 0 ? 0 : events_ - 1, std::move(label), std::move(value)});
-    }
-
+    bool keepsTexts_;
     std::vector<std::uint8_t> octets_;
-    std::vector<TraceLine> lines_;
+    std::vector<Line> lines_;
     std::size_t events_ = 0;
-    bool keepsTexts_ = false;
 };
-
-// What parts two traces that keep texts: the first event that differs, its lines that do, and the events before.
-[[nodiscard]] std::string firstDifference(const Trace &before, const Trace &after);
 
 } // namespace netfloor::compare
