@@ -80,8 +80,8 @@ void traceExports(const Plugin &plugin, Trace &trace) {
     for (std::int32_t index = -1; index < 19; ++index) {
         trace.event("tables");
         trace.number("index", index);
-        trace.number("result of Ptr", plugin.getPtr(index, &pointers[std::max(index, 0)]));
-        trace.number("result of Table", plugin.getTable(index, &tables[std::max(index, 0)]));
+        trace.number("ptrResult", plugin.getPtr(index, &pointers[std::max(index, 0)]));
+        trace.number("tableResult", plugin.getTable(index, &tables[std::max(index, 0)]));
         trace.number("pointer", pointers[std::max(index, 0)] != nullptr);
         trace.number("table", tables[std::max(index, 0)] != nullptr);
     }

@@ -90,51 +90,42 @@ void traceStack(const char *label, const BitStack &stack) {
     const auto top = stack.top - stack.base;
     tracePointer(label, stack.base);
     trace->number("depth", top);
-    trace->number("count", stack.count);
-    trace->number("capacity", stack.capacity);
+    trace->words("count capacity", &stack.count, 2 * sizeof stack.count);
     if (top >= 0 && top < stack.capacity) {
         trace->words(label, stack.base, (static_cast<std::size_t>(top) + 1) * sizeof *stack.base);
     }
 }
 
 void traceFieldRecord(const FieldRecord &record) {
-    trace->number("field record: id", record.fieldId);
+    trace->number("recordId", record.fieldId);
     tracePointer("name", record.fieldName);
     trace->text("name", record.fieldName, textOctets);
     trace->number("value", record.value);
     tracePointer("valueText", record.valueText);
     trace->text("valueText", record.valueText, textOctets);
-    trace->number("rangeCount", record.rangeCount);
-    trace->number("outputRangeCount", record.outputRangeCount);
+    trace->words("rangeCount outputRangeCount", &record.rangeCount, 2 * sizeof record.rangeCount);
     tracePointer("ranges", record.ranges);
-    // rangeCapacity, wideStart, wideBits, untouched1, rawFlag, untouched2
-    trace->words("after ranges", &record.rangeCapacity, sizeof record - offsetof(FieldRecord, rangeCapacity));
+    trace->words("rangeCapacity wideStart wideBits untouched1 untouched1 rawFlag untouched2 untouched2",
+                 &record.rangeCapacity, 8 * sizeof record.rangeCapacity);
     const std::size_t shown = strict ? record.rangeCapacity : std::min(record.rangeCount, record.rangeCapacity);
-    trace->words("range word", record.ranges, shown * sizeof(BitRange));
+    trace->words("range", record.ranges, shown * sizeof(BitRange));
 }
 
 void traceState() {
     tracePointer("data", state->data);
     tracePointer("sourceData", state->sourceData);
-    trace->number("totalBits", state->totalBits);
-    trace->number("cursor", state->cursor);
-    trace->number("reserved1", state->reserved1);
-    trace->number("bitsLeft", state->bitsLeft);
-    trace->number("flags", state->flags);
+    trace->words("totalBits cursor reserved1 bitsLeft flags", &state->totalBits, 5 * sizeof(std::uint32_t));
     traceStack("blockStarts", state->blockStarts);
     traceStack("limits", state->limits);
     trace->number("condition", state->condition);
-    trace->number("advance", state->advance);
-    trace->number("reserved2", state->reserved2);
+    trace->words("advance reserved2", &state->advance, 2 * sizeof(std::uint32_t));
     tracePointer("blockName", state->blockName);
     trace->text("blockName", state->blockName, nameOctets);
     trace->words("scratch", state->scratch, sizeof state->scratch);
     traceFieldRecord(state->fieldRecord);
     tracePointer("layerFrames", state->layerFrames);
-    trace->number("layerHandedOff", state->layerHandedOff);
-    trace->number("layerIndex", state->layerIndex);
-    trace->number("layerCapacity", state->layerCapacity);
-    trace->words("frame word", state->layerFrames,
+    trace->words("layerHandedOff layerIndex layerCapacity", &state->layerHandedOff, 3 * sizeof(std::uint32_t));
+    trace->words("frame", state->layerFrames,
                  std::min(state->layerIndex + std::size_t{1}, std::size_t{state->layerCapacity}) * sizeof(LayerFrame));
 }
 
@@ -142,22 +133,19 @@ void traceContext() {
     if (context == nullptr) {
         trace->number("left", keyContext->bitsLeft);
         tracePointer("keyRecord", keyContext->keyRecord);
-        trace->number("byteAreaOffset", keyContext->byteAreaOffset);
-        trace->number("byteAreaSize", keyContext->byteAreaSize);
+        trace->words("byteAreaOffset byteAreaSize", &keyContext->byteAreaOffset, 4, sizeof keyContext->byteAreaSize);
         trace->octets("keyRecord", keyContext->keyRecord, keyRecordOctets);
         return;
     }
     trace->number("left", context->bitsLeft);
     trace->number("layerNumber", context->layerNumber);
-    trace->number("decoderId", context->decoderId);
-    trace->number("verdict", context->verdict);
+    trace->words("decoderId verdict", &context->decoderId, 2 * sizeof context->decoderId);
     tracePointer("fieldRecords", context->fieldRecords);
     trace->number("fieldRecordCount", context->fieldRecordCount);
-    trace->octets("decoded field", context->fieldRecords + context->fieldRecordCount * decodedFieldOctets, 8);
+    trace->octets("decoded", context->fieldRecords + context->fieldRecordCount * decodedFieldOctets, 8);
     tracePointer("layerInfo", context->layerInfo);
-    trace->number("layerInfoCount", context->layerInfoCount);
-    trace->number("layerInfoCapacity", context->layerInfoCapacity);
-    trace->words("layer info word", context->layerInfo,
+    trace->words("layerInfoCount layerInfoCapacity", &context->layerInfoCount, 2 * sizeof context->layerInfoCount);
+    trace->words("info", context->layerInfo,
                  (std::min(context->layerInfoCount, context->layerInfoCapacity) + std::size_t{1}) *
                      sizeof(LayerInfoRecord));
 }
@@ -170,8 +158,8 @@ void event(const char *name) {
     traceState();
     traceContext();
     const bool changed = !std::ranges::equal(working, input->packet);
-    trace->number("working copy changed", changed);
-    trace->octets("working copy", working.data(), changed ? working.size() : 0);
+    trace->number("copyChanged", changed);
+    trace->octets("copy", working.data(), changed ? working.size() : 0);
 }
 
 void event(const char *name, const void *argument) {
@@ -378,7 +366,7 @@ bool run(const Plugin &thePlugin, Pass thePass, const Input &theInput, bool isSt
     }
     alarm(0);
     const bool overrun = arena.overrun();
-    trace->number("wrote outside its storage", overrun);
+    trace->number("overrun", overrun);
     trace->octets("storage", arena.used().data(), strict ? arena.used().size() : 0);
     return signal == 0 && !overrun;
 }

@@ -6,7 +6,6 @@
 #include <set>
 
 #include "capture/capture.h"
-#include "generator.h"
 #include "link_layer.h"
 #include "support/corpus.h"
 

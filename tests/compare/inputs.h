@@ -10,6 +10,9 @@
 
 namespace netfloor::compare {
 
+// A packet that follows the grammar, with lengths that are mostly right.
+[[nodiscard]] test::Octets generatedPacket(Random &random);
+
 class Inputs {
 public:
     // Captures in all of these folders, and packets that hold every field.

@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <cstring>
 #include <iterator>
+#include <sstream>
 
 #include "support/packets.h"
 
@@ -41,9 +42,15 @@ void Trace::event(const char *name) {
 void Trace::words(const char *label, const void *from, std::size_t octets, std::size_t wordOctets) {
     const auto *const first = static_cast<const std::uint8_t *>(from);
     octets_.insert(octets_.end(), first, first + octets);
-    for (std::size_t at = 0; keepsTexts_ && at < octets; at += wordOctets) {
-        const std::string index = octets > wordOctets ? '[' + std::to_string(at / wordOctets) + ']' : "";
-        lines_.push_back({events_, label + index, valueText(first + at, std::min(wordOctets, octets - at))});
+    if (!keepsTexts_) {
+        return;
+    }
+    std::istringstream names(label);
+    std::string name = label; // the last one stands for the words without a name
+    for (std::size_t at = 0; at < octets; at += wordOctets) {
+        const bool named = static_cast<bool>(names >> name);
+        const std::string index = named ? "" : '[' + std::to_string(at / wordOctets) + ']';
+        lines_.push_back({events_, name + index, valueText(first + at, std::min(wordOctets, octets - at))});
     }
 }
 

@@ -21,7 +21,7 @@ public:
 
     void number(const char *label, std::integral auto value) { words(label, &value, sizeof value, sizeof value); }
 
-    // Words, of which each has a text of its own.
+    // Words, of which each has a text of its own. `label` may name each of them, with blanks between the names.
     void words(const char *label, const void *from, std::size_t octets, std::size_t wordOctets = 4);
     void octets(const char *label, const void *from, std::size_t count) { words(label, from, count, 32); }
 
