@@ -48,10 +48,11 @@ void change(Octets &packet, const Octets &other, Random &random) {
         packet.resize(at);
         packet.insert(packet.end(), other.begin() + random.below(other.size() + 1), other.end());
         break;
-    default: { // some octets twice, or out
+    default: { // some octets out, or twice
         const auto from = packet.begin() + static_cast<std::ptrdiff_t>(at);
-        const Octets piece(from, from + random.below(std::min<std::size_t>(packet.size() - at, 40) + 1));
-        packet.insert(from, piece.begin(), piece.end());
+        const auto to = from + random.below(std::min<std::size_t>(packet.size() - at, 40) + 1);
+        const Octets piece(from, to);
+        random.oneIn(2) ? packet.erase(from, to) : packet.insert(from, piece.begin(), piece.end());
         break;
     }
     }
@@ -97,15 +98,13 @@ Plan drawnPlan(Random &random, Octets &packet) {
 
 Inputs::Inputs(const std::vector<std::string> &folders, std::uint64_t seed)
     : seed_(seed), packets_(test::packetsOfAllFields()) {
+    variedPackets_ = packets_.size();
     for (const std::string &folder : folders) {
-        std::set<std::filesystem::path> files;
-        for (const auto &file : std::filesystem::directory_iterator(folder)) {
-            if (file.path().extension() != ".md") {
-                files.insert(file.path());
+        const std::filesystem::directory_iterator listed(folder);
+        for (const auto &file : std::set<std::filesystem::path>(begin(listed), end(listed))) {
+            if (file.extension() != ".md") {
+                readCapture(file, packets_);
             }
-        }
-        for (const auto &file : files) {
-            readCapture(file, packets_);
         }
     }
     for (std::uint32_t packet = 0; packet < packets_.size(); ++packet) {
@@ -132,7 +131,7 @@ Input Inputs::input(std::uint64_t number) const {
         const Octets &packet = packets_[cut.packet];
         return {{packet.begin(), packet.begin() + cut.octets}, {}, "beginning"};
     }
-    Random random(seed_ ^ (number + 1) * 0x9e3779b97f4a7c15);
+    Random random(Random(seed_).next() ^ Random(number).next());
     Input input;
     input.packet = drawnPacket(random, input.origin);
     input.plan = drawnPlan(random, input.packet);
@@ -143,7 +142,8 @@ Octets Inputs::drawnPacket(Random &random, const char *&origin) const {
     const bool generated = random.oneIn(2);
     origin = generated ? "generated" : "changed";
     const auto captured = [&]() -> const Octets & {
-        return packets_[random.below(random.oneIn(3) ? 70 : packets_.size())]; // many are alike but the first ones
+        // The first ones are of many kinds; of the others many are alike.
+        return packets_[random.below(random.oneIn(3) ? variedPackets_ : packets_.size())];
     };
     Octets packet = generated ? generatedPacket(random) : captured();
     if (packet.size() > 400 && !random.oneIn(8)) {

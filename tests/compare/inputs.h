@@ -21,8 +21,6 @@ public:
     // Even numbers go through all packets of the captures and then through all their beginnings; odd ones are drawn.
     [[nodiscard]] Input input(std::uint64_t number) const;
 
-    [[nodiscard]] std::size_t packets() const { return packets_.size(); }
-
 private:
     struct Beginning {
         std::uint32_t packet;
@@ -32,6 +30,7 @@ private:
 
     std::uint64_t seed_;
     std::vector<test::Octets> packets_;
+    std::size_t variedPackets_ = 0; // those that hold every field stand in front
     std::vector<Beginning> beginnings_;
 };
 
