@@ -2,7 +2,7 @@
 #include "plugin.h"
 
 #include <algorithm>
-#include <cstring>
+#include <filesystem>
 #include <stdexcept>
 
 #include <dlfcn.h>
@@ -53,7 +53,9 @@ int findWritable(dl_phdr_info *object, std::size_t, void *argument) {
 
 } // namespace
 
-Plugin::Plugin(const std::string &path) : handle(dlopen(path.c_str(), RTLD_NOW | RTLD_LOCAL)) {
+// A name without a folder would be looked for among the libraries of the system.
+Plugin::Plugin(const std::string &path)
+    : handle(dlopen(std::filesystem::absolute(path).c_str(), RTLD_NOW | RTLD_LOCAL)) {
     check(handle != nullptr);
     resolve(handle, "vex_PreDecodeTO", passes[NETFLOOR_MODE_TO]);
     resolve(handle, "vex_PreDecodeMD", passes[NETFLOOR_MODE_MD]);
