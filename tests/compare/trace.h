@@ -1,0 +1,53 @@
+// SPDX-License-Identifier: MIT
+// What a host saw during a run, as octets: two runs are the same if their traces are. A trace that keeps
+// texts says in addition what each of them is.
+#pragma once
+
+#include <concepts>
+#include <cstdint>
+#include <string>
+#include <vector>
+
+namespace netfloor::compare {
+
+class Trace {
+public:
+    explicit Trace(bool keepsTexts = false) : keepsTexts_(keepsTexts) {}
+
+    void clear();
+
+    // A call of the host, or a result; what follows belongs to it.
+    void event(const char *name);
+
+    void number(const char *label, std::integral auto value) { words(label, &value, sizeof value, sizeof value); }
+
+    // Words, of which each has a text of its own. `label` may name each of them, with blanks between the names.
+    void words(const char *label, const void *from, std::size_t octets, std::size_t wordOctets = 4);
+    void octets(const char *label, const void *from, std::size_t count) { words(label, from, count, 32); }
+
+    // A zero-terminated text, which may be cut at `most` octets.
+    void text(const char *label, const char *from, std::size_t most = SIZE_MAX);
+
+    [[nodiscard]] std::size_t events() const { return events_; }
+    [[nodiscard]] bool operator==(const Trace &other) const { return octets_ == other.octets_; }
+
+    // Of two traces that keep texts: the first event that differs, and the events before it.
+    [[nodiscard]] static std::string firstDifference(const Trace &old, const Trace &now);
+
+private:
+    struct Line {
+        std::size_t event; // from 1
+        std::string label;
+        std::string value;
+        bool operator==(const Line &) const = default;
+    };
+    [[nodiscard]] std::string eventText(std::size_t event) const;
+    [[nodiscard]] std::vector<Line> linesOf(std::size_t event) const;
+
+    bool keepsTexts_;
+    std::vector<std::uint8_t> octets_;
+    std::vector<Line> lines_;
+    std::size_t events_ = 0;
+};
+
+} // namespace netfloor::compare
