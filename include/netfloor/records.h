@@ -81,7 +81,7 @@ typedef struct LayerInfoRecord {
 /* Bits of `flags` in DecodeState. Any of them makes the MV pass set its verdict. */
 enum {
     NETFLOOR_FLAG_EXPECTATION = 0x2,            /* a fixed value, a bound or a count was not met */
-    NETFLOOR_FLAG_LIMIT_TOO_LONG = 0x8,         /* a length reaches behind the bits left (MV) */
+    NETFLOOR_FLAG_LIMIT_TOO_LONG = 0x8,         /* a length reaches past the bits left (MV) */
     NETFLOOR_FLAG_BITS_LEFT_OVER = 0x10,        /* bits that no field covers inside a length (MV) */
     NETFLOOR_FLAG_NO_LAYER_FRAMES = 0x10000000, /* `layerFrames` could not grow */
     NETFLOOR_FLAG_NO_STACK = 0x20000000,        /* `blockStarts` or `limits` could not grow */

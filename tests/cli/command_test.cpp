@@ -194,7 +194,7 @@ TEST_F(Command, endsWithACodeAndASentence) {
 }
 
 // What every packet of a kind leaves by design is told apart from damage, and only damage makes the exit code.
-TEST_F(Command, tellsMarksByDesignFromDamage) {
+TEST_F(Command, tellsFlagsByDesignFromDamage) {
     const Octets tcpHead = hex("0050 9c40 00000001 00000000");
     const Octets sctpHead = hex("0b59 0b59 00000000 00000000");
     const Octets init = sctpHead + hex("01 00 0014 00000001 00010000 000a 000a 00000001");
@@ -214,9 +214,9 @@ TEST_F(Command, tellsMarksByDesignFromDamage) {
         {ipv4({.protocol = 47, .payload = hex("0000 0800 45*20")}), 0, "good     0x2 every GRE payload", 0},
         {ipv4({.protocol = 132, .payload = init}), 0, "good     0x8 an SCTP INIT", 0},
         {ipv4({.protocol = 17, .payload = hex("0001 0002 00")}), 0,
-         "unread   0x10 bits left over inside a length: 1 octet behind 'UDP Destination Port' at octet 23", 0},
+         "unread   0x10 bits left over inside a length: 1 octet after 'UDP Destination Port' at octet 23", 0},
         {ipv4({.protocol = 6, .payload = tcpHead + hex("f002 0100 0000 0000")}), 0, "DAMAGED  0x2 every TCP header", 1},
-        {ipv4({.protocol = 132, .payload = longInit}), 0, "DAMAGED  0x8 length reaches behind the bits left", 1},
+        {ipv4({.protocol = 132, .payload = longInit}), 0, "DAMAGED  0x8 length reaches past the bits left", 1},
         {ipv4({.protocol = 132, .payload = sctpHead + hex("09 00 000c 0003 0008 00000005")}), 0,
          "good     0x8 a list of SCTP error causes", 0},
         {ipv4({.protocol = 132, .payload = sctpHead + hex("06 00 000c 0005 0008 00000005")}), 0,
@@ -227,9 +227,9 @@ TEST_F(Command, tellsMarksByDesignFromDamage) {
          1},
         // The octets of the identification are read from the last one on, which is no gap in front of them.
         {ipv6({.nextHeader = 44, .payload = hex("3a 00 0001 00000007  87*9")}), 0,
-         "8 octets behind 'ICMP Message Type' at octet 48", 0},
+         "8 octets after 'ICMP Message Type' at octet 48", 0},
         {ipv4({.protocol = 1, .payload = hex("08 01 0000 0001 0001")}), 0,
-         "DAMAGED  0x2 expectation not met behind 'ICMP Message Type' at octet 20", 1},
+         "DAMAGED  0x2 expectation not met after 'ICMP Message Type' at octet 20", 1},
         // The capture, not the sender, has cut the first.
         {ipv4({.protocol = 132, .payload = longInit}), 60, "cut      0x8", 0},
         {shortened(udpPacket, 11), 0, "unread", 0},

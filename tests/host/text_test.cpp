@@ -111,7 +111,7 @@ TEST(Text, NamesFlags) {
     using Names = std::vector<std::string>;
     EXPECT_EQ(flagNames(0), Names());
     EXPECT_EQ(flagNames(0x2 | 0x10), (Names{"expectation not met", "bits left over inside a length"}));
-    EXPECT_EQ(flagNames(0x80000008), (Names{"length reaches behind the bits left", "flag 0x80000000"}));
+    EXPECT_EQ(flagNames(0x80000008), (Names{"length reaches past the bits left", "flag 0x80000000"}));
 }
 
 } // namespace
