@@ -177,6 +177,12 @@ TEST_F(Command, endsWithACodeAndASentence) {
         {"netfloor --plugin $T/none.so $T/five.pcap", 5, {}, {"none.so"}, {}},
         {"netfloor --plugin $T/foreign.txt $T/five.pcap", 5, {}, {"foreign.txt"}, {}},
         {"netfloor $T/five.pcap > /dev/full", 6, {}, {"No space left"}, {}},
+        // Nobody foresaw a current folder that is gone.
+        {"ln -s $P $T/link.so; mkdir $T/gone; cd $T/gone; rmdir $T/gone; netfloor --plugin ../link.so $T/five.pcap",
+         7,
+         {},
+         {"a fault of netfloor itself", "Please report it"},
+         {}},
         // The reader of a long output goes away.
         {"for i in 1 2 3 4 5 6; do netfloor detail $C/udp-tcp-rawip.pcap; done | head -n 1; exit ${PIPESTATUS[0]}",
          0,
@@ -192,6 +198,23 @@ TEST_F(Command, endsWithACodeAndASentence) {
          1},
     });
 }
+
+#if !defined(__SANITIZE_ADDRESS__) // which takes more addresses than the limit gives
+TEST_F(Command, tellsWhenMemoryRunsOut) {
+    const Octets large = udpPacket + Octets(std::size_t{15} << 20U);
+    writeFile("large.pcapng", pcapngSection() + pcapngInterface(228, {}) + pcapngPacket(0, 0, large));
+    check({
+        {"netfloor $T/large.pcapng", 0, {"10.0.0.1"}, {}, {}},
+        // The libraries alone take more or less by the system: the limit goes up until the command starts.
+        {"for kib in {8000..200000..4000}; do (ulimit -v $kib; netfloor $T/large.pcapng) >$T/out 2>$T/err; code=$?; "
+         "case $code in 5 | 127) ;; *) break ;; esac; done; cat $T/err >&2; exit $code",
+         8,
+         {},
+         {"memory ran out"},
+         {}},
+    });
+}
+#endif
 
 // What every packet of a kind leaves by design is told apart from damage, and only damage makes the exit code.
 TEST_F(Command, tellsFlagsByDesignFromDamage) {
