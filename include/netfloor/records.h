@@ -148,7 +148,8 @@ typedef struct XtrContext {
     uint8_t *keyRecord;       /* in: this packet's record, filled by the offsets of the key table */
     uint16_t byteAreaOffset;  /* in, out: octets from `keyRecord` to the next free place for a value
                                  stored as octets */
-    uint16_t byteAreaSize;    /* in: room in octets for one such value; an address needs 17 */
+    uint16_t byteAreaSize;    /* in: the most octets that one such value may need; an address needs
+                                 17. It does not limit all values together, see XTR_netfloor */
     DecodeState *decodeState; /* in: the packet */
 } XtrContext;
 
