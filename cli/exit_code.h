@@ -15,6 +15,8 @@ enum class ExitCode : std::uint8_t {
     cutCapture = 4,     // the capture ends in the middle of a packet; all whole packets were decoded
     noPlugin = 5,       // the plug-in is missing or no plug-in
     noOutput = 6,       // the output cannot be written
+    fault = 7,          // a fault of the command itself: an exception that nobody foresaw
+    noMemory = 8,       // memory ran out
 };
 
 // What was asked for makes no sense. what() is a sentence for the user.

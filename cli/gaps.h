@@ -10,12 +10,12 @@
 namespace netfloor::cli {
 
 struct Gap {
-    std::size_t nextField = 0; // index of the field behind it, or the number of fields
+    std::size_t nextField = 0; // index of the field after it, or the number of fields
     std::uint32_t firstBit = 0;
     std::uint32_t lastBit = 0;
 
-    // The field in front of it, or null.
-    [[nodiscard]] const FieldReport *behind(const Report &detail) const {
+    // The field before it, or null.
+    [[nodiscard]] const FieldReport *fieldBefore(const Report &detail) const {
         return nextField == 0 ? nullptr : &detail.fields[nextField - 1];
     }
 };

@@ -3,6 +3,9 @@
 #include <csignal>
 #include <exception>
 #include <iostream>
+#include <new>
+#include <string>
+#include <string_view>
 #include <variant>
 
 #include "capture/capture.h"
@@ -21,8 +24,8 @@ int number(ExitCode code) {
     return static_cast<int>(code);
 }
 
-int fail(ExitCode code, const std::exception &error) {
-    std::cerr << "netfloor: " << error.what() << '\n';
+int fail(ExitCode code, std::string_view sentence) {
+    std::cerr << "netfloor: " << sentence << '\n';
     return number(code);
 }
 
@@ -43,13 +46,18 @@ int runCommand(int argumentCount, char **arguments) {
     } catch (const OutputClosed &) {
         return number(ExitCode::good);
     } catch (const UsageError &error) {
-        return fail(ExitCode::usage, error);
+        return fail(ExitCode::usage, error.what());
     } catch (const CaptureError &error) {
-        return fail(ExitCode::noCapture, error);
+        return fail(ExitCode::noCapture, error.what());
     } catch (const PluginError &error) {
-        return fail(ExitCode::noPlugin, error);
+        return fail(ExitCode::noPlugin, error.what());
+    } catch (const OutputError &error) {
+        return fail(ExitCode::noOutput, error.what());
+    } catch (const std::bad_alloc &) {
+        return fail(ExitCode::noMemory, "memory ran out. A limit (ulimit -v) may be too low.");
     } catch (const std::exception &error) {
-        return fail(ExitCode::noOutput, error);
+        return fail(ExitCode::fault, std::string("a fault of netfloor itself: ") + error.what() +
+                                         ". Please report it, with the command line and the capture.");
     }
 }
 

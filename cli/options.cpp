@@ -35,6 +35,8 @@ Exit codes:
   4  the capture is cut or damaged: the whole packets in front were decoded
   5  the plug-in is missing or no plug-in
   6  the output cannot be written
+  7  a fault of netfloor itself
+  8  memory ran out
 
 Examples:
   netfloor capture.pcap                          what is in it

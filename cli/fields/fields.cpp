@@ -7,6 +7,7 @@
 #include <optional>
 
 #include "exit_code.h"
+#include "netfloor-host/field_knowledge.h"
 #include "output.h"
 #include "plugin_path.h"
 
@@ -73,6 +74,16 @@ Choice choose(const Fields &all, const std::string &wanted) {
                          "'netfloor fields' lists them.");
     }
     return {fields, best == Fit::part && fields.size() > 1};
+}
+
+Fields listFields(const FieldTables &tables) {
+    const FieldKnowledge knowledge(tables.fields());
+    Fields fields;
+    for (const FieldDescription &field : tables.fields()) {
+        const std::string_view section = knowledge.section(field.id);
+        fields.push_back({&field, section.empty() ? "Other fields" : section});
+    }
+    return fields;
 }
 
 } // namespace

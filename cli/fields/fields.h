@@ -22,8 +22,6 @@ struct ListedField {
 
 using Fields = std::vector<ListedField>;
 
-[[nodiscard]] Fields listFields(const FieldTables &tables);
-
 // The forms of the output.
 [[nodiscard]] std::string listText(const Fields &fields);
 [[nodiscard]] std::string detailsText(Fields fields); // those that differ in nothing but id, section and key as one

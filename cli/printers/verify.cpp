@@ -5,39 +5,41 @@
 #include <cstdio>
 #include <string_view>
 
-#include "marks.h"
+#include "findings.h"
+#include "netfloor-host/field_knowledge.h"
 #include "printers/printer.h"
 
 namespace netfloor::cli {
 
 namespace {
 
-// What a packet is found to be. The verdict of the pass tells the first from all others.
-enum class Finding : std::uint8_t {
+// The verdict on a packet. The verdict of the pass tells the first from all others.
+enum class PacketVerdict : std::uint8_t {
     good,
-    byDesign, // marks that say nothing against the packet
+    byDesign, // flags that say nothing against the packet
     unread,   // octets that no field covers
     cut,      // damage in a packet that the capture has cut: it says nothing about the packet on the wire
     damaged,
 };
 
-struct FindingWords {
+struct VerdictWords {
     std::string_view verdict;
     std::string_view total;
     Style style;
 };
 
-constexpr std::array<FindingWords, 5> words = {{
+constexpr std::array<VerdictWords, 5> words = {{
     {"good", "good", Style::good},
-    {"good", "good with marks by design", Style::good},
+    {"good", "good with flags by design", Style::good},
     {"unread", "with octets unread", Style::warning},
-    {"cut", "with marks, but cut by the snap length", Style::warning},
+    {"cut", "with flags, but cut by the snap length", Style::warning},
     {"DAMAGED", "damaged", Style::bad},
 }};
 
 class VerifyPrinter final : public Printer {
 public:
-    using Printer::Printer;
+    VerifyPrinter(const Options &options, Output &out, Host &host)
+        : Printer(options, out, host), knowledge_(FieldTables(host.library()).fields()) {}
 
     void print(const CapturedPacket &packet, const NetworkPart &network, const std::string &time) override {
         printHead(packet, time);
@@ -70,32 +72,33 @@ public:
     }
 
     [[nodiscard]] ExitCode exitCode() const override {
-        return counts_[static_cast<std::size_t>(Finding::damaged)] == 0 ? ExitCode::good : ExitCode::damagedPackets;
+        return counts_[static_cast<std::size_t>(PacketVerdict::damaged)] == 0 ? ExitCode::good
+                                                                              : ExitCode::damagedPackets;
     }
 
 private:
     void printVerdict(const CapturedPacket &packet, std::span<const std::uint8_t> octets) {
         const Report report = host().run(Pass::mv, octets);
-        std::vector<Mark> marks;
+        std::vector<Finding> findings;
         if (report.verdict.fault()) {
-            marks = explainFlags(report.flags, host().run(Pass::md, octets));
+            findings = explainFlags(report.flags, host().run(Pass::md, octets), knowledge_);
         }
-        const Finding finding = findingOf(report, marks, packet.isCut());
-        ++counts_[static_cast<std::size_t>(finding)];
+        const auto verdict = static_cast<std::size_t>(verdictOf(report, findings, packet.isCut()));
+        ++counts_[verdict];
 
-        const FindingWords &found = words[static_cast<std::size_t>(finding)];
-        out().styled(found.style, found.verdict);
-        if (!marks.empty()) {
-            out().blanks(words.back().verdict.size() - found.verdict.size());
+        const VerdictWords &shown = words[verdict];
+        out().styled(shown.style, shown.verdict);
+        if (!findings.empty()) {
+            out().blanks(words.back().verdict.size() - shown.verdict.size());
         }
         if (report.ending == Ending::cutOff) {
             out() << "  the pass was cut off";
         }
-        for (const Mark &mark : marks) {
+        for (const Finding &finding : findings) {
             std::array<char, 16> flag{};
-            std::snprintf(flag.data(), flag.size(), "  0x%x ", mark.flag);
-            out() << flag.data() << mark.text;
-            if (mark.kind == MarkKind::byDesign) {
+            std::snprintf(flag.data(), flag.size(), "  0x%x ", finding.flag);
+            out() << flag.data() << finding.text;
+            if (finding.kind == FindingKind::byDesign) {
                 out().styled(Style::dim, " (by design)");
             }
         }
@@ -104,25 +107,27 @@ private:
         }
     }
 
-    [[nodiscard]] static Finding findingOf(const Report &report, const std::vector<Mark> &marks, bool isCut) {
+    [[nodiscard]] static PacketVerdict verdictOf(const Report &report, const std::vector<Finding> &findings,
+                                                 bool isCut) {
         if (report.ending == Ending::cutOff) {
-            return Finding::damaged;
+            return PacketVerdict::damaged;
         }
         if (!report.verdict.fault()) {
-            return Finding::good;
+            return PacketVerdict::good;
         }
-        MarkKind worst = MarkKind::byDesign;
-        for (const Mark &mark : marks) {
-            worst = std::max(worst, mark.kind);
+        FindingKind worst = FindingKind::byDesign;
+        for (const Finding &finding : findings) {
+            worst = std::max(worst, finding.kind);
         }
         switch (worst) {
-        case MarkKind::byDesign: return Finding::byDesign;
-        case MarkKind::unread: return Finding::unread;
-        case MarkKind::damage: break;
+        case FindingKind::byDesign: return PacketVerdict::byDesign;
+        case FindingKind::unread: return PacketVerdict::unread;
+        case FindingKind::damage: break;
         }
-        return isCut ? Finding::cut : Finding::damaged;
+        return isCut ? PacketVerdict::cut : PacketVerdict::damaged;
     }
 
+    FieldKnowledge knowledge_;
     std::array<std::uint64_t, words.size()> counts_ = {};
 };
 

@@ -4,18 +4,20 @@
 #include <string_view>
 #include <unordered_map>
 
+#include "netfloor-host/field_knowledge.h"
+
 namespace netfloor {
 namespace {
 
-// An address that the plug-in shows as a number, so that its tables do not tell it for one.
-constexpr std::string_view maskName = "Address Mask";
-
 KeyType typeOf(const FieldDescriptor &field) {
+    if (const auto known = knownKeyType(field.name)) {
+        return *known;
+    }
     const bool isListedAddress = (field.flags >> 8 & 0xff) != 0;
     switch (field.flags & 0xff) {
     case 1: return KeyType::number8;
     case 2: return KeyType::number16;
-    case 3: return isListedAddress || field.name == maskName ? KeyType::ipv4Address : KeyType::number32;
+    case 3: return isListedAddress ? KeyType::ipv4Address : KeyType::number32;
     default: return KeyType::ipv6Address;
     }
 }

@@ -23,7 +23,7 @@ struct NamedFlag {
 
 constexpr NamedFlag namedFlags[] = {
     {NETFLOOR_FLAG_EXPECTATION, "expectation not met"},
-    {NETFLOOR_FLAG_LIMIT_TOO_LONG, "length reaches behind the bits left"},
+    {NETFLOOR_FLAG_LIMIT_TOO_LONG, "length reaches past the bits left"},
     {NETFLOOR_FLAG_BITS_LEFT_OVER, "bits left over inside a length"},
     {NETFLOOR_FLAG_NO_LAYER_FRAMES, "no storage for layer frames"},
     {NETFLOOR_FLAG_NO_STACK, "no storage for a stack"},

@@ -50,6 +50,11 @@ uint8_t NETFLOOR_CDECL vex_PreDecodeMV(PreDecodeContext *context);
  * the row's place (its length in bits, its place in octets from the record) and 16 octets in the
  * byte area, each with its two nibbles exchanged.
  *
+ * The room for addresses is the host's to ensure. `byteAreaSize` is compared with each address alone
+ * and never counted down; `byteAreaOffset` grows by 16 with each address and wraps after 65535. One
+ * IPv6 packet can take 65296 octets (4081 addresses, most of them in routing headers). A host is safe
+ * when 65551 octets from `keyRecord` on may be written, and presence octets and values are after these.
+ *
  * Returns 1 at the end of the packet or at a hand-off: then `layerHandedOff` is 1, the blocks are
  * still open, and the host goes on with the owner of the next layer by itself. Returns 0 when cut
  * off: storage ran out, or an address did not fit into `byteAreaSize` (the row's word has its top

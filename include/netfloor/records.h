@@ -81,7 +81,7 @@ typedef struct LayerInfoRecord {
 /* Bits of `flags` in DecodeState. Any of them makes the MV pass set its verdict. */
 enum {
     NETFLOOR_FLAG_EXPECTATION = 0x2,            /* a fixed value, a bound or a count was not met */
-    NETFLOOR_FLAG_LIMIT_TOO_LONG = 0x8,         /* a length reaches behind the bits left (MV) */
+    NETFLOOR_FLAG_LIMIT_TOO_LONG = 0x8,         /* a length reaches past the bits left (MV) */
     NETFLOOR_FLAG_BITS_LEFT_OVER = 0x10,        /* bits that no field covers inside a length (MV) */
     NETFLOOR_FLAG_NO_LAYER_FRAMES = 0x10000000, /* `layerFrames` could not grow */
     NETFLOOR_FLAG_NO_STACK = 0x20000000,        /* `blockStarts` or `limits` could not grow */
@@ -148,7 +148,8 @@ typedef struct XtrContext {
     uint8_t *keyRecord;       /* in: this packet's record, filled by the offsets of the key table */
     uint16_t byteAreaOffset;  /* in, out: octets from `keyRecord` to the next free place for a value
                                  stored as octets */
-    uint16_t byteAreaSize;    /* in: room in octets for one such value; an address needs 17 */
+    uint16_t byteAreaSize;    /* in: the most octets that one such value may need; an address needs
+                                 17. It does not limit all values together, see XTR_netfloor */
     DecodeState *decodeState; /* in: the packet */
 } XtrContext;
 

@@ -44,7 +44,7 @@ const std::string &folder() {
 
 Outcome shell(const std::string &line) {
     const std::string script = folder() + "/script";
-    std::ofstream(script) << "C='" NETFLOOR_CAPTURES "'\nT='" << folder()
+    std::ofstream(script) << "C='" NETFLOOR_CAPTURES "'\nP='" NETFLOOR_PLUGIN "'\nT='" << folder()
                           << "'\nnetfloor() { '" NETFLOOR_COMMAND "' \"$@\"; }\n"
                           << line << '\n';
     const int status = std::system(("bash " + script + " >" + script + ".out 2>" + script + ".err").c_str());

@@ -16,7 +16,8 @@ struct Outcome {
     std::string err;
 };
 
-// A shell line in which `netfloor` is the command, $C the folder of the test captures and $T folder().
+// A shell line in which `netfloor` is the command, $C the folder of the test captures, $P the plug-in and
+// $T folder().
 [[nodiscard]] Outcome shell(const std::string &line);
 
 // A folder of its own for each test program, removed at its end.

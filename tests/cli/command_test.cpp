@@ -177,6 +177,12 @@ TEST_F(Command, endsWithACodeAndASentence) {
         {"netfloor --plugin $T/none.so $T/five.pcap", 5, {}, {"none.so"}, {}},
         {"netfloor --plugin $T/foreign.txt $T/five.pcap", 5, {}, {"foreign.txt"}, {}},
         {"netfloor $T/five.pcap > /dev/full", 6, {}, {"No space left"}, {}},
+        // Nobody foresaw a current folder that is gone.
+        {"ln -s $P $T/link.so; mkdir $T/gone; cd $T/gone; rmdir $T/gone; netfloor --plugin ../link.so $T/five.pcap",
+         7,
+         {},
+         {"a fault of netfloor itself", "Please report it"},
+         {}},
         // The reader of a long output goes away.
         {"for i in 1 2 3 4 5 6; do netfloor detail $C/udp-tcp-rawip.pcap; done | head -n 1; exit ${PIPESTATUS[0]}",
          0,
@@ -193,8 +199,25 @@ TEST_F(Command, endsWithACodeAndASentence) {
     });
 }
 
+#if !defined(__SANITIZE_ADDRESS__) // which takes more addresses than the limit gives
+TEST_F(Command, tellsWhenMemoryRunsOut) {
+    const Octets large = udpPacket + Octets(std::size_t{15} << 20U);
+    writeFile("large.pcapng", pcapngSection() + pcapngInterface(228, {}) + pcapngPacket(0, 0, large));
+    check({
+        {"netfloor $T/large.pcapng", 0, {"10.0.0.1"}, {}, {}},
+        // The libraries alone take more or less by the system: the limit goes up until the command starts.
+        {"for kib in {8000..200000..4000}; do (ulimit -v $kib; netfloor $T/large.pcapng) >$T/out 2>$T/err; code=$?; "
+         "case $code in 5 | 127) ;; *) break ;; esac; done; cat $T/err >&2; exit $code",
+         8,
+         {},
+         {"memory ran out"},
+         {}},
+    });
+}
+#endif
+
 // What every packet of a kind leaves by design is told apart from damage, and only damage makes the exit code.
-TEST_F(Command, tellsMarksByDesignFromDamage) {
+TEST_F(Command, tellsFlagsByDesignFromDamage) {
     const Octets tcpHead = hex("0050 9c40 00000001 00000000");
     const Octets sctpHead = hex("0b59 0b59 00000000 00000000");
     const Octets init = sctpHead + hex("01 00 0014 00000001 00010000 000a 000a 00000001");
@@ -214,9 +237,9 @@ TEST_F(Command, tellsMarksByDesignFromDamage) {
         {ipv4({.protocol = 47, .payload = hex("0000 0800 45*20")}), 0, "good     0x2 every GRE payload", 0},
         {ipv4({.protocol = 132, .payload = init}), 0, "good     0x8 an SCTP INIT", 0},
         {ipv4({.protocol = 17, .payload = hex("0001 0002 00")}), 0,
-         "unread   0x10 bits left over inside a length: 1 octet behind 'UDP Destination Port' at octet 23", 0},
+         "unread   0x10 bits left over inside a length: 1 octet after 'UDP Destination Port' at octet 23", 0},
         {ipv4({.protocol = 6, .payload = tcpHead + hex("f002 0100 0000 0000")}), 0, "DAMAGED  0x2 every TCP header", 1},
-        {ipv4({.protocol = 132, .payload = longInit}), 0, "DAMAGED  0x8 length reaches behind the bits left", 1},
+        {ipv4({.protocol = 132, .payload = longInit}), 0, "DAMAGED  0x8 length reaches past the bits left", 1},
         {ipv4({.protocol = 132, .payload = sctpHead + hex("09 00 000c 0003 0008 00000005")}), 0,
          "good     0x8 a list of SCTP error causes", 0},
         {ipv4({.protocol = 132, .payload = sctpHead + hex("06 00 000c 0005 0008 00000005")}), 0,
@@ -227,9 +250,9 @@ TEST_F(Command, tellsMarksByDesignFromDamage) {
          1},
         // The octets of the identification are read from the last one on, which is no gap in front of them.
         {ipv6({.nextHeader = 44, .payload = hex("3a 00 0001 00000007  87*9")}), 0,
-         "8 octets behind 'ICMP Message Type' at octet 48", 0},
+         "8 octets after 'ICMP Message Type' at octet 48", 0},
         {ipv4({.protocol = 1, .payload = hex("08 01 0000 0001 0001")}), 0,
-         "DAMAGED  0x2 expectation not met behind 'ICMP Message Type' at octet 20", 1},
+         "DAMAGED  0x2 expectation not met after 'ICMP Message Type' at octet 20", 1},
         // The capture, not the sender, has cut the first.
         {ipv4({.protocol = 132, .payload = longInit}), 60, "cut      0x8", 0},
         {shortened(udpPacket, 11), 0, "unread", 0},

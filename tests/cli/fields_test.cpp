@@ -13,7 +13,7 @@
 namespace netfloor::test {
 namespace {
 
-TEST(Fields, ShowWhatAFieldIs) {
+TEST(Fields, showWhatAFieldIs) {
     const struct {
         const char *line;
         const char *out;
@@ -107,7 +107,7 @@ unkown option type, discard packet
     }
 }
 
-TEST(Fields, AreListedInEachForm) {
+TEST(Fields, areListedInEachForm) {
     const Outcome list = shell("netfloor fields");
     EXPECT_EQ(std::ranges::count(list.out, '\n'), 383);
     EXPECT_NE(list.out.find("\n 384        16    41  TCP                    TCP Source Port "), std::string::npos);
@@ -140,7 +140,7 @@ TEST(Fields, AreListedInEachForm) {
     }
 }
 
-TEST(Fields, PageOfReferenceIsCurrent) {
+TEST(Fields, pageOfReferenceIsCurrent) {
     std::ifstream file(NETFLOOR_CAPTURES "/../../docs/fields.md");
     const std::string page((std::istreambuf_iterator<char>(file)), std::istreambuf_iterator<char>());
     EXPECT_TRUE(shell("netfloor fields --markdown").out == page)

@@ -4,6 +4,7 @@
 #include <limits>
 #include <string>
 #include <string_view>
+#include <utility>
 #include <vector>
 
 #include <gtest/gtest.h>
@@ -73,6 +74,45 @@ TEST(KeyRecord, isFilledAsFarAsThePacketGoes) {
         BareRun run(Octets(examplePacket().begin(), examplePacket().begin() + static_cast<std::ptrdiff_t>(cut.octets)));
         EXPECT_EQ(run.enter(Pass::xtr), 1);
         EXPECT_EQ(run.keyText(), all.substr(0, all.find(cut.nextRow))) << cut.octets;
+    }
+}
+
+// The IPv6 packet with the most addresses: all that its length leaves room for are in routing headers.
+Octets packetOfMostAddresses() {
+    constexpr std::size_t mostInOneHeader = 127;
+    constexpr std::size_t mostPayload = 65535;
+    const Octets address = hex("21*16");
+    Octets payload;
+    for (std::size_t room = mostPayload; room >= 8 + address.size(); room = mostPayload - payload.size()) {
+        const std::size_t count = std::min((room - 8) / address.size(), mostInOneHeader);
+        payload = std::move(payload) + hex("2b") + Octets{static_cast<std::uint8_t>(2 * count)} + hex("00*6");
+        for (std::size_t i = 0; i < count; ++i) {
+            payload.insert(payload.end(), address.begin(), address.end());
+        }
+    }
+    return ipv6({.nextHeader = 43, .payload = payload});
+}
+
+// How far one packet writes into the area of a host that sets no end to it.
+TEST(KeyRecord, reachOfTheAddressesOfAPacket) {
+    const Octets packet = packetOfMostAddresses();
+    const struct {
+        std::uint16_t start, end;
+        std::size_t written; // octets from the key record on
+    } cases[] = {
+        {0, 65296, 65296}, {255, 15, 65551}, // the offset wraps after 65535
+    };
+    for (const auto &[start, end, written] : cases) {
+        std::vector<std::uint8_t> record(std::size_t{1} << 17, KeyRoom::poison);
+        BareRun run(packet);
+        run.xtr.keyRecord = record.data();
+        run.xtr.byteAreaOffset = start;
+        run.xtr.byteAreaSize = 17;
+        EXPECT_EQ(run.enter(Pass::xtr), 1);
+        EXPECT_EQ(run.xtr.byteAreaOffset, end);
+        const auto last =
+            std::find_if(record.rbegin(), record.rend(), [](auto octet) { return octet != KeyRoom::poison; });
+        EXPECT_EQ(static_cast<std::size_t>(record.rend() - last), written);
     }
 }
 

@@ -38,7 +38,7 @@ std::vector<std::string> texts(const Report &report) {
 }
 
 // The tree of blocks follows the plug-in's, and two blocks of one name stay two.
-TEST(Host, TellsTheBlocksOfFields) {
+TEST(Host, tellsTheBlocksOfFields) {
     Host host = newHost();
     const Report report = host.run(Pass::md, udpPacket(40001, twelveOctets));
     const auto blockOf = [&](std::string_view name) { return report.field(name)->block; };
@@ -53,7 +53,7 @@ TEST(Host, TellsTheBlocksOfFields) {
     EXPECT_EQ(report.blocks[blockOf("Checksum")].parent, blockOf("UDP Source Port"));
 }
 
-TEST(Host, ListsLayersAndHandOffs) {
+TEST(Host, listsLayersAndHandOffs) {
     Host host = newHost();
     const Octets packet = udpPacket(40001, twelveOctets);
     for (const std::uint32_t capacity : {0U, 1U, 7U}) {
@@ -82,7 +82,7 @@ TEST(Host, ListsLayersAndHandOffs) {
 }
 
 // What a caller of the boundary sees of an XTR stop.
-TEST(Host, LeavesAnXtrStopAlone) {
+TEST(Host, leavesAnXtrStopAlone) {
     Host host = newHost();
     RunOptions options;
     options.followStop = false;
@@ -95,7 +95,7 @@ TEST(Host, LeavesAnXtrStopAlone) {
     EXPECT_GT(report.blockDepth, 2U);
 }
 
-TEST(Owners, AreFoundByKeyAndProtocolThenKeyThenProtocol) {
+TEST(Owners, areFoundByKeyAndProtocolThenKeyThenProtocol) {
     std::string asked;
     const auto named = [&asked](const char *name) {
         return [&asked, name](NextLayer &) {
@@ -126,7 +126,7 @@ TEST(Owners, AreFoundByKeyAndProtocolThenKeyThenProtocol) {
     }
 }
 
-TEST(Owners, SeeTheirPayloadAndMayLeaveBits) {
+TEST(Owners, seeTheirPayloadAndMayLeaveBits) {
     Host host = newHost();
     Octets seen;
     host.owners().add(7000, [&](NextLayer &next) {
@@ -150,7 +150,7 @@ TEST(Owners, SeeTheirPayloadAndMayLeaveBits) {
     }
 }
 
-TEST(Owners, RefuseAndThrow) {
+TEST(Owners, refuseAndThrow) {
     Host host = newHost();
     host.owners().add(7000, [](NextLayer &) { return Handled::refused; });
     host.owners().add(7001, [](NextLayer &) -> Handled { throw std::runtime_error("no such owner"); });
@@ -165,7 +165,7 @@ TEST(Owners, RefuseAndThrow) {
 }
 
 // IPv4 in UDP in IPv4 and so on: an owner leads back into the plug-in, in each pass.
-TEST(Owners, LeadBackIntoThePlugin) {
+TEST(Owners, leadBackIntoThePlugin) {
     Host host = newHost();
     host.owners().add(7000, [](NextLayer &next) {
         if (next.runPlugin()) {
@@ -199,7 +199,7 @@ TEST(Owners, LeadBackIntoThePlugin) {
 }
 
 // The head of a DATA chunk is put in front of the payload by an owner that takes 16 octets first.
-TEST(Owners, TakeTheUserDataOfAnSctpChunk) {
+TEST(Owners, takeTheUserDataOfAnSctpChunk) {
     const struct {
         std::string_view chunk;
         std::uint32_t taken; // octets behind the head
@@ -229,7 +229,7 @@ TEST(Owners, TakeTheUserDataOfAnSctpChunk) {
 }
 
 // The smallest storage grows to what the packet needs, and gives the same reports.
-TEST(Storage, GrowsFromOneElement) {
+TEST(Storage, growsFromOneElement) {
     Host host = newHost();
     const Octets packet = udpPacket(7000, twelveOctets);
     RunOptions small;
@@ -242,7 +242,7 @@ TEST(Storage, GrowsFromOneElement) {
 
 // Every single growth that a packet asks for is refused in turn: the pass is cut off, says why, and no
 // storage is lost.
-TEST(Storage, CutsOffWhenGrowthIsRefused) {
+TEST(Storage, cutsOffWhenGrowthIsRefused) {
     Host host = newHost();
     const Octets packet = udpPacket(7000, twelveOctets);
     for (const Pass pass : allPasses) {
@@ -268,7 +268,7 @@ TEST(Storage, CutsOffWhenGrowthIsRefused) {
     }
 }
 
-TEST(Storage, TakesPreparedStates) {
+TEST(Storage, takesPreparedStates) {
     Host host = newHost();
     const Octets packet = udpPacket(7000, twelveOctets);
     Octets behind = hex("ff") + packet;
@@ -290,7 +290,7 @@ TEST(Storage, TakesPreparedStates) {
     EXPECT_EQ(host.run(Pass::to, packet, prepared).scratch[20], 5U);
 }
 
-TEST(Storage, RefusesOptionsThatContradictThePacket) {
+TEST(Storage, refusesOptionsThatContradictThePacket) {
     Host host = newHost();
     const Octets packet = hex("45");
     RunOptions options;

@@ -52,7 +52,7 @@ protected:
     int files_ = 0;
 };
 
-TEST_F(Refusal, SaysWhatIsWrongWhereAndWhatToDo) {
+TEST_F(Refusal, saysWhatIsWrongWhereAndWhatToDo) {
     std::string otherMachine = contentOfPlugin();
     otherMachine.at(4) = 1; // 32 bits
     std::string cut = contentOfPlugin();
@@ -90,7 +90,7 @@ TEST_F(Refusal, SaysWhatIsWrongWhereAndWhatToDo) {
     }
 }
 
-TEST_F(Refusal, NamesEachExportThatIsMissing) {
+TEST_F(Refusal, namesEachExportThatIsMissing) {
     // A library that is loaded anyway, and is no plug-in.
     const std::filesystem::path stranger =
         std::filesystem::path(NETFLOOR_PLUGIN).parent_path().parent_path() / "host" / "libhd_HostDispatch.so";
@@ -106,7 +106,7 @@ TEST_F(Refusal, NamesEachExportThatIsMissing) {
     }
 }
 
-TEST(PluginLibrary, SharesOneLoadAndCopiesStandAlone) {
+TEST(PluginLibrary, sharesOneLoadAndCopiesStandAlone) {
     const PluginLibrary first = PluginLibrary::open(NETFLOOR_PLUGIN);
     // The same file by a relative path is the same load.
     const PluginLibrary second = PluginLibrary::open(std::filesystem::relative(NETFLOOR_PLUGIN));
@@ -118,14 +118,14 @@ TEST(PluginLibrary, SharesOneLoadAndCopiesStandAlone) {
     EXPECT_EQ(copy.path(), NETFLOOR_PLUGIN);
 }
 
-TEST(PluginLibrary, WritesDates) {
+TEST(PluginLibrary, writesDates) {
     const PluginLibrary library = PluginLibrary::open(NETFLOOR_PLUGIN);
     EXPECT_EQ(library.dateText(0), "1970-01-01 00:00:00");
     EXPECT_EQ(library.dateText(951827696), "2000-02-29 12:34:56");
 }
 
 // Each load asks for its set-up until it is told 1 or more, or is refused for good.
-TEST(PluginLibrary, SetsUpKeysOncePerLoad) {
+TEST(PluginLibrary, setsUpKeysOncePerLoad) {
     const std::vector<std::uint8_t> packet = {0x45};
     const struct {
         KeySetUp setUp;

@@ -21,7 +21,7 @@ Ipv6Octets octetsOf(std::string_view text) {
     return octets;
 }
 
-TEST(Text, ShowsIpv6AddressesAsRfc5952Asks) {
+TEST(Text, showsIpv6AddressesAsRfc5952Asks) {
     const std::pair<std::string_view, std::string_view> cases[] = {
         {"", "::"},
         {"00*15 01", "::1"},
@@ -51,7 +51,7 @@ FieldReport fieldOf(std::uint32_t firstBit, std::uint32_t count, std::uint32_t b
     return field;
 }
 
-TEST(Text, FindsIpv6AddressesByTheirRanges) {
+TEST(Text, findsIpv6AddressesByTheirRanges) {
     Octets packet(20);
     std::iota(packet.begin(), packet.end(), std::uint8_t{0});
     const Ipv6Octets wanted = octetsOf("02030405 06070809 0a0b0c0d 0e0f1011");
@@ -72,7 +72,7 @@ TEST(Text, FindsIpv6AddressesByTheirRanges) {
 }
 
 // What the plug-in shows as groups in its own digit order, and stores with exchanged nibbles.
-TEST(Text, ShowsTheAddressesOfAnIpv6Packet) {
+TEST(Text, showsTheAddressesOfAnIpv6Packet) {
     Host host(PluginLibrary::open(NETFLOOR_PLUGIN));
     const Octets packet = ipv6({.nextHeader = 17, .payload = udp(40000, 40001)});
     const Report fields = host.run(Pass::md, packet);
@@ -98,7 +98,7 @@ TEST(Text, ShowsTheAddressesOfAnIpv6Packet) {
     EXPECT_EQ(cutOff.key("Source IP Address")->number >> 31, 1U);
 }
 
-TEST(Text, ShowsKeyFieldsByTheirTypes) {
+TEST(Text, showsKeyFieldsByTheirTypes) {
     // Stored with the nibbles of each octet exchanged.
     const KeyValue address = {"Source IP Address", 97, KeyType::ipv6Address, 0, hex("0210d08b 00*11 10")};
     EXPECT_EQ(keyText(address), "2001:db8::1");
@@ -107,11 +107,11 @@ TEST(Text, ShowsKeyFieldsByTheirTypes) {
     EXPECT_EQ(keyText({"TSN", 87, KeyType::number32, 0xffffffff, {}}), "4294967295");
 }
 
-TEST(Text, NamesFlags) {
+TEST(Text, namesFlags) {
     using Names = std::vector<std::string>;
     EXPECT_EQ(flagNames(0), Names());
     EXPECT_EQ(flagNames(0x2 | 0x10), (Names{"expectation not met", "bits left over inside a length"}));
-    EXPECT_EQ(flagNames(0x80000008), (Names{"length reaches behind the bits left", "flag 0x80000000"}));
+    EXPECT_EQ(flagNames(0x80000008), (Names{"length reaches past the bits left", "flag 0x80000000"}));
 }
 
 } // namespace

@@ -24,7 +24,7 @@ std::string listOfFields() {
     return list;
 }
 
-TEST(NewOutput, IsOneFileOverTheCatalogue) {
+TEST(NewOutput, isOneFileOverTheCatalogue) {
     const FieldTables published(PluginLibrary::open(NETFLOOR_PLUGIN));
     std::string expected;
     for (const FieldDescription &field : published.fields()) {

@@ -58,7 +58,7 @@ const Tables &tables() {
     return all;
 }
 
-TEST(Exports, GiveATableOrSayThatThereIsNone) {
+TEST(Exports, giveATableOrSayThatThereIsNone) {
     const PluginLibrary &library = sharedHost().library();
     const std::set<std::int32_t> pointers = {1, 2, 4, 5};
     const std::set<std::int32_t> tableNumbers = {1, 2, 4, 5, 6, 7, 8, 9};
@@ -80,7 +80,7 @@ TEST(Exports, GiveATableOrSayThatThereIsNone) {
     EXPECT_EQ(table<char>(5) - pointer(5), 16);
 }
 
-TEST(Exports, TellWhoThePluginIs) {
+TEST(Exports, tellWhoThePluginIs) {
     const void *out = nullptr;
     sharedHost().library().getPtr()(NETFLOOR_TABLE_IDENTITY, &out);
     const auto &identity = *static_cast<const ProtocolIdentity *>(out);
@@ -111,7 +111,7 @@ Octets text(std::string_view characters, const Octets &behind) {
     return Octets(characters.begin(), characters.end()) + behind;
 }
 
-TEST(Exports, GiveSamplesOfTheLayoutOfRecords) {
+TEST(Exports, giveSamplesOfTheLayoutOfRecords) {
     constexpr std::uint32_t a = 0xa5a5a5a5;
     const std::map<std::int32_t, Octets> samples = {
         {4, le32({4, 124, 92, 60, a, a, a, 1, 0xfffd, 0x106, 0xffff, 0x4b4b4b4b}) + hex("0800 0d00 0100 0300") +
@@ -131,7 +131,7 @@ TEST(Exports, GiveSamplesOfTheLayoutOfRecords) {
     }
 }
 
-TEST(FieldTable, HasItsRowsInEveryWord) {
+TEST(FieldTable, hasItsRowsInEveryWord) {
     EXPECT_EQ(tables().fieldCount, 381U);
     EXPECT_STREQ(tables().fields[0].name, "Version");
     EXPECT_STREQ(tables().fields[380].name, "Authentication Data");
@@ -173,7 +173,7 @@ TEST(FieldTable, HasItsRowsInEveryWord) {
 }
 
 // Facts that hold in each row, and in so many of them.
-TEST(FieldTable, HoldsTogether) {
+TEST(FieldTable, holdsTogether) {
     std::set<std::uint32_t> ids;
     std::set<std::uint32_t> marked;
     std::uint32_t keys = 0;
@@ -217,7 +217,7 @@ TEST(FieldTable, HoldsTogether) {
                   {"equal", 356}, {"blank behind", 24}, {"unkown option type, discard packet|discard packet", 1}}));
 }
 
-TEST(ValueTables, HaveTheirNumbers) {
+TEST(ValueTables, haveTheirNumbers) {
     const Tables &all = tables();
     ASSERT_EQ(all.valueCount, 4539U);
     EXPECT_EQ(all.values[4539].poolIndex, 0U);
@@ -269,7 +269,7 @@ TEST(ValueTables, HaveTheirNumbers) {
     EXPECT_EQ(used.size(), 370U);
 }
 
-TEST(TextTable, HoldsEachTextOnceInFirstUse) {
+TEST(TextTable, holdsEachTextOnceInFirstUse) {
     const Tables &all = tables();
     ASSERT_EQ(all.textCount, 824U);
     const std::set<std::string> distinct(all.texts, all.texts + 824);
@@ -345,7 +345,7 @@ Octets layoutRecord(const std::vector<std::pair<int, int>> &pieces, std::pair<in
     return Octets{static_cast<std::uint8_t>(octets.size()), 0} + octets;
 }
 
-TEST(LayoutTable, HasItsRecordsAndTheirUsers) {
+TEST(LayoutTable, hasItsRecordsAndTheirUsers) {
     const Tables &all = tables();
     const std::vector<std::pair<int, int>> octet = {{1, 8}};
     const struct {

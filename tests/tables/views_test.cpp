@@ -222,7 +222,7 @@ const std::set<std::uint32_t> there = {177, 180, 188, 223, 226, 232, 235, 238, 2
                                        348, 349, 357, 358, 362, 363, 381, 398, 441, 444, 447, 448, 452, 453, 457, 458,
                                        461, 462, 468, 469, 474, 475, 542, 556, 576, 583, 587, 597, 600, 716, 719, 724};
 
-TEST(Views, AgreeOnEveryField) {
+TEST(Views, agreeOnEveryField) {
     Comparison all;
     std::set<std::uint32_t> tried;
     for (const Octets &packet : packetsOfAllFields()) {
@@ -270,7 +270,7 @@ TEST(Views, AgreeOnEveryField) {
 }
 
 // Whatever else stands in a packet: octets changed at random, and all that looks like a packet in the captures.
-TEST(Views, AgreeOnAnyPacket) {
+TEST(Views, agreeOnAnyPacket) {
     Comparison all;
     std::minstd_rand random(20260101);
     for (const Octets &packet : packetsOfAllFields()) {
@@ -295,7 +295,7 @@ TEST(Views, AgreeOnAnyPacket) {
     EXPECT_GE(all.reports, 50000U);
 }
 
-TEST(Views, NameValues) {
+TEST(Views, nameValues) {
     const struct {
         std::uint32_t id, value;
         const char *name;
@@ -329,7 +329,7 @@ TEST(Views, NameValues) {
 }
 
 // The key-field table tells neither width nor kind; the host takes both from the field of the same name.
-TEST(Views, TellKeyTypes) {
+TEST(Views, tellKeyTypes) {
     const struct {
         KeyType type;
         std::size_t count; // of names; 58 rows are filled at all

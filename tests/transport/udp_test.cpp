@@ -1,8 +1,7 @@
 // SPDX-License-Identifier: MIT
-// UDP (RFC 768) over IPv4, and the names of the ports.
+// UDP (RFC 768) over IPv4.
 #include <algorithm>
 #include <string>
-#include <tuple>
 #include <vector>
 
 #include <gtest/gtest.h>
@@ -87,73 +86,6 @@ TEST(Udp, lengthFieldDecidesNothing) {
 TEST(Udp, headerLengthCountsForTheNextLayer) {
     const Runs runs = runAll(ipv4({.protocol = 17, .payload = udp(53, 53, hex("61*6")), .headerWords = 3}));
     EXPECT_EQ(handOffLines(runs.md), "hand-off key 53 protocol 17 port 53 at 225 bits 48 octets 14 preceding 20\n");
-}
-
-struct PortNames {
-    std::string md, to; // of the source port; the destination port has to agree
-};
-
-std::string between(const std::string &text, const std::string &front, const std::string &back) {
-    EXPECT_TRUE(text.starts_with(front) && text.ends_with(back) && text.size() >= front.size() + back.size()) << text;
-    return text.substr(front.size(), text.size() - front.size() - back.size());
-}
-
-PortNames portNames(std::uint16_t port) {
-    const Octets packet = ipv4({.protocol = 17, .payload = udp(port, port)});
-    const Report md = sharedHost().run(Pass::md, packet);
-    const Report to = sharedHost().run(Pass::to, packet);
-    const std::string number = " (" + std::to_string(port) + ")";
-    const std::string name = between(md.fields[ipv4Fields].text, "  UDP Source Port=", number);
-    const std::string mnemonic = between(to.displays[ipv4Fields].text, "UDP - ", number);
-    EXPECT_EQ(md.fields[ipv4Fields + 1].text, "  UDP Destination Port=" + name + number);
-    EXPECT_EQ(to.displays[ipv4Fields + 1].text, "UDP - " + mnemonic + number);
-    return {name, mnemonic};
-}
-
-// FNV-1a over a line "port|long text|mnemonic" for each of the 291 named ports in ascending order, from a list
-// written down apart from the plug-in's.
-constexpr std::uint64_t digestOfPortNames = 0xf159903246e6c3c9;
-
-TEST(PortNames, ofAllPorts) {
-    std::size_t named = 0;
-    std::uint64_t hash = 0xcbf29ce484222325;
-    for (unsigned port = 0; port <= 65535; ++port) {
-        const PortNames names = portNames(static_cast<std::uint16_t>(port));
-        if (names.to.empty()) {
-            ASSERT_EQ(names.md, std::to_string(port));
-            continue;
-        }
-        ++named;
-        for (const char letter : std::to_string(port) + '|' + names.md + '|' + names.to + '\n') {
-            hash = (hash ^ static_cast<std::uint8_t>(letter)) * 0x100000001b3;
-        }
-    }
-    EXPECT_EQ(named, 291u);
-    EXPECT_EQ(hash, digestOfPortNames);
-}
-
-TEST(PortNames, ofAFewPorts) {
-    const std::vector<std::tuple<std::uint16_t, std::string, std::string>> sample = {
-        {1, "TCP Port Service Multiplexer", "TCPMUX"},
-        {20, "File Transfer [Default Data]", "FTP-DATA"},
-        {146, "ISO-IP0", "ISO-TP0"},
-        {441, "decvms-sysmgt", "DECVMS-SYSMGt"},
-        {443, "https  MCom", "HTTPS"},
-        {447, "DDM-RFM", "DDM-DFM"},
-        {1812, "RADIUS", "RADIUS"},
-        {1813, "RADIUS Accounting", "RADIUS-ACC"},
-        {2152, "GTP-U", "GTP-U"},
-        {8002, "Torvane BTS O&M", "O&M"},
-        {0, "0", ""},
-        {4, "4", ""},
-        {6, "6", ""},
-        {8003, "8003", ""},
-        {65535, "65535", ""},
-    };
-    for (const auto &[port, md, to] : sample) {
-        EXPECT_EQ(portNames(port).md, md);
-        EXPECT_EQ(portNames(port).to, to);
-    }
 }
 
 } // namespace

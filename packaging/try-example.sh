@@ -1,0 +1,39 @@
+#!/bin/sh
+# SPDX-License-Identifier: MIT
+# Builds the example as a user of netfloor does, and compares what it prints with what stands beside it.
+#
+#   try-example.sh CMAKE EXAMPLE-DIRECTORY installed BUILD-DIRECTORY     against an installation, which was moved
+#   try-example.sh CMAKE EXAMPLE-DIRECTORY sources SOURCE-DIRECTORY      with netfloor as a part of its own build
+set -eu
+cmake=$1
+example=$2
+netfloor=$4
+work=$(mktemp -d)
+trap 'rm -rf "$work"' EXIT
+
+fail() {
+    echo "$1" >&2
+    exit 1
+}
+
+case $3 in
+installed)
+    "$cmake" --install "$netfloor" --prefix "$work/first" >/dev/null
+    mv "$work/first" "$work/prefix"
+    "$cmake" -S "$example" -B "$work/build" -DCMAKE_PREFIX_PATH="$work/prefix" -DCMAKE_BUILD_TYPE=Release >/dev/null
+    ;;
+sources)
+    "$cmake" -S "$example" -B "$work/build" -DNETFLOOR_SOURCE="$netfloor" >/dev/null
+    # What a project has not asked for stays as it was.
+    grep -q '^CMAKE_BUILD_TYPE:STRING=$' "$work/build/CMakeCache.txt" || fail "netfloor chose the build type"
+    [ ! -e "$work/build/compile_commands.json" ] || fail "netfloor wrote compile_commands.json"
+    ;;
+esac
+"$cmake" --build "$work/build" --target decode_packet >/dev/null
+"$work/build/decode_packet" >"$work/output"
+diff "$example/expected.txt" "$work/output"
+
+if [ "$3" = sources ]; then
+    "$cmake" --install "$work/build" --prefix "$work/prefix" >/dev/null
+    [ -z "$(ls "$work/prefix" 2>/dev/null)" ] || fail "netfloor is installed with a project that did not ask for it"
+fi
