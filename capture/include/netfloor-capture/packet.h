@@ -32,12 +32,12 @@ struct CaptureTime {
 struct CapturedPacket {
     std::uint64_t number = 0;   // from 1
     std::uint64_t position = 0; // octet of the capture, unpacked, at which the packet's record begins
-    std::optional<CaptureTime> time;
-    std::uint8_t timeDigits = 0;          // of a second, that the capture has: 6 for microseconds
-    std::uint32_t interfaceNumber = 0;    // within its section; 0 where the format has none
-    int linkType = 0;                     // as files number it, see www.tcpdump.org/linktypes.html
-    std::uint32_t wireOctets = 0;         // what the packet had before the snap length cut it
-    std::span<const std::uint8_t> octets; // valid until the next packet is read
+    std::optional<CaptureTime> time = {};
+    std::uint8_t timeDigits = 0;               // of a second, that the capture has: 6 for microseconds
+    std::uint32_t interfaceNumber = 0;         // within its section; 0 where the format has none
+    int linkType = 0;                          // as files number it, see www.tcpdump.org/linktypes.html
+    std::uint32_t wireOctets = 0;              // what the packet had before the snap length cut it
+    std::span<const std::uint8_t> octets = {}; // valid until the next packet is read
 
     [[nodiscard]] bool isCut() const { return octets.size() < wireOctets; }
 };
