@@ -22,7 +22,7 @@ public:
     explicit PcapReader(OctetStream &stream) : stream_(stream) {
         const auto octets = stream.peek(fileHeaderOctets);
         if (octets.size() < fileHeaderOctets) {
-            throw unusable("it ends after " + std::to_string(octets.size()) + " octets");
+            refuse("it ends after " + std::to_string(octets.size()) + " octets");
         }
         bigEndian_ = !isMagic(NumberView(octets, false).u32(0));
         const NumberView header(octets, bigEndian_);
@@ -30,8 +30,8 @@ public:
         nanosecondsPerUnit_ = magic == magicNanoseconds ? 1 : 1000;
         headOctets_ = magic == magicLongRecords ? 24 : 16;
         if (header.u16(4) < 2) {
-            throw unusable("version " + std::to_string(header.u16(4)) + "." + std::to_string(header.u16(6)) +
-                           " of the format has no known form");
+            refuse("version " + std::to_string(header.u16(4)) + "." + std::to_string(header.u16(6)) +
+                   " of the format has no known form");
         }
         swaps_ = header.u16(4) == 2 && header.u16(6) < 3;
         maySwap_ = header.u16(4) == 2 && header.u16(6) == 3;
@@ -79,9 +79,9 @@ public:
     }
 
 private:
-    [[nodiscard]] CaptureError unusable(const std::string &reason) const {
-        return CaptureError(stream_.file().name() + " has no usable capture header: " + reason +
-                            ". Take the capture again, or name another file.");
+    [[noreturn]] void refuse(const std::string &reason) const {
+        throw CaptureError(stream_.file().name() + " has no usable capture header: " + reason +
+                           ". Take the capture again, or name another file.");
     }
 
     // Some programs write a second or more into the fraction.

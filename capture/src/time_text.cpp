@@ -81,9 +81,8 @@ void TimeText::writeDate(const CaptureTime &time) {
 
 void TimeText::writeFraction(std::uint32_t nanoseconds) {
     std::array<char, 9> digits{};
-    for (auto digit = digits.rbegin(); digit != digits.rend(); ++digit) {
-        *digit = static_cast<char>('0' + nanoseconds % 10);
-        nanoseconds /= 10;
+    for (std::size_t i = digits.size(); i > 0; nanoseconds /= 10) {
+        digits[--i] = static_cast<char>('0' + nanoseconds % 10);
     }
     text_ += '.';
     text_.append(digits.data(), digits_);

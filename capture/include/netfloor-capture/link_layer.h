@@ -34,7 +34,7 @@ public:
     // "ARP", "EtherType 0x1234", "cut inside the VLAN header", ...; empty for IP.
     [[nodiscard]] std::string text() const;
 
-    auto operator<=>(const NotIp &) const = default;
+    auto operator<=>(const NotIp &) const = default; // NOLINT(modernize-use-nullptr): taken for a null
 
 private:
     Kind kind_ = Kind::ip;

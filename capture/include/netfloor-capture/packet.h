@@ -26,7 +26,7 @@ struct CaptureTime {
         return sum;
     }
 
-    auto operator<=>(const CaptureTime &) const = default;
+    auto operator<=>(const CaptureTime &) const = default; // NOLINT(modernize-use-nullptr): taken for a null
 };
 
 struct CapturedPacket {
