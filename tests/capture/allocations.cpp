@@ -3,13 +3,19 @@
 
 #include <cstddef>
 
+#ifdef __SANITIZE_ADDRESS__
+
+std::optional<std::uint64_t> netfloor::test::allocations() {
+    return std::nullopt;
+}
+
+#else
+
 namespace {
 
-thread_local std::uint64_t count = 0;
+thread_local std::uint64_t given = 0;
 
 } // namespace
-
-#ifndef __SANITIZE_ADDRESS__
 
 // The C library lets a program have its own malloc(), which all libraries then use.
 extern "C" {
@@ -19,31 +25,23 @@ void *__libc_calloc(std::size_t count, std::size_t size);
 void *__libc_realloc(void *block, std::size_t size);
 
 void *malloc(std::size_t size) {
-    ++count;
+    ++given;
     return __libc_malloc(size);
 }
 
-void *calloc(std::size_t number, std::size_t size) {
-    ++count;
-    return __libc_calloc(number, size);
+void *calloc(std::size_t count, std::size_t size) {
+    ++given;
+    return __libc_calloc(count, size);
 }
 
 void *realloc(void *block, std::size_t size) {
-    ++count;
+    ++given;
     return __libc_realloc(block, size);
 }
 }
 
-#endif
-
-namespace netfloor::test {
-
-std::optional<std::uint64_t> allocations() {
-#ifdef __SANITIZE_ADDRESS__
-    return std::nullopt;
-#else
-    return count;
-#endif
+std::optional<std::uint64_t> netfloor::test::allocations() {
+    return given;
 }
 
-} // namespace netfloor::test
+#endif
