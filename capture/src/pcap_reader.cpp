@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// pcap files (draft-ietf-opsawg-pcap). They are not left to libpcap because it allows no view into a buffer of its
-// caller, tells no positions, and takes more than one of the loader's milliseconds to be there at all.
+// pcap files (draft-ietf-opsawg-pcap). They are not left to libpcap because it copies each packet and tells no
+// positions, and because a program without a filter then starts without it.
 #include "records.h"
 
 namespace netfloor {
