@@ -1,19 +1,19 @@
 // SPDX-License-Identifier: MIT
 #include "decode.h"
 
-#include <array>
-#include <cstdio>
 #include <cstdlib>
-#include <ctime>
 #include <iostream>
 #include <memory>
+#include <optional>
 #include <string>
 #include <string_view>
 
 #include <unistd.h>
 
-#include "capture/capture.h"
-#include "filter.h"
+#include "netfloor-capture/capture_file.h"
+#include "netfloor-capture/filter.h"
+#include "netfloor-capture/link_layer.h"
+#include "netfloor-capture/time_text.h"
 #include "output.h"
 #include "plugin_path.h"
 #include "printers/printer.h"
@@ -33,65 +33,35 @@ bool wantsColour(Colour colour) {
            (terminal == nullptr || std::string_view(terminal) != "dumb");
 }
 
-// Writes the times of packets: seconds since the first one, or date and time of day.
-class TimeTexts {
-public:
-    TimeTexts(bool utc, int digits) : utc_(utc), digits_(digits) {}
-
-    [[nodiscard]] std::string operator()(const std::optional<CaptureTime> &time) {
-        if (!time) {
-            return "";
+// What a filter left out because it has no meaning there.
+std::string refusedText(const std::string &expression, const PacketFilter &filter) {
+    constexpr std::size_t mostTold = 3;
+    std::string text = "--filter '" + expression + "' leaves out what libpcap cannot filter with it:";
+    std::size_t told = 0;
+    for (const auto &[linkType, refused] : filter.refused()) {
+        if (told++ == mostTold) {
+            return text + " and packets of " + countText(filter.refused().size() - mostTold, "more link type") + ".";
         }
-        if (!first_) {
-            first_ = time;
-        }
-        return utc_ ? dateText(*time) : sinceFirst(*time);
+        text += (told == 1 ? " " : "; ") + countText(refused.packets, "packet") + " of link type " +
+                linkTypeName(linkType) + " (" + refused.reason + ")";
     }
-
-private:
-    [[nodiscard]] std::string fraction(std::uint32_t nanoseconds) const {
-        std::array<char, 16> text{};
-        std::snprintf(text.data(), text.size(), ".%09u", nanoseconds);
-        return {text.data(), static_cast<std::size_t>(digits_) + 1};
-    }
-
-    [[nodiscard]] std::string sinceFirst(const CaptureTime &time) const {
-        constexpr std::int64_t second = 1'000'000'000;
-        const std::int64_t difference = (time.seconds - first_->seconds) * second + time.nanoseconds -
-                                        static_cast<std::int64_t>(first_->nanoseconds);
-        const std::int64_t size = difference < 0 ? -difference : difference;
-        return (difference < 0 ? "-" : "") + std::to_string(size / second) +
-               fraction(static_cast<std::uint32_t>(size % second));
-    }
-
-    [[nodiscard]] std::string dateText(const CaptureTime &time) const {
-        std::tm parts = {};
-        const std::time_t seconds = time.seconds;
-        if (gmtime_r(&seconds, &parts) == nullptr) {
-            return std::to_string(time.seconds) + fraction(time.nanoseconds);
-        }
-        std::array<char, 64> text{};
-        const std::size_t size = std::strftime(text.data(), text.size(), "%Y-%m-%dT%H:%M:%S", &parts);
-        return std::string(text.data(), size) + fraction(time.nanoseconds) + "Z";
-    }
-
-    bool utc_;
-    int digits_;
-    std::optional<CaptureTime> first_;
-};
+    return text + ". Filter on what all link types of the capture have, or leave the filter out.";
+}
 
 class Decoding {
 public:
     explicit Decoding(const Options &options)
         : options_(options),
-          stream_(options.file),
-          capture_(openCapture(stream_)),
-          filter_(options.filter),
+          capture_(options.file),
           host_(PluginLibrary::open(findPlugin(options.plugin))),
-          out_(wantsColour(options.colour), stream_.isLive() || ::isatty(STDOUT_FILENO) == 1),
+          out_(wantsColour(options.colour), capture_.isLive() || ::isatty(STDOUT_FILENO) == 1),
           printer_(makePrinter(options, out_, host_)),
-          times_(options.utc, capture_->timeDigits()),
-          progress_(std::make_unique<ProgressBar>(stream_)) {}
+          times_(options.utc ? TimeForm::utc : TimeForm::sinceFirst),
+          progress_(std::make_unique<ProgressBar>(capture_)) {
+        if (!options.filter.empty()) {
+            filter_.emplace(options.filter);
+        }
+    }
 
     ExitCode run() {
         ExitCode code = ExitCode::good;
@@ -103,8 +73,14 @@ public:
             code = ExitCode::cutCapture;
         }
         progress_.reset(); // what follows stands on a clean line
+        if (filter_ && filter_->refusedAll()) {
+            throw UsageError(refusedText(options_.filter, *filter_));
+        }
         printer_->finish(tally_);
         out_.flush();
+        if (filter_ && !filter_->refused().empty()) {
+            std::cerr << "netfloor: " << refusedText(options_.filter, *filter_) << '\n';
+        }
         if (!damage.empty()) {
             std::cerr << "netfloor: " << damage << '\n';
             return code;
@@ -116,7 +92,7 @@ public:
                                  : "--packet " + std::to_string(*options_.packet) + " does not match the filter.");
         }
         if (read_ == 0 && options_.count != std::uint64_t{0}) {
-            std::cerr << "netfloor: " << stream_.name() << " holds no packets.\n";
+            std::cerr << "netfloor: " << capture_.name() << " holds no packets.\n";
         }
         return printer_->exitCode();
     }
@@ -124,16 +100,16 @@ public:
 private:
     void readPackets() {
         CapturedPacket packet;
-        while ((!options_.count || tally_.packets < *options_.count) && capture_->next(packet)) {
+        while ((!options_.count || tally_.packets < *options_.count) && capture_.next(packet)) {
             read_ = packet.number;
-            const std::string time = times_(packet.time);
+            times_.see(packet);
             if (options_.packet && packet.number < *options_.packet) {
                 continue;
             }
-            if (filter_.passes(packet)) {
+            if (!filter_ || filter_->passes(packet)) {
                 const NetworkPart network = findNetworkPart(packet.linkType, packet.octets);
                 tally_.add(network);
-                printer_->print(packet, network, time);
+                printer_->print(packet, network, times_.text(packet));
                 out_.endPacket();
             }
             if (options_.packet) {
@@ -144,13 +120,12 @@ private:
     }
 
     const Options &options_;
-    OctetStream stream_;
-    std::unique_ptr<CaptureReader> capture_;
-    Filter filter_;
+    CaptureFile capture_;
+    std::optional<PacketFilter> filter_;
     Host host_;
     Output out_;
     std::unique_ptr<Printer> printer_;
-    TimeTexts times_;
+    TimeText times_;
     std::unique_ptr<ProgressBar> progress_;
     Tally tally_;
     std::uint64_t read_ = 0; // packets of the capture

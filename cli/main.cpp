@@ -8,10 +8,10 @@
 #include <string_view>
 #include <variant>
 
-#include "capture/capture.h"
 #include "decode.h"
 #include "exit_code.h"
 #include "fields/fields.h"
+#include "netfloor-capture/errors.h"
 #include "netfloor-host/host.h"
 #include "options.h"
 #include "output.h"
@@ -46,6 +46,8 @@ int runCommand(int argumentCount, char **arguments) {
     } catch (const OutputClosed &) {
         return number(ExitCode::good);
     } catch (const UsageError &error) {
+        return fail(ExitCode::usage, error.what());
+    } catch (const FilterError &error) {
         return fail(ExitCode::usage, error.what());
     } catch (const CaptureError &error) {
         return fail(ExitCode::noCapture, error.what());

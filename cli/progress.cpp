@@ -17,10 +17,10 @@ constexpr auto every = std::chrono::milliseconds(100);
 
 } // namespace
 
-ProgressBar::ProgressBar(const OctetStream &stream)
-    : stream_(stream),
+ProgressBar::ProgressBar(const CaptureFile &capture)
+    : capture_(capture),
       next_(Clock::now() + firstAfter),
-      enabled_(::isatty(STDERR_FILENO) == 1 && ::isatty(STDOUT_FILENO) == 0 && stream.progress().has_value()) {}
+      enabled_(::isatty(STDERR_FILENO) == 1 && ::isatty(STDOUT_FILENO) == 0 && capture.progress().has_value()) {}
 
 ProgressBar::~ProgressBar() {
     if (shown_) {
@@ -34,7 +34,7 @@ void ProgressBar::packetDone(std::uint64_t packets) {
     }
     next_ = Clock::now() + every;
     shown_ = true;
-    const double share = stream_.progress().value_or(0);
+    const double share = capture_.progress().value_or(0);
     const auto filled = static_cast<std::size_t>(share * barColumns);
     const std::string bar = std::string(filled, '#') + std::string(barColumns - std::min(filled, barColumns), '.');
     std::fprintf(stderr, "\r[%s] %3.0f %%  %llu packets", bar.c_str(), share * 100,

@@ -5,14 +5,14 @@
 #include <chrono>
 #include <cstdint>
 
-#include "capture/octet_stream.h"
+#include "netfloor-capture/capture_file.h"
 
 namespace netfloor::cli {
 
 class ProgressBar {
 public:
     // Shows itself only when standard error is a terminal, standard output is none, and the size is known.
-    explicit ProgressBar(const OctetStream &stream);
+    explicit ProgressBar(const CaptureFile &capture);
     ProgressBar(const ProgressBar &) = delete;
     ProgressBar &operator=(const ProgressBar &) = delete;
     ~ProgressBar();
@@ -22,7 +22,7 @@ public:
 private:
     using Clock = std::chrono::steady_clock;
 
-    const OctetStream &stream_;
+    const CaptureFile &capture_;
     Clock::time_point next_;
     bool enabled_;
     bool shown_ = false;

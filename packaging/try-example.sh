@@ -2,12 +2,17 @@
 # SPDX-License-Identifier: MIT
 # Builds the example as a user of netfloor does, and compares what it prints with what stands beside it.
 #
-#   try-example.sh CMAKE EXAMPLE-DIRECTORY installed BUILD-DIRECTORY     against an installation, which was moved
-#   try-example.sh CMAKE EXAMPLE-DIRECTORY sources SOURCE-DIRECTORY      with netfloor as a part of its own build
+#   try-example.sh CMAKE EXAMPLE installed BUILD-DIRECTORY ARGUMENT...     against an installation, which was moved
+#   try-example.sh CMAKE EXAMPLE sources SOURCE-DIRECTORY ARGUMENT...      with netfloor as a part of its own build
+#
+# EXAMPLE is a directory, and its program has the same name. It gets the arguments.
 set -eu
 cmake=$1
 example=$2
+way=$3
 netfloor=$4
+shift 4
+program=$(basename "$example")
 work=$(mktemp -d)
 trap 'rm -rf "$work"' EXIT
 
@@ -16,7 +21,7 @@ fail() {
     exit 1
 }
 
-case $3 in
+case $way in
 installed)
     "$cmake" --install "$netfloor" --prefix "$work/first" >/dev/null
     mv "$work/first" "$work/prefix"
@@ -29,11 +34,11 @@ sources)
     [ ! -e "$work/build/compile_commands.json" ] || fail "netfloor wrote compile_commands.json"
     ;;
 esac
-"$cmake" --build "$work/build" --target decode_packet >/dev/null
-"$work/build/decode_packet" >"$work/output"
+"$cmake" --build "$work/build" --target "$program" >/dev/null
+"$work/build/$program" "$@" >"$work/output"
 diff "$example/expected.txt" "$work/output"
 
-if [ "$3" = sources ]; then
+if [ "$way" = sources ]; then
     "$cmake" --install "$work/build" --prefix "$work/prefix" >/dev/null
     [ -z "$(ls "$work/prefix" 2>/dev/null)" ] || fail "netfloor is installed with a project that did not ask for it"
 fi

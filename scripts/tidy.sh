@@ -14,7 +14,7 @@ shared=$(git ls-files -z --cached --others --exclude-standard -- '*.h' '*.hpp' .
 export shared
 
 # entries/descriptors.cpp is left out: it needs limits of constant evaluation that are spelled for the compiler in use.
-git ls-files --cached --others --exclude-standard -- 'plugin/*.cpp' 'host/*.cpp' 'cli/*.cpp' |
+git ls-files --cached --others --exclude-standard -- 'plugin/*.cpp' 'host/*.cpp' 'capture/*.cpp' 'cli/*.cpp' |
     grep -v '^plugin/entries/descriptors.cpp$' |
     while read -r file; do [ ! -f "$file" ] || echo "$file"; done |
     xargs -P "$(nproc)" -I{} sh -c '

@@ -214,7 +214,7 @@ public:
         if (network.isIp()) {
             printReport(network.octets);
         } else {
-            note(Style::dim, "no IP: " + network.other);
+            note(Style::dim, "no IP: " + network.other.text());
         }
         if (packet.isCut()) {
             note(Style::warning, cutText(packet));

@@ -70,7 +70,7 @@ public:
 
     void print(const CapturedPacket &packet, const NetworkPart &network, const std::string &time) override {
         Report report;
-        std::string note = "no IP: " + network.other;
+        std::string note = network.isIp() ? "" : "no IP: " + network.other.text();
         if (network.isIp()) {
             report = host().run(Pass::xtr, network.octets);
             note = report.ending == Ending::complete ? "" : "the pass was cut off";

@@ -21,9 +21,13 @@ std::string Tally::text() const {
     if (others.empty()) {
         return text;
     }
-    std::vector<std::pair<std::string, std::uint64_t>> byCount(others.begin(), others.end());
-    std::stable_sort(byCount.begin(), byCount.end(),
-                     [](const auto &left, const auto &right) { return left.second > right.second; });
+    std::vector<std::pair<std::string, std::uint64_t>> byCount;
+    for (const auto &[what, count] : others) {
+        byCount.emplace_back(what.text(), count);
+    }
+    std::sort(byCount.begin(), byCount.end(), [](const auto &left, const auto &right) {
+        return left.second != right.second ? left.second > right.second : left.first < right.first;
+    });
     text += ", " + std::to_string(packets - withIp) + " without (";
     for (const auto &[name, count] : byCount) {
         text += (text.back() == '(' ? "" : ", ") + std::to_string(count) + " " + name;
@@ -42,7 +46,7 @@ void Printer::printHead(const CapturedPacket &packet, const std::string &time) {
 }
 
 void Printer::printOther(const NetworkPart &network) const {
-    out_.styled(Style::dim, "no IP: " + network.other);
+    out_.styled(Style::dim, "no IP: " + network.other.text());
 }
 
 void Printer::printTally(const Tally &tally) const {

@@ -7,9 +7,9 @@
 #include <memory>
 #include <string>
 
-#include "capture/capture.h"
 #include "exit_code.h"
-#include "link_layer.h"
+#include "netfloor-capture/link_layer.h"
+#include "netfloor-capture/packet.h"
 #include "netfloor-host/host.h"
 #include "options.h"
 #include "output.h"
@@ -21,7 +21,7 @@ namespace netfloor::cli {
 struct Tally {
     std::uint64_t packets = 0;
     std::uint64_t withIp = 0;
-    std::map<std::string, std::uint64_t> others; // by name
+    std::map<NotIp, std::uint64_t> others;
 
     void add(const NetworkPart &network);
     // "205 packets: 198 with IP, 7 without (4 ARP, 3 LLDP)"

@@ -405,6 +405,9 @@ TEST_F(Command, readsPcapngWithInterfacesOfDifferentTypes) {
     broken[broken.size() - 1] ^= 0x04; // the second length of the last block
     writeFile("broken.pcapng", broken);
     writeFile("noBlock.pcapng", pcapngSection() + hex("00000001 00000004 00000004"));
+    const Octets linkTypes = pcapngSection() + pcapngInterface(147, {}) + pcapngInterface(228, {});
+    writeFile("private.pcapng", linkTypes + pcapngPacket(0, 0, udpPacket));
+    writeFile("mixed.pcapng", linkTypes + pcapngPacket(0, 0, udpPacket) + pcapngPacket(1, 0, udpPacket));
 
     check({
         {"netfloor keys --column 'Source Address' $T/good.pcapng",
@@ -415,6 +418,9 @@ TEST_F(Command, readsPcapngWithInterfacesOfDifferentTypes) {
          {},
          6},
         {"netfloor -f 'udp port 53' $T/good.pcapng", 0, {"    5  "}, {}, {}, 5},
+        // A link type that libpcap does not know costs its own packets, and no others.
+        {"netfloor -f udp $T/mixed.pcapng", 0, {"    2  "}, {"1 packet of link type 147 ("}, {"    1  "}, 1},
+        {"netfloor -f udp $T/private.pcapng", 2, {}, {"1 packet of link type 147", "leave the filter out"}, {}},
         {"netfloor $T/cut.pcapng",
          4,
          {"    3  "},

@@ -16,8 +16,8 @@
 
 #include <gtest/gtest.h>
 
-#include "capture/capture.h"
-#include "link_layer.h"
+#include "netfloor-capture/capture_file.h"
+#include "netfloor-capture/link_layer.h"
 #include "netfloor-host/text.h"
 #include "peers/packet.h"
 #include "peers/pairs.h"
@@ -122,11 +122,10 @@ public:
         SCOPED_TRACE(file);
         const std::vector<std::string> lines = tsharkLines(file);
         told_.clear();
-        cli::OctetStream stream(file);
-        const auto reader = cli::openCapture(stream);
+        CaptureFile capture(file);
         std::size_t packets = 0;
-        for (cli::CapturedPacket captured; reader->next(captured); ++packets) {
-            const cli::NetworkPart network = cli::findNetworkPart(captured.linkType, captured.octets);
+        for (CapturedPacket captured; capture.next(captured); ++packets) {
+            const NetworkPart network = findNetworkPart(captured.linkType, captured.octets);
             if (network.isIp()) {
                 ASSERT_LT(packets, lines.size());
                 SCOPED_TRACE("packet " + std::to_string(captured.number));

@@ -1,16 +1,14 @@
 // SPDX-License-Identifier: MIT
-#include "link_layer.h"
+#include "netfloor-capture/link_layer.h"
 
 #include <algorithm>
 #include <array>
 #include <cstdio>
-#include <optional>
 #include <string_view>
 
-#include <pcap/dlt.h>
-#include <pcap/pcap.h>
+#include "libpcap.h"
 
-namespace netfloor::cli {
+namespace netfloor {
 
 namespace {
 
@@ -54,12 +52,13 @@ constexpr std::array pppNames = {
 };
 
 template <std::size_t count>
-std::string nameOf(const std::array<NumberName, count> &names, std::uint16_t number, const char *kind) {
+NotIp nameOf(const std::array<NumberName, count> &names, std::uint16_t number, NotIp::Kind kind) {
     const auto *const found =
         std::find_if(names.begin(), names.end(), [number](const NumberName &row) { return row.number == number; });
-    if (found != names.end()) {
-        return std::string(found->name);
-    }
+    return found != names.end() ? NotIp(NotIp::Kind::name, found->name) : NotIp(kind, number);
+}
+
+std::string hexText(const char *kind, std::uint32_t number) {
     std::array<char, 32> text{};
     std::snprintf(text.data(), text.size(), "%s 0x%04x", kind, number);
     return text.data();
@@ -85,7 +84,7 @@ public:
         }
         const std::uint16_t type = u16(typeAt);
         skip(headerOctets);
-        return behindEtherType(type);
+        return afterEtherType(type);
     }
 
     // The address family of the capturing system, in its own byte order or, for `networkOrder`, in network order.
@@ -103,7 +102,7 @@ public:
         if (family == 2 || std::find(ipv6Families.begin(), ipv6Families.end(), family) != ipv6Families.end()) {
             return found();
         }
-        return other("address family " + std::to_string(family));
+        return other(NotIp(NotIp::Kind::addressFamily, family));
     }
 
     // RFC 1661 and 1662: address and control field and the first octet of the protocol may be left out.
@@ -121,14 +120,14 @@ public:
         if ((packet_[at_] & 1U) != 0) {
             const std::uint16_t shortProtocol = packet_[at_];
             skip(1);
-            return behindPppProtocol(shortProtocol);
+            return afterPppProtocol(shortProtocol);
         }
         if (!has(2)) {
             return tooShort("PPP");
         }
         const std::uint16_t protocol = u16(0);
         skip(2);
-        return behindPppProtocol(protocol);
+        return afterPppProtocol(protocol);
     }
 
     // One octet of direction in front of PPP; pppd leaves it in the place of the address field.
@@ -151,7 +150,7 @@ public:
 
     NetworkPart raw() { return found(); }
 
-    [[nodiscard]] NetworkPart other(std::string name) const { return {{}, at_, std::move(name)}; }
+    [[nodiscard]] NetworkPart other(NotIp what) const { return {{}, at_, what}; }
 
 private:
     [[nodiscard]] bool has(std::size_t octets) const { return packet_.size() - at_ >= octets; }
@@ -162,12 +161,12 @@ private:
 
     [[nodiscard]] NetworkPart found() const {
         if (at_ == packet_.size()) {
-            return other("no octets behind the link layer");
+            return other(NotIp(NotIp::Kind::name, "no octets after the link layer"));
         }
-        return {packet_.subspan(at_), at_, {}};
+        return {packet_.subspan(at_), at_, NotIp()};
     }
     [[nodiscard]] NetworkPart tooShort(const char *header) const {
-        return other(std::string("cut inside the ") + header + " header");
+        return other(NotIp(NotIp::Kind::cutHeader, header));
     }
 
     NetworkPart etherType() {
@@ -176,10 +175,10 @@ private:
         }
         const std::uint16_t type = u16(0);
         skip(2);
-        return behindEtherType(type);
+        return afterEtherType(type);
     }
 
-    NetworkPart behindEtherType(std::uint16_t type) {
+    NetworkPart afterEtherType(std::uint16_t type) {
         while (type == 0x8100 || type == 0x88a8 || type == 0x9100 || type == 0x9200) { // VLAN tags, 802.1Q and 802.1ad
             if (!has(4)) {
                 return tooShort("VLAN");
@@ -194,66 +193,122 @@ private:
             return pppoeSession();
         }
         if (type < leastEtherType) {
-            return behindLength();
+            return afterLength();
         }
-        return other(nameOf(etherTypeNames, type, "EtherType"));
+        return other(nameOf(etherTypeNames, type, NotIp::Kind::etherType));
     }
 
-    // IEEE 802.3: an LLC header follows, with SNAP (RFC 1042) an EtherType behind it.
-    NetworkPart behindLength() {
+    // IEEE 802.3: an LLC header follows, with SNAP (RFC 1042) an EtherType after it.
+    NetworkPart afterLength() {
         constexpr std::array<std::uint8_t, 6> snap = {0xaa, 0xaa, 0x03, 0x00, 0x00, 0x00};
         if (has(8) && std::equal(snap.begin(), snap.end(), packet_.begin() + static_cast<std::ptrdiff_t>(at_))) {
             skip(6);
             const std::uint16_t type = u16(0);
             skip(2);
             if (type >= leastEtherType) {
-                return behindEtherType(type);
+                return afterEtherType(type);
             }
         }
         if (has(2) && packet_[at_] == 0x42 && packet_[at_ + 1] == 0x42) {
-            return other("spanning tree");
+            return other(NotIp(NotIp::Kind::name, "spanning tree"));
         }
-        return other("802.3 frame");
+        return other(NotIp(NotIp::Kind::name, "802.3 frame"));
     }
 
-    NetworkPart behindPppProtocol(std::uint16_t protocol) {
+    NetworkPart afterPppProtocol(std::uint16_t protocol) {
         if (protocol == pppIpv4 || protocol == pppIpv6) {
             return found();
         }
-        return other(nameOf(pppNames, protocol, "PPP protocol"));
+        return other(nameOf(pppNames, protocol, NotIp::Kind::pppProtocol));
     }
 
     std::span<const std::uint8_t> packet_;
     std::size_t at_ = 0;
 };
 
+// Link types as files number them.
+namespace link_type {
+constexpr int null = 0;
+constexpr int ethernet = 1;
+constexpr int ppp = 9;
+constexpr int rawOfSystems = 12; // written by mistake: the numbers of FreeBSD and OpenBSD themselves
+constexpr int rawOfOpenBsd = 14;
+constexpr int pppSerial = 50;
+constexpr int pppEthernet = 51;
+constexpr int raw = 101;
+constexpr int loop = 108;
+constexpr int linuxCooked = 113;
+constexpr int pppOfPppd = 166;
+constexpr int pppWithDirection = 204;
+constexpr int ipv4 = 228;
+constexpr int ipv6 = 229;
+constexpr int linuxCooked2 = 276;
+} // namespace link_type
+
+constexpr std::array linkTypeNames = {
+    NumberName{link_type::null, "BSD loopback"},
+    NumberName{link_type::ethernet, "Ethernet"},
+    NumberName{link_type::ppp, "PPP"},
+    NumberName{link_type::rawOfSystems, "Raw IP"},
+    NumberName{link_type::rawOfOpenBsd, "Raw IP"},
+    NumberName{link_type::pppSerial, "PPP over serial"},
+    NumberName{link_type::pppEthernet, "PPPoE"},
+    NumberName{link_type::raw, "Raw IP"},
+    NumberName{link_type::loop, "OpenBSD loopback"},
+    NumberName{link_type::linuxCooked, "Linux cooked v1"},
+    NumberName{link_type::pppOfPppd, "PPP for pppd, with direction flag"},
+    NumberName{link_type::pppWithDirection, "PPP with direction"},
+    NumberName{link_type::ipv4, "Raw IPv4"},
+    NumberName{link_type::ipv6, "Raw IPv6"},
+    NumberName{link_type::linuxCooked2, "Linux cooked v2"},
+};
+
 } // namespace
+
+std::string NotIp::text() const {
+    switch (kind_) {
+    case Kind::ip: return {};
+    case Kind::name: return std::string(name_);
+    case Kind::cutHeader: return "cut inside the " + std::string(name_) + " header";
+    case Kind::etherType: return hexText("EtherType", number_);
+    case Kind::pppProtocol: return hexText("PPP protocol", number_);
+    case Kind::addressFamily: return "address family " + std::to_string(number_);
+    case Kind::linkType: return "link type " + linkTypeName(static_cast<int>(number_));
+    }
+    return {};
+}
 
 NetworkPart findNetworkPart(int linkType, std::span<const std::uint8_t> packet) {
     LinkWalk walk(packet);
     switch (linkType) {
-    case DLT_EN10MB: return walk.ethernet();
-    case DLT_LINUX_SLL: return walk.cooked(14, 16);
-    case DLT_LINUX_SLL2: return walk.cooked(0, 20);
-    case DLT_RAW:
-    case 14: // DLT_RAW of OpenBSD
-    case 101:
-    case DLT_IPV4:
-    case DLT_IPV6: return walk.raw();
-    case DLT_NULL: return walk.addressFamily(false);
-    case DLT_LOOP: return walk.addressFamily(true);
-    case DLT_PPP:
-    case DLT_PPP_SERIAL: return walk.ppp();
-    case DLT_PPP_ETHER: return walk.pppoeSession();
-    case DLT_PPP_PPPD: return walk.pppWithDirection(true);
-    case DLT_PPP_WITH_DIR: return walk.pppWithDirection(false);
-    default: return walk.other("link type " + linkTypeName(linkType));
+    case link_type::ethernet: return walk.ethernet();
+    case link_type::linuxCooked: return walk.cooked(14, 16);
+    case link_type::linuxCooked2: return walk.cooked(0, 20);
+    case link_type::raw:
+    case link_type::rawOfSystems:
+    case link_type::rawOfOpenBsd:
+    case link_type::ipv4:
+    case link_type::ipv6: return walk.raw();
+    case link_type::null: return walk.addressFamily(false);
+    case link_type::loop: return walk.addressFamily(true);
+    case link_type::ppp:
+    case link_type::pppSerial: return walk.ppp();
+    case link_type::pppEthernet: return walk.pppoeSession();
+    case link_type::pppOfPppd: return walk.pppWithDirection(true);
+    case link_type::pppWithDirection: return walk.pppWithDirection(false);
+    default: return walk.other(NotIp(NotIp::Kind::linkType, static_cast<std::uint32_t>(linkType)));
     }
 }
 
 std::string linkTypeName(int linkType) {
-    const char *const text = pcap_datalink_val_to_description(linkType);
+    const auto *const found = std::find_if(linkTypeNames.begin(), linkTypeNames.end(),
+                                           [linkType](const NumberName &row) { return row.number == linkType; });
+    if (found != linkTypeNames.end()) {
+        return std::string(found->name);
+    }
+    const Libpcap *const pcap = libpcap();
+    const char *const text = pcap == nullptr ? nullptr : pcap->describe(libpcapLinkType(linkType));
     return text != nullptr ? text : std::to_string(linkType);
 }
 
-} // namespace netfloor::cli
+} // namespace netfloor

@@ -1,12 +1,15 @@
 // SPDX-License-Identifier: MIT
-#include "capture/capture.h"
+#include "netfloor-capture/capture_file.h"
 
-#include <algorithm>
 #include <array>
 #include <string>
 #include <string_view>
+#include <utility>
 
-namespace netfloor::cli {
+#include "octet_stream.h"
+#include "records.h"
+
+namespace netfloor {
 
 namespace {
 
@@ -41,38 +44,59 @@ constexpr std::array packings = {
     Packing{"PK\x03\x04"sv, "zip", "unzip -p"},
 };
 
-} // namespace
-
-std::unique_ptr<CaptureReader> openCapture(OctetStream &stream) {
+// Finds out the format.
+std::unique_ptr<RecordReader> readerOf(OctetStream &stream) {
+    const std::string &name = stream.file().name();
     const auto peeked = stream.peek(8);
     const std::string start(peeked.begin(), peeked.end());
     if (start.empty()) {
-        throw CaptureError(stream.name() + (stream.error().empty() ? " is empty." : ": " + stream.error() + ".") +
+        throw CaptureError(name + (stream.error().empty() ? " is empty." : ": " + stream.error() + ".") +
                            " Take the capture again, or name another file.");
     }
     for (const Magic &magic : magics) {
         if (start.starts_with(magic.octets)) {
-            return magic.format == Format::pcap ? openPcap(stream) : openPcapng(stream);
+            return magic.format == Format::pcap ? readPcap(stream) : readPcapng(stream);
         }
     }
     for (const Packing &packing : packings) {
         if (start.starts_with(packing.octets)) {
-            throw CaptureError(stream.name() + " is packed with " + std::string(packing.name) +
+            throw CaptureError(name + " is packed with " + std::string(packing.name) +
                                ". Unpack it on the way: " + std::string(packing.unpack) + " FILE | netfloor -");
         }
     }
-    throw CaptureError(stream.name() + " is neither a pcap nor a pcapng capture. Other capture formats can be "
-                                       "converted: editcap -F pcapng FILE NEWFILE");
+    throw CaptureError(name + " is neither a pcap nor a pcapng capture. Other capture formats can be "
+                              "converted: editcap -F pcapng FILE NEWFILE");
 }
 
-CaptureDamage damageAt(const OctetStream &stream, std::uint64_t packetNumber, std::uint64_t firstOctet,
-                       const std::string &reason) {
-    return CaptureDamage{
-        stream.name() + ": " + reason + " in packet " + std::to_string(packetNumber) + ", which begins at octet " +
-        std::to_string(firstOctet) + (stream.isPacked() ? " of the unpacked capture" : " of the file") +
-        (packetNumber == 1   ? "; there is no whole packet in front of it."
-         : packetNumber == 2 ? "; the 1 packet in front of it is whole."
-                             : "; the " + std::to_string(packetNumber - 1) + " packets in front of it are whole.")};
+} // namespace
+
+// The reader borrows the stream, which must not move with the capture.
+struct CaptureFile::Parts {
+    explicit Parts(const std::string &path) : stream(path), reader(readerOf(stream)) {}
+
+    OctetStream stream;
+    std::unique_ptr<RecordReader> reader;
+};
+
+CaptureFile::CaptureFile(const std::string &path) : parts_(std::make_unique<Parts>(path)) {}
+CaptureFile::~CaptureFile() = default;
+CaptureFile::CaptureFile(CaptureFile &&) noexcept = default;
+CaptureFile &CaptureFile::operator=(CaptureFile &&) noexcept = default;
+
+bool CaptureFile::next(CapturedPacket &packet) {
+    return parts_->reader->next(packet);
 }
 
-} // namespace netfloor::cli
+const std::string &CaptureFile::name() const {
+    return parts_->stream.file().name();
+}
+
+bool CaptureFile::isLive() const {
+    return parts_->stream.file().isLive();
+}
+
+std::optional<double> CaptureFile::progress() const {
+    return parts_->stream.file().progress();
+}
+
+} // namespace netfloor

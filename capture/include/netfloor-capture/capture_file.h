@@ -1,0 +1,49 @@
+// SPDX-License-Identifier: MIT
+// Reads a capture: pcap or pcapng, packed with gzip or not, from a file or from standard input.
+//
+//     netfloor::CaptureFile capture("traffic.pcap");
+//     netfloor::CapturedPacket packet;
+//     while (capture.next(packet)) {
+//         const netfloor::NetworkPart network = netfloor::findNetworkPart(packet.linkType, packet.octets);
+//     }
+//
+// Memory is bounded whatever the file holds, and nothing is allocated for a packet unless it is the largest so far.
+#pragma once
+
+#include <memory>
+#include <optional>
+#include <string>
+
+#include "netfloor-capture/errors.h"
+#include "netfloor-capture/packet.h"
+
+namespace netfloor {
+
+class CaptureFile {
+public:
+    // "-" is standard input. Throws CaptureError.
+    explicit CaptureFile(const std::string &path);
+    ~CaptureFile();
+    CaptureFile(CaptureFile &&) noexcept;
+    CaptureFile &operator=(CaptureFile &&) noexcept;
+    CaptureFile(const CaptureFile &) = delete;
+    CaptureFile &operator=(const CaptureFile &) = delete;
+
+    // The next packet, or false at the end. Throws CaptureDamage.
+    [[nodiscard]] bool next(CapturedPacket &packet);
+
+    // The path, or "standard input".
+    [[nodiscard]] const std::string &name() const;
+
+    // Whether the packets come from a program as they are made.
+    [[nodiscard]] bool isLive() const;
+
+    // The share of the file that has been read, 0 to 1, or none where its size is not known.
+    [[nodiscard]] std::optional<double> progress() const;
+
+private:
+    struct Parts;
+    std::unique_ptr<Parts> parts_;
+};
+
+} // namespace netfloor

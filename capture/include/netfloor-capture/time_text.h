@@ -1,0 +1,39 @@
+// SPDX-License-Identifier: MIT
+// The times of packets as text: seconds since the first packet, or date and time of day.
+#pragma once
+
+#include <cstdint>
+#include <optional>
+#include <string>
+
+#include "netfloor-capture/packet.h"
+
+namespace netfloor {
+
+enum class TimeForm : std::uint8_t { sinceFirst, utc };
+
+class TimeText {
+public:
+    explicit TimeText(TimeForm form) : form_(form) {}
+
+    // Takes note of each packet in the order of the capture: the first one with a time is where the others count from,
+    // and decides whether all of them get 6 digits or 9.
+    void see(const CapturedPacket &packet);
+
+    // Empty for a packet without a time; valid until the next call.
+    [[nodiscard]] const std::string &text(const CapturedPacket &packet);
+
+private:
+    void writeSinceFirst(const CaptureTime &time);
+    void writeDate(const CaptureTime &time);
+    void writeFraction(std::uint32_t nanoseconds);
+
+    TimeForm form_;
+    std::optional<CaptureTime> first_;
+    unsigned digits_ = 6;
+    std::optional<std::int64_t> dateSecond_; // the second of which date_ is the text
+    std::string date_;
+    std::string text_;
+};
+
+} // namespace netfloor

@@ -1,0 +1,66 @@
+// SPDX-License-Identifier: MIT
+// The octets of a capture, unpacked: looked at in a buffer, and taken from it once they are known.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <cstdlib>
+#include <memory>
+#include <optional>
+#include <span>
+#include <string>
+
+#include "octet_file.h"
+#include "unpacker.h"
+
+namespace netfloor {
+
+class OctetStream {
+public:
+    explicit OctetStream(const std::string &path);
+
+    // The next octets, which stay unread; fewer than `count` at the end. Valid until the next call that reads.
+    [[nodiscard]] std::span<const std::uint8_t> peek(std::size_t count) {
+        if (end_ - begin_ < count) {
+            count = fill(count);
+        }
+        return {buffer_.get() + begin_, count};
+    }
+
+    // Takes octets that have been peeked at. They stay where they are until the next call that reads.
+    void take(std::size_t count) {
+        begin_ += count;
+        position_ += count;
+    }
+
+    // Takes octets without looking; false when the capture ends before.
+    [[nodiscard]] bool skip(std::size_t count);
+
+    [[nodiscard]] std::uint64_t position() const { return position_; } // octets taken
+    // Where the capture ends, as far as it has been read.
+    [[nodiscard]] std::uint64_t endPosition() const { return position_ + (end_ - begin_); }
+
+    // Why the octets ended early, or empty: a packed file that is cut or damaged, a disk that fails.
+    [[nodiscard]] const std::string &error() const;
+
+    [[nodiscard]] const OctetFile &file() const { return file_; }
+    [[nodiscard]] bool isPacked() const { return unpacker_.has_value(); }
+
+private:
+    struct Free {
+        void operator()(std::uint8_t *octets) const { std::free(octets); }
+    };
+
+    [[nodiscard]] std::size_t fill(std::size_t count);
+    void grow(std::size_t least);
+
+    OctetFile file_;
+    std::optional<Unpacker> unpacker_;
+    std::unique_ptr<std::uint8_t, Free> buffer_;
+    std::size_t size_ = 0;  // of buffer_
+    std::size_t begin_ = 0; // of what is unread in buffer_
+    std::size_t end_ = 0;
+    std::uint64_t position_ = 0;
+};
+
+} // namespace netfloor

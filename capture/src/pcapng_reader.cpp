@@ -1,0 +1,213 @@
+// SPDX-License-Identifier: MIT
+// pcapng files (draft-ietf-opsawg-pcapng). They are not left to libpcap because it gives up a file, before its
+// first packet, whose interfaces differ in link type or snap length, as captures on "any" and merged captures do.
+#include "interfaces.h"
+#include "records.h"
+
+namespace netfloor {
+
+namespace {
+
+constexpr std::uint32_t sectionHeader = 0x0a0d0d0a;
+constexpr std::uint32_t interfaceDescription = 1;
+constexpr std::uint32_t packetBlock = 2; // obsolete, still found
+constexpr std::uint32_t simplePacket = 3;
+constexpr std::uint32_t enhancedPacket = 6;
+
+constexpr std::uint32_t orderMark = 0x1a2b3c4d; // as a section in network order has it
+constexpr std::uint32_t frameOctets = 12;       // type and length in front of a block's body, the length again after it
+constexpr std::uint32_t mostBlockOctets = 2 * mostPacketOctets;
+// What is looked at as a whole stands in the buffer: an interface's description, a packet with its comments.
+constexpr std::uint32_t mostInterfaceOctets = std::uint32_t{1024} * 1024;
+constexpr std::uint32_t mostOptionOctets = std::uint32_t{1024} * 1024;
+
+bool isPacket(std::uint32_t type) {
+    return type == enhancedPacket || type == packetBlock || type == simplePacket;
+}
+
+struct Block {
+    std::uint64_t position = 0;
+    std::uint32_t type = 0;
+    std::uint32_t octets = 0; // with type and lengths
+};
+
+class PcapngReader final : public RecordReader {
+public:
+    // A file that is damaged before its first packet is no capture, and told at once.
+    explicit PcapngReader(OctetStream &stream) : stream_(stream) {
+        try {
+            (void)findPacket();
+        } catch (const CaptureDamage &damage) {
+            throw CaptureError(damage.what());
+        }
+    }
+
+    bool next(CapturedPacket &packet) override {
+        if (!atPacket_ && !findPacket()) {
+            return false;
+        }
+        takePacket(packet);
+        atPacket_ = false;
+        packet.number = ++number_;
+        packet.position = block_.position;
+        return true;
+    }
+
+private:
+    [[nodiscard]] CaptureDamage damage(const std::string &reason) const {
+        return damageAt(stream_, number_ + 1, block_.position, reason);
+    }
+    [[nodiscard]] CaptureDamage cut() const { return cutAt(stream_, number_ + 1, block_.position); }
+
+    // Goes to the next block that is a packet. False at the end.
+    bool findPacket() {
+        while (readBlockHead()) {
+            if (isPacket(block_.type)) {
+                atPacket_ = true;
+                return true;
+            }
+            if (block_.type == interfaceDescription) {
+                takeInterface();
+            } else if (!stream_.skip(block_.octets - 4)) {
+                throw cut();
+            } else {
+                takeSecondLength();
+            }
+        }
+        return false;
+    }
+
+    // Looks at the start of a block, and takes nothing. False at the end.
+    bool readBlockHead() {
+        block_.position = stream_.position();
+        const auto octets = stream_.peek(frameOctets);
+        if (octets.empty() && stream_.error().empty()) {
+            return false;
+        }
+        if (octets.size() < frameOctets) {
+            throw cut();
+        }
+        // The first word of a section header reads the same in both orders; the third tells the order.
+        if (NumberView(octets, true).u32(0) == sectionHeader) {
+            const std::uint32_t order = NumberView(octets, true).u32(8);
+            if (order != orderMark && order != __builtin_bswap32(orderMark)) {
+                throw damage("a section header without a byte order");
+            }
+            bigEndian_ = order == orderMark;
+            interfaces_.clear();
+        }
+        const NumberView head(octets, bigEndian_);
+        block_.type = head.u32(0);
+        block_.octets = head.u32(4);
+        if (block_.octets < frameOctets || block_.octets % 4 != 0 || block_.octets > mostBlockOctets) {
+            throw damage("a block of " + std::to_string(block_.octets) + " octets");
+        }
+        return true;
+    }
+
+    // The whole block, which is in the buffer then, without type and lengths.
+    [[nodiscard]] std::span<const std::uint8_t> takeBlock() {
+        const auto octets = stream_.peek(block_.octets);
+        if (octets.size() < block_.octets) {
+            throw cut();
+        }
+        if (NumberView(octets, bigEndian_).u32(block_.octets - 4) != block_.octets) {
+            throw damage("a block whose two lengths differ");
+        }
+        stream_.take(block_.octets);
+        return octets.subspan(8, block_.octets - frameOctets);
+    }
+
+    void takeSecondLength() {
+        const auto octets = stream_.peek(4);
+        if (octets.size() < 4) {
+            throw cut();
+        }
+        if (NumberView(octets, bigEndian_).u32(0) != block_.octets) {
+            throw damage("a block whose two lengths differ");
+        }
+        stream_.take(4);
+    }
+
+    void takeInterface() {
+        if (block_.octets < frameOctets + 8) {
+            throw damage("an interface description that is too short");
+        }
+        if (block_.octets > mostInterfaceOctets) {
+            throw damage("an interface description of " + std::to_string(block_.octets) + " octets");
+        }
+        interfaces_.add(readInterface({takeBlock(), bigEndian_}));
+    }
+
+    [[nodiscard]] const Interface &interface(std::uint32_t number) const {
+        const Interface *const found = interfaces_.find(number);
+        if (found != nullptr) {
+            return *found;
+        }
+        if (number < interfaces_.count()) {
+            throw damage("interface " + std::to_string(number) + ", where " + std::to_string(InterfaceTable::mostKept) +
+                         " is the limit,");
+        }
+        throw damage("an interface that is not described");
+    }
+
+    void takePacket(CapturedPacket &packet) {
+        const std::size_t headOctets = block_.type == simplePacket ? 4 : 20;
+        if (block_.octets < frameOctets + headOctets) {
+            throw damage("a packet block that is too short");
+        }
+        const auto start = stream_.peek(8 + headOctets);
+        if (start.size() < 8 + headOctets) {
+            throw cut();
+        }
+        const NumberView head(start.subspan(8), bigEndian_);
+        const bool isSimple = block_.type == simplePacket;
+        const std::uint32_t number = isSimple ? 0 : block_.type == packetBlock ? head.u16(0) : head.u32(0);
+        const Interface &from = interface(number);
+        const auto room = static_cast<std::uint32_t>(block_.octets - frameOctets - headOctets);
+        const std::uint32_t captured = isSimple ? simpleOctets(head.u32(0), from, room) : head.u32(12);
+        checkLengths(captured, room, from);
+        packet.time = isSimple ? std::nullopt : from.timeOf(std::uint64_t{head.u32(4)} << 32U | head.u32(8));
+        packet.timeDigits = from.timeDigits();
+        packet.interfaceNumber = number;
+        packet.linkType = from.linkType;
+        packet.wireOctets = head.u32(isSimple ? 0 : 16);
+        packet.octets = takeBlock().subspan(headOctets, captured);
+    }
+
+    // A simple packet block says what was on the wire, and not what was captured.
+    static std::uint32_t simpleOctets(std::uint32_t onWire, const Interface &from, std::uint32_t room) {
+        const std::uint32_t captured = std::min(onWire, room);
+        return from.snapOctets == 0 ? captured : std::min(captured, from.snapOctets);
+    }
+
+    // Before the buffer has to hold the block.
+    void checkLengths(std::uint32_t captured, std::uint32_t room, const Interface &from) const {
+        if (captured > room) {
+            throw damage("a packet larger than its block");
+        }
+        const std::uint32_t most = mostOctetsFor(from.snapOctets);
+        if (captured > most) {
+            throw damage("a length of " + std::to_string(captured) + " octets, where " + std::to_string(most) +
+                         " is the limit,");
+        }
+        if (room - captured > mostOptionOctets) {
+            throw damage("a packet block with " + std::to_string(room - captured) + " octets of options");
+        }
+    }
+
+    OctetStream &stream_;
+    InterfaceTable interfaces_; // of the section
+    Block block_;               // the one that is read
+    std::uint64_t number_ = 0;
+    bool bigEndian_ = false;
+    bool atPacket_ = false; // the block is a packet, and not yet given out
+};
+
+} // namespace
+
+std::unique_ptr<RecordReader> readPcapng(OctetStream &stream) {
+    return std::make_unique<PcapngReader>(stream);
+}
+
+} // namespace netfloor

@@ -1,0 +1,83 @@
+// SPDX-License-Identifier: MIT
+// What the readers of the two formats have in common.
+#pragma once
+
+#include <algorithm>
+#include <bit>
+#include <cstdint>
+#include <cstring>
+#include <memory>
+#include <span>
+#include <string>
+
+#include "netfloor-capture/errors.h"
+#include "netfloor-capture/packet.h"
+#include "octet_stream.h"
+
+namespace netfloor {
+
+constexpr std::uint32_t nanosecondsPerSecond = 1'000'000'000;
+
+class RecordReader {
+public:
+    RecordReader() = default;
+    RecordReader(const RecordReader &) = delete;
+    RecordReader &operator=(const RecordReader &) = delete;
+    virtual ~RecordReader() = default;
+
+    [[nodiscard]] virtual bool next(CapturedPacket &packet) = 0;
+};
+
+// The formats. The stream is borrowed.
+[[nodiscard]] std::unique_ptr<RecordReader> readPcap(OctetStream &stream);
+[[nodiscard]] std::unique_ptr<RecordReader> readPcapng(OctetStream &stream);
+
+// Numbers in octets of a known byte order.
+class NumberView {
+public:
+    NumberView(std::span<const std::uint8_t> octets, bool bigEndian)
+        : octets_(octets), swaps_(bigEndian != (std::endian::native == std::endian::big)) {}
+
+    [[nodiscard]] std::size_t size() const { return octets_.size(); }
+    [[nodiscard]] std::uint8_t u8(std::size_t offset) const { return octets_[offset]; }
+    [[nodiscard]] std::uint16_t u16(std::size_t offset) const {
+        const auto number = raw<std::uint16_t>(offset);
+        return swaps_ ? __builtin_bswap16(number) : number;
+    }
+    [[nodiscard]] std::uint32_t u32(std::size_t offset) const {
+        const auto number = raw<std::uint32_t>(offset);
+        return swaps_ ? __builtin_bswap32(number) : number;
+    }
+    [[nodiscard]] std::uint64_t u64(std::size_t offset) const {
+        const auto number = raw<std::uint64_t>(offset);
+        return swaps_ ? __builtin_bswap64(number) : number;
+    }
+
+private:
+    template <typename Number>
+    [[nodiscard]] Number raw(std::size_t offset) const {
+        Number number = 0;
+        std::memcpy(&number, octets_.data() + offset, sizeof number);
+        return number;
+    }
+
+    std::span<const std::uint8_t> octets_;
+    bool swaps_;
+};
+
+// The most octets that a packet can have been captured with; a length above it is damage. Some programs write a snap
+// length of 0 or of all bits for "any".
+constexpr std::uint32_t mostPacketOctets = std::uint32_t{16} * 1024 * 1024;
+constexpr std::uint32_t usualSnapOctets = 262144;
+[[nodiscard]] constexpr std::uint32_t mostOctetsFor(std::uint32_t snapOctets) {
+    return snapOctets == 0 ? mostPacketOctets : std::clamp(snapOctets, usualSnapOctets, mostPacketOctets);
+}
+
+// "NAME: REASON in packet 7, which begins at octet 910 ..."; `packetNumber` is that of the packet that is lost.
+[[nodiscard]] CaptureDamage damageAt(const OctetStream &stream, std::uint64_t packetNumber, std::uint64_t position,
+                                     const std::string &reason);
+
+// The same where the capture ends too early.
+[[nodiscard]] CaptureDamage cutAt(const OctetStream &stream, std::uint64_t packetNumber, std::uint64_t position);
+
+} // namespace netfloor
