@@ -9,7 +9,7 @@
 #include "decode.h"
 #include "exit_code.h"
 #include "fields/fields.h"
-#include "netfloor-host/host.h"
+#include "netfloor-host/plugin_host.h"
 #include "options.h"
 #include "output.h"
 

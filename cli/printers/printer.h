@@ -10,7 +10,7 @@
 #include "capture/capture.h"
 #include "exit_code.h"
 #include "link_layer.h"
-#include "netfloor-host/host.h"
+#include "netfloor-host/plugin_host.h"
 #include "options.h"
 #include "output.h"
 #include "text.h"

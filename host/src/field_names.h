@@ -1,0 +1,46 @@
+// SPDX-License-Identifier: MIT
+// Names, resolved once: those of fields from the plug-in's tables, and those of blocks, which come with each report,
+// from what was seen before.
+#pragma once
+
+#include <cstdint>
+#include <functional>
+#include <set>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include <netfloor/descriptors.h>
+
+namespace netfloor {
+
+// What the field tables say of an id.
+struct NamedField {
+    std::string_view name;
+    bool isKey = false;
+    bool isKnown = false;
+    std::string_view lastBlock; // the name of the block in which the field stood last
+};
+
+class FieldNames {
+public:
+    // A plug-in without field tables has no known ids.
+    explicit FieldNames(NetfloorGetTable getTable);
+
+    // Ids that the tables do not know share one element.
+    [[nodiscard]] NamedField &find(std::uint32_t id) { return fields_[id < fields_.size() ? id : 0]; }
+
+    // The same text, which stays where it is. A field usually stands in the same block, so that one comparison is
+    // enough.
+    [[nodiscard]] std::string_view blockName(NamedField &field, std::string_view name) {
+        return field.lastBlock == name ? field.lastBlock : findBlockName(field, name);
+    }
+
+private:
+    [[nodiscard]] std::string_view findBlockName(NamedField &field, std::string_view name);
+
+    std::vector<NamedField> fields_; // by id; the first stands for all unknown ones
+    std::set<std::string, std::less<>> blockNames_;
+};
+
+} // namespace netfloor
