@@ -1,19 +1,22 @@
 #!/bin/sh
 # SPDX-License-Identifier: MIT
-# Installs a build into a directory of its own, moves the installation, builds the example against it and
+# Installs a build into a directory of its own, moves the installation, builds each example against it and
 # compares what the example prints with what stands beside it.
 #
-#   try-installed.sh CMAKE BUILD-DIRECTORY EXAMPLE-DIRECTORY
+#   try-installed.sh CMAKE BUILD-DIRECTORY EXAMPLES-DIRECTORY
 set -eu
 cmake=$1
 build=$2
-example=$3
+examples=$3
 work=$(mktemp -d)
 trap 'rm -rf "$work"' EXIT
 
 "$cmake" --install "$build" --prefix "$work/first" >/dev/null
 mv "$work/first" "$work/prefix"
-"$cmake" -S "$example" -B "$work/build" -DCMAKE_PREFIX_PATH="$work/prefix" -DCMAKE_BUILD_TYPE=Release >/dev/null
-"$cmake" --build "$work/build" >/dev/null
-"$work/build/decode_packet" >"$work/output"
-diff "$example/expected.txt" "$work/output"
+for example in "$examples"/*/; do
+    name=$(basename "$example")
+    "$cmake" -S "$example" -B "$work/$name" -DCMAKE_PREFIX_PATH="$work/prefix" -DCMAKE_BUILD_TYPE=Release >/dev/null
+    "$cmake" --build "$work/$name" >/dev/null
+    "$work/$name/$name" >"$work/output"
+    diff "$example/expected.txt" "$work/output"
+done

@@ -7,43 +7,56 @@
 
 namespace netfloor {
 
+namespace {
+
+constexpr std::size_t usualDepth = 32;
+
+template <typename Element>
+void makeRoom(std::vector<Element> &elements, std::size_t count) {
+    if (elements.size() < count) {
+        elements.resize(2 * count);
+    }
+}
+
+} // namespace
+
+BlockTracker::BlockTracker(FieldNames &names)
+    : names_(names), views_(usualDepth), levels_(usualDepth), shown_(usualDepth) {
+    toOpen_.reserve(usualDepth);
+}
+
 void BlockTracker::reset() {
-    truncate(0);
-    shown_.clear();
+    depth_ = 0;
+    shownDepth_ = 0;
     lastCursor_ = 0;
     nextNumber_ = 0;
 }
 
-void BlockTracker::truncate(std::size_t depth) {
-    views_.resize(depth);
-    levels_.resize(depth);
-}
-
-void BlockTracker::change(const DecodeState &state, std::size_t depth, NamedField &field, Sink &sink) {
-    truncate(levelsKept(state, depth));
+void BlockTracker::change(const DecodeState &state, std::uint32_t depth, NamedField &field, Sink &sink) {
     const std::uint32_t limitDepth = depthOf(state.limits);
-    while (views_.size() < depth) {
-        open(state.blockStarts.base[views_.size() + 1], limitDepth);
+    depth_ = levelsKept(state, depth);
+    while (depth_ < depth) {
+        open(state.blockStarts.base[depth_ + 1], limitDepth);
     }
-    if (views_.empty()) {
+    if (depth == 0) {
         closeAll(sink);
         return;
     }
     const std::string_view blockName = state.blockName;
-    if (levels_.back().hasField && views_.back().name != blockName) {
-        truncate(depth - 1);
+    if (levels_[depth - 1].hasField && views_[depth - 1].name != blockName) {
+        --depth_;
         open(state.blockStarts.base[depth], limitDepth);
     }
-    if (!levels_.back().hasField) {
+    if (!levels_[depth - 1].hasField) {
         name(names_.blockName(field, blockName));
     }
     show(sink);
 }
 
-// How many of the known blocks are still open: see isInnermostUnchanged.
-std::size_t BlockTracker::levelsKept(const DecodeState &state, std::size_t depth) const {
-    std::size_t kept = std::min(depth, views_.size());
-    for (std::size_t level = kept; level-- > 0;) {
+// How many of the known blocks are still open: see isKnown.
+std::uint32_t BlockTracker::levelsKept(const DecodeState &state, std::uint32_t depth) const {
+    std::uint32_t kept = std::min(depth, depth_);
+    for (std::uint32_t level = kept; level-- > 0;) {
         const std::uint32_t firstBit = state.blockStarts.base[level + 1];
         if (views_[level].firstBit != firstBit) {
             kept = level;
@@ -55,72 +68,83 @@ std::size_t BlockTracker::levelsKept(const DecodeState &state, std::size_t depth
 }
 
 void BlockTracker::open(std::uint32_t firstBit, std::uint32_t limitDepth) {
-    Level level;
+    makeRoom(views_, depth_ + std::size_t{1});
+    makeRoom(levels_, depth_ + std::size_t{1});
+    Level &level = levels_[depth_];
+    level = {};
     level.limitDepth = limitDepth;
-    if (!views_.empty()) {
-        const auto parent = static_cast<std::uint32_t>(views_.size() - 1);
+    if (depth_ != 0) {
+        const std::uint32_t parent = depth_ - 1;
         const Level &around = levels_[parent];
         level.shownParent = isShown(parent) ? parent : around.shownParent;
         if (around.isInChain && around.limitDepth == limitDepth) {
             level.isInChain = true;
             level.chainParent = around.chainParent;
         }
-        if (!around.hasField) {
+        if (!around.hasField && !beginsWithItsParent(parent)) {
             level.chainParent = level.isInChain ? level.chainParent : level.shownParent;
             level.isInChain = true;
             level.shownParent = level.chainParent;
         }
     }
-    levels_.push_back(level);
-    views_.push_back({{}, nextNumber_++, firstBit, depthUnder(level.shownParent), false});
+    views_[depth_] = {{}, nextNumber_++, firstBit, depthUnder(level.shownParent), false};
+    ++depth_;
+}
+
+// A block that begins where the block shown around it does is part of that, and no link that follows.
+bool BlockTracker::beginsWithItsParent(std::uint32_t level) const {
+    const std::uint32_t shownParent = levels_[level].shownParent;
+    return shownParent != none && views_[shownParent].firstBit == views_[level].firstBit;
 }
 
 // Gives the innermost block its name. Where one of that name is shown around it, it takes its place.
 void BlockTracker::name(std::string_view name) {
-    Level &innermost = levels_.back();
+    Level &innermost = levels_[depth_ - 1];
+    BlockView &view = views_[depth_ - 1];
     innermost.hasField = true;
-    views_.back().name = name;
+    view.name = name;
     if (name.empty()) {
         return;
     }
     for (std::uint32_t level = innermost.shownParent; level != none; level = levels_[level].shownParent) {
-        if (views_[level].name == name) {
+        // Names stand in one place each, so that equal ones have one address.
+        if (views_[level].name.data() == name.data()) {
             innermost.shownParent = levels_[level].shownParent;
             break;
         }
     }
-    views_.back().depth = depthUnder(innermost.shownParent);
+    view.depth = depthUnder(innermost.shownParent);
 }
 
 // Opens the innermost block in the sink, and the blocks around it that are not open there.
 void BlockTracker::show(Sink &sink) {
-    const auto innermost = static_cast<std::uint32_t>(views_.size() - 1);
-    std::uint32_t level = isShown(innermost) ? innermost : levels_[innermost].shownParent;
-    toOpen_.clear();
-    std::size_t common = 0;
-    for (; level != none; level = levels_[level].shownParent) {
-        const BlockView &view = views_[level];
-        if (view.depth < shown_.size() && shown_[view.depth].number == view.number) {
-            common = view.depth + 1;
-            break;
-        }
+    const std::uint32_t target = isShown(depth_ - 1) ? depth_ - 1 : levels_[depth_ - 1].shownParent;
+    if (target == none || isOpenInSink(target)) {
+        return closeDownTo(depthUnder(target), sink);
+    }
+    std::uint32_t level = levels_[target].shownParent;
+    for (toOpen_.clear(); level != none && !isOpenInSink(level); level = levels_[level].shownParent) {
         toOpen_.push_back(level);
     }
-    closeDownTo(common, sink);
+    closeDownTo(depthUnder(level), sink);
     for (std::size_t i = toOpen_.size(); i-- > 0;) {
-        BlockView &view = views_[toOpen_[i]];
-        view.continued = levels_[toOpen_[i]].wasShown;
-        levels_[toOpen_[i]].wasShown = true;
-        shown_.push_back(view);
-        sink.blockOpened(view);
+        openInSink(toOpen_[i], sink);
     }
+    openInSink(target, sink);
 }
 
-void BlockTracker::closeDownTo(std::size_t depth, Sink &sink) {
-    while (shown_.size() > depth) {
-        const BlockView closed = shown_.back();
-        shown_.pop_back();
-        sink.blockClosed(closed);
+void BlockTracker::openInSink(std::uint32_t level, Sink &sink) {
+    makeRoom(shown_, shownDepth_ + std::size_t{1});
+    BlockView &view = views_[level];
+    view.continued = levels_[level].wasShown;
+    levels_[level].wasShown = true;
+    shown_[shownDepth_++] = view;
+    sink.blockOpened(view);
+}
+
+void BlockTracker::closeDownTo(std::uint32_t depth, Sink &sink) {
+    while (shownDepth_ > depth) {
+        sink.blockClosed(shown_[--shownDepth_]);
     }
 }
 

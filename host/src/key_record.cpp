@@ -62,24 +62,22 @@ void KeyRecord::reset() {
 }
 
 void KeyRecord::report(std::span<const KeyColumn> columns, std::uint16_t byteAreaOffset, Sink &sink) const {
+    const std::uint8_t *const record = octets_.get();
     for (std::uint32_t octet = 0; octet * bitsPerOctet < columns.size(); ++octet) {
-        for (std::uint32_t present = octets_[presenceStart + octet]; present != 0; present &= present - 1) {
+        for (std::uint32_t present = record[presenceStart + octet]; present != 0; present &= present - 1) {
             const std::uint32_t row = octet * bitsPerOctet + static_cast<std::uint32_t>(std::countr_zero(present));
-            if (row < columns.size()) {
-                sink.key(view(columns, row, byteAreaOffset));
-            }
+            const std::uint8_t *const place = record + valueStart + row * valueOctets;
+            const auto &[name, type] = columns[row];
+            const bool isAddress = type == KeyType::ipv6Address;
+            sink.key({
+                .name = name,
+                .row = row,
+                .type = type,
+                .number = loadAs(type, place),
+                .octets = isAddress ? loadOctets(record, place, byteAreaOffset) : std::span<const std::uint8_t>(),
+            });
         }
     }
-}
-
-KeyView KeyRecord::view(std::span<const KeyColumn> columns, std::uint32_t row, std::uint16_t byteAreaOffset) const {
-    const std::uint8_t *const place = octets_.get() + valueStart + row * valueOctets;
-    const KeyType type = columns[row].type;
-    KeyView view{columns[row].name, row, type, loadAs(type, place), {}};
-    if (type == KeyType::ipv6Address) {
-        view.octets = loadOctets(octets_.get(), place, byteAreaOffset);
-    }
-    return view;
 }
 
 } // namespace netfloor

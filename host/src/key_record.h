@@ -43,9 +43,6 @@ public:
     void report(std::span<const KeyColumn> columns, std::uint16_t byteAreaOffset, Sink &sink) const;
 
 private:
-    [[nodiscard]] KeyView view(std::span<const KeyColumn> columns, std::uint32_t row,
-                               std::uint16_t byteAreaOffset) const;
-
     std::unique_ptr<std::uint8_t[]> octets_;
 };
 

@@ -36,8 +36,8 @@ public:
 private:
     void append(std::string_view text) { size_ += text.copy(text_.data() + size_, text_.size() - size_); }
     void append(std::uint32_t number) {
-        size_ = static_cast<std::size_t>(
-            std::to_chars(text_.data() + size_, text_.data() + text_.size(), number).ptr - text_.data());
+        size_ = static_cast<std::size_t>(std::to_chars(text_.data() + size_, text_.data() + text_.size(), number).ptr -
+                                         text_.data());
     }
 
     std::array<char, 64> text_;
@@ -101,7 +101,7 @@ std::optional<std::uint32_t> NextLayer::ipProtocol() const {
 }
 
 std::span<const std::uint8_t> NextLayer::packet() const {
-    return run_.current_->packet();
+    return run_.packet_;
 }
 
 std::span<const std::uint8_t> NextLayer::payload() const {

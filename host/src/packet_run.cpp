@@ -3,14 +3,12 @@
 
 #include <algorithm>
 #include <string>
-#include <tuple>
 #include <utility>
 
 namespace netfloor {
 namespace {
 
 constexpr std::int32_t refusal = -1;
-constexpr std::uint8_t untouchedOctet = 0xff;
 constexpr std::size_t usualLayers = 8;
 constexpr std::uint16_t addressRoom = 64; // for one address, which takes 17 octets
 
@@ -57,15 +55,16 @@ Ending PacketRun::run(Pass pass, std::span<const std::uint8_t> packet, const Own
 }
 
 void PacketRun::prepare(std::span<const std::uint8_t> packet, const TestRunOptions *test) {
+    packet_ = packet;
     exception_ = nullptr;
     handOffDepth_ = 0;
     reentries_ = 0;
     followStop_ = test == nullptr || test->followStop;
     if (test == nullptr) {
         reused_.reset(packet);
-        current_ = &reused_;
+        state_ = &reused_.state();
     } else {
-        current_ = &exact_.emplace(packet, test->state);
+        state_ = &exact_.emplace(packet, test->state).state();
     }
     if (pass_ == Pass::xtr) {
         prepareKeyContext(test);
@@ -169,7 +168,7 @@ Handled PacketRun::handOff() {
 }
 
 HandOff PacketRun::describeHandOff() const {
-    const DecodeState &state = current_->state();
+    const DecodeState &state = *state_;
     HandOff record;
     record.key = frame().nextLayerKey;
     record.protocol = frame().nextLayerProtocol;
@@ -187,49 +186,35 @@ HandOff PacketRun::describeHandOff() const {
     return record;
 }
 
-const LayerFrame &PacketRun::frame() const {
-    return state().layerFrames[state().layerIndex];
-}
-
 void PacketRun::addField(std::uint32_t outputRangeCount, const BitRange *ranges, const char *display,
                          const char *fieldName, std::uint32_t fieldId, std::uint32_t bitOrder) noexcept {
     if (exception_) {
         return;
     }
     try {
-        PreDecodeContext &context = preDecode_.context;
-        const std::uint8_t *const head = context.fieldRecords + context.fieldRecordCount * fieldRecordOctets;
         NamedField &field = names_.find(fieldId);
-        FieldView view;
-        view.id = fieldId;
-        view.reportedName = LazyText(fieldName);
-        view.name = field.isKnown ? field.name : withoutLeadingBlanks(view.reportedName.view());
-        view.isKey = field.isKey;
-        view.text = LazyText(display);
-        view.value = state().fieldRecord.value;
-        view.ranges = {ranges, outputRangeCount};
-        view.bitOrder = bitOrder;
-        std::copy_n(head, view.recordHead.size(), view.recordHead.begin());
-        report(view, field);
-        context.fieldRecordCount = (context.fieldRecordCount + 1) % fieldRecordCount;
+        blocks_.moveTo(state(), field, *sink_);
+        const std::uint8_t *const head = fieldRecordHead();
+        const LazyText reportedName(fieldName);
+        sink_->field({
+            .id = fieldId,
+            .name = field.isKnown ? field.name : withoutLeadingBlanks(reportedName.view()),
+            .isKey = field.isKey,
+            .text = LazyText(display),
+            .reportedName = reportedName,
+            .value = state().fieldRecord.value,
+            .ranges = {ranges, outputRangeCount},
+            .bitOrder = bitOrder,
+            .flags = state().flags,
+            .depth = blocks_.shownDepth(),
+            .blocks = blocks_.open(),
+            .recordHead = {head[0], head[1], head[2]},
+        });
+        preDecode_.context.fieldRecordCount = (preDecode_.context.fieldRecordCount + 1) % fieldRecordCount;
         markFieldRecord();
     } catch (...) {
         keepException();
     }
-}
-
-void PacketRun::report(FieldView &view, NamedField &field) {
-    blocks_.moveTo(state(), field, *sink_);
-    view.flags = state().flags;
-    view.depth = blocks_.shownDepth();
-    view.blocks = blocks_.open();
-    sink_->field(view);
-}
-
-// Marks the head of the current field record, so that what the plug-in leaves alone can be told.
-void PacketRun::markFieldRecord() {
-    std::fill_n(preDecode_.context.fieldRecords + preDecode_.context.fieldRecordCount * fieldRecordOctets,
-                std::tuple_size_v<decltype(FieldView::recordHead)>, untouchedOctet);
 }
 
 void PacketRun::addDisplay(const char *display, std::uint32_t displayId) noexcept {
@@ -274,13 +259,21 @@ void PacketRun::addOwnEntry(std::uint32_t bits, std::string_view name, std::stri
     }
     if (pass_ == Pass::md) {
         const BitRange range = {0, state().cursor, state().cursor + bits - 1, 0, {}};
-        FieldView view;
-        view.name = name;
-        view.text = LazyText(longText);
-        view.reportedName = LazyText(name);
-        view.ranges = {&range, 1};
-        view.recordHead = {preDecode_.context.layerNumber, 0, 0};
-        report(view, names_.find(0));
+        blocks_.moveTo(state(), names_.find(0), *sink_);
+        sink_->field({
+            .id = 0,
+            .name = name,
+            .isKey = false,
+            .text = LazyText(longText),
+            .reportedName = LazyText(name),
+            .value = 0,
+            .ranges = {&range, 1},
+            .bitOrder = 0,
+            .flags = state().flags,
+            .depth = blocks_.shownDepth(),
+            .blocks = blocks_.open(),
+            .recordHead = {preDecode_.context.layerNumber, 0, 0},
+        });
     } else if (pass_ == Pass::to) {
         sink_->text({0, name, false, LazyText(shortText), preDecode_.context.layerNumber});
     }

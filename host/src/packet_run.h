@@ -1,15 +1,17 @@
 // SPDX-License-Identifier: MIT
-// One pass over one packet at a time: what answers the plug-in's calls while it runs. The storage is kept from packet to
-// packet.
+// One pass over one packet at a time: what answers the plug-in's calls while it runs. The storage is kept from packet
+// to packet.
 #pragma once
 
 #include <array>
 #include <cstdint>
+#include <cstring>
 #include <exception>
 #include <memory>
 #include <optional>
 #include <span>
 #include <string_view>
+#include <tuple>
 #include <vector>
 
 #include "block_tracker.h"
@@ -45,6 +47,8 @@ private:
     // once, so that two in turn are enough for a packet of any length.
     static constexpr std::size_t fieldRecordOctets = 1000;
     static constexpr std::uint32_t fieldRecordCount = 2;
+    static constexpr std::size_t headOctets = std::tuple_size_v<decltype(FieldView::recordHead)>;
+    static constexpr std::uint8_t untouchedOctet = 0xff;
 
     void prepare(std::span<const std::uint8_t> packet, const TestRunOptions *test);
     void prepareContext(const TestRunOptions *test);
@@ -54,14 +58,17 @@ private:
     [[nodiscard]] bool enterFromOwner();
     [[nodiscard]] Handled handOff();
     [[nodiscard]] HandOff describeHandOff() const;
-    [[nodiscard]] DecodeState &state() { return current_->state(); }
-    [[nodiscard]] const DecodeState &state() const { return current_->state(); }
-    [[nodiscard]] const LayerFrame &frame() const;
+    [[nodiscard]] DecodeState &state() { return *state_; }
+    [[nodiscard]] const DecodeState &state() const { return *state_; }
+    [[nodiscard]] const LayerFrame &frame() const { return state_->layerFrames[state_->layerIndex]; }
     void openLayer(std::uint32_t decoderId);
     void closeLayer();
     void addOwnEntry(std::uint32_t bits, std::string_view name, std::string_view longText, std::string_view shortText);
-    void report(FieldView &view, NamedField &field);
-    void markFieldRecord();
+    [[nodiscard]] std::uint8_t *fieldRecordHead() {
+        return fieldRecords_.data() + preDecode_.context.fieldRecordCount * fieldRecordOctets;
+    }
+    // Marks the head of the current field record, so that what the plug-in leaves alone can be told.
+    void markFieldRecord() { std::memset(fieldRecordHead(), untouchedOctet, headOctets); }
     void keepException() noexcept;
     Ending finish(std::int32_t result);
 
@@ -80,7 +87,8 @@ private:
     Sink *sink_ = nullptr;
     RunOptions options_;
     bool followStop_ = true;
-    PacketState *current_ = nullptr;
+    std::span<const std::uint8_t> packet_;
+    DecodeState *state_ = nullptr;
     standin::PreDecodeRun preDecode_ = {};
     XtrContext xtr_ = {};
     std::uint32_t handOffDepth_ = 0;

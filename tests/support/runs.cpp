@@ -160,7 +160,8 @@ void compareXtr(Comparison &comparison, const Runs &runs) {
     }
 }
 
-Report runGuarded(Pass pass, std::span<const std::uint8_t> packet, TestRunOptions options, bool followStop, Host &host) {
+Report runGuarded(Pass pass, std::span<const std::uint8_t> packet, TestRunOptions options, bool followStop,
+                  Host &host) {
     const GuardedOctets source(packet);
     const GuardedOctets working(packet);
     options.followStop = followStop;

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// What a pass reported about one packet, kept as plain records, and the sink that keeps them. For tests and for programs
-// that look at a packet as a whole; who writes an output takes what it needs as it comes, see sink.h.
+// What a pass reported about one packet, kept as plain records, and the sink that keeps them. For tests and for
+// programs that look at a packet as a whole; who writes an output takes what it needs as it comes, see sink.h.
 #pragma once
 
 #include <array>
@@ -64,6 +64,9 @@ struct KeyValue {
     KeyType type = KeyType::number32;
     std::uint32_t number = 0;         // every type but ipv6Address; an IPv4 address has its first octet on top
     std::vector<std::uint8_t> octets; // ipv6Address: as stored, that is with the nibbles of each octet exchanged
+
+    // For what takes keys as they come, such as keyText().
+    operator KeyView() const { return {name, row, type, number, octets}; } // NOLINT(*-explicit-*)
 };
 
 // One pass over one packet. The lists that the pass does not fill stay empty.
@@ -108,8 +111,8 @@ struct Report {
     [[nodiscard]] const KeyValue *key(std::string_view name) const;
 };
 
-// Keeps all of one pass in `report`, which has to outlive it. An owner that wants to know what was reported so far looks
-// there.
+// Keeps all of one pass in `report`, which has to outlive it. An owner that wants to know what was reported so far
+// looks there.
 class ReportSink final : public Sink {
 public:
     explicit ReportSink(Report &report) : report_(report) {}

@@ -64,8 +64,8 @@ private:
 // would stand thousands of levels deep. The host shows links side by side:
 //
 //   - A block of the same name as one that is shown around it takes the place of that one.
-//   - A block whose parent has no field of its own so far is a link. It stands beside the first such block under the
-//     same limit.
+//   - A block is a link if its parent has no field of its own so far and does not begin where the block shown around
+//     it begins. It stands beside the first link under the same limit.
 //
 // So the depth never exceeds the number of names that blocks have.
 struct BlockView {
@@ -78,12 +78,12 @@ struct BlockView {
 
 // MD: one field.
 struct FieldView {
-    std::uint32_t id = 0;              // 0 for what an owner in the host reported
-    std::string_view name;             // as the field tables have it, or as it was reported where they do not know the id
-    bool isKey = false;                // one of the key fields, by which the plug-in says what matters of a packet
-    LazyText text;                     // the display line; may be empty
-    LazyText reportedName;             // letter for letter, leading blanks included
-    std::uint32_t value = 0;           // as the field record has it
+    std::uint32_t id = 0;    // 0 for what an owner in the host reported
+    std::string_view name;   // as the field tables have it, or as it was reported where they do not know the id
+    bool isKey = false;      // one of the key fields, by which the plug-in says what matters of a packet
+    LazyText text;           // the display line; may be empty
+    LazyText reportedName;   // letter for letter, leading blanks included
+    std::uint32_t value = 0; // as the field record has it
     std::span<const BitRange> ranges;  // in the order in which they were read; value, firstBit, lastBit count
     std::uint32_t bitOrder = 0;        // 8 where the bits of each octet were read reversed
     std::uint32_t flags = 0;           // of the decode state: what was raised before the field was reported
@@ -163,12 +163,12 @@ enum class Ending : std::uint8_t {
 struct PassEnd {
     Pass pass;
     Ending ending;
-    std::int32_t result;       // as the entry returned it
-    std::uint32_t bitsLeft;    // of the context: bits that were not decoded
-    Verdict verdict;           // MV
-    std::uint8_t layerNumber;  // of the last layer; not XTR
-    std::uint32_t decoderId;   // not XTR
-    const DecodeState &state;  // as the plug-in left it: cursor, flags
+    std::int32_t result;      // as the entry returned it
+    std::uint32_t bitsLeft;   // of the context: bits that were not decoded
+    Verdict verdict;          // MV
+    std::uint8_t layerNumber; // of the last layer; not XTR
+    std::uint32_t decoderId;  // not XTR
+    const DecodeState &state; // as the plug-in left it: cursor, flags
 };
 
 // Takes what a pass reports, in this order:
@@ -196,10 +196,10 @@ public:
     virtual void blockClosed(const BlockView & /*block*/) {}
     virtual void field(const FieldView & /*field*/) {}
 
-    virtual void text(const ShortTextView & /*text*/) {}   // TO
-    virtual void key(const KeyView & /*key*/) {}           // XTR
-    virtual void layer(const LayerRecord & /*layer*/) {}   // MD and TO
-    virtual void handOff(const HandOff & /*handOff*/) {}   // after the owner's work
+    virtual void text(const ShortTextView & /*text*/) {} // TO
+    virtual void key(const KeyView & /*key*/) {}         // XTR
+    virtual void layer(const LayerRecord & /*layer*/) {} // MD and TO
+    virtual void handOff(const HandOff & /*handOff*/) {} // after the owner's work
     virtual void end(const PassEnd & /*end*/) {}
 };
 
