@@ -2,6 +2,7 @@
 #include "block_tracker.h"
 
 #include <algorithm>
+#include <cstring>
 
 #include "netfloor-host/testing.h"
 
@@ -33,23 +34,23 @@ void BlockTracker::reset() {
 }
 
 void BlockTracker::change(const DecodeState &state, std::uint32_t depth, NamedField &field, Sink &sink) {
-    const std::uint32_t limitDepth = depthOf(state.limits);
-    depth_ = levelsKept(state, depth);
+    const std::uint32_t before = depth_;
+    const std::uint32_t kept = levelsKept(state, depth);
+    depth_ = kept;
     while (depth_ < depth) {
-        open(state.blockStarts.base[depth_ + 1], limitDepth);
+        open(state.blockStarts.base[depth_ + 1], depthOf(state.limits));
     }
     if (depth == 0) {
-        closeAll(sink);
-        return;
+        return closeAll(sink);
     }
-    const std::string_view blockName = state.blockName;
-    if (levels_[depth - 1].hasField && views_[depth - 1].name != blockName) {
+    if (levels_[depth - 1].hasField) {
+        if (std::strcmp(views_[depth - 1].name.data(), state.blockName) == 0) {
+            return kept == before ? void() : show(sink);
+        }
         --depth_;
-        open(state.blockStarts.base[depth], limitDepth);
+        open(state.blockStarts.base[depth], depthOf(state.limits));
     }
-    if (!levels_[depth - 1].hasField) {
-        name(names_.blockName(field, blockName));
-    }
+    name(names_.blockName(field, state.blockName));
     show(sink);
 }
 

@@ -21,16 +21,16 @@ FieldNames::FieldNames(NetfloorGetTable getTable) : fields_(1) {
             continue;
         }
         fields_.resize(std::max<std::size_t>(fields_.size(), row->fieldId + 1));
-        fields_[row->fieldId] = {row->name, row->keyIndex != 0, true, {}};
+        fields_[row->fieldId] = {row->name, row->keyIndex != 0, true, ""};
     }
 }
 
-std::string_view FieldNames::findBlockName(NamedField &field, std::string_view name) {
+const char *FieldNames::findBlockName(NamedField &field, std::string_view name) {
     auto found = blockNames_.find(name);
     if (found == blockNames_.end()) {
         found = blockNames_.emplace(name).first;
     }
-    field.lastBlock = *found;
+    field.lastBlock = found->c_str();
     return field.lastBlock;
 }
 

@@ -4,6 +4,7 @@
 #pragma once
 
 #include <cstdint>
+#include <cstring>
 #include <functional>
 #include <set>
 #include <string>
@@ -19,7 +20,7 @@ struct NamedField {
     std::string_view name;
     bool isKey = false;
     bool isKnown = false;
-    std::string_view lastBlock; // the name of the block in which the field stood last
+    const char *lastBlock = ""; // the name of the block in which the field stood last
 };
 
 class FieldNames {
@@ -30,14 +31,14 @@ public:
     // Ids that the tables do not know share one element.
     [[nodiscard]] NamedField &find(std::uint32_t id) { return fields_[id < fields_.size() ? id : 0]; }
 
-    // The same text, which stays where it is. A field usually stands in the same block, so that one comparison is
-    // enough.
-    [[nodiscard]] std::string_view blockName(NamedField &field, std::string_view name) {
-        return field.lastBlock == name ? field.lastBlock : findBlockName(field, name);
+    // The same text, at a place that all equal ones share. A field usually stands in the same block, so that one
+    // comparison is enough.
+    [[nodiscard]] const char *blockName(NamedField &field, const char *name) {
+        return std::strcmp(field.lastBlock, name) == 0 ? field.lastBlock : findBlockName(field, name);
     }
 
 private:
-    [[nodiscard]] std::string_view findBlockName(NamedField &field, std::string_view name);
+    [[nodiscard]] const char *findBlockName(NamedField &field, std::string_view name);
 
     std::vector<NamedField> fields_; // by id; the first stands for all unknown ones
     std::set<std::string, std::less<>> blockNames_;

@@ -63,15 +63,15 @@ void KeyRecord::reset() {
 
 void KeyRecord::report(std::span<const KeyColumn> columns, std::uint16_t byteAreaOffset, Sink &sink) const {
     const std::uint8_t *const record = octets_.get();
-    for (std::uint32_t octet = 0; octet * bitsPerOctet < columns.size(); ++octet) {
+    for (std::size_t octet = 0; octet * bitsPerOctet < columns.size(); ++octet) {
         for (std::uint32_t present = record[presenceStart + octet]; present != 0; present &= present - 1) {
-            const std::uint32_t row = octet * bitsPerOctet + static_cast<std::uint32_t>(std::countr_zero(present));
+            const std::size_t row = octet * bitsPerOctet + static_cast<std::size_t>(std::countr_zero(present));
             const std::uint8_t *const place = record + valueStart + row * valueOctets;
             const auto &[name, type] = columns[row];
             const bool isAddress = type == KeyType::ipv6Address;
             sink.key({
                 .name = name,
-                .row = row,
+                .row = static_cast<std::uint32_t>(row),
                 .type = type,
                 .number = loadAs(type, place),
                 .octets = isAddress ? loadOctets(record, place, byteAreaOffset) : std::span<const std::uint8_t>(),

@@ -172,7 +172,7 @@ std::int32_t LoadedPlugin::enterExtract(XtrContext *context) {
 }
 
 // Of a nested pass the user is this thread, and it alone touches what is not atomic.
-PluginUse::PluginUse(LoadedPlugin &plugin) : plugin_(plugin), isOutermost_(false) {
+PluginUse::PluginUse(LoadedPlugin &plugin) : plugin_(plugin) {
     thread_local const char mark = 0;
     const void *user = nullptr;
     isOutermost_ = plugin_.user_.compare_exchange_strong(user, &mark, std::memory_order_acquire);

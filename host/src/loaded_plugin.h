@@ -69,7 +69,7 @@ public:
 
 private:
     LoadedPlugin &plugin_;
-    bool isOutermost_;
+    bool isOutermost_ = false;
 };
 
 // The time in which a pass waits for the owner of a next layer.

@@ -140,7 +140,7 @@ std::string everything(const Report &report) {
 // A packet leaves nothing to the next one: the storage that is kept gives what a new one gives.
 TEST(Sink, GetsTheSameFromStorageThatIsKept) {
     const std::vector<Octets> packets = packetsOfAllFields();
-    Host host = freshHost();
+    Host host(PluginLibrary::open(NETFLOOR_PLUGIN));
     for (const Pass pass : allPasses) {
         std::size_t different = 0;
         for (std::size_t i = 0; i < packets.size(); ++i) {
@@ -181,7 +181,7 @@ private:
 };
 
 TEST(Sink, EndsThePassByAnException) {
-    Host host = freshHost();
+    Host host(PluginLibrary::open(NETFLOOR_PLUGIN));
     const Octets packet = ipv4({.protocol = 17, .payload = udp(40000, 40001, hex("00*12"))});
     const std::string before = everything(host.run(Pass::md, packet));
     for (const Pass pass : allPasses) {
@@ -210,7 +210,7 @@ private:
 };
 
 TEST(Busy, AnOwnerMayRunAnotherPacketAndASinkMayNot) {
-    Host host = freshHost();
+    Host host(PluginLibrary::open(NETFLOOR_PLUGIN));
     const Octets inner = ipv6({.nextHeader = 17, .payload = udp(53, 53, hex("00*8"))});
     const Octets outer = ipv4({.protocol = 17, .payload = udp(40000, 7000, hex("00*12"))});
     for (const Pass pass : allPasses) {
@@ -231,7 +231,7 @@ TEST(Busy, AnOwnerMayRunAnotherPacketAndASinkMayNot) {
 }
 
 TEST(Busy, SaysWhatToDoForASecondThread) {
-    const PluginLibrary library = PluginLibrary::openCopy(NETFLOOR_PLUGIN);
+    const PluginLibrary library = PluginLibrary::open(NETFLOOR_PLUGIN);
     const Octets packet = ipv4({.protocol = 17, .payload = udp(40000, 7000, hex("00*12"))});
     std::latch entered(1);
     std::latch leave(1);
