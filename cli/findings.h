@@ -8,7 +8,7 @@
 #include <vector>
 
 #include "netfloor-host/field_knowledge.h"
-#include "netfloor-host/host.h"
+#include "netfloor-host/plugin_host.h"
 
 namespace netfloor::cli {
 

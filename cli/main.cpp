@@ -12,7 +12,7 @@
 #include "exit_code.h"
 #include "fields/fields.h"
 #include "netfloor-capture/errors.h"
-#include "netfloor-host/host.h"
+#include "netfloor-host/plugin_host.h"
 #include "options.h"
 #include "output.h"
 

@@ -10,7 +10,7 @@
 #include "exit_code.h"
 #include "netfloor-capture/link_layer.h"
 #include "netfloor-capture/packet.h"
-#include "netfloor-host/host.h"
+#include "netfloor-host/plugin_host.h"
 #include "options.h"
 #include "output.h"
 #include "text.h"

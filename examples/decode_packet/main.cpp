@@ -4,7 +4,7 @@
 #include <iostream>
 #include <string>
 
-#include <netfloor-host/host.h>
+#include <netfloor-host/plugin_host.h>
 
 namespace {
 

@@ -6,7 +6,7 @@
 #include <netfloor-capture/capture_file.h>
 #include <netfloor-capture/link_layer.h>
 #include <netfloor-capture/time_text.h>
-#include <netfloor-host/host.h>
+#include <netfloor-host/plugin_host.h>
 
 namespace {
 

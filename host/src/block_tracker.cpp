@@ -2,18 +2,64 @@
 #include "block_tracker.h"
 
 #include <algorithm>
+#include <cstring>
 
-#include "netfloor-host/packet_state.h"
+#include "netfloor-host/testing.h"
 
 namespace netfloor {
 
-// How many of the known levels are still open. What was opened after the last call begins at or behind the
-// cursor of that call, so an equal level in front of it is the same block, and so are all below it.
-std::size_t BlockTracker::levelsKept(const DecodeState &state, std::size_t depth) const {
-    std::size_t kept = std::min(depth, levels_.size());
-    for (std::size_t level = kept; level-- > 0;) {
+namespace {
+
+constexpr std::size_t usualDepth = 32;
+
+template <typename Element>
+void makeRoom(std::vector<Element> &elements, std::size_t count) {
+    if (elements.size() < count) {
+        elements.resize(2 * count);
+    }
+}
+
+} // namespace
+
+BlockTracker::BlockTracker(FieldNames &names)
+    : names_(names), views_(usualDepth), levels_(usualDepth), shown_(usualDepth) {
+    toOpen_.reserve(usualDepth);
+}
+
+void BlockTracker::reset() {
+    depth_ = 0;
+    shownDepth_ = 0;
+    lastCursor_ = 0;
+    nextNumber_ = 0;
+}
+
+void BlockTracker::change(const DecodeState &state, std::uint32_t depth, NamedField &field, Sink &sink) {
+    const std::uint32_t before = depth_;
+    const std::uint32_t kept = levelsKept(state, depth);
+    depth_ = kept;
+    while (depth_ < depth) {
+        open(state.blockStarts.base[depth_ + 1], depthOf(state.limits));
+    }
+    if (depth == 0) {
+        return closeAll(sink);
+    }
+    if (levels_[depth - 1].hasField) {
+        if (std::strcmp(views_[depth - 1].name.data(), state.blockName) == 0) {
+            return kept == before ? void() : show(sink);
+        }
+        --depth_;
+        open(state.blockStarts.base[depth], depthOf(state.limits));
+    }
+    name(names_.blockName(field, state.blockName));
+    show(sink);
+}
+
+// How many of the known blocks are still open: see isKnown.
+std::uint32_t BlockTracker::levelsKept(const DecodeState &state, std::uint32_t depth) const {
+    std::uint32_t kept = std::min(depth, depth_);
+    for (std::uint32_t level = kept; level-- > 0;) {
         const std::uint32_t firstBit = state.blockStarts.base[level + 1];
-        if (levels_[level].firstBit != firstBit) {
+        if (views_[level].firstBit != firstBit) {
             kept = level;
         } else if (firstBit < lastCursor_) {
             break;
@@ -22,33 +68,85 @@ std::size_t BlockTracker::levelsKept(const DecodeState &state, std::size_t depth
     return kept;
 }
 
-void BlockTracker::open(std::uint32_t firstBit, std::vector<Block> &blocks) {
-    const std::size_t parent = levels_.empty() ? Block::none : levels_.back().block;
-    levels_.push_back({firstBit, blocks.size(), false});
-    blocks.push_back({{}, parent, firstBit});
+void BlockTracker::open(std::uint32_t firstBit, std::uint32_t limitDepth) {
+    makeRoom(views_, depth_ + std::size_t{1});
+    makeRoom(levels_, depth_ + std::size_t{1});
+    Level &level = levels_[depth_];
+    level = {};
+    level.limitDepth = limitDepth;
+    if (depth_ != 0) {
+        const std::uint32_t parent = depth_ - 1;
+        const Level &around = levels_[parent];
+        level.shownParent = isShown(parent) ? parent : around.shownParent;
+        if (around.isInChain && around.limitDepth == limitDepth) {
+            level.isInChain = true;
+            level.chainParent = around.chainParent;
+        }
+        if (!around.hasField && !beginsWithItsParent(parent)) {
+            level.chainParent = level.isInChain ? level.chainParent : level.shownParent;
+            level.isInChain = true;
+            level.shownParent = level.chainParent;
+        }
+    }
+    views_[depth_] = {{}, nextNumber_++, firstBit, depthUnder(level.shownParent), false};
+    ++depth_;
 }
 
-std::size_t BlockTracker::current(const DecodeState &state, std::vector<Block> &blocks) {
-    const std::size_t depth = depthOf(state.blockStarts);
-    levels_.resize(levelsKept(state, depth), Level{});
-    while (levels_.size() < depth) {
-        open(state.blockStarts.base[levels_.size() + 1], blocks);
+// A block that begins where the block shown around it does is part of that, and no link that follows.
+bool BlockTracker::beginsWithItsParent(std::uint32_t level) const {
+    const std::uint32_t shownParent = levels_[level].shownParent;
+    return shownParent != none && views_[shownParent].firstBit == views_[level].firstBit;
+}
+
+// Gives the innermost block its name. Where one of that name is shown around it, it takes its place.
+void BlockTracker::name(std::string_view name) {
+    Level &innermost = levels_[depth_ - 1];
+    BlockView &view = views_[depth_ - 1];
+    innermost.hasField = true;
+    view.name = name;
+    if (name.empty()) {
+        return;
     }
-    lastCursor_ = state.cursor;
-    if (levels_.empty()) {
-        return Block::none;
+    for (std::uint32_t level = innermost.shownParent; level != none; level = levels_[level].shownParent) {
+        // Names stand in one place each, so that equal ones have one address.
+        if (views_[level].name.data() == name.data()) {
+            innermost.shownParent = levels_[level].shownParent;
+            break;
+        }
     }
-    const std::string_view name = state.blockName;
-    if (levels_.back().named && blocks[levels_.back().block].name != name) {
-        levels_.pop_back();
-        open(state.blockStarts.base[depth], blocks);
+    view.depth = depthUnder(innermost.shownParent);
+}
+
+// Opens the innermost block in the sink, and the blocks around it that are not open there.
+void BlockTracker::show(Sink &sink) {
+    const std::uint32_t target = isShown(depth_ - 1) ? depth_ - 1 : levels_[depth_ - 1].shownParent;
+    if (target == none || isOpenInSink(target)) {
+        return closeDownTo(depthUnder(target), sink);
     }
-    Level &innermost = levels_.back();
-    if (!innermost.named) {
-        innermost.named = true;
-        blocks[innermost.block].name = name;
+    std::uint32_t level = levels_[target].shownParent;
+    for (toOpen_.clear(); level != none && !isOpenInSink(level); level = levels_[level].shownParent) {
+        toOpen_.push_back(level);
     }
-    return innermost.block;
+    closeDownTo(depthUnder(level), sink);
+    for (std::size_t i = toOpen_.size(); i-- > 0;) {
+        openInSink(toOpen_[i], sink);
+    }
+    openInSink(target, sink);
+}
+
+void BlockTracker::openInSink(std::uint32_t level, Sink &sink) {
+    makeRoom(shown_, shownDepth_ + std::size_t{1});
+    BlockView &view = views_[level];
+    view.continued = levels_[level].wasShown;
+    levels_[level].wasShown = true;
+    shown_[shownDepth_++] = view;
+    sink.blockOpened(view);
+}
+
+void BlockTracker::closeDownTo(std::uint32_t depth, Sink &sink) {
+    while (shownDepth_ > depth) {
+        sink.blockClosed(shown_[--shownDepth_]);
+    }
 }
 
 } // namespace netfloor

@@ -2,36 +2,101 @@
 // Keeps track of the blocks in which fields stand, from what a host sees of them when a field is reported:
 // the name of the innermost block, and where each open block began. Two blocks without a name of their own that begin
 // at the same bit cannot be told apart, and count as one.
+//
+// It also decides how they are shown; netfloor-host/sink.h describes the rules.
 #pragma once
 
 #include <cstddef>
 #include <cstdint>
+#include <span>
 #include <string_view>
 #include <vector>
 
 #include <netfloor/records.h>
 
-#include "netfloor-host/reports.h"
+#include "field_names.h"
+#include "netfloor-host/sink.h"
 
 namespace netfloor {
 
 class BlockTracker {
 public:
-    // The innermost open block, as an index of `blocks`, to which blocks not seen before are added.
-    std::size_t current(const DecodeState &state, std::vector<Block> &blocks);
+    explicit BlockTracker(FieldNames &names);
+
+    // Before a packet.
+    void reset();
+
+    // Moves to the block in which the field stands that is being reported; the sink gets the blocks that are closed and
+    // opened on the way. The cost is that of the blocks that changed.
+    void moveTo(const DecodeState &state, NamedField &field, Sink &sink) {
+        const auto depth = static_cast<std::uint32_t>(state.blockStarts.top - state.blockStarts.base);
+        if (!isKnown(depth, *state.blockStarts.top)) {
+            change(state, depth, field, sink);
+        } else if (depth != depth_) {
+            depth_ = depth;
+            show(sink);
+        }
+        lastCursor_ = state.cursor;
+    }
+
+    // After the last field.
+    void closeAll(Sink &sink) { closeDownTo(0, sink); }
+
+    [[nodiscard]] std::span<const BlockView> open() const { return {views_.data(), depth_}; }
+    [[nodiscard]] std::uint32_t shownDepth() const { return shownDepth_; }
 
 private:
+    static constexpr std::uint32_t none = static_cast<std::uint32_t>(-1);
+
+    // What belongs to an open block beside its view. Blocks are given by their place among the open ones.
     struct Level {
-        std::uint32_t firstBit;
-        std::size_t block;
-        bool named;
+        bool hasField = false;        // a field stood directly in it, so that its name is known
+        bool wasShown = false;        // opened in the sink
+        bool isInChain = false;       // `chainParent` tells where links are shown
+        std::uint32_t limitDepth = 0; // limits open when it was first seen
+        std::uint32_t shownParent = none;
+        std::uint32_t chainParent = none;
     };
 
-    void open(std::uint32_t firstBit, std::vector<Block> &blocks);
-    [[nodiscard]] std::size_t levelsKept(const DecodeState &state, std::size_t depth) const;
+    // Whether the block at this depth, which begins at this bit, is one in which a field stood before. What is opened
+    // after a field begins at or after the cursor of that call. So a block that begins in front of it is the same as
+    // then, and so are all around it.
+    [[nodiscard]] bool isKnown(std::uint32_t depth, std::uint32_t firstBit) const {
+        return depth != 0 && depth <= depth_ && firstBit < lastCursor_ && views_[depth - 1].firstBit == firstBit &&
+               levels_[depth - 1].hasField;
+    }
 
-    std::vector<Level> levels_;
+    void change(const DecodeState &state, std::uint32_t depth, NamedField &field, Sink &sink);
+    [[nodiscard]] std::uint32_t levelsKept(const DecodeState &state, std::uint32_t depth) const;
+    void open(std::uint32_t firstBit, std::uint32_t limitDepth);
+    [[nodiscard]] bool beginsWithItsParent(std::uint32_t level) const;
+    void name(std::string_view name);
+    void show(Sink &sink);
+    void openInSink(std::uint32_t level, Sink &sink);
+    void closeDownTo(std::uint32_t depth, Sink &sink);
+    [[nodiscard]] bool isShown(std::uint32_t level) const {
+        return levels_[level].hasField && !views_[level].name.empty();
+    }
+    [[nodiscard]] bool isOpenInSink(std::uint32_t level) const {
+        const BlockView &view = views_[level];
+        return view.depth < shownDepth_ && shown_[view.depth].number == view.number;
+    }
+    [[nodiscard]] std::uint32_t depthUnder(std::uint32_t shownParent) const {
+        return shownParent == none ? 0 : views_[shownParent].depth + 1;
+    }
+
+    FieldNames &names_;
+
+    // Room that only grows, and how much of it is in use.
+    std::vector<BlockView> views_; // of the open blocks, the outermost first
+    std::vector<Level> levels_;    // the same
+    std::vector<BlockView> shown_; // those that are open in the sink
+    std::uint32_t depth_ = 0;
+    std::uint32_t shownDepth_ = 0;
+
+    std::vector<std::uint32_t> toOpen_;
     std::uint32_t lastCursor_ = 0;
+    std::uint32_t nextNumber_ = 0;
 };
 
 } // namespace netfloor

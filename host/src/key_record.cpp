@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
 #include "key_record.h"
 
-#include <algorithm>
+#include <bit>
 #include <cstring>
 
 namespace netfloor {
@@ -32,15 +32,15 @@ std::uint32_t loadAs(KeyType type, const std::uint8_t *place) {
 
 // The octets of an address. None where it did not fit, or where later addresses have come over it: what was
 // stored whole ends in front of the offset at which the pass left off.
-std::vector<std::uint8_t> loadOctets(const std::uint8_t *record, const std::uint8_t *place,
-                                     std::uint16_t byteAreaOffset) {
+std::span<const std::uint8_t> loadOctets(const std::uint8_t *record, const std::uint8_t *place,
+                                         std::uint16_t byteAreaOffset) {
     const std::uint32_t bits = loadNumber<std::uint16_t>(place);
     const std::uint32_t from = loadNumber<std::uint16_t>(place + sizeof(std::uint16_t));
     const std::uint32_t octets = (bits + bitsPerOctet - 1) / bitsPerOctet;
     if (from + octets > byteAreaOffset) {
         return {};
     }
-    return {record + from, record + from + octets};
+    return {record + from, octets};
 }
 
 } // namespace
@@ -55,30 +55,29 @@ void KeyRecord::layOut(std::span<KeyFieldRow> table) {
     }
 }
 
-// The room for addresses is left as it comes: it is large, and of it only what was stored is read.
-KeyRecord::KeyRecord() : octets_(std::make_unique_for_overwrite<std::uint8_t[]>(recordOctets)) {
-    std::fill(octets_.get() + presenceStart, octets_.get() + recordOctets, std::uint8_t{0});
+KeyRecord::KeyRecord() : octets_(std::make_unique<std::uint8_t[]>(recordOctets)) {}
+
+void KeyRecord::reset() {
+    std::memset(octets_.get() + presenceStart, 0, presenceOctets);
 }
 
-std::vector<KeyValue> KeyRecord::values(std::span<const KeyFieldRow> table, std::span<const KeyType> types,
-                                        std::uint16_t byteAreaOffset) const {
-    std::vector<KeyValue> values;
-    for (std::size_t number = 0; number < table.size(); ++number) {
-        const KeyFieldRow &row = table[number];
-        if ((octets_[row.presenceOffset] & row.presenceMask) == 0) {
-            continue;
-        }
-        KeyValue &value = values.emplace_back();
-        const std::uint8_t *const place = octets_.get() + row.valueOffset;
-        value.name = row.fieldName;
-        value.row = static_cast<std::uint32_t>(number);
-        value.type = types[number];
-        value.number = loadAs(value.type, place);
-        if (value.type == KeyType::ipv6Address) {
-            value.octets = loadOctets(octets_.get(), place, byteAreaOffset);
+void KeyRecord::report(std::span<const KeyColumn> columns, std::uint16_t byteAreaOffset, Sink &sink) const {
+    const std::uint8_t *const record = octets_.get();
+    for (std::size_t octet = 0; octet * bitsPerOctet < columns.size(); ++octet) {
+        for (std::uint32_t present = record[presenceStart + octet]; present != 0; present &= present - 1) {
+            const std::size_t row = octet * bitsPerOctet + static_cast<std::size_t>(std::countr_zero(present));
+            const std::uint8_t *const place = record + valueStart + row * valueOctets;
+            const auto &[name, type] = columns[row];
+            const bool isAddress = type == KeyType::ipv6Address;
+            sink.key({
+                .name = name,
+                .row = static_cast<std::uint32_t>(row),
+                .type = type,
+                .number = loadAs(type, place),
+                .octets = isAddress ? loadOctets(record, place, byteAreaOffset) : std::span<const std::uint8_t>(),
+            });
         }
     }
-    return values;
 }
 
 } // namespace netfloor

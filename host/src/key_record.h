@@ -2,20 +2,26 @@
 // The key record: where the XTR pass stores the values of a packet's key fields.
 //
 // A plug-in writes an address at any 16-bit offset of the record and has no bound but the room for one, so
-// the first 128 KiB belong to addresses. Presence bits and values stand behind them, out of its way.
+// the first 128 KiB belong to addresses. Presence bits and values stand after them, out of its way.
 #pragma once
 
 #include <cstddef>
 #include <cstdint>
 #include <memory>
 #include <span>
-#include <vector>
+#include <string_view>
 
 #include <netfloor/records.h>
 
-#include "netfloor-host/reports.h"
+#include "netfloor-host/sink.h"
 
 namespace netfloor {
+
+// What a row of the key-field table holds.
+struct KeyColumn {
+    std::string_view name;
+    KeyType type = KeyType::number32;
+};
 
 class KeyRecord {
 public:
@@ -27,12 +33,14 @@ public:
 
     KeyRecord();
 
+    // Before a packet: no row is present. Of the rest only what was stored is read.
+    void reset();
+
     [[nodiscard]] std::uint8_t *octets() { return octets_.get(); }
 
-    // The rows that are marked present, `types` those of all rows. `byteAreaOffset` is that of the context behind
-    // the pass.
-    [[nodiscard]] std::vector<KeyValue> values(std::span<const KeyFieldRow> table, std::span<const KeyType> types,
-                                               std::uint16_t byteAreaOffset) const;
+    // Reports the rows that are marked present, of a table with these columns. `byteAreaOffset` is that of the context
+    // after the pass.
+    void report(std::span<const KeyColumn> columns, std::uint16_t byteAreaOffset, Sink &sink) const;
 
 private:
     std::unique_ptr<std::uint8_t[]> octets_;

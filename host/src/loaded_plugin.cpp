@@ -145,23 +145,56 @@ std::int32_t LoadedPlugin::initialise(KeyFieldRow *table, std::uint32_t rowCount
     const std::vector<std::int32_t> &results = keySetUp.results;
     const std::int32_t result = results.empty() ? 1 : results[std::min<std::size_t>(keySetUpCalls, results.size() - 1)];
     ++keySetUpCalls;
+    keysAreSettled_ = result != 0 || rowCount > KeyRecord::mostRows;
     if (rowCount > KeyRecord::mostRows) {
         return -1;
     }
     if (result > 0) {
         KeyRecord::layOut({table, rowCount});
         keyTable_ = {table, rowCount};
-        keyTypes_ = keyTypesOf(keyTable_, getTable);
+        keyColumns_.clear();
+        for (const KeyType type : keyTypesOf(keyTable_, getTable)) {
+            keyColumns_.push_back({keyTable_[keyColumns_.size()].fieldName, type});
+        }
         *presenceRow = keySetUp.presenceRow;
     }
     return result;
 }
 
 std::int32_t LoadedPlugin::enterExtract(XtrContext *context) {
+    if (keysAreSettled_) {
+        return extract(context);
+    }
     netfloor_setKeyOptions(this);
     const std::int32_t result = extract(context);
     netfloor_setKeyOptions(nullptr);
     return result;
+}
+
+// Of a nested pass the user is this thread, and it alone touches what is not atomic.
+PluginUse::PluginUse(LoadedPlugin &plugin) : plugin_(plugin) {
+    thread_local const char mark = 0;
+    const void *user = nullptr;
+    isOutermost_ = plugin_.user_.compare_exchange_strong(user, &mark, std::memory_order_acquire);
+    if (!isOutermost_ && user != &mark) {
+        throw PluginBusy("the plug-in " + plugin_.path().string() +
+                         " is at work in another thread, and it serves one packet at a time. Give each thread a Host "
+                         "of its own, with a copy of the plug-in by PluginLibrary::openCopy.");
+    }
+    if (!isOutermost_ && !plugin_.isHandingOff_) {
+        throw PluginBusy("the plug-in " + plugin_.path().string() +
+                         " is in the middle of a packet. A sink cannot run it: keep what the other packet is needed "
+                         "for until this one is through, or use a copy by PluginLibrary::openCopy.");
+    }
+    plugin_.isHandingOff_ = false;
+}
+
+PluginUse::~PluginUse() {
+    if (isOutermost_) {
+        plugin_.user_.store(nullptr, std::memory_order_release);
+    } else {
+        plugin_.isHandingOff_ = true;
+    }
 }
 
 PluginLibrary::PluginLibrary(std::shared_ptr<LoadedPlugin> loaded) : loaded_(std::move(loaded)) {}

@@ -2,6 +2,7 @@
 // One load of a plug-in in this process, and the set-up of its key-field table.
 #pragma once
 
+#include <atomic>
 #include <filesystem>
 #include <span>
 #include <vector>
@@ -23,14 +24,14 @@ public:
 
     std::int32_t initialise(KeyFieldRow *table, std::uint32_t rowCount, std::uint16_t *presenceRow) noexcept override;
 
-    // The XTR entry, with this plug-in named to libhx_KeyOptions.
+    // The XTR entry, with this plug-in named to libhx_KeyOptions as long as it may ask for its set-up.
     [[nodiscard]] std::int32_t enterExtract(XtrContext *context);
 
     [[nodiscard]] void *handle() const { return handle_; }
     [[nodiscard]] const std::filesystem::path &path() const { return path_; }
     [[nodiscard]] void *find(const char *exportName) const;
     [[nodiscard]] std::span<const KeyFieldRow> keyTable() const { return keyTable_; }
-    [[nodiscard]] const std::vector<KeyType> &keyTypes() const { return keyTypes_; } // of its rows
+    [[nodiscard]] std::span<const KeyColumn> keyColumns() const { return keyColumns_; } // of its rows
 
     NetfloorPreDecode preDecodeMD = nullptr;
     NetfloorPreDecode preDecodeTO = nullptr;
@@ -48,7 +49,42 @@ private:
     int descriptor_;
     void *handle_;
     std::span<const KeyFieldRow> keyTable_;
-    std::vector<KeyType> keyTypes_;
+    std::vector<KeyColumn> keyColumns_;
+    bool keysAreSettled_ = false; // the plug-in does not ask again
+
+    friend class PluginUse;
+    friend class OwnerTurn;
+    std::atomic<const void *> user_ = nullptr; // the thread that is running a pass, by the address of a mark of its own
+    bool isHandingOff_ = false;                // the user's: its innermost pass waits for the owner of a next layer
+};
+
+// The right to run a pass, held from its start to its end. Throws PluginBusy where another pass is running, unless that
+// one waits in this thread for the owner of a next layer.
+class PluginUse {
+public:
+    explicit PluginUse(LoadedPlugin &plugin);
+    ~PluginUse();
+    PluginUse(const PluginUse &) = delete;
+    PluginUse &operator=(const PluginUse &) = delete;
+
+private:
+    LoadedPlugin &plugin_;
+    bool isOutermost_ = false;
+};
+
+// The time in which a pass waits for the owner of a next layer.
+class OwnerTurn {
+public:
+    explicit OwnerTurn(LoadedPlugin &plugin) : plugin_(plugin), before_(plugin.isHandingOff_) {
+        plugin_.isHandingOff_ = true;
+    }
+    ~OwnerTurn() { plugin_.isHandingOff_ = before_; }
+    OwnerTurn(const OwnerTurn &) = delete;
+    OwnerTurn &operator=(const OwnerTurn &) = delete;
+
+private:
+    LoadedPlugin &plugin_;
+    bool before_;
 };
 
 } // namespace netfloor

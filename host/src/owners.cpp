@@ -2,7 +2,8 @@
 #include "netfloor-host/owners.h"
 
 #include <algorithm>
-#include <string>
+#include <array>
+#include <charconv>
 
 #include "packet_run.h"
 
@@ -14,16 +15,43 @@ constexpr std::uint32_t protocolNumbers = 256;
 constexpr std::uint32_t sctpProtocol = 132;
 constexpr std::uint32_t hostsOwnDecoder = 0;
 
-std::string octetsText(std::uint32_t bits) {
-    const std::uint32_t octets = bits / bitsPerOctet;
-    const std::uint32_t rest = bits % bitsPerOctet;
-    return std::to_string(octets) + (octets == 1 ? " octet" : " octets") +
-           (rest == 0 ? "" : " and " + std::to_string(rest) + " bits");
-}
+// "Data=12 octets", "Data - 3 octets and 4 bits", without storage of its own.
+class DataText {
+public:
+    DataText(std::string_view start, std::uint32_t bits) {
+        const std::uint32_t octets = bits / bitsPerOctet;
+        const std::uint32_t rest = bits % bitsPerOctet;
+        append(start);
+        append(octets);
+        append(octets == 1 ? " octet" : " octets");
+        if (rest != 0) {
+            append(" and ");
+            append(rest);
+            append(" bits");
+        }
+    }
+
+    [[nodiscard]] std::string_view view() const { return {text_.data(), size_}; }
+
+private:
+    void append(std::string_view text) { size_ += text.copy(text_.data() + size_, text_.size() - size_); }
+    void append(std::uint32_t number) {
+        size_ = static_cast<std::size_t>(std::to_chars(text_.data() + size_, text_.data() + text_.size(), number).ptr -
+                                         text_.data());
+    }
+
+    std::array<char, 64> text_;
+    std::size_t size_ = 0;
+};
 
 void takeBitsAsData(NextLayer &next, std::uint32_t bits) {
-    if (bits > 0) {
-        next.take(bits, "data", "Data=" + octetsText(bits), "Data - " + octetsText(bits));
+    if (bits == 0) {
+        return;
+    }
+    switch (next.pass()) {
+    case Pass::md: return next.take(bits, "data", DataText("Data=", bits).view(), {});
+    case Pass::to: return next.take(bits, "data", {}, DataText("Data - ", bits).view());
+    default: return next.consume(bits);
     }
 }
 
@@ -73,11 +101,11 @@ std::optional<std::uint32_t> NextLayer::ipProtocol() const {
 }
 
 std::span<const std::uint8_t> NextLayer::packet() const {
-    return run_.packet_.packet();
+    return run_.packet_;
 }
 
 std::span<const std::uint8_t> NextLayer::payload() const {
-    const DecodeState &state = run_.packet_.state();
+    const DecodeState &state = run_.state();
     const std::size_t first = (state.cursor - 1 + bitsPerOctet - 1) / bitsPerOctet;
     const std::size_t skippedBits = first * bitsPerOctet - (state.cursor - 1);
     if (first >= packet().size() || skippedBits > state.bitsLeft) {
@@ -87,15 +115,11 @@ std::span<const std::uint8_t> NextLayer::payload() const {
 }
 
 std::uint32_t NextLayer::bitsLeft() const {
-    return run_.packet_.state().bitsLeft;
-}
-
-const Report &NextLayer::soFar() const {
-    return run_.report_;
+    return run_.state().bitsLeft;
 }
 
 DecodeState &NextLayer::state() {
-    return run_.packet_.state();
+    return run_.state();
 }
 
 PreDecodeContext *NextLayer::preDecodeContext() {

@@ -3,15 +3,14 @@
 
 #include <algorithm>
 #include <string>
-#include <tuple>
 #include <utility>
 
 namespace netfloor {
 namespace {
 
 constexpr std::int32_t refusal = -1;
-constexpr std::uint8_t untouchedOctet = 0xff;
-constexpr std::size_t usualFields = 48; // an IP and a transport header
+constexpr std::size_t usualLayers = 8;
+constexpr std::uint16_t addressRoom = 64; // for one address, which takes 17 octets
 
 std::uint32_t modeOf(Pass pass) {
     switch (pass) {
@@ -21,44 +20,87 @@ std::uint32_t modeOf(Pass pass) {
     }
 }
 
-// A plug-in that gives no text means an empty one.
-std::string_view textOf(const char *text) {
-    return text == nullptr ? std::string_view() : std::string_view(text);
+Ending endingOf(std::int32_t result) {
+    if (result == 0) {
+        return Ending::cutOff;
+    }
+    return result > 0 ? Ending::complete : Ending::keysDenied;
+}
+
+std::string_view withoutLeadingBlanks(std::string_view name) {
+    name.remove_prefix(std::min(name.find_first_not_of(' '), name.size()));
+    return name;
 }
 
 } // namespace
 
-PacketRun::PacketRun(LoadedPlugin &plugin, const OwnerRegistry &owners, Pass pass, std::span<const std::uint8_t> packet,
-                     const RunOptions &options)
-    : plugin_(plugin), owners_(owners), pass_(pass), options_(options), packet_(packet, options.state) {
-    report_.pass = pass;
-    if (pass == Pass::xtr) {
-        xtr_.keyRecord = keyRecord_.emplace().octets();
-        xtr_.byteAreaSize = options.byteAreaSize;
-        xtr_.decodeState = &packet_.state();
-        return;
-    }
-    layerInfo_.resize(std::size_t{options.layerInfoCapacity} + 1);
+PacketRun::PacketRun(LoadedPlugin &plugin, FieldNames &names)
+    : plugin_(plugin), names_(names), reused_({}), layerInfo_(usualLayers), blocks_(names) {
     preDecode_.operations = this;
-    PreDecodeContext &context = preDecode_.context;
-    context.layerNumber = options.layerNumber;
-    context.decoderId = options.decoderId;
-    context.fieldRecords = fieldRecords_.data();
-    context.layerInfo = layerInfo_.data();
-    context.layerInfoCapacity = options.layerInfoCapacity;
-    context.decodeState = &packet_.state();
-    markFieldRecord();
-    report_.fields.reserve(pass == Pass::md ? usualFields : 0);
-    report_.displays.reserve(pass == Pass::to ? usualFields : 0);
 }
 
-Report PacketRun::run() {
-    report_.result = enter();
+Ending PacketRun::run(Pass pass, std::span<const std::uint8_t> packet, const OwnerRegistry &owners, Sink &sink,
+                      const RunOptions &options, const TestRunOptions *test) {
+    pass_ = pass;
+    owners_ = &owners;
+    sink_ = &sink;
+    options_ = options;
+    prepare(packet, test);
+    sink.begin(pass, packet);
+    const std::int32_t result = enter();
     if (exception_) {
         std::rethrow_exception(exception_);
     }
-    finish();
-    return std::move(report_);
+    return finish(result);
+}
+
+void PacketRun::prepare(std::span<const std::uint8_t> packet, const TestRunOptions *test) {
+    packet_ = packet;
+    exception_ = nullptr;
+    handOffDepth_ = 0;
+    reentries_ = 0;
+    followStop_ = test == nullptr || test->followStop;
+    if (test == nullptr) {
+        reused_.reset(packet);
+        state_ = &reused_.state();
+    } else {
+        state_ = &exact_.emplace(packet, test->state).state();
+    }
+    if (pass_ == Pass::xtr) {
+        prepareKeyContext(test);
+    } else {
+        prepareContext(test);
+    }
+}
+
+void PacketRun::prepareContext(const TestRunOptions *test) {
+    if (test != nullptr) {
+        layerInfo_ = std::vector<LayerInfoRecord>(std::size_t{test->layerInfoCapacity} + 1);
+    }
+    PreDecodeContext &context = preDecode_.context;
+    context.bitsLeft = 0;
+    context.layerNumber = options_.layerNumber;
+    context.decoderId = options_.decoderId;
+    context.verdict = 0;
+    context.fieldRecords = fieldRecords_.data();
+    context.fieldRecordCount = 0;
+    context.layerInfo = layerInfo_.data();
+    context.layerInfoCount = 0;
+    context.layerInfoCapacity = static_cast<std::uint32_t>(layerInfo_.size() - 1);
+    context.decodeState = &state();
+    if (pass_ == Pass::md) {
+        blocks_.reset();
+        markFieldRecord();
+    }
+}
+
+void PacketRun::prepareKeyContext(const TestRunOptions *test) {
+    keyRecord_.reset();
+    xtr_.bitsLeft = 0;
+    xtr_.keyRecord = keyRecord_.octets();
+    xtr_.byteAreaOffset = 0;
+    xtr_.byteAreaSize = test == nullptr ? addressRoom : test->byteAreaSize;
+    xtr_.decodeState = &state();
 }
 
 std::int32_t PacketRun::enter() {
@@ -74,13 +116,13 @@ std::int32_t PacketRun::enter() {
 // The XTR pass stops at a hand-off, and it is for the host to go on with the owner.
 std::int32_t PacketRun::enterExtract() {
     const std::int32_t result = plugin_.enterExtract(&xtr_);
-    if (result != 1 || packet_.state().layerHandedOff == 0 || !options_.followStop) {
+    if (result != 1 || state().layerHandedOff == 0 || !followStop_) {
         return result;
     }
     if (handOff() == Handled::refused) {
         return 0;
     }
-    xtr_.bitsLeft = packet_.state().bitsLeft;
+    xtr_.bitsLeft = state().bitsLeft;
     return result;
 }
 
@@ -95,6 +137,9 @@ bool PacketRun::enterFromOwner() {
 }
 
 std::int32_t PacketRun::preDecode(std::uint32_t mode) noexcept {
+    if (exception_) {
+        return refusal;
+    }
     try {
         if (mode != modeOf(pass_)) {
             throw PluginError("the plug-in " + plugin_.path().string() + " hands on in mode " + std::to_string(mode) +
@@ -110,24 +155,27 @@ std::int32_t PacketRun::preDecode(std::uint32_t mode) noexcept {
 Handled PacketRun::handOff() {
     HandOff record = describeHandOff();
     NextLayer next(*this);
+    const OwnerTurn turn(plugin_);
     ++handOffDepth_;
-    const Handled handled = owners_.find(next.key(), next.ipProtocol())(next);
+    const Handled handled = owners_->find(next.key(), next.ipProtocol())(next);
     --handOffDepth_;
-    record.consumedBits = packet_.state().cursor - record.cursor;
+    record.consumedBits = state().cursor - record.cursor;
     record.refused = handled == Handled::refused;
-    report_.handOffs.push_back(record);
+    if (!exception_) {
+        sink_->handOff(record);
+    }
     return handled;
 }
 
 HandOff PacketRun::describeHandOff() const {
-    const DecodeState &state = packet_.state();
+    const DecodeState &state = *state_;
     HandOff record;
     record.key = frame().nextLayerKey;
     record.protocol = frame().nextLayerProtocol;
     record.port = state.scratch[NETFLOOR_NEXT_LAYER_PORT];
     record.nextLayerOctets = state.scratch[NETFLOOR_NEXT_LAYER_OCTETS];
     record.precedingOctets = state.scratch[NETFLOOR_PRECEDING_OCTETS];
-    record.layerNumber = preDecode_.context.layerNumber;
+    record.layerNumber = pass_ == Pass::xtr ? 0 : preDecode_.context.layerNumber;
     record.layerIndex = state.layerIndex;
     record.cursor = state.cursor;
     record.bitsLeft = state.bitsLeft;
@@ -138,44 +186,44 @@ HandOff PacketRun::describeHandOff() const {
     return record;
 }
 
-const LayerFrame &PacketRun::frame() const {
-    return packet_.state().layerFrames[packet_.state().layerIndex];
-}
-
 void PacketRun::addField(std::uint32_t outputRangeCount, const BitRange *ranges, const char *display,
                          const char *fieldName, std::uint32_t fieldId, std::uint32_t bitOrder) noexcept {
+    if (exception_) {
+        return;
+    }
     try {
-        PreDecodeContext &context = preDecode_.context;
-        const std::uint8_t *const head = context.fieldRecords + context.fieldRecordCount * fieldRecordOctets;
-        FieldReport &field = report_.fields.emplace_back();
-        field.id = fieldId;
-        field.name = textOf(fieldName);
-        field.text = textOf(display);
-        field.value = packet_.state().fieldRecord.value;
-        field.ranges.reserve(outputRangeCount);
-        for (std::uint32_t i = 0; i < outputRangeCount; ++i) {
-            field.ranges.push_back({ranges[i].value, ranges[i].firstBit, ranges[i].lastBit});
-        }
-        field.bitOrder = bitOrder;
-        field.flags = packet_.state().flags;
-        field.block = blocks_.current(packet_.state(), report_.blocks);
-        std::copy_n(head, field.recordHead.size(), field.recordHead.begin());
-        context.fieldRecordCount = (context.fieldRecordCount + 1) % fieldRecordCount;
+        NamedField &field = names_.find(fieldId);
+        blocks_.moveTo(state(), field, *sink_);
+        const std::uint8_t *const head = fieldRecordHead();
+        const LazyText reportedName(fieldName);
+        sink_->field({
+            .id = fieldId,
+            .name = field.isKnown ? field.name : withoutLeadingBlanks(reportedName.view()),
+            .isKey = field.isKey,
+            .text = LazyText(display),
+            .reportedName = reportedName,
+            .value = state().fieldRecord.value,
+            .ranges = {ranges, outputRangeCount},
+            .bitOrder = bitOrder,
+            .flags = state().flags,
+            .depth = blocks_.shownDepth(),
+            .blocks = blocks_.open(),
+            .recordHead = {head[0], head[1], head[2]},
+        });
+        preDecode_.context.fieldRecordCount = (preDecode_.context.fieldRecordCount + 1) % fieldRecordCount;
         markFieldRecord();
     } catch (...) {
         keepException();
     }
 }
 
-// Marks the head of the current field record, so that what the plug-in leaves alone can be told.
-void PacketRun::markFieldRecord() {
-    std::fill_n(preDecode_.context.fieldRecords + preDecode_.context.fieldRecordCount * fieldRecordOctets,
-                std::tuple_size_v<decltype(FieldReport::recordHead)>, untouchedOctet);
-}
-
 void PacketRun::addDisplay(const char *display, std::uint32_t displayId) noexcept {
+    if (exception_) {
+        return;
+    }
     try {
-        report_.displays.push_back({displayId, std::string(textOf(display)), preDecode_.context.layerNumber});
+        const NamedField &field = names_.find(displayId);
+        sink_->text({displayId, field.name, field.isKey, LazyText(display), preDecode_.context.layerNumber});
     } catch (...) {
         keepException();
     }
@@ -195,29 +243,39 @@ void PacketRun::openLayer(std::uint32_t decoderId) {
     if (context.layerInfoCount > context.layerInfoCapacity) {
         growLayerInfo();
     }
-    context.layerInfo[context.layerInfoCount] = {packet_.state().cursor, 0, decoderId, context.layerNumber};
+    context.layerInfo[context.layerInfoCount] = {state().cursor, 0, decoderId, context.layerNumber};
 }
 
 void PacketRun::closeLayer() {
     PreDecodeContext &context = preDecode_.context;
-    context.layerInfo[context.layerInfoCount].lastBit = packet_.state().cursor - 1;
+    context.layerInfo[context.layerInfoCount].lastBit = state().cursor - 1;
     ++context.layerInfoCount;
 }
 
 void PacketRun::addOwnEntry(std::uint32_t bits, std::string_view name, std::string_view longText,
                             std::string_view shortText) {
-    const DecodeState &state = packet_.state();
+    if (exception_) {
+        return;
+    }
     if (pass_ == Pass::md) {
-        FieldReport field;
-        field.name = name;
-        field.text = longText;
-        field.ranges.push_back({0, state.cursor, state.cursor + bits - 1});
-        field.flags = state.flags;
-        field.block = blocks_.current(state, report_.blocks);
-        field.recordHead = {preDecode_.context.layerNumber, 0, 0};
-        report_.fields.push_back(std::move(field));
+        const BitRange range = {0, state().cursor, state().cursor + bits - 1, 0, {}};
+        blocks_.moveTo(state(), names_.find(0), *sink_);
+        sink_->field({
+            .id = 0,
+            .name = name,
+            .isKey = false,
+            .text = LazyText(longText),
+            .reportedName = LazyText(name),
+            .value = 0,
+            .ranges = {&range, 1},
+            .bitOrder = 0,
+            .flags = state().flags,
+            .depth = blocks_.shownDepth(),
+            .blocks = blocks_.open(),
+            .recordHead = {preDecode_.context.layerNumber, 0, 0},
+        });
     } else if (pass_ == Pass::to) {
-        report_.displays.push_back({0, std::string(shortText), preDecode_.context.layerNumber});
+        sink_->text({0, name, false, LazyText(shortText), preDecode_.context.layerNumber});
     }
 }
 
@@ -227,41 +285,25 @@ void PacketRun::keepException() noexcept {
     }
 }
 
-void PacketRun::finish() {
-    const DecodeState &state = packet_.state();
+Ending PacketRun::finish(std::int32_t result) {
     const PreDecodeContext &context = preDecode_.context;
-    report_.cursor = state.cursor;
-    report_.flags = state.flags;
-    report_.stateBitsLeft = state.bitsLeft;
-    report_.blockDepth = depthOf(state.blockStarts);
-    report_.limitDepth = depthOf(state.limits);
-    report_.layerIndex = state.layerIndex;
-    report_.layerHandedOff = state.layerHandedOff != 0;
-    report_.condition = state.condition != 0;
-    std::ranges::copy(state.scratch, report_.scratch.begin());
-    report_.ending = report_.result > 0 ? Ending::complete : report_.result == 0 ? Ending::cutOff : Ending::keysDenied;
+    const Ending ending = endingOf(result);
     if (pass_ == Pass::xtr) {
-        report_.bitsLeft = xtr_.bitsLeft;
-        report_.keys = keyRecord_->values(plugin_.keyTable(), plugin_.keyTypes(), xtr_.byteAreaOffset);
-        return;
+        keyRecord_.report(plugin_.keyColumns(), xtr_.byteAreaOffset, *sink_);
+        sink_->end({pass_, ending, result, xtr_.bitsLeft, {}, 0, 0, state()});
+        return ending;
     }
-    report_.bitsLeft = context.bitsLeft;
-    report_.layerNumber = context.layerNumber;
-    report_.decoderId = context.decoderId;
+    Verdict verdict;
     if (pass_ == Pass::mv) {
-        report_.verdict = {context.verdict, state.flags};
-        return;
+        verdict = {context.verdict, state().flags};
+    } else {
+        blocks_.closeAll(*sink_);
+        for (const LayerInfoRecord &layer : std::span(context.layerInfo, context.layerInfoCount)) {
+            sink_->layer({layer.firstBit, layer.lastBit, layer.decoderId, layer.layerNumber});
+        }
     }
-    for (std::uint32_t i = 0; i < context.layerInfoCount; ++i) {
-        const LayerInfoRecord &layer = context.layerInfo[i];
-        report_.layers.push_back({layer.firstBit, layer.lastBit, layer.decoderId, layer.layerNumber});
-    }
-}
-
-Host::Host(PluginLibrary library) : library_(std::move(library)) {}
-
-Report Host::run(Pass pass, std::span<const std::uint8_t> packet, const RunOptions &options) {
-    return PacketRun(*library_.loaded_, owners_, pass, packet, options).run();
+    sink_->end({pass_, ending, result, context.bitsLeft, verdict, context.layerNumber, context.decoderId, state()});
+    return ending;
 }
 
 } // namespace netfloor

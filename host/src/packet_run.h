@@ -1,32 +1,39 @@
 // SPDX-License-Identifier: MIT
-// One pass over one packet: what stands behind the plug-in's calls while it runs.
+// One pass over one packet at a time: what answers the plug-in's calls while it runs. The storage is kept from packet
+// to packet.
 #pragma once
 
 #include <array>
 #include <cstdint>
+#include <cstring>
 #include <exception>
+#include <memory>
 #include <optional>
 #include <span>
 #include <string_view>
+#include <tuple>
 #include <vector>
 
 #include "block_tracker.h"
+#include "field_names.h"
 #include "key_record.h"
 #include "links.h"
 #include "loaded_plugin.h"
-#include "netfloor-host/host.h"
+#include "netfloor-host/plugin_host.h"
+#include "netfloor-host/testing.h"
 
 namespace netfloor {
 
 class PacketRun final : public standin::RunOperations {
 public:
-    PacketRun(LoadedPlugin &plugin, const OwnerRegistry &owners, Pass pass, std::span<const std::uint8_t> packet,
-              const RunOptions &options);
+    PacketRun(LoadedPlugin &plugin, FieldNames &names);
 
-    [[nodiscard]] Report run();
+    // `test`, if there is one, is `options` as well.
+    Ending run(Pass pass, std::span<const std::uint8_t> packet, const OwnerRegistry &owners, Sink &sink,
+               const RunOptions &options, const TestRunOptions *test);
 
-    // What the plug-in calls, by way of the stand-ins. No exception may pass the plug-in, so each is kept until
-    // it has returned.
+    // What the plug-in calls, by way of the stand-ins. No exception may pass the plug-in, so the first is kept until
+    // it has returned. Nothing is reported after it.
     void addField(std::uint32_t outputRangeCount, const BitRange *ranges, const char *display, const char *fieldName,
                   std::uint32_t fieldId, std::uint32_t bitOrder) noexcept override;
     void addDisplay(const char *display, std::uint32_t displayId) noexcept override;
@@ -40,35 +47,53 @@ private:
     // once, so that two in turn are enough for a packet of any length.
     static constexpr std::size_t fieldRecordOctets = 1000;
     static constexpr std::uint32_t fieldRecordCount = 2;
+    static constexpr std::size_t headOctets = std::tuple_size_v<decltype(FieldView::recordHead)>;
+    static constexpr std::uint8_t untouchedOctet = 0xff;
 
+    void prepare(std::span<const std::uint8_t> packet, const TestRunOptions *test);
+    void prepareContext(const TestRunOptions *test);
+    void prepareKeyContext(const TestRunOptions *test);
     [[nodiscard]] std::int32_t enter();
     [[nodiscard]] std::int32_t enterExtract();
     [[nodiscard]] bool enterFromOwner();
     [[nodiscard]] Handled handOff();
     [[nodiscard]] HandOff describeHandOff() const;
-    [[nodiscard]] const LayerFrame &frame() const;
+    [[nodiscard]] DecodeState &state() { return *state_; }
+    [[nodiscard]] const DecodeState &state() const { return *state_; }
+    [[nodiscard]] const LayerFrame &frame() const { return state_->layerFrames[state_->layerIndex]; }
     void openLayer(std::uint32_t decoderId);
     void closeLayer();
     void addOwnEntry(std::uint32_t bits, std::string_view name, std::string_view longText, std::string_view shortText);
-    void markFieldRecord();
+    [[nodiscard]] std::uint8_t *fieldRecordHead() {
+        return fieldRecords_.data() + preDecode_.context.fieldRecordCount * fieldRecordOctets;
+    }
+    // Marks the head of the current field record, so that what the plug-in leaves alone can be told.
+    void markFieldRecord() { std::memset(fieldRecordHead(), untouchedOctet, headOctets); }
     void keepException() noexcept;
-    void finish();
+    Ending finish(std::int32_t result);
 
     LoadedPlugin &plugin_;
-    const OwnerRegistry &owners_;
-    Pass pass_;
-    RunOptions options_;
-    PacketState packet_;
-    standin::PreDecodeRun preDecode_ = {};
-    XtrContext xtr_ = {};
-    std::optional<KeyRecord> keyRecord_; // XTR
+    FieldNames &names_;
+    PacketState reused_;
+    std::optional<PacketState> exact_; // of a test
+    KeyRecord keyRecord_;
     std::array<std::uint8_t, fieldRecordCount *fieldRecordOctets> fieldRecords_ = {};
     std::vector<LayerInfoRecord> layerInfo_;
     BlockTracker blocks_;
+
+    // The pass that is going on.
+    Pass pass_ = Pass::md;
+    const OwnerRegistry *owners_ = nullptr;
+    Sink *sink_ = nullptr;
+    RunOptions options_;
+    bool followStop_ = true;
+    std::span<const std::uint8_t> packet_;
+    DecodeState *state_ = nullptr;
+    standin::PreDecodeRun preDecode_ = {};
+    XtrContext xtr_ = {};
     std::uint32_t handOffDepth_ = 0;
     std::uint32_t reentries_ = 0;
     std::exception_ptr exception_;
-    Report report_;
 };
 
 } // namespace netfloor

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-#include "netfloor-host/packet_state.h"
+#include "netfloor-host/testing.h"
 
 #include <algorithm>
 #include <array>
@@ -18,11 +18,15 @@ constexpr std::uint32_t bitsPerOctet = 8;
 constexpr std::size_t mostOctets = std::numeric_limits<std::uint32_t>::max() / bitsPerOctet;
 constexpr std::size_t textOctets = 255;
 
-std::uint32_t checkedBits(std::span<const std::uint8_t> packet, const StateOptions &options) {
+std::uint32_t bitsOf(std::span<const std::uint8_t> packet) {
     if (packet.size() > mostOctets) {
         throw std::invalid_argument("a packet has at most " + std::to_string(mostOctets) + " octets");
     }
-    const auto allBits = static_cast<std::uint32_t>(packet.size() * bitsPerOctet);
+    return static_cast<std::uint32_t>(packet.size() * bitsPerOctet);
+}
+
+std::uint32_t checkedBits(std::span<const std::uint8_t> packet, const StateOptions &options) {
+    const std::uint32_t allBits = bitsOf(packet);
     const std::uint32_t totalBits = options.totalBits.value_or(allBits);
     if (totalBits > allBits) {
         throw std::invalid_argument("totalBits is above the bits that the packet has");
@@ -55,6 +59,12 @@ void setUp(BitStack &stack, std::uint32_t capacity, std::uint32_t bottom, standi
     stack.capacity = capacity;
 }
 
+void clear(BitStack &stack, std::uint32_t bottom) {
+    *stack.base = bottom;
+    stack.top = stack.base;
+    stack.count = 0;
+}
+
 } // namespace
 
 struct PacketState::Storage final : standin::HeapKeeper {
@@ -71,15 +81,10 @@ struct PacketState::Storage final : standin::HeapKeeper {
 
     // Not the constructor: what has been allocated when a later part fails is to be freed.
     void setUpFor(std::span<const std::uint8_t> octets, const StateOptions &options) {
-        packet = octets;
         allowGrowth = options.allowGrowth;
         const std::uint32_t totalBits = checkedBits(octets, options);
-        const std::size_t copied = (std::size_t{totalBits} + bitsPerOctet - 1) / bitsPerOctet;
-        copy = std::make_unique<std::uint8_t[]>(copied);
-        std::copy_n(octets.data(), copied, copy.get());
+        take(octets, (std::size_t{totalBits} + bitsPerOctet - 1) / bitsPerOctet);
 
-        state.data = copy.get();
-        state.sourceData = octets.data();
         state.totalBits = totalBits;
         state.cursor = options.cursor;
         state.bitsLeft = totalBits - (options.cursor - 1);
@@ -96,12 +101,62 @@ struct PacketState::Storage final : standin::HeapKeeper {
         state.fieldRecord.ranges = allocate<BitRange>(options.rangeCapacity, *this);
     }
 
+    // The ranges of the field record are left as they are: a field writes those that count for it.
+    void resetTo(std::span<const std::uint8_t> octets) {
+        const std::uint32_t totalBits = bitsOf(octets);
+        take(octets, octets.size());
+        const std::size_t frames = std::size_t{std::min(state.layerIndex, state.layerCapacity - 1)} + 1;
+        std::memset(state.layerFrames, 0, frames * sizeof *state.layerFrames);
+
+        state.totalBits = totalBits;
+        state.cursor = 1;
+        state.bitsLeft = totalBits;
+        state.flags = 0;
+        clear(state.blockStarts, 1);
+        clear(state.limits, totalBits);
+        state.condition = 0;
+        state.advance = 0;
+        *state.blockName = '\0';
+        // In pieces: a copy of this size as one makes compilers choose a string instruction, which starts slowly.
+        constexpr std::size_t wordsEach = 8;
+        for (std::size_t word = 0; word < std::size(state.scratch); word += wordsEach) {
+            std::memset(state.scratch + word, 0, wordsEach * sizeof *state.scratch);
+        }
+        FieldRecord &record = state.fieldRecord;
+        record.fieldId = 0;
+        *record.fieldName = '\0';
+        record.value = 0;
+        *record.valueText = '\0';
+        record.rangeCount = record.outputRangeCount = 0;
+        record.wideStart = record.wideBits = 0;
+        record.rawFlag = 0;
+        state.layerHandedOff = 1;
+        state.layerIndex = 0;
+    }
+
+    // Copies the octets; the state shows the copy and the original.
+    void take(std::span<const std::uint8_t> octets, std::size_t copied) {
+        if (copied > copyOctets || !copy) {
+            copy.reset(); // room for both is not needed
+            copyOctets = 0;
+            copy = std::make_unique_for_overwrite<std::uint8_t[]>(copied);
+            copyOctets = copied;
+        }
+        if (copied != 0) {
+            std::memcpy(copy.get(), octets.data(), copied);
+        }
+        packet = octets;
+        state.data = copy.get();
+        state.sourceData = octets.data();
+    }
+
     bool allowsGrowth(std::size_t octets) noexcept override { return !allowGrowth || allowGrowth(octets); }
 
     DecodeState state = {};
     std::span<const std::uint8_t> packet;
     std::function<bool(std::size_t)> allowGrowth;
     std::unique_ptr<std::uint8_t[]> copy;
+    std::size_t copyOctets = 0;
     std::array<char, textOctets> blockName = {};
     std::array<char, textOctets> fieldName = {};
     std::array<char, textOctets> valueText = {};
@@ -117,6 +172,10 @@ PacketState::PacketState(std::span<const std::uint8_t> packet, const StateOption
 
 PacketState::~PacketState() = default;
 
+void PacketState::reset(std::span<const std::uint8_t> packet) {
+    storage_->resetTo(packet);
+}
+
 DecodeState &PacketState::state() {
     return storage_->state;
 }
@@ -127,10 +186,6 @@ const DecodeState &PacketState::state() const {
 
 std::span<const std::uint8_t> PacketState::packet() const {
     return storage_->packet;
-}
-
-std::uint32_t depthOf(const BitStack &stack) {
-    return static_cast<std::uint32_t>(stack.top - stack.base);
 }
 
 } // namespace netfloor

@@ -79,10 +79,11 @@ struct Stretch {
     std::uint32_t bits;
 };
 
-std::optional<Stretch> stretchOf(const std::vector<ReportedRange> &ranges, std::uint32_t bitsEach) {
+template <typename Range>
+std::optional<Stretch> stretchOf(std::span<const Range> ranges, std::uint32_t bitsEach) {
     const std::uint32_t firstBit = ranges.front().firstBit;
     std::uint32_t next = firstBit;
-    for (const ReportedRange &range : ranges) {
+    for (const Range &range : ranges) {
         if (range.firstBit != next || range.lastBit - range.firstBit + 1 != bitsEach) {
             return std::nullopt;
         }
@@ -100,6 +101,25 @@ std::uint32_t addressRangeBits(std::size_t rangeCount) {
     case 4 * groupCount: return addressBits / static_cast<std::uint32_t>(rangeCount);
     default: return 0;
     }
+}
+
+template <typename Range>
+std::optional<Ipv6Octets> addressOf(std::span<const Range> ranges, std::span<const std::uint8_t> packet) {
+    const std::uint32_t bitsEach = addressRangeBits(ranges.size());
+    if (bitsEach == 0) {
+        return std::nullopt;
+    }
+    const std::optional<Stretch> stretch = stretchOf(ranges, bitsEach);
+    if (!stretch || (stretch->firstBit - 1) % bitsPerOctet != 0) {
+        return std::nullopt;
+    }
+    const std::size_t first = (stretch->firstBit - 1) / bitsPerOctet;
+    Ipv6Octets octets = {};
+    if (first > packet.size() || packet.size() - first < octets.size()) {
+        return std::nullopt;
+    }
+    std::copy_n(packet.begin() + static_cast<std::ptrdiff_t>(first), octets.size(), octets.begin());
+    return octets;
 }
 
 } // namespace
@@ -151,24 +171,14 @@ std::string ipv4Text(std::uint32_t address) {
 }
 
 std::optional<Ipv6Octets> ipv6Address(const FieldReport &field, std::span<const std::uint8_t> packet) {
-    const std::uint32_t bitsEach = addressRangeBits(field.ranges.size());
-    if (bitsEach == 0) {
-        return std::nullopt;
-    }
-    const std::optional<Stretch> stretch = stretchOf(field.ranges, bitsEach);
-    if (!stretch || (stretch->firstBit - 1) % bitsPerOctet != 0) {
-        return std::nullopt;
-    }
-    const std::size_t first = (stretch->firstBit - 1) / bitsPerOctet;
-    Ipv6Octets octets = {};
-    if (first > packet.size() || packet.size() - first < octets.size()) {
-        return std::nullopt;
-    }
-    std::copy_n(packet.begin() + static_cast<std::ptrdiff_t>(first), octets.size(), octets.begin());
-    return octets;
+    return addressOf(std::span<const ReportedRange>(field.ranges), packet);
 }
 
-std::optional<Ipv6Octets> ipv6Address(const KeyValue &key) {
+std::optional<Ipv6Octets> ipv6Address(const FieldView &field, std::span<const std::uint8_t> packet) {
+    return addressOf(field.ranges, packet);
+}
+
+std::optional<Ipv6Octets> ipv6Address(const KeyView &key) {
     Ipv6Octets octets = {};
     if (key.type != KeyType::ipv6Address || key.octets.size() != octets.size()) {
         return std::nullopt;
@@ -178,7 +188,7 @@ std::optional<Ipv6Octets> ipv6Address(const KeyValue &key) {
     return octets;
 }
 
-std::string keyText(const KeyValue &key) {
+std::string keyText(const KeyView &key) {
     switch (key.type) {
     case KeyType::ipv4Address: return ipv4Text(key.number);
     case KeyType::ipv6Address: {

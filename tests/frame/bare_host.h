@@ -10,7 +10,7 @@
 #include <vector>
 
 #include "../host/standins/links.h"
-#include "netfloor-host/host.h"
+#include "netfloor-host/testing.h"
 #include "support/memory.h"
 #include "support/packets.h"
 

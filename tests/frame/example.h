@@ -5,7 +5,7 @@
 
 #include <array>
 
-#include "netfloor-host/host.h"
+#include "netfloor-host/testing.h"
 #include "support/packets.h"
 
 namespace netfloor::test {

@@ -55,7 +55,7 @@ TEST(HandOffKey, goesByThePorts) {
     };
     for (const KeyCase &one : cases) {
         SCOPED_TRACE(std::to_string(one.source) + " to " + std::to_string(one.destination));
-        RunOptions options;
+        TestRunOptions options;
         options.state.prepare = [](DecodeState &state) { state.scratch[NETFLOOR_NEXT_LAYER_PORT] = unset; };
         const Octets datagram = udp(one.source, one.destination, hex("61*5"));
         const Runs runs = runAll(ipv4({.protocol = 17, .payload = datagram}), options);

@@ -195,7 +195,7 @@ TEST(FieldStep, packetAtEveryBitOfAnOctet) {
     const Runs plain = runAll(examplePacket());
     for (unsigned shift = 1; shift < 8; ++shift) {
         SCOPED_TRACE("at bit " + std::to_string(shift));
-        RunOptions options;
+        TestRunOptions options;
         options.state.cursor = 1 + shift;
         options.state.totalBits = shift + 8 * static_cast<std::uint32_t>(examplePacket().size());
         const Runs moved = runAll(shifted(examplePacket(), shift), options);

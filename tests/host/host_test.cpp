@@ -8,7 +8,7 @@
 
 #include <gtest/gtest.h>
 
-#include "netfloor-host/host.h"
+#include "netfloor-host/testing.h"
 #include "support/packets.h"
 
 namespace netfloor::test {
@@ -57,7 +57,7 @@ TEST(Host, listsLayersAndHandOffs) {
     Host host = newHost();
     const Octets packet = udpPacket(40001, twelveOctets);
     for (const std::uint32_t capacity : {0U, 1U, 7U}) {
-        RunOptions options;
+        TestRunOptions options;
         options.layerInfoCapacity = capacity;
         options.layerNumber = 3;
         options.decoderId = 42;
@@ -84,7 +84,7 @@ TEST(Host, listsLayersAndHandOffs) {
 // What a caller of the boundary sees of an XTR stop.
 TEST(Host, leavesAnXtrStopAlone) {
     Host host = newHost();
-    RunOptions options;
+    TestRunOptions options;
     options.followStop = false;
     const Report report = host.run(Pass::xtr, udpPacket(7000, twelveOctets), options);
     EXPECT_EQ(report.result, 1);
@@ -232,7 +232,7 @@ TEST(Owners, takeTheUserDataOfAnSctpChunk) {
 TEST(Storage, growsFromOneElement) {
     Host host = newHost();
     const Octets packet = udpPacket(7000, twelveOctets);
-    RunOptions small;
+    TestRunOptions small;
     small.state.blockCapacity = small.state.limitCapacity = small.state.layerCapacity = small.state.rangeCapacity = 1;
     for (const Pass pass : allPasses) {
         EXPECT_EQ(texts(host.run(pass, packet, small)), texts(host.run(pass, packet)));
@@ -251,7 +251,7 @@ TEST(Storage, cutsOffWhenGrowthIsRefused) {
         for (bool refused = true; refused; ++allowed) {
             refused = false;
             std::uint32_t asked = 0;
-            RunOptions options;
+            TestRunOptions options;
             options.state.blockCapacity = options.state.limitCapacity = 1;
             options.state.layerCapacity = options.state.rangeCapacity = 1;
             options.state.allowGrowth = [&](std::size_t) {
@@ -272,20 +272,20 @@ TEST(Storage, takesPreparedStates) {
     Host host = newHost();
     const Octets packet = udpPacket(7000, twelveOctets);
     Octets behind = hex("ff") + packet;
-    RunOptions options;
+    TestRunOptions options;
     options.state.cursor = 9;
     const Report report = host.run(Pass::md, behind, options);
     EXPECT_EQ(report.field("Version")->ranges, (std::vector<ReportedRange>{{4, 13, 16}}));
     EXPECT_EQ(report.layerIndex, 1U);
 
-    RunOptions flagged;
+    TestRunOptions flagged;
     flagged.state.flags = 0x2;
     EXPECT_EQ(host.run(Pass::mv, packet, flagged).verdict.value, -52);
 
-    RunOptions cut;
+    TestRunOptions cut;
     cut.state.totalBits = 12;
     EXPECT_EQ(host.run(Pass::md, packet, cut).fields.size(), 2U);
-    RunOptions prepared;
+    TestRunOptions prepared;
     prepared.state.prepare = [](DecodeState &state) { state.scratch[20] = 5; };
     EXPECT_EQ(host.run(Pass::to, packet, prepared).scratch[20], 5U);
 }
@@ -293,9 +293,9 @@ TEST(Storage, takesPreparedStates) {
 TEST(Storage, refusesOptionsThatContradictThePacket) {
     Host host = newHost();
     const Octets packet = hex("45");
-    RunOptions options;
+    TestRunOptions options;
     const auto refused = [&](auto &&change) {
-        RunOptions changed;
+        TestRunOptions changed;
         change(changed.state);
         EXPECT_THROW(static_cast<void>(host.run(Pass::md, packet, changed)), std::invalid_argument);
     };

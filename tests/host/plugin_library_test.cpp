@@ -10,7 +10,7 @@
 
 #include <gtest/gtest.h>
 
-#include "netfloor-host/host.h"
+#include "netfloor-host/plugin_host.h"
 
 namespace netfloor::test {
 namespace {

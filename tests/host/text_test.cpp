@@ -8,7 +8,7 @@
 
 #include <gtest/gtest.h>
 
-#include "netfloor-host/host.h"
+#include "netfloor-host/testing.h"
 #include "support/packets.h"
 
 namespace netfloor::test {
@@ -90,7 +90,7 @@ TEST(Text, showsTheAddressesOfAnIpv6Packet) {
         EXPECT_EQ(ipv6Address(field, packet).has_value(), field.name.ends_with("IP Address")) << field.name;
     }
 
-    RunOptions narrow;
+    TestRunOptions narrow;
     narrow.byteAreaSize = 16;
     const Report cutOff = host.run(Pass::xtr, packet, narrow);
     EXPECT_EQ(cutOff.ending, Ending::cutOff) << "an address needs room for 17 octets";

@@ -84,7 +84,7 @@ TEST(Ipv6Header, payloadLengthLimitsTheDatagram) {
 // An address needs room for 17 octets in the key record, and takes 16 of them.
 TEST(Ipv6Header, roomForAddressesInTheKeyRecord) {
     for (const std::uint16_t room : std::vector<std::uint16_t>{0, 1, 16, 17}) {
-        RunOptions options;
+        TestRunOptions options;
         options.byteAreaSize = room;
         const Report report = runPass(Pass::xtr, ipv6({}), options);
         EXPECT_EQ(report.ending, room < 17 ? Ending::cutOff : Ending::complete) << room;
@@ -294,7 +294,7 @@ TEST(Ipv6Chain, deepestOnASmallStack) {
             EXPECT_EQ(runs.md.ending, Ending::complete);
             EXPECT_EQ(runs.md.bitsLeft, 0u);
         }
-        RunOptions options; // room for a chain, but not for this one
+        TestRunOptions options; // room for a chain, but not for this one
         options.state.allowGrowth = [](std::size_t octets) { return octets < 20000; };
         for (const Pass pass : {Pass::md, Pass::to, Pass::mv, Pass::xtr}) {
             const Report report = runPass(pass, alternating, options);

@@ -7,7 +7,7 @@
 #include <string>
 #include <vector>
 
-#include "netfloor-host/host.h"
+#include "netfloor-host/plugin_host.h"
 #include "peers/pairs.h"
 
 namespace netfloor::test {

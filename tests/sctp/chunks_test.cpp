@@ -381,14 +381,14 @@ TEST(SctpChunk, longOctetStrings) {
         EXPECT_EQ(runs.md.fields.back().text.size(), shown ? 255u : std::string_view("    Reserved").size());
         EXPECT_EQ(runs.to.displays.back().text.size(), shown ? 255u : 8u);
         for (const Pass pass : {Pass::md, Pass::to, Pass::mv, Pass::xtr}) {
-            RunOptions options;
+            TestRunOptions options;
             options.state.allowGrowth = [](std::size_t) { return false; };
             const Report report = runPass(pass, packet, options);
             EXPECT_EQ(report.ending, Ending::cutOff);
             EXPECT_EQ(report.flags, 0x40000000u);
         }
     }
-    RunOptions narrow;
+    TestRunOptions narrow;
     narrow.state.allowGrowth = [](std::size_t) { return false; };
     const Report stack = runPass(Pass::md, sctp(repeated("0b 00 00 04", 64)), narrow);
     EXPECT_EQ(stack.flags, 0x20000000u);

@@ -160,7 +160,8 @@ void compareXtr(Comparison &comparison, const Runs &runs) {
     }
 }
 
-Report runGuarded(Pass pass, std::span<const std::uint8_t> packet, RunOptions options, bool followStop, Host &host) {
+Report runGuarded(Pass pass, std::span<const std::uint8_t> packet, TestRunOptions options, bool followStop,
+                  Host &host) {
     const GuardedOctets source(packet);
     const GuardedOctets working(packet);
     options.followStop = followStop;
@@ -188,7 +189,7 @@ Host freshHost() {
     return Host(PluginLibrary::openCopy(NETFLOOR_PLUGIN));
 }
 
-Report runPass(Pass pass, std::span<const std::uint8_t> packet, const RunOptions &options, Host &host) {
+Report runPass(Pass pass, std::span<const std::uint8_t> packet, const TestRunOptions &options, Host &host) {
     Report report = runGuarded(pass, packet, options, false, host);
     if (pass == Pass::xtr && report.layerHandedOff && report.ending == Ending::complete) {
         report.handOffs = runGuarded(pass, packet, options, true, host).handOffs;
@@ -196,7 +197,7 @@ Report runPass(Pass pass, std::span<const std::uint8_t> packet, const RunOptions
     return report;
 }
 
-Runs runAll(std::span<const std::uint8_t> packet, const RunOptions &options, Host &host) {
+Runs runAll(std::span<const std::uint8_t> packet, const TestRunOptions &options, Host &host) {
     Runs runs{runPass(Pass::md, packet, options, host), runPass(Pass::to, packet, options, host),
               runPass(Pass::mv, packet, options, host), runPass(Pass::xtr, packet, options, host)};
     const std::string differences = disagreements(runs);

@@ -29,7 +29,7 @@
 #include <string>
 #include <string_view>
 
-#include "netfloor-host/host.h"
+#include "netfloor-host/testing.h"
 #include "support/packets.h"
 
 namespace netfloor::test {
@@ -47,11 +47,11 @@ struct Runs {
 
 // One pass, over octets that end at an inaccessible page. In the XTR pass the report is that of the plug-in
 // alone, which stops at a hand-off; a second run, which goes on with the owner, gives the hand-offs.
-[[nodiscard]] Report runPass(Pass pass, std::span<const std::uint8_t> packet, const RunOptions &options = {},
+[[nodiscard]] Report runPass(Pass pass, std::span<const std::uint8_t> packet, const TestRunOptions &options = {},
                              Host &host = sharedHost());
 
 // The four passes, each over octets that end at an inaccessible page. Fails the test where they disagree.
-Runs runAll(std::span<const std::uint8_t> packet, const RunOptions &options = {}, Host &host = sharedHost());
+Runs runAll(std::span<const std::uint8_t> packet, const TestRunOptions &options = {}, Host &host = sharedHost());
 
 // In what the four passes disagree, a line each; empty when they agree: cursor, bits left, depth of the stacks,
 // layers, hand-offs, number of fields and texts, flags as far as they are those of all passes, the verdict, and

@@ -124,7 +124,7 @@ TEST(Tcp, dataOffsetAndRoomForIt) {
     };
     for (const HeaderCase &one : cases) {
         SCOPED_TRACE(one.name);
-        RunOptions options;
+        TestRunOptions options;
         options.state.prepare = [](DecodeState &state) { std::fill_n(state.scratch, 32, unwritten); };
         const Runs runs = runAll(one.packet, options);
         EXPECT_EQ(std::ranges::count(linesFrom(lines(runs.md), "384"), '\n'), one.fields);

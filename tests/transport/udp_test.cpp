@@ -56,7 +56,7 @@ TEST(Udp, datagramOfEachSize) {
     };
     for (const SizeCase &size : cases) {
         SCOPED_TRACE(std::to_string(size.octets) + " octets");
-        RunOptions options;
+        TestRunOptions options;
         options.state.prepare = [](DecodeState &state) { std::fill_n(state.scratch, 32, seed); };
         const Octets datagram = udp(1000, 2000, hex("61*5"));
         const Octets part(datagram.begin(), datagram.begin() + static_cast<std::ptrdiff_t>(size.octets));

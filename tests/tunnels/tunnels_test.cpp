@@ -182,7 +182,7 @@ TEST(Tunnels, growthThatFails) {
     const Octets packet = tunnel(4, tunnel(4, tunnel(4, tunnel(4, tunnel(253, hex("61"))))));
     for (std::uint32_t capacity = 6; capacity <= 10; ++capacity) {
         SCOPED_TRACE(capacity);
-        RunOptions options;
+        TestRunOptions options;
         options.state.blockCapacity = capacity;
         options.state.allowGrowth = [](std::size_t) { return false; };
         const Runs runs = runAll(packet, options);

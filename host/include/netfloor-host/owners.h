@@ -12,7 +12,7 @@
 
 #include <netfloor/records.h>
 
-#include "netfloor-host/reports.h"
+#include "netfloor-host/sink.h"
 
 namespace netfloor {
 
@@ -32,7 +32,6 @@ public:
     [[nodiscard]] std::span<const std::uint8_t> packet() const;  // the whole packet
     [[nodiscard]] std::span<const std::uint8_t> payload() const; // whole octets from the cursor to the limit
     [[nodiscard]] std::uint32_t bitsLeft() const;
-    [[nodiscard]] const Report &soFar() const; // what the pass has reported up to here
 
     [[nodiscard]] DecodeState &state();
     [[nodiscard]] PreDecodeContext *preDecodeContext(); // null in the XTR pass
@@ -41,7 +40,7 @@ public:
     // Moves the cursor over `bits` bits, or over all that are left if they are fewer.
     void consume(std::uint32_t bits);
 
-    // Reports the next `bits` bits as one entry and consumes them: a field in MD, a text in TO.
+    // Reports the next `bits` bits to the sink as one entry and consumes them: a field in MD, a text in TO.
     void take(std::uint32_t bits, std::string_view name, std::string_view longText, std::string_view shortText);
 
     // Opens and closes a record for the bits that `decode` consumes in the list of layers (MD and TO).

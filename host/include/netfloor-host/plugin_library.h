@@ -21,6 +21,12 @@ public:
     using std::runtime_error::runtime_error;
 };
 
+// A plug-in was entered while it serves another packet. what() says which one and what to do.
+class PluginBusy : public std::logic_error {
+public:
+    using std::logic_error::logic_error;
+};
+
 // How this host answers hx_InitialiseOptXTR: with the results in turn, the last of them for good.
 struct KeySetUp {
     std::vector<std::int32_t> results = {1};
@@ -32,7 +38,8 @@ class LoadedPlugin;
 // A handle of a loaded plug-in; copies share it.
 //
 // A pass of a plug-in keeps its variables in statics and serves one packet at a time. Who decodes in several
-// threads, or wants the key-field table set up anew, opens a copy for each.
+// threads, or wants the key-field table set up anew, opens a copy for each. The functions of a handle may not be called
+// while another thread runs or sets up the same load.
 class PluginLibrary {
 public:
     // Loads the plug-in at `path`, or gives a handle of it when this process has loaded it before. It stays

@@ -1,27 +1,18 @@
 // SPDX-License-Identifier: MIT
-// What a pass reported about one packet, as plain records. Whoever prints or compares results needs this
-// header only, and no knowledge of any protocol.
-//
-// Bits are numbered as in netfloor/records.h: from 1, and within an octet from the least significant up.
+// What a pass reported about one packet, kept as plain records, and the sink that keeps them. For tests and for
+// programs that look at a packet as a whole; who writes an output takes what it needs as it comes, see sink.h.
 #pragma once
 
 #include <array>
 #include <cstddef>
 #include <cstdint>
-#include <optional>
 #include <string>
 #include <string_view>
-#include <variant>
 #include <vector>
 
-namespace netfloor {
+#include "netfloor-host/sink.h"
 
-enum class Pass : std::uint8_t {
-    md,  // every field with its long text and its bit ranges
-    to,  // every field's short display text
-    mv,  // a verdict
-    xtr, // the values of the key fields
-};
+namespace netfloor {
 
 // One piece of a field.
 struct ReportedRange {
@@ -66,16 +57,6 @@ struct DisplayReport {
     std::uint8_t layerNumber = 0;
 };
 
-// MV.
-struct Verdict {
-    std::int32_t value = 0;  // 0, or -52 when a flag is set
-    std::uint32_t flags = 0; // NETFLOOR_FLAG_..., see flagNames() in text.h
-    [[nodiscard]] bool fault() const { return value != 0; }
-};
-
-// How the value of a key field is to be shown.
-enum class KeyType : std::uint8_t { number8, number16, number32, ipv4Address, ipv6Address };
-
 // XTR: one key field that the packet has.
 struct KeyValue {
     std::string name;
@@ -83,41 +64,9 @@ struct KeyValue {
     KeyType type = KeyType::number32;
     std::uint32_t number = 0;         // every type but ipv6Address; an IPv4 address has its first octet on top
     std::vector<std::uint8_t> octets; // ipv6Address: as stored, that is with the nibbles of each octet exchanged
-};
 
-// MD and TO: one record of the host's list of layers.
-struct LayerRecord {
-    std::uint32_t firstBit = 0;
-    std::uint32_t lastBit = 0; // firstBit - 1 for a layer without bits
-    std::uint32_t decoderId = 0;
-    std::uint32_t layerNumber = 0;
-
-    friend bool operator==(const LayerRecord &, const LayerRecord &) = default;
-};
-
-// All passes: one hand-off to an owner of a next layer, as the plug-in left it.
-struct HandOff {
-    std::uint32_t key = 0;      // LayerFrame::nextLayerKey
-    std::uint32_t protocol = 0; // LayerFrame::nextLayerProtocol, 0 where it was not written
-    std::uint32_t port = 0;     // the scratch words
-    std::uint32_t nextLayerOctets = 0;
-    std::uint32_t precedingOctets = 0;
-    std::uint32_t layerNumber = 0; // of the next layer
-    std::uint32_t layerIndex = 0;  // of the layer frame that names the owner
-    std::uint32_t cursor = 0;      // the first bit of the next layer
-    std::uint32_t bitsLeft = 0;    // what the limit allows from there on
-    std::uint32_t contextBitsLeft = 0;
-    std::uint32_t blockDepth = 0; // blocks and limits open, the bottom elements not counted
-    std::uint32_t limitDepth = 0;
-    std::uint32_t nesting = 0;      // how many hand-offs this one stands in
-    std::uint32_t consumedBits = 0; // what the owner took
-    bool refused = false;           // the owner refused; the pass was cut off
-};
-
-enum class Ending : std::uint8_t {
-    complete,   // the pass ran to its end; bits may be left
-    cutOff,     // storage ran out, an owner refused, or an address did not fit into the key record
-    keysDenied, // XTR: the set-up of the key-field table was refused
+    // For what takes keys as they come, such as keyText().
+    operator KeyView() const { return {name, row, type, number, octets}; } // NOLINT(*-explicit-*)
 };
 
 // One pass over one packet. The lists that the pass does not fill stay empty.
@@ -160,6 +109,26 @@ struct Report {
     // The first field, or key field, of that name, or null.
     [[nodiscard]] const FieldReport *field(std::string_view name) const;
     [[nodiscard]] const KeyValue *key(std::string_view name) const;
+};
+
+// Keeps all of one pass in `report`, which has to outlive it. An owner that wants to know what was reported so far
+// looks there.
+class ReportSink final : public Sink {
+public:
+    explicit ReportSink(Report &report) : report_(report) {}
+
+    void begin(Pass pass, std::span<const std::uint8_t> packet) override;
+    void field(const FieldView &field) override;
+    void text(const ShortTextView &text) override;
+    void key(const KeyView &key) override;
+    void layer(const LayerRecord &layer) override;
+    void handOff(const HandOff &handOff) override;
+    void end(const PassEnd &end) override;
+
+private:
+    void keepBlocks(std::span<const BlockView> blocks);
+
+    Report &report_;
 };
 
 } // namespace netfloor

@@ -28,13 +28,14 @@ using Ipv6Octets = std::array<std::uint8_t, 16>;
 
 // The IPv6 address that a field stands on, taken from the packet by the field's bit ranges, or none when the
 // field is no IPv6 address: it is one if its ranges are one stretch of 128 bits, 8 groups of 16 bits or 32
-// nibbles, one behind the other on octet borders.
+// nibbles, one after the other on octet borders.
 [[nodiscard]] std::optional<Ipv6Octets> ipv6Address(const FieldReport &field, std::span<const std::uint8_t> packet);
+[[nodiscard]] std::optional<Ipv6Octets> ipv6Address(const FieldView &field, std::span<const std::uint8_t> packet);
 
 // The IPv6 address of a key field, its nibbles put back in order, or none when the key field holds no address.
-[[nodiscard]] std::optional<Ipv6Octets> ipv6Address(const KeyValue &key);
+[[nodiscard]] std::optional<Ipv6Octets> ipv6Address(const KeyView &key);
 
 // The value of a key field in its usual form: a decimal number, or an address.
-[[nodiscard]] std::string keyText(const KeyValue &key);
+[[nodiscard]] std::string keyText(const KeyView &key);
 
 } // namespace netfloor

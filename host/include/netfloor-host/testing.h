@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: MIT
-// A packet in the form in which plug-ins work on it: a DecodeState with the storage behind it.
+// For tests of a plug-in, and of nothing else: states set up as no packet needs them, and memory of exact size, so that
+// a memory checker sees each read past the end.
 #pragma once
 
 #include <cstddef>
@@ -11,9 +12,11 @@
 
 #include <netfloor/records.h>
 
+#include "netfloor-host/plugin_host.h"
+
 namespace netfloor {
 
-// How a DecodeState is set up. The defaults suit any packet; the rest is for tests of a plug-in's frame.
+// How a DecodeState is set up. The defaults suit any packet.
 struct StateOptions {
     std::optional<std::uint32_t> totalBits; // default: all octets of the packet
     std::uint32_t cursor = 1;               // the bit at which the first layer starts
@@ -32,16 +35,28 @@ struct StateOptions {
     std::function<void(DecodeState &state)> prepare;
 };
 
-// Owns a DecodeState and everything it points to but the packet itself. The working copy has exactly the
-// octets that `totalBits` needs, so that a memory checker sees each read behind it.
+// A run with a state of its own, built anew, which Host::run takes in the place of RunOptions.
+struct TestRunOptions : RunOptions {
+    StateOptions state;
+    std::uint32_t layerInfoCapacity = 7; // highest index of the list of layers at the start
+    std::uint16_t byteAreaSize = 64;     // XTR: room for one address; it needs 17
+    bool followStop = true;              // XTR: go on with the owner of the next layer
+};
+
+// Owns a DecodeState and everything it points to but the packet itself.
 class PacketState {
 public:
-    // `packet` has to outlive the object. Throws std::invalid_argument when totalBits, the cursor or a
-    // capacity make no sense, and std::bad_alloc.
+    // The working copy has exactly the octets that `totalBits` needs. `packet` has to outlive the object, or its use
+    // for this packet. Throws std::invalid_argument when totalBits, the cursor or a capacity make no sense, and
+    // std::bad_alloc.
     explicit PacketState(std::span<const std::uint8_t> packet, const StateOptions &options = {});
     ~PacketState();
     PacketState(const PacketState &) = delete;
     PacketState &operator=(const PacketState &) = delete;
+
+    // Takes another packet, with all its octets, into the same storage. The working copy may have more room than the
+    // packet needs. What is cleared is what the packet before may have left and the next one may see.
+    void reset(std::span<const std::uint8_t> packet);
 
     [[nodiscard]] DecodeState &state();
     [[nodiscard]] const DecodeState &state() const;
@@ -53,6 +68,8 @@ private:
 };
 
 // Elements above the bottom one.
-[[nodiscard]] std::uint32_t depthOf(const BitStack &stack);
+[[nodiscard]] inline std::uint32_t depthOf(const BitStack &stack) {
+    return static_cast<std::uint32_t>(stack.top - stack.base);
+}
 
 } // namespace netfloor

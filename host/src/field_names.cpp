@@ -1,0 +1,37 @@
+// SPDX-License-Identifier: MIT
+#include "field_names.h"
+
+#include <algorithm>
+
+namespace netfloor {
+namespace {
+
+// Ids are small; a table with others would not be worth the room.
+constexpr std::uint32_t mostIds = 65536;
+
+} // namespace
+
+FieldNames::FieldNames(NetfloorGetTable getTable) : fields_(1) {
+    const void *table = nullptr;
+    if (getTable(NETFLOOR_TABLE_FIELDS, &table) != NETFLOOR_TABLE_FOUND || table == nullptr) {
+        return;
+    }
+    for (const auto *row = static_cast<const FieldDescriptor *>(table); row->flags != NETFLOOR_NO_FIELD; ++row) {
+        if (row->fieldId == 0 || row->fieldId >= mostIds) {
+            continue;
+        }
+        fields_.resize(std::max<std::size_t>(fields_.size(), row->fieldId + 1));
+        fields_[row->fieldId] = {row->name, row->keyIndex != 0, true, ""};
+    }
+}
+
+const char *FieldNames::findBlockName(NamedField &field, std::string_view name) {
+    auto found = blockNames_.find(name);
+    if (found == blockNames_.end()) {
+        found = blockNames_.emplace(name).first;
+    }
+    field.lastBlock = found->c_str();
+    return field.lastBlock;
+}
+
+} // namespace netfloor
