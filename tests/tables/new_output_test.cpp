@@ -18,9 +18,8 @@ std::string line(std::uint32_t id, std::string_view name, std::string_view displ
 // The output.
 std::string listOfFields() {
     std::string list;
-    for (const plugin::Field *const field : plugin::catalogue) {
-        list += line(field->id, field->bareName(), field->line);
-    }
+    plugin::CatalogueFields::forEachField(
+        [&]<const plugin::Field & field> { list += line(field.id, field.bareName(), plugin::longText<field>); });
     return list;
 }
 
