@@ -5,8 +5,8 @@
 #include <filesystem>
 #include <set>
 
-#include "capture/capture.h"
-#include "link_layer.h"
+#include "netfloor-capture/capture_file.h"
+#include "netfloor-capture/link_layer.h"
 #include "support/corpus.h"
 
 namespace netfloor::compare {
@@ -18,16 +18,15 @@ using test::Octets;
 constexpr std::size_t mostCutOctets = 160;
 
 void readCapture(const std::filesystem::path &path, std::vector<Octets> &packets) {
-    cli::OctetStream stream(path);
-    const auto reader = cli::openCapture(stream);
     try {
-        for (cli::CapturedPacket packet; reader->next(packet);) {
-            const auto part = cli::findNetworkPart(packet.linkType, packet.octets);
+        CaptureFile capture(path);
+        for (CapturedPacket packet; capture.next(packet);) {
+            const auto part = findNetworkPart(packet.linkType, packet.octets);
             if (part.isIp()) {
                 packets.emplace_back(part.octets.begin(), part.octets.end());
             }
         }
-    } catch (const cli::CaptureDamage &) {
+    } catch (const CaptureDamage &) {
         return; // what came before is good
     }
 }
