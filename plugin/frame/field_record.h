@@ -4,6 +4,7 @@
 
 #include <cstdint>
 #include <cstring>
+#include <string_view>
 
 #include "frame/bits.h"
 #include "frame/field.h"
@@ -23,15 +24,14 @@ namespace netfloor::plugin {
     return place.isPieces() || place.shape == Shape::octets || place.shape == Shape::octetsBackward;
 }
 
-// The value of a field that lies at `cursor`, before it is scaled.
-template <const Field &field>
+// The value of a field at `place`, counted from `cursor`, before it is scaled. Fields of one place share it.
+template <Place place>
 [[nodiscard]] NETFLOOR_INLINE inline std::uint32_t valueAt(const std::uint8_t *data, std::uint32_t cursor,
                                                            std::uint32_t units) {
-    constexpr const Place &place = field.place;
     std::uint32_t value = 0;
     if constexpr (place.isPieces()) {
         forEach<place.count>([&]<std::uint32_t i>() NETFLOOR_INLINE {
-            constexpr Piece piece = field.place.pieces[i];
+            constexpr Piece piece = place.pieces[i];
             value = joined(value, pieceAt<piece.low, piece.high>(data, cursor), piece.width());
         });
     } else if constexpr (place.shape == Shape::octets && !place.isRun()) {
@@ -76,11 +76,10 @@ inline void writeGroups(FieldRecord &record, const std::uint8_t *data, std::uint
     return value;
 }
 
-// Writes the elements and the value of a field that lies at `cursor`, and its id. There is room for the elements.
-template <const Field &field>
+// Writes the elements and the value of a field at `place`, counted from `cursor`. There is room for the elements.
+template <Place place>
 NETFLOOR_INLINE inline void writeElements(FieldRecord &record, const std::uint8_t *data, std::uint32_t cursor,
                                           std::uint32_t units) {
-    constexpr const Place &place = field.place;
     BitRange *const ranges = record.ranges;
     std::uint32_t value = 0;
     const auto nibble = [&](std::uint32_t index, std::uint32_t first) NETFLOOR_INLINE {
@@ -100,7 +99,7 @@ NETFLOOR_INLINE inline void writeElements(FieldRecord &record, const std::uint8_
 
     if constexpr (place.shape == Shape::pieces) {
         forEach<place.count>([&]<std::uint32_t i>() NETFLOOR_INLINE {
-            constexpr Piece piece = field.place.pieces[i];
+            constexpr Piece piece = place.pieces[i];
             ranges[i].firstBit = cursor + piece.low;
             ranges[i].lastBit = cursor + piece.high;
             ranges[i].value = pieceAt<piece.low, piece.high>(data, cursor);
@@ -130,7 +129,7 @@ NETFLOOR_INLINE inline void writeElements(FieldRecord &record, const std::uint8_
             nibble(i, cursor + i * nibbleBits);
         }
     } else {
-        value = valueAt<field>(data, cursor, units);
+        value = valueAt<place>(data, cursor, units);
         elements = 0;
         outputElements = 0;
     }
@@ -138,18 +137,15 @@ NETFLOOR_INLINE inline void writeElements(FieldRecord &record, const std::uint8_
     record.value = value;
     record.rangeCount = elements;
     record.outputRangeCount = outputElements;
-    record.fieldId = field.id;
 }
 
-// Resets the record for a field and gives it the field's name.
-template <const Field &field>
-NETFLOOR_INLINE inline void beginRecord(FieldRecord &record) {
+// Resets the record for a field and gives it the field's name: a literal, so that its terminating zero goes along.
+NETFLOOR_INLINE inline void beginRecord(FieldRecord &record, std::string_view name) {
     record.value = 0;
     record.rangeCount = 0;
     record.valueText[0] = '\0';
     record.rawFlag = 0;
-    // A name is a literal, so its terminating zero goes along.
-    std::memcpy(record.fieldName, field.name.data(), field.name.size() + 1);
+    std::memcpy(record.fieldName, name.data(), name.size() + 1);
 }
 
 } // namespace netfloor::plugin

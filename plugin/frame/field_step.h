@@ -49,7 +49,7 @@ NETFLOOR_INLINE inline void stepInRun(Reader<Pass> &reader, Store into) {
     reader.writer.nameBlock(reader, *reader.state);
     const std::uint32_t start = reader.cursor;
     if constexpr (!std::is_same_v<Store, Unstored>) {
-        store(into, valueAt<field>(reader.data, start, place.count));
+        store(into, valueAt<field.place>(reader.data, start, place.count));
     }
     reader.left -= place.advance;
     reader.cursor += place.advance;
@@ -87,12 +87,12 @@ NETFLOOR_INLINE inline void step(Reader<Pass> &reader, std::uint32_t units, Stor
     const std::uint32_t moves = place.isRun() ? place.moves(units) : place.advance;
     reader.writer.nameBlock(reader, *reader.state);
     reader.writer.template beginField<field>(reader.state->fieldRecord);
-    if (!reader.roomFor(place.elements(units), beginRecord<field>)) {
+    if (!reader.roomFor(place.elements(units), field.name.data())) {
         return;
     }
     const std::uint32_t start = reader.cursor;
     if constexpr (!std::is_same_v<Store, Unstored>) {
-        store(into, valueAt<field>(reader.data, start, units));
+        store(into, valueAt<field.place>(reader.data, start, units));
     }
     reader.setAdvance(static_cast<std::int32_t>(moves));
     reader.left -= moves;
@@ -137,15 +137,12 @@ NETFLOOR_INLINE inline void readCounted(Reader<Pass> &reader, std::int32_t count
     }
 }
 
-// A peek keeps the record of the field before.
-inline void keepRecord(FieldRecord &) {}
-
 // Gives the bits of `place` without moving the cursor and without reporting anything; nothing where they
 // are not all left or the run has ended. The field record keeps what was seen, under the name of the field before.
 template <class Pass>
 NETFLOOR_INLINE inline std::optional<std::uint32_t> peek(Reader<Pass> &reader, const Place &place) {
     reader.writer.flushRun(*reader.state);
-    if (reader.ended() || reader.left < place.needs(place.count) || !reader.roomFor(place.count, keepRecord)) {
+    if (reader.ended() || reader.left < place.needs(place.count) || !reader.roomFor(place.count, nullptr)) {
         return std::nullopt;
     }
     const bool whole = !place.isPieces();

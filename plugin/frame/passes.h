@@ -210,7 +210,7 @@ private:
         static_assert(width > 0 && width <= 32, "a key field is a number of up to 32 bits, or an address");
         using Stored =
             std::conditional_t<width <= 8, std::uint8_t, std::conditional_t<width <= 16, std::uint16_t, std::uint32_t>>;
-        const auto value = static_cast<Stored>(valueAt<field>(data, start, units) * field.place.scale);
+        const auto value = static_cast<Stored>(valueAt<field.place>(data, start, units) * field.place.scale);
         std::memcpy(record + row.valueOffset, &value, sizeof value);
     }
 

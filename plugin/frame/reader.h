@@ -16,9 +16,6 @@
 
 namespace netfloor::plugin {
 
-// Starts the record of a field whose elements are still to be read.
-using RecordBeginning = void (*)(FieldRecord &record);
-
 template <DecodingPass Pass>
 class Reader : public Position {
 public:
@@ -161,14 +158,15 @@ public:
         }
     }
 
-    // Makes room for so many elements of a field whose record `begin` starts. False when the ranges cannot grow.
-    NETFLOOR_INLINE bool roomFor(std::uint32_t elements, RecordBeginning begin) {
+    // Makes room for so many elements of a field of this name, whose elements are still to be read; without a name the
+    // record stays that of the field before. False when the ranges cannot grow.
+    NETFLOOR_INLINE bool roomFor(std::uint32_t elements, const char *name) {
         if (elements < state->fieldRecord.rangeCapacity) [[likely]] {
             return true;
         }
         // Growth works on a copy, so that the reader itself can stay in registers.
         Reader copy = *this;
-        if (!copy.makeRoom(elements, begin)) {
+        if (!copy.makeRoom(elements, name)) {
             end(Outcome::cutOff);
             return false;
         }
@@ -196,9 +194,11 @@ private:
         return growStack(*state, stack);
     }
 
-    [[gnu::cold, gnu::noinline]] bool makeRoom(std::uint32_t elements, RecordBeginning begin) {
+    [[gnu::cold, gnu::noinline]] bool makeRoom(std::uint32_t elements, const char *name) {
         giveState();
-        begin(state->fieldRecord);
+        if (name != nullptr) {
+            beginRecord(state->fieldRecord, name);
+        }
         return growRanges(*state, elements);
     }
 };

@@ -5,6 +5,7 @@
 #pragma once
 
 #include <cstdint>
+#include <string_view>
 
 #include "frame/bits.h"
 #include "frame/field.h"
@@ -54,13 +55,14 @@ public:
 
     template <const Field &field>
     NETFLOOR_INLINE void beginField(FieldRecord &record) {
-        beginRecord<field>(record);
+        beginRecord(record, field.name);
     }
 
     template <const Field &field>
     NETFLOOR_INLINE void writeField(const Position &position, DecodeState &state, const std::uint8_t *data,
                                     std::uint32_t start, std::uint32_t units) {
-        writeElements<field>(state.fieldRecord, data, start, units);
+        writeElements<field.place>(state.fieldRecord, data, start, units);
+        state.fieldRecord.fieldId = field.id;
         state.cursor = position.cursor;
         state.bitsLeft = position.left;
     }
@@ -73,21 +75,27 @@ public:
     NETFLOOR_INLINE void leaveRun() {}
 };
 
-// Writes a field that was read at `cursor` into the field record.
-using RecordWriter = void (*)(FieldRecord &record, const std::uint8_t *data, std::uint32_t cursor, std::uint32_t units);
+// What it takes to write a field into the record later on.
+struct DeferredField {
+    void (*writeElements)(FieldRecord &record, const std::uint8_t *data, std::uint32_t cursor, std::uint32_t units);
+    std::string_view name;
+    std::uint32_t id;
+};
+
+template <Place place>
+void writeDeferredElements(FieldRecord &record, const std::uint8_t *data, std::uint32_t cursor, std::uint32_t units) {
+    writeElements<place>(record, data, cursor, place.isRun() ? units : place.count);
+}
 
 template <const Field &field>
-void writeRecord(FieldRecord &record, const std::uint8_t *data, std::uint32_t cursor, std::uint32_t units) {
-    beginRecord<field>(record);
-    writeElements<field>(record, data, cursor, field.place.isRun() ? units : field.place.count);
-}
+inline constexpr DeferredField deferred{writeDeferredElements<field.place>, field.name, field.id};
 
 // What was read last.
 struct LastRead {
-    RecordWriter writer = nullptr; // of the last field; null: the record is up to date
-    std::uint32_t cursor = 0;      // where that field lies
-    std::uint32_t units = 0;       // of a run of octets or nibbles
-    Peek peek = {};                // after that field
+    const DeferredField *field = nullptr; // null: the record is up to date
+    std::uint32_t cursor = 0;             // where that field lies
+    std::uint32_t units = 0;              // of a run of octets or nibbles
+    Peek peek = {};                       // after that field
 };
 
 // Puts off what the host cannot see yet. In a checked run (see checked_run.h) it puts off more: what is known there
@@ -112,7 +120,7 @@ public:
 
     // Nothing is put off: the state is as the host left it.
     NETFLOOR_INLINE void reset() {
-        last_.writer = nullptr;
+        last_.field = nullptr;
         last_.peek.pieces = 0;
         endRun();
     }
@@ -131,10 +139,10 @@ public:
         if (!inRun_) {
             return;
         }
-        if (field_.writer != nullptr) {
+        if (field_.field != nullptr) {
             state.condition = 1;
             state.advance = field_.advance;
-            last_.writer = field_.writer;
+            last_.field = field_.field;
             last_.cursor = field_.cursor;
             last_.peek.pieces = 0;
         }
@@ -155,13 +163,15 @@ public:
     }
 
     NETFLOOR_INLINE void flushRecord(FieldRecord &record, const std::uint8_t *data) {
-        if (last_.writer != nullptr) {
-            last_.writer(record, data, last_.cursor, last_.units);
+        if (last_.field != nullptr) {
+            beginRecord(record, last_.field->name);
+            last_.field->writeElements(record, data, last_.cursor, last_.units);
+            record.fieldId = last_.field->id;
         }
         if (last_.peek.pieces != 0) {
             writePeek(record, data, last_.peek);
         }
-        last_.writer = nullptr;
+        last_.field = nullptr;
         last_.peek.pieces = 0;
     }
 
@@ -188,7 +198,7 @@ public:
     template <const Field &field>
     NETFLOOR_INLINE void writeField(const Position &, DecodeState &state, const std::uint8_t *, std::uint32_t start,
                                     std::uint32_t units) {
-        last_.writer = writeRecord<field>;
+        last_.field = &deferred<field>;
         last_.cursor = start;
         if constexpr (field.place.isRun()) {
             last_.units = units;
@@ -201,7 +211,7 @@ public:
     template <const Field &field>
     NETFLOOR_INLINE void writeFieldInRun(DecodeState &state, std::uint32_t start) {
         checkedBits_ -= field.place.advance;
-        field_.writer = writeRecord<field>;
+        field_.field = &deferred<field>;
         field_.cursor = start;
         field_.advance = static_cast<std::int32_t>(field.place.advance);
         writeWide<field>(state.fieldRecord);
@@ -235,7 +245,7 @@ private:
 
     // Of the run: its last field, and the blocks on the stack after its last push (0: there was none).
     struct RunField {
-        RecordWriter writer = nullptr; // null: there was none
+        const DeferredField *field = nullptr; // null: there was none
         std::uint32_t cursor = 0;
         std::int32_t advance = 0;
     };
