@@ -37,6 +37,14 @@ if(NETFLOOR_COVERAGE)
     add_link_options(--coverage)
 endif()
 
+# Compiles the standard library's headers that most sources include once for the target: they take longer than a source.
+function(netfloor_precompile_headers target)
+    if(PROJECT_IS_TOP_LEVEL)
+        target_precompile_headers(${target} PRIVATE <algorithm> <array> <cstdint> <functional> <map> <memory> <optional>
+            <span> <stdexcept> <string> <string_view> <vector>)
+    endif()
+endfunction()
+
 # Adds each folder that is there.
 function(netfloor_add_folders)
     foreach(folder IN LISTS ARGN)
