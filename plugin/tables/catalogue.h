@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: MIT
 // The catalogue of all fields and of all key fields: the joined rows of the protocols. The fields have the order of the
-// published field table: depth first, each protocol where the grammar first reaches it.
+// published field table: depth first, each protocol where the grammar first reaches it. A new protocol comes last, so
+// that the rows of the others keep their numbers, which hosts may have stored.
 #pragma once
 
 #include <cstdint>
