@@ -37,7 +37,7 @@ std::int32_t hd_PreDecode(PreDecodeContext *context, std::uint32_t) {
 }
 
 std::int32_t hx_InitialiseOptXTR(KeyFieldRow *table, std::uint32_t rowCount, std::uint16_t *) {
-    if (rowCount != keyRowCount) {
+    if (rowCount > mostKeyRows) {
         return -1;
     }
     for (std::size_t row = 0; row < rowCount; ++row) {

@@ -12,10 +12,10 @@ namespace netfloor::bench {
 
 // How the null host lays out key records: a bit for each row that tells whether it is present, then a place of
 // four octets for each row, then the area for values stored as octets.
-inline constexpr std::size_t keyRowCount = 113;
 inline constexpr std::size_t presenceOctets = 16;
+inline constexpr std::size_t mostKeyRows = presenceOctets * 8;
 inline constexpr std::size_t keyPlaceOctets = 4;
-inline constexpr std::size_t byteAreaOffset = presenceOctets + keyRowCount * keyPlaceOctets;
+inline constexpr std::size_t byteAreaOffset = presenceOctets + mostKeyRows * keyPlaceOctets;
 inline constexpr std::size_t byteAreaSize = 64; // for one value
 inline constexpr std::size_t keyRecordOctets = byteAreaOffset + 16 * byteAreaSize;
 

@@ -9,7 +9,7 @@
 
 namespace {
 
-// Writes `number` in `digits` digits, zeros in front, and gives the place behind them.
+// Writes `number` in `digits` digits, padded with zeros, and gives the place after them.
 char *writeDigits(char *to, std::uint32_t number, std::uint32_t digits) {
     for (std::uint32_t place = digits; place-- > 0; number /= 10) {
         to[place] = static_cast<char>('0' + number % 10);

@@ -11,7 +11,8 @@
 //   |      Internet header + 64 bits of original data datagram      |
 //   +---------------------------------------------------------------+
 //
-// Each message has fields of its own, equal ones too, so that a host sees by the id which message a field stands in.
+// Each message has its own fields, even where they are equal, so that a host sees by the id to which message a field
+// belongs.
 #pragma once
 
 #include <array>
@@ -50,7 +51,7 @@ inline constexpr ValueNames redirectCodeNames{redirectCodeRows};
 inline constexpr ValueNames timeExceededCodeNames{timeExceededCodeRows};
 inline constexpr ValueNames problemCodeNames{problemCodeRows};
 
-// The short text of the original data has its last four octets only.
+// The short text shows only the last four octets of the original data.
 // clang-format off
 inline constexpr Field unreachableCode      {548, "Code",                          octets(1),          "  %n=%-S",             &unreachableCodeNames};
 inline constexpr Field unreachableChecksum  {549, "Checksum",                      octetPair(),        "  %n=%x"};
@@ -80,8 +81,8 @@ inline constexpr Field problemUnused        {574, "Unused",                     
 inline constexpr Field problemData          {575, "64-bit Original Data Datagram", octets(8),          R"(  %n=%-["%x"])",     noNames,                "%x"};
 // clang-format on
 
-// Many senders quote more than 64 bits of data. Here what is left goes to the host as one field without a name; in
-// the other messages nothing reads it, and the datagram ends with bits left over.
+// Many senders quote more than 64 bits of data. This message reports the rest as one field without a name. The other
+// messages do not read it, and the datagram ends with bits left over.
 template <class Pass>
 NETFLOOR_INLINE inline void destinationUnreachable(Reader<Pass> &reader) {
     if (!reader.live) {

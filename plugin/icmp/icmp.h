@@ -8,7 +8,7 @@
 //   +---------------+---------------+-------------------------------+
 //   |                     as the type has it                        |
 //
-// The type chooses the message. The checksum is shown but not computed. A message hands on to no next layer.
+// The type chooses the message. The checksum is not verified. No message has a next layer.
 #pragma once
 
 #include <cstdint>
@@ -26,7 +26,7 @@ namespace netfloor::plugin::icmp {
 
 inline constexpr Field reservedData{541, "ICMP Reserved Data", octets(1), "%n=%x"};
 
-// A message of a type without a meaning: what stands behind the type is data, octet by octet.
+// A message of an unassigned type: the octets after the type are data, a field each.
 template <class Pass>
 NETFLOOR_INLINE inline void reservedMessage(Reader<Pass> &reader) {
     if (!reader.live) {
@@ -44,7 +44,7 @@ NETFLOOR_INLINE inline void reservedMessage(Reader<Pass> &reader) {
     }
 }
 
-// Runs a message that has no other code than 0. With another code, or none, nothing behind the type is read.
+// Runs a message that has no other code than 0. With another code, or without one, nothing after the type is read.
 template <auto production, class Pass>
 NETFLOOR_INLINE inline void withCodeZero(Reader<Pass> &reader) {
     if (peek(reader, octets(1)) != std::uint32_t{0}) {
@@ -83,7 +83,7 @@ NETFLOOR_INLINE inline void message(Reader<Pass> &reader) {
     }
 }
 
-// The protocols of the quoted headers have their key rows after those of all messages.
+// The key rows of the quoted headers come after those of all messages.
 // clang-format off
 using MessageRows = Rows<
     Joined<

@@ -10,8 +10,8 @@
 //   +----------------+-----------------+
 //   | Invoking packet, or data ...     |
 //
-// The invoking packet is not decoded: it is a row of octets. Nor are the messages above 129, of neighbour
-// discovery among them: behind the type they stay unread.
+// The invoking packet is not decoded: it is a list of octets. Messages above 129, such as those of neighbour discovery,
+// are not read after the type.
 #pragma once
 
 #include <array>
@@ -69,7 +69,7 @@ inline constexpr ValueNames unreachableNames{unreachableRows};
 inline constexpr ValueNames timeExceededNames{timeExceededRows};
 inline constexpr ValueNames parameterProblemNames{parameterProblemRows};
 
-// The octets of the checksum, the data and the invoking packet are fields of their own.
+// Each octet of the checksum, the data and the invoking packet is a field of its own.
 // clang-format off
 inline constexpr Field messageClass             {246, "Message Type",      bit(7),    "%n=%-S", &classNames};
 inline constexpr Field messageType              {247, "ICMP Message Type", octets(1), "%n=%-S", &typeNames};
@@ -110,7 +110,7 @@ inline constexpr Field echoReplyData            {282, "Data ",             octet
 inline constexpr std::int32_t typeOctets = 1;
 inline constexpr std::int32_t octetsAfterType = 7;
 
-// What stands behind the type: `fixed` are the fields of the header's second word.
+// Reads the message after its type: `fixed` are the fields of the header's second word.
 template <const Field &code, const Field &checksum, const Field &data, const Field &...fixed, class Pass>
 NETFLOOR_INLINE inline void body(Reader<Pass> &reader) {
     auto &variables = reader.variables();

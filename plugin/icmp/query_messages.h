@@ -12,8 +12,8 @@
 //   |    Data: octets, three timestamps, or an address mask         |
 //   +---------------------------------------------------------------+
 //
-// In place of identifier and sequence number an advertisement has the number of its routers, the size of an entry and
-// the lifetime, with the entries behind them; a solicitation has 32 reserved bits.
+// Instead of identifier and sequence number, an advertisement has the number of routers, the size of an entry and the
+// lifetime, and then the entries. A solicitation has 32 reserved bits there.
 #pragma once
 
 #include <cstdint>
@@ -80,7 +80,7 @@ NETFLOOR_INLINE inline void echo(Reader<Pass> &reader) {
     if (reader.live) {
         variables.payloadOctets -= echoHeaderOctets;
     }
-    // A datagram too short for its message is a fault; data that is cut short is none.
+    // A datagram that is too short for the header is a fault; data that are cut short are none.
     readRepeated<echoData>(reader, variables.payloadOctets);
     if (variables.payloadOctets < 0) {
         reader.raise(Flag::count);
@@ -114,7 +114,7 @@ NETFLOOR_INLINE inline void information(Reader<Pass> &reader) {
     read<informationSequence>(reader);
 }
 
-// An entry is 8 octets, whatever the size of an entry says. One that is cut short counts as seen.
+// An entry has 8 octets, whatever the entry size field says. An entry that is cut short is counted.
 template <class Pass>
 NETFLOOR_INLINE inline void routerAdvertisement(Reader<Pass> &reader) {
     if (!reader.live) {
@@ -162,7 +162,7 @@ NETFLOOR_INLINE inline void addressMaskMessage(Reader<Pass> &reader) {
     read<addressMask>(reader);
 }
 
-// Where two types share a message, its key fields have a row for each type.
+// If two types share a message, its key fields have a row for each type.
 // clang-format off
 using EchoRows = Rows<
     FieldList<echoCode, echoChecksum, echoIdentifier, echoSequence, echoData>,

@@ -16,7 +16,7 @@
 //   |                     Options and padding                       |
 //   +---------------------------------------------------------------+
 //
-// The quotation is shown and leads to nothing: its length opens no limit, and its protocol is not decoded.
+// The quoted header is only shown: its length sets no limit, and its protocol chooses no production.
 #pragma once
 
 #include <array>
@@ -32,7 +32,7 @@
 
 namespace netfloor::plugin::icmp {
 
-// The values of the outer header have the same names in another spelling.
+// These values have names in the outer header too, in another spelling.
 inline constexpr std::array quotedPrecedenceRows = {
     ValueName{0, "Routine"},
     ValueName{1, "Priority"},
@@ -57,7 +57,7 @@ inline constexpr ValueNames quotedReliabilityNames{quotedReliabilityRows};
 inline constexpr ValueNames quotedDontFragmentNames{quotedDontFragmentRows};
 inline constexpr ValueNames quotedMoreFragmentsNames{quotedMoreFragmentsRows};
 
-// The cursor moves over the first octet of the Fragment Offset only: the TTL takes the second one with it.
+// After the Fragment Offset the cursor is on its second octet; the TTL moves it over that octet and its own.
 // clang-format off
 inline constexpr Field quotedVersion        {605, "Version",                 piece(4, 7),                                   "  %n=%u"};
 inline constexpr Field quotedHeaderLength   {606, "IHL",                     piece(0, 3).advancing(8),                      "  %n=%u*4 octet(s)"};
@@ -74,7 +74,7 @@ inline constexpr Field quotedMoreFragments  {618, "Flags MF",                bit
 inline constexpr Field quotedFragmentOffset {619, "Fragment Offset",         pieces({0, 4}, {8, 15}).advancing(8).times(8), "  %n=%u"};
 inline constexpr Field quotedTimeToLive     {620, "TTL",                     piece(8, 15).advancing(16),                    "  %n=%u"};
 
-// The protocol: its short text tells which message quotes it, and whether that came through an IP in IP tunnel.
+// The protocol. Its short text says which message quotes the header, and whether that message came in IP in IP.
 inline constexpr Field unreachableInTunnel  {663, "Embedded IP Protocols",  octets(1), "%n=%-S",               &protocolNames, "IPinIP - ICMP - DUM - %-S"};
 inline constexpr Field sourceQuenchInTunnel {666, "Embedded IP Protocols",  octets(1), "%n=%-S",               &protocolNames, "IPinIP- ICMP - SQM - %-S"};
 inline constexpr Field redirectInTunnel     {669, "Embedded IP Protocols",  octets(1), "%n=%-S",               &protocolNames, "IPinIP - ICMP - RM - %-S"};
@@ -135,7 +135,7 @@ NETFLOOR_INLINE inline void quotedHeader(Reader<Pass> &reader) {
     read<quotedChecksum>(reader);
     read<quotedSource>(reader);
     read<quotedDestination>(reader);
-    // The options are as long as the quoted header says, whatever header the message itself stands behind.
+    // The length of the options comes from the quoted header, not from the header before the message.
     if (embeddedHeaderOctets >= 1) {
         ipv4::options(reader, embeddedHeaderOctets);
     }

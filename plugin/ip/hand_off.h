@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// The hand-off of TCP, UDP and SCTP: the ports choose who owns the payload.
+// The hand-off of TCP, UDP and SCTP: the ports choose the owner of the payload.
 #pragma once
 
 #include <cstdint>
@@ -11,14 +11,14 @@
 
 namespace netfloor::plugin {
 
-// A payload of so many bits or less is left unread.
+// A payload of this many bits or fewer is not handed off.
 inline constexpr std::uint32_t handOffAbove = 32;
 
-// Below this a source port is well known, and wins over everything.
+// A source port below this is well known, and is preferred to all others.
 inline constexpr std::uint32_t wellKnownPorts = 1024;
-// Below this a port is taken as a server's.
+// A port below this is taken for a server's.
 inline constexpr std::uint32_t serverPorts = 9000;
-// The signalling of the control plane, on either side: looked up without the protocol.
+// The port of control-plane signalling, as a source port preferred too. Its hand-off does not write the protocol.
 inline constexpr std::uint32_t signallingPort = 3452;
 
 [[nodiscard]] constexpr NextLayer chooseNextLayer(std::uint32_t source, std::uint32_t destination,
@@ -36,8 +36,8 @@ inline constexpr std::uint32_t signallingPort = 3452;
     return {.key = protocol, .port = 0, .writesPort = false, .writesProtocol = false};
 }
 
-// Tells the next layer how many octets it has, and how many of the IPv4 datagram stand before them. Over IPv6
-// the latter is the negated payload, as no Total Length was read.
+// Tells the next layer how many octets it has, and how many octets of the IPv4 datagram precede them. Over
+// IPv6 the latter is the negated payload length, as no Total Length was read.
 template <class Pass>
 NETFLOOR_INLINE inline void tellNextLayer(Reader<Pass> &reader) {
     const auto &variables = reader.variables();

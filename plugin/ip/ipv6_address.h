@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// IPv6 addresses (RFC 4291), which headers, options and parameters of several protocols hold.
+// IPv6 addresses (RFC 4291), which occur in headers, options and parameters of several protocols.
 #pragma once
 
 #include "frame/bit_order.h"

@@ -1,13 +1,14 @@
 // SPDX-License-Identifier: MIT
-// Option lists behind a header, as IPv4 (RFC 791) and TCP (RFC 9293) have them: each option starts with an
-// octet that says its type, and all but the shortest go on with an octet that says its length.
+// The option list after a header, as in IPv4 (RFC 791) and TCP (RFC 9293). Each option starts with an octet for its
+// type. An octet for its length follows, except in options of one octet.
 //
 //   +--------+     +--------+--------+---------------+
 //   |  type  |     |  type  | length |     data      |
 //   +--------+     +--------+--------+---------------+
 //
-// A list is read in rounds. In a round each known type has its turn once, in a fixed order, and takes the option
-// under the cursor if it is its own; so a round takes several options where they stand in that order.
+// A list is read in rounds. In a round each known type has one turn, in a fixed order. A type that has its turn reads
+// the option at the cursor if the option is of this type. So one round reads several options if they come in that
+// order.
 #pragma once
 
 #include <array>
@@ -21,10 +22,10 @@
 
 namespace netfloor::plugin {
 
-// The octets in which the options stand.
+// The octets that hold the options.
 struct OptionArea {
-    std::int32_t octets; // still to decode; below 0 where an option says that it is longer than the area
-    bool taken = false;  // an option was taken in this round
+    std::int32_t octets; // still to decode; below 0 if the length of an option is larger than what was left
+    bool taken = false;  // an option was read in this round
 
     void take(std::int32_t optionOctets) {
         octets -= optionOctets;
@@ -32,7 +33,7 @@ struct OptionArea {
     }
 };
 
-// The place of every type in the order of turns; behind the last one where the type is not known.
+// The turn of every type; `count`, which is past the last turn, for a type that is not known.
 template <std::size_t count>
 [[nodiscard]] consteval std::array<std::uint8_t, 256> turnsOf(const std::array<std::uint8_t, count> &types) {
     std::array<std::uint8_t, 256> turns{};
@@ -46,7 +47,7 @@ template <std::size_t count>
 template <const auto &types>
 inline constexpr auto turnOf = turnsOf(types);
 
-// Looks whose turn, from `turn` on, takes the option under the cursor: types.size() where none does.
+// Peeks at the type of the option at the cursor and gives its turn, if that is `turn` or later; else types.size().
 template <const auto &types, class Pass>
 [[nodiscard]] NETFLOOR_INLINE inline std::size_t nextTaker(Reader<Pass> &reader, std::size_t turn) {
     const std::optional<std::uint32_t> type = peek(reader, octets(1));
@@ -66,7 +67,7 @@ NETFLOOR_INLINE inline void optionOfOneOctet(Reader<Pass> &reader, BlockName nam
     }
 }
 
-// The block of an option with a length: its limit is read ahead.
+// The block of an option with a length. The limit is the option's length, which is peeked.
 template <class Pass>
 class [[nodiscard]] OptionBlock : public LimitedBlock<Pass> {
 public:
@@ -75,7 +76,7 @@ public:
     }
 };
 
-// Reads the type and the length of an option, which counts for as many octets as its length says.
+// Reads the type and the length of an option, and takes that length off the area.
 template <const Field &type, const Field &length, class Pass>
 NETFLOOR_INLINE inline void optionHead(Reader<Pass> &reader, OptionArea &area) {
     read<type>(reader);
@@ -86,7 +87,7 @@ NETFLOOR_INLINE inline void optionHead(Reader<Pass> &reader, OptionArea &area) {
     }
 }
 
-// The same for an option that counts for a fixed number of octets, whatever its length says.
+// The same, but takes a fixed number of octets off the area, whatever the option's length is.
 template <const Field &type, const Field &length, class Pass>
 NETFLOOR_INLINE inline void optionHead(Reader<Pass> &reader, OptionArea &area, std::int32_t countedOctets) {
     read<type>(reader);

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// Fields that have one declaration for each kind of carriage, so that a host sees by the id what a transport or
-// ICMP header came in.
+// Fields that have one declaration for each outer protocol: a host sees by the id whether a transport or ICMP header
+// came through a tunnel, and through which.
 #pragma once
 
 #include "frame/field.h"
@@ -9,7 +9,7 @@
 
 namespace netfloor::plugin {
 
-// Reads the variant for the protocol of the outermost header.
+// Reads the declaration that belongs to the outer protocol.
 template <const Field &inIpInIp, const Field &inMinimalEncapsulation, const Field &other, class Pass,
           class Store = Unstored>
 NETFLOOR_INLINE inline void readByOuterProtocol(Reader<Pass> &reader, Store into = {}) {

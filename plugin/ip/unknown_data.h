@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// Payload of a protocol that the grammar does not know, behind any of its headers: one field for each octet.
+// Payload of a protocol that the grammar does not know, after any header: one field for each octet.
 #pragma once
 
 #include "frame/block.h"

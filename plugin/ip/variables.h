@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// The grammar's variables that more than one protocol reads or sets. The others stand with their protocol.
+// The grammar's variables that more than one protocol reads or sets. The others are declared by their protocol.
 #pragma once
 
 #include <cstdint>

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// The first field of every packet: the version, read ahead of the header that it decides on.
+// The version, which is the first field of every packet and decides which header follows.
 #pragma once
 
 #include "frame/field.h"

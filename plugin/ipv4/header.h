@@ -16,9 +16,8 @@
 //   |                     Options and padding                       |
 //   +---------------------------------------------------------------+
 //
-// Neither the checksum nor the version nor the header length is tested for plausibility. The version has been
-// read ahead when the header starts. What the Total Length allows is a limited block, so that what lies behind
-// the datagram stays to whoever brought it.
+// Checksum, version and header length are not verified. The version was read before this production starts. The Total
+// Length sets the limit of a block, so that octets after the datagram stay unread.
 #pragma once
 
 #include "frame/block.h"
@@ -43,7 +42,7 @@ inline constexpr Field sourceAddress      {159, "Source Address",         octets
 inline constexpr Field destinationAddress {160, "Destination Address",    octets(4),                R"(%n= %-["%u":"."])"};
 // clang-format on
 
-// What the datagram holds in front of its limited block: the octets of version, service and Total Length.
+// The octets of the datagram before its limited block: version, header length, service and Total Length.
 inline constexpr std::uint32_t bitsBeforeLimit = 32;
 
 template <class Pass>
@@ -72,7 +71,7 @@ NETFLOOR_INLINE inline void fieldsAfterTotalLength(Reader<Pass> &reader) {
     read<destinationAddress>(reader);
 }
 
-// Reads a datagram; `payload` is the production of what its header carries.
+// Reads a datagram; `payload` is the production of its payload.
 template <auto payload, class Pass>
 NETFLOOR_INLINE inline void datagram(Reader<Pass> &reader) {
     if (!reader.live) {
@@ -85,7 +84,7 @@ NETFLOOR_INLINE inline void datagram(Reader<Pass> &reader) {
     if (!reader.live) {
         return;
     }
-    // A Total Length below 4 wraps to a huge number, which is more than any packet holds.
+    // For a Total Length below 4 this wraps to a number larger than any packet.
     const std::uint32_t limit = variables.ipTotalLength * bitsPerOctet - bitsBeforeLimit;
     reader.setAdvance(static_cast<std::int32_t>(limit));
     if (limit > reader.left) {

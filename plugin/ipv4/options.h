@@ -6,8 +6,8 @@
 //   type   7  Record Route              type 136  Stream Identifier
 //   type  68  Internet Timestamp        type 137  Strict Source and Record Route
 //
-// An option of any other type ends the list, and so does type 0; what is left of the area is padding. No option
-// is held to the area: one whose length goes past it reads on in the payload, and ends the list.
+// Type 0 and any type not listed end the list; the rest of the area is padding. The area is no limit: an option whose
+// length reaches past the area is read into the payload, and ends the list.
 #pragma once
 
 #include <array>
@@ -23,7 +23,7 @@
 
 namespace netfloor::plugin::ipv4 {
 
-// The levels of RFC 791, whose second octet is read as the more significant.
+// The levels of RFC 791, with the second octet as the more significant one.
 inline constexpr std::array securityRows = {
     ValueName{0, "Unclassified"},
     ValueName{5039, "Restricted"},
@@ -98,14 +98,14 @@ inline constexpr Field optionPadding       {306, "Padding",                     
 
 inline constexpr std::int32_t fixedHeaderOctets = 20;
 
-// An option holds no more entries than this, however long it says it is.
+// No more entries than this are read from an option, whatever its length is.
 inline constexpr std::int32_t mostEntries = 20;
 
 // The types, in the order of their turns in a round.
 inline constexpr std::array<std::uint8_t, 8> optionTypes = {1, 130, 131, 137, 7, 136, 68, 0};
 
 struct OptionVariables {
-    std::int32_t optionOctets; // of the area behind the fixed header
+    std::int32_t optionOctets; // of the area after the fixed header
 };
 
 template <class Pass>
@@ -118,8 +118,8 @@ void securityOption(Reader<Pass> &reader, OptionArea &area) {
     read<transmissionControl>(reader);
 }
 
-// In a packet that is not one of IPv4, a route is one of IPv6 addresses. No IPv6 header leads to an IPv4 header so far,
-// but the field tables publish the address as part of the routes.
+// In a packet that does not start with an IPv4 header, the route data are IPv6 addresses. No IPv6 header leads to an
+// IPv4 header so far, but the field tables list the address among the fields of the routes.
 template <const Field &type, const Field &length, const Field &pointer, const Field &routeData, class Pass>
 void routeOption(Reader<Pass> &reader, BlockName name, OptionArea &area) {
     const OptionBlock<Pass> option{reader, name};
@@ -152,7 +152,7 @@ void addressAndTimestamp(Reader<Pass> &reader) {
     read<registeredTimestamp>(reader);
 }
 
-// With prespecified addresses these show as timestamps too.
+// With prespecified addresses, these are shown as timestamps too.
 template <class Pass>
 void timestampOption(Reader<Pass> &reader, OptionArea &area) {
     const OptionBlock<Pass> option{reader, "Type68"};
@@ -178,7 +178,7 @@ void endOfListOption(Reader<Pass> &reader, OptionArea &area) {
     area.taken = false;
 }
 
-// Takes the option under the cursor, which is of a known type.
+// Reads the option at the cursor, which is of a known type.
 template <class Pass>
 void option(Reader<Pass> &reader, std::uint8_t type, OptionArea &area) {
     switch (type) {
@@ -224,7 +224,7 @@ void optionArea(Reader<Pass> &reader) {
     }
 }
 
-// The options in an area of so many octets. A header without options costs no more than its block.
+// Reads the options in an area of `areaOctets`. A header without options costs no more than its block.
 template <class Pass>
 NETFLOOR_INLINE inline void options(Reader<Pass> &reader, std::int32_t areaOctets) {
     if (!reader.live) {

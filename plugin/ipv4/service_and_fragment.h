@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// The two productions of the IPv4 header (RFC 791) that an IP in IP header shares.
+// The two productions that the IPv4 header (RFC 791) and the IP in IP header share.
 //
 //    0   1   2   3   4   5   6   7          0   1   2   3 ...                   15
 //  +---+---+---+---+---+---+---+---+      +---+---+---+--------------------------+

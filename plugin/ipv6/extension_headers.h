@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// The extension headers of IPv6 (RFC 2460), each of which tells the next one.
+// The extension headers of IPv6 (RFC 2460). Each one names the next header.
 //
 //   Routing (43)                           Fragment (44)
 //   +--------+--------+--------+--------+  +--------+--------+-------------+--+-+
@@ -16,8 +16,8 @@
 //   |         Encrypted data ...        |  |          Sequence Number          |
 //                                          |      Authentication data ...      |
 //
-// No header's length is a limit: a header is read by its fields, and the next one is looked for where they
-// end. What a length does is to count off `payloadOctets`, and when nothing is left of them the chain ends.
+// The length of a header is no limit: the next header starts where the fields of this one end. The length is only
+// subtracted from `payloadOctets`. The chain ends when nothing is left of these.
 #pragma once
 
 #include <array>
@@ -67,7 +67,7 @@ struct ExtensionHeaderVariables {
     std::int32_t ahDataOctets; // of the authentication header that was read last
 };
 
-// Octets of an extension header that tells its length in units of 8 octets, without the first one.
+// Octets of an extension header whose length field counts units of 8 octets after the first unit.
 [[nodiscard]] constexpr std::uint32_t extensionOctets(std::uint32_t length) {
     return length * 8 + 8;
 }
@@ -75,7 +75,7 @@ struct ExtensionHeaderVariables {
 inline constexpr std::uint32_t fragmentHeaderOctets = 8;
 inline constexpr std::uint32_t securityHeaderOctets = 8;
 
-// Counts a header off the payload.
+// Subtracts a header from the payload.
 template <class Pass>
 NETFLOOR_INLINE inline void countOff(Reader<Pass> &reader, std::uint32_t octetCount) {
     if (reader.live) {
@@ -83,7 +83,7 @@ NETFLOOR_INLINE inline void countOff(Reader<Pass> &reader, std::uint32_t octetCo
     }
 }
 
-// Gives the length as it stands in the header.
+// Reads the length and gives it in the unit of the header.
 template <class Pass>
 [[nodiscard]] NETFLOOR_INLINE inline std::uint32_t headerLength(Reader<Pass> &reader) {
     std::uint32_t length = 0;
@@ -94,7 +94,7 @@ template <class Pass>
     return length;
 }
 
-// The links of the chain. Their blocks stay open in `chain`; each gives whether the chain goes on behind it.
+// The links of the chain. Their blocks stay open in `chain`. Each function returns whether the chain goes on after it.
 
 template <class Pass>
 [[nodiscard]] NETFLOOR_INLINE inline bool optionsHeader(Reader<Pass> &reader, BlockChain<Pass> &chain, BlockName name) {
@@ -104,7 +104,7 @@ template <class Pass>
     return reader.live && option(reader, chain);
 }
 
-// "Sgmt Left" does not steer the addresses: all that the length has room for are read.
+// The length gives the number of addresses to read; "Sgmt Left" has no influence.
 template <class Pass>
 NETFLOOR_INLINE inline void type0Routing(Reader<Pass> &reader) {
     nextHeader(reader);
@@ -118,7 +118,7 @@ NETFLOOR_INLINE inline void type0Routing(Reader<Pass> &reader) {
     countOff(reader, extensionOctets(length));
 }
 
-// The header is read up to 4 octets in front of its end, and that is where the next one is looked for.
+// The header is read up to 4 octets before its end, and the next header is read from there.
 template <class Pass>
 NETFLOOR_INLINE inline void unknownRouting(Reader<Pass> &reader) {
     nextHeader(reader);
@@ -127,7 +127,7 @@ NETFLOOR_INLINE inline void unknownRouting(Reader<Pass> &reader) {
     countOff(reader, extensionOctets(length));
 }
 
-// A header of an unknown type that is not through with its segments is left unread, and ends the chain.
+// A header of an unknown type that has segments left is not read, and ends the chain.
 template <class Pass>
 [[nodiscard]] NETFLOOR_INLINE inline bool routingHeader(Reader<Pass> &reader, BlockChain<Pass> &chain) {
     std::uint32_t type = 0;
@@ -151,7 +151,7 @@ template <class Pass>
     return true;
 }
 
-// The offset steers nothing: what a later fragment holds is read as the next header all the same.
+// The offset has no influence: the payload of a later fragment is read as the next header too.
 template <class Pass>
 [[nodiscard]] NETFLOOR_INLINE inline bool fragmentHeader(Reader<Pass> &reader, BlockChain<Pass> &chain) {
     chain.open("IPv6 Fragment Header");

@@ -12,8 +12,8 @@
 //   |                      Destination Address                      |
 //   +---------------------------------------------------------------+
 //
-// A Payload Length that reaches behind the packet leaves all behind it unread. The version of the packet's
-// first header has been read ahead; that of a header inside another one is not shown.
+// If the Payload Length reaches past the packet, nothing after it is read. The version of the first header was read
+// before this production starts; the version of an inner header is not shown.
 #pragma once
 
 #include <cstdint>
@@ -28,8 +28,8 @@
 
 namespace netfloor::plugin::ipv6 {
 
-// The Payload Length is shown ahead (168), for the limit, and again inside the limit (171). The published tables do not
-// tell the two apart: both have the layout of two octets that the cursor moves over.
+// The Payload Length is reported twice: for the limit (168), without moving the cursor, and inside the limit (171). The
+// published tables show no difference: both have the layout of two octets that the cursor moves over.
 //
 // clang-format off
 inline constexpr Field trafficClass       {166, "Traffic Class",          pieces({0, 3}, {12, 15}),                          "%n=%u"};
@@ -45,15 +45,15 @@ inline constexpr Field destinationNibbles {954, "Destination IP Address", addres
 // clang-format on
 
 struct HeaderVariables {
-    std::uint32_t ipv6PayloadLength; // octets behind the fixed header
+    std::uint32_t ipv6PayloadLength; // octets after the fixed header
 };
 
 inline constexpr std::uint32_t payloadLengthBits = 16;
 
-// What stands between the Payload Length and the payload: Next Header, Hop Limit and the addresses.
+// The bits between the Payload Length and the payload: Next Header, Hop Limit and the addresses.
 inline constexpr std::uint32_t bitsAfterLength = 272;
 
-// The Next Header of any header of the chain.
+// Reads the Next Header of any header of the chain.
 template <class Pass>
 NETFLOOR_INLINE inline void nextHeader(Reader<Pass> &reader) {
     if (!reader.live) {
@@ -83,10 +83,10 @@ NETFLOOR_INLINE inline void fieldsFromPayloadLength(Reader<Pass> &reader) {
     addressReadTwice<destinationGroups, destinationNibbles>(reader);
 }
 
-// Reads a fixed header, whose body stays open in `chain`. Gives whether the chain goes on behind it.
+// Reads a fixed header, whose body stays open in `chain`. Returns whether the chain goes on after it.
 //
-// The test of the length is made with what stands behind the Payload Length, while the body starts with it:
-// a packet one or two octets short is read as far as it goes.
+// The test of the bits left counts from after the Payload Length, but the body starts at the Payload Length. So a
+// packet that is one or two octets too short passes the test, and is read up to its end.
 template <class Pass>
 [[nodiscard]] NETFLOOR_INLINE inline bool fixedHeader(Reader<Pass> &reader, BlockChain<Pass> &chain) {
     auto &variables = reader.variables();

@@ -5,8 +5,8 @@
 //   |  Option Type  |  Option Length| Option Data
 //   +---------------+---------------+------------- - - -
 //
-// Only the first option of a header is read. What stands behind it is taken as the next header, so that a
-// header with several options shows the second one as something that it is not.
+// Only the first option of a header is read. The octets after it are read as the next header, so that the second option
+// of a header is shown as something that it is not.
 #pragma once
 
 #include <cstdint>
@@ -33,12 +33,12 @@ inline constexpr Field discardedOptionType {243, "discard packet",       octets(
 // clang-format on
 
 struct OptionVariables {
-    std::int32_t optionLength; // of the option that told its length last
+    std::int32_t optionLength; // of the last option whose length was read
 };
 
 enum : std::uint32_t { optionPad1 = 0, optionPadN = 1 };
 
-// What the two top bits of the type say is to be done with an option that nobody knows.
+// What to do with an unknown option, as the two top bits of its type say.
 inline constexpr std::uint32_t actionSkip = 0;
 
 inline constexpr std::int32_t nibblesPerOctet = 2;
@@ -59,7 +59,7 @@ NETFLOOR_INLINE inline void skippedOption(Reader<Pass> &reader) {
     readCounted<skippedOctet>(reader, variables.optionLength);
 }
 
-// The option forbids to go on. Its length is not read: all behind its type is data.
+// An option whose type forbids to go on. Its length is not read: everything after the type is data.
 template <class Pass>
 NETFLOOR_INLINE inline void discardedOption(Reader<Pass> &reader) {
     read<discardedOptionType>(reader);
@@ -68,7 +68,7 @@ NETFLOOR_INLINE inline void discardedOption(Reader<Pass> &reader) {
     }
 }
 
-// Reads an option, whose blocks stay open in `chain`. Gives whether the chain goes on behind it.
+// Reads an option, whose blocks stay open in `chain`. Returns whether the chain goes on after it.
 template <class Pass>
 [[nodiscard]] NETFLOOR_INLINE inline bool option(Reader<Pass> &reader, BlockChain<Pass> &chain) {
     std::uint32_t type = 0;

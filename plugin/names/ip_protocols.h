@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// The names of the IP protocol numbers, which the registry of assigned numbers gives up to 137.
+// The names of the IP protocol numbers. The registry of assigned numbers names those up to 137.
 #pragma once
 
 #include <array>

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// What an IPv4 datagram carries.
+// The payload of an IPv4 datagram.
 #pragma once
 
 #include "frame/block.h"
@@ -15,10 +15,13 @@
 
 namespace netfloor::plugin {
 
-// Runs the production of the payload. A later fragment is data, whatever its protocol; with DF set the offset
-// does not count.
+// Runs the production of the payload, if the header was read to its end. A fragment other than the first one is data,
+// whatever its protocol. If DF is set, the fragment offset is ignored.
 template <class Pass>
 NETFLOOR_INLINE inline void ipv4Payload(Reader<Pass> &reader) {
+    if (!reader.live) {
+        return;
+    }
     const auto &variables = reader.variables();
     if (variables.fragmentOffset >= 1 && variables.dontFragment == 0) {
         return runOutOfLine<unknownData<Pass>>(reader);

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// An IPv6 packet: the chain of its headers, up to the one that ends it. An IPv6 header is a link like the others, and
-// the first one.
+// An IPv6 packet: a chain of headers, and the payload that ends it. The fixed header is the first link of the chain,
+// and may come again later in it.
 #pragma once
 
 #include <cstdint>
@@ -18,7 +18,7 @@
 
 namespace netfloor::plugin {
 
-// A protocol that ends the chain. The tunnels of IPv4 are not followed from here.
+// Runs the production of the payload, which ends the chain. The tunnels through IPv4 are not followed from here.
 template <class Pass>
 NETFLOOR_INLINE inline void ipv6Payload(Reader<Pass> &reader, std::uint32_t protocol) {
     switch (protocol) {
@@ -50,7 +50,7 @@ template <class Pass>
     }
 }
 
-// A packet: its IPv6 header, and what that leads to.
+// Reads the chain of headers, and the payload.
 template <class Pass>
 NETFLOOR_INLINE inline void ipv6Packet(Reader<Pass> &reader) {
     const auto &variables = reader.variables();

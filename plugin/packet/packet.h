@@ -27,7 +27,7 @@ struct Variables : BitOrderVariables,
                    tcp::TcpVariables,
                    sctp::Variables {};
 
-// One packet, from its version on. With a version other than 4 and 6 nothing further is read.
+// Reads one packet. After a version other than 4 and 6 nothing is read.
 template <class Pass>
 NETFLOOR_INLINE inline void packet(Reader<Pass> &reader) {
     auto &variables = reader.variables();

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
 // Tunnels through IPv4: IP in IP (RFC 2003) and minimal encapsulation (RFC 2004), one inside the other in any order,
-// and what the innermost carries. Thousands of levels fit in one datagram.
+// and the payload of the innermost. One datagram has room for thousands of levels.
 #pragma once
 
 #include <cstdint>
@@ -32,7 +32,7 @@ NETFLOOR_INLINE inline void tunnelPayload(Reader<Pass> &reader, std::uint32_t in
     }
 }
 
-// Reads the tunnel that the protocol says, and all tunnels inside it.
+// Reads the tunnel whose protocol number was read last, and all tunnels inside it.
 template <class Pass>
 NETFLOOR_INLINE inline void tunnels(Reader<Pass> &reader) {
     const auto &variables = reader.variables();

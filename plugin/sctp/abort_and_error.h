@@ -9,9 +9,9 @@
 //   |                         Error Causes                          |
 //   +---------------------------------------------------------------+
 //
-// ABORT has a limit: nothing that goes wrong in it reaches the walk over the chunks, unless the limit itself is too
-// long. ERROR has none, and the end of its causes mostly ends the walk. The Length of both goes to the causes alone:
-// `chunkOctets` stays that of the chunk before, which the walk then counts twice.
+// ABORT has a limit: a fault in it does not end the walk over the chunks, unless the limit itself is too long. ERROR
+// has none, and the end of its causes mostly ends the walk. The Length of both is used for the causes only:
+// `chunkOctets` stays that of the previous chunk, which the walk then counts twice.
 #pragma once
 
 #include <array>

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// The head of a chunk (RFC 9260, section 3.2), behind its type.
+// The head of a chunk (RFC 9260, section 3.2), after its type.
 //
 //    0                   1                   2                   3
 //    0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1
@@ -7,7 +7,7 @@
 //   |   Chunk Type  |  Chunk Flags  |          Chunk Length         |
 //   +---------------+---------------+-------------------------------+
 //
-// Nearly every chunk has ids of its own for these fields, and their names come in two spellings.
+// Nearly every chunk has its own ids for these fields, whose names have two spellings.
 #pragma once
 
 #include <cstdint>

@@ -9,7 +9,7 @@
 //   |                            Cookie                             |
 //   +---------------------------------------------------------------+
 //
-// COOKIE ACK is a head alone.
+// COOKIE ACK has no more than a head.
 #pragma once
 
 #include "frame/block.h"
@@ -28,7 +28,7 @@ inline constexpr Field cookie          {895, "    Cookie", octetRunBackward(), R
 inline constexpr Field cookieAckFlags  = lowerFlagsField(892);
 // clang-format on
 
-// `chunkOctets` stays without the head, so that the walk takes four octets fewer than the Length.
+// `chunkOctets` does not include the head, so that the walk counts four octets fewer than the Length.
 template <class Pass>
 void cookieEchoChunk(Reader<Pass> &reader) {
     std::int32_t &chunkOctets = reader.variables().chunkOctets;

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// A list whose elements are counted by a field in front of it.
+// A list whose number of elements is in a field before it.
 #pragma once
 
 #include <cstdint>
@@ -8,8 +8,8 @@
 
 namespace netfloor::plugin::sctp {
 
-// Reads a list of `count` elements. The count is believed as it stands: the list ends at it, or where a field does
-// not fit. An element counts once it is begun, so a list whose last element is cut short has its full count. Gives
+// Reads a list of `count` elements. The count is not verified: the list ends after that many, or at a field that does
+// not fit. An element is counted when it starts, so a list whose last element is cut short has its full count. Returns
 // whether that is so.
 template <class Pass, class Element>
 NETFLOOR_INLINE inline bool countedList(Reader<Pass> &reader, std::int32_t count, Element element) {

@@ -15,9 +15,9 @@
 //   |                           User Data                           |
 //   +---------------------------------------------------------------+
 //
-// The I bit of RFC 7053 shows as reserved. The user data are the next layer's, which the ports choose; the Payload
-// Protocol Identifier has no say in it. The walk over the chunks goes on where the next layer stopped, so a chunk
-// behind DATA is decoded if the next layer has consumed the user data and their padding.
+// The I bit of RFC 7053 is shown as reserved. The ports choose the next layer, which gets the user data; the Payload
+// Protocol Identifier has no influence. The walk over the chunks goes on where the next layer stopped, so a chunk after
+// DATA is decoded if the next layer has consumed the user data and their padding.
 #pragma once
 
 #include <array>
@@ -52,7 +52,7 @@ inline constexpr Field streamSequenceNumber      {819, "    Stream Sequence Numb
 inline constexpr Field payloadProtocolIdentifier {820, "    Payload Protocol Identifier", octets(4),                "    %n=0x%x"};
 // clang-format on
 
-// A Length of so many octets is that of a chunk without user data.
+// The Length of a chunk without user data.
 inline constexpr std::int32_t emptyDataOctets = 16;
 
 template <class Pass>

@@ -9,8 +9,8 @@
 //   |                   Cause-Specific Information                  |
 //   +---------------------------------------------------------------+
 //
-// The causes are not walked by their own Lengths. The first is limited by all causes of the chunk, and the end of its
-// block skips the others. What a further round is limited by depends on what the cause before has stored.
+// The Length of a cause does not limit it. The limit of the first cause covers all causes of the chunk, and the end of
+// its block skips the others. The limit of each later round is what the previous cause stored.
 #pragma once
 
 #include <array>
@@ -53,7 +53,7 @@ inline constexpr std::array causeCodeRows = {
 };
 inline constexpr ValueNames causeCodeNames{.rows = causeCodeRows, .otherwise = "UNKNOWN"};
 
-// Each cause has an id of its own for its Length: that is how the host tells the causes apart.
+// Each cause has its own id for its Length, by which the host distinguishes the causes.
 constexpr Field causeLengthField(std::uint32_t id) {
     return {id, "      Length", octetPair(), "      %n=%u"};
 }
@@ -95,11 +95,11 @@ void missingParameters(Reader<Pass> &reader) {
         const Block<Pass> block{reader, "INLINE BLOCK"};
         read<missingType>(reader);
     });
-    // The list of causes ends behind a last type that is cut short.
+    // The list of causes ends after a last type that is cut short.
     reader.test(!cutShort);
 }
 
-// The list runs until a field does not fit: behind the last parameter that is the type of the next.
+// The list ends at a field that does not fit: after the last parameter, this is the type of a next one.
 template <class Pass>
 void unrecognizedParameterList(Reader<Pass> &reader) {
     std::int32_t &errorOctets = reader.variables().errorOctets;
@@ -147,14 +147,14 @@ void causeOf(Reader<Pass> &reader, std::uint32_t code) {
     }
 }
 
-// The block of a cause bears the name of its code.
+// The block of a cause has the name of its code.
 [[nodiscard]] constexpr BlockName causeBlock(std::uint32_t code) {
     const std::uint32_t row = rowNumber<causeCodeNames>(code);
     return row == 0 ? BlockName{"Unknown Cause Code"} : BlockName{causeCodeRows[row - 1].text};
 }
 
-// The list goes on as long as its rounds end with the condition true, mostly with a field that did fit, whether or
-// not anything is left. It ordinarily ends with a limit that is longer than what is left.
+// The list goes on while a round ends with a true condition, which mostly is that of a field that fitted. Whether
+// anything is left does not matter. Usually the list ends with a limit that is longer than the bits left.
 template <class Pass>
 void causeList(Reader<Pass> &reader) {
     while (reader.live && reader.state->condition != 0) {

@@ -33,7 +33,7 @@ inline constexpr Field heartbeatInfo       {943, "        Sender-specific HB Inf
 
 inline constexpr std::uint32_t knownInfoType = 1;
 
-// Information of another type stays unread, and so does one whose type is cut short: the walk takes it for the next
+// Information of another type is not read, and neither is one whose type is cut short: the walk reads it as the next
 // chunk.
 template <class Pass>
 void heartbeatInformation(Reader<Pass> &reader) {

@@ -17,7 +17,7 @@
 //   |                           Parameters                          |
 //   +---------------------------------------------------------------+
 //
-// INIT has a limit, so that a field that does not fit stays its own matter. INIT ACK has none.
+// INIT has a limit, so that a field that does not fit ends INIT only. INIT ACK has none.
 #pragma once
 
 #include <cstdint>
@@ -32,7 +32,7 @@
 
 namespace netfloor::plugin::sctp {
 
-// The two chunks have the same fields, whose ids run on from the first.
+// The two chunks have the same fields, with consecutive ids from the first on.
 inline constexpr std::uint32_t initIds = 823;
 inline constexpr std::uint32_t initAckIds = 835;
 
@@ -46,7 +46,7 @@ template <std::uint32_t ids> inline constexpr Field inboundStreams  {ids + 5, " 
 template <std::uint32_t ids> inline constexpr Field initialTsn      {ids + 6, "    Initial Transmission Sequence Number(I_TSN)", octets(4), "    %n=%u"};
 // clang-format on
 
-// The Length counts in so many octets in front of the parameters.
+// The octets before the parameters, which the Length includes.
 inline constexpr std::int32_t octetsBeforeParameters = 20;
 
 template <std::uint32_t ids, auto parameters, class Pass>

@@ -9,9 +9,9 @@
 //   |                             Value                             |
 //   +---------------------------------------------------------------+
 //
-// The two lists differ: they know different types, and a parameter of INIT is a limited block, so that what does not
-// fit in it stays its own matter and what its value leaves over is skipped. In an INIT ACK the next parameter is read
-// behind the last field of the one before, padding or not, and what does not fit ends the walk over the chunks.
+// The two lists differ in the types that they know. A parameter of INIT is a limited block: a field that does not fit
+// ends the parameter only, and octets after its value are skipped. In an INIT ACK the next parameter starts after the
+// last field of the previous one, with padding or not, and a field that does not fit ends the walk over the chunks.
 #pragma once
 
 #include <array>
@@ -76,22 +76,22 @@ inline constexpr Field unknownParameter        {872, "        Reserved",        
 inline constexpr Field stateCookie             {857, "        State Cookie",                         octetRun(), R"(        %n=%-["%x"])"};
 // clang-format on
 
-// What a parameter takes from the octets of its list: its Length less 8, and not its Length. So a list seldom ends with
-// its last parameter; it ends where the bits do.
+// Subtracts a parameter from the octets of its list: its Length less 8, not its Length. So a list seldom ends with its
+// last parameter; it ends with the bits.
 template <class Pass>
-void reckonParameter(Reader<Pass> &reader, std::int32_t &listOctets) {
+void subtractParameter(Reader<Pass> &reader, std::int32_t &listOctets) {
     if (reader.live) {
         listOctets -= reader.variables().parameterOctets - headOctets;
     }
 }
 
-// Whether the list has another parameter, by that reckoning. It is asked also behind a field that did not fit.
+// Whether the list has another parameter, by that count. The test is made also after a field that did not fit.
 template <class Pass>
 [[nodiscard]] bool listGoesOn(Reader<Pass> &reader, std::int32_t listOctets) {
     return reader.test(listOctets >= 1) && reader.live;
 }
 
-// A parameter whose value is one field, of fixed size or of as many octets as the Length tells.
+// A parameter whose value is one field, of a fixed size or of the size that the Length gives.
 template <const Field &field, class Pass>
 void parameterOf(Reader<Pass> &reader, BlockName name) {
     if (!reader.live) {
@@ -126,7 +126,7 @@ void commonParameter(Reader<Pass> &reader, std::uint32_t type) {
     }
 }
 
-// From here on `parameterOctets` counts the types, and the list reckons with that number.
+// From here on `parameterOctets` is the number of types, which is then subtracted from the list.
 template <class Pass>
 void supportedAddressTypes(Reader<Pass> &reader) {
     if (!reader.live) {
@@ -161,17 +161,17 @@ void initParameters(Reader<Pass> &reader) {
             LimitedBlock<Pass> parameter{reader, "Init Option"};
             parameter.limit(limitFromLength<valueLengthAhead>(reader, octetsAfterHead(variables.parameterOctets)));
             initParameter(reader);
-            reckonParameter(reader, variables.chunkOctets);
+            subtractParameter(reader, variables.chunkOctets);
         }
-        // A parameter of Length 0 would be read again for ever. Where less than a type is left, the next limit is
-        // another one, and ends the list with its mark.
+        // A parameter of Length 0 would be read again for ever. If less than a type is left, the next round computes
+        // another limit, which ends the list and raises its flag.
         if (reader.cursor == start && reader.left >= typeBits) {
             reader.live = false;
         }
     }
 }
 
-// The parameters set `parameterOctets` anew, so that the outer list reckons with the last of them.
+// The inner parameters overwrite `parameterOctets`, so that the last of them is subtracted from the outer list.
 template <class Pass>
 void unrecognizedParameters(Reader<Pass> &reader) {
     if (!reader.live) {
@@ -183,7 +183,7 @@ void unrecognizedParameters(Reader<Pass> &reader) {
     while (listGoesOn(reader, unrecognizedOctets)) {
         chain.open("");
         unrecognizedParameter(reader);
-        reckonParameter(reader, unrecognizedOctets);
+        subtractParameter(reader, unrecognizedOctets);
     }
 }
 
@@ -209,11 +209,11 @@ void initAckParameters(Reader<Pass> &reader) {
             const Block<Pass> parameter{reader, "InitAck Option"};
             initAckParameter(reader);
         }
-        reckonParameter(reader, variables.chunkOctets);
+        subtractParameter(reader, variables.chunkOctets);
     }
 }
 
-// The parameters that both chunks know stand with INIT, the first one that has them.
+// The parameters that both chunks know are listed with INIT, which comes first.
 // clang-format off
 using InitParameterFields = FieldList<
     initParameterType, initParameterLength,

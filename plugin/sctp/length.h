@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// The Lengths of chunks, parameters and error causes (RFC 9260), and the limits taken from them.
+// The Lengths of chunks, parameters and error causes (RFC 9260), and the limits computed from them.
 #pragma once
 
 #include <array>
@@ -13,10 +13,10 @@
 
 namespace netfloor::plugin::sctp {
 
-// The head of a chunk, a parameter or a cause, which its Length counts in.
+// The head of a chunk, a parameter or a cause, which its Length includes.
 inline constexpr std::int32_t headOctets = 4;
 
-// Stores a Length as the octets behind the head. Of a Length below 4 the number is negative, and nothing fits.
+// Stores a Length as the octets after the head. For a Length below 4 this is negative, and nothing fits.
 [[nodiscard]] constexpr auto octetsAfterHead(std::int32_t &octets) {
     return [&octets](std::uint32_t length) { octets = static_cast<std::int32_t>(length) - headOctets; };
 }
@@ -29,22 +29,22 @@ inline constexpr std::int32_t headOctets = 4;
 inline constexpr std::uint32_t typeBits = 16;
 inline constexpr std::uint32_t lengthBits = 16;
 
-// Bits in front of a Length: stepped over where `needs` of them are left.
+// Bits before a Length, which are skipped if `needs` bits are left.
 struct Skipped {
     std::uint32_t needs;
     std::uint32_t width;
 };
 
-// A Length that lies behind the place where its limited block starts.
+// A Length that comes after the start of the block that it limits.
 struct LengthAhead {
-    std::array<Skipped, 2> skipped; // what lies in front of the Length; one that needs nothing is none
-    bool addsSkipped;               // whether the limit adds them to the Length
-    std::uint32_t takesOff;         // bits that the limit takes off the sum
+    std::array<Skipped, 2> skipped; // the fields before the Length; an element that needs 0 bits is unused
+    bool addsSkipped;               // whether their bits are added to the limit
+    std::uint32_t takesOff;         // bits that are subtracted from the sum
 };
 
-// The limits of a whole Length are Length * 8 bits, of ABORT Length * 8 - 8. INIT starts behind its Chunk Type,
-// so that its limit reaches one octet behind the chunk. Where that octet is missing the limit does not hold, and the
-// walk over the chunks ends; where it is there, it is skipped.
+// The limit is Length * 8 bits, and Length * 8 - 8 for ABORT. INIT starts after its Chunk Type, so that its limit
+// reaches one octet past the chunk. If that octet is missing, the limit does not fit and the walk over the chunks ends.
+// Otherwise the octet is skipped.
 inline constexpr LengthAhead initLengthAhead = {
     .skipped = {Skipped{.needs = 8, .width = 8}},
     .addsSkipped = true,
@@ -63,10 +63,10 @@ inline constexpr LengthAhead valueLengthAhead = {
     .takesOff = 32,
 };
 
-// Reads a Length ahead of its turn, and gives the bits of the limit that it sets. Nothing is reported, and the
-// cursor comes back. What does not fit adds the advance of the step before instead of its own: behind the last
-// parameter of a list that makes a limit which is longer than what is left, or 0. A Length that was read is kept, also
-// where the limit is then too short for the field itself.
+// Peeks at a Length, and gives the limit in bits. Nothing is reported, and the cursor is set back. A field that does
+// not fit adds the advance of the previous step instead of its own: after the last parameter of a list, this makes a
+// limit that is longer than the bits left, or 0. A Length that was read is stored, even if the limit is then too short
+// for the Length field itself.
 template <const LengthAhead &ahead, class Pass, class Store>
 [[nodiscard]] std::uint32_t limitFromLength(Reader<Pass> &reader, Store into) {
     if (reader.ended()) {

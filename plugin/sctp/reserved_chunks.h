@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// ECNE and CWR, which RFC 9260 reserves (section 3.2; RFC 4960, appendix A), and the chunks of unknown types: a head,
-// and octets.
+// ECNE and CWR, which RFC 9260 reserves (section 3.2; RFC 4960, appendix A), and the chunks of unknown types: a head
+// and data.
 #pragma once
 
 #include "frame/block.h"
@@ -47,7 +47,7 @@ void cwrChunk(Reader<Pass> &reader) {
     congestionChunk<cwrFlags, cwrReserved>(reader, "CWR");
 }
 
-// `chunkOctets` stays without the head where there are contents: the walk takes four octets fewer than the Length.
+// With contents, `chunkOctets` does not include the head: the walk counts four octets fewer than the Length.
 template <class Pass>
 void reservedChunk(Reader<Pass> &reader) {
     std::int32_t &chunkOctets = reader.variables().chunkOctets;

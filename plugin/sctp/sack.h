@@ -17,7 +17,7 @@
 //   |                         Duplicate TSN                         |  for each duplicate
 //   +---------------------------------------------------------------+
 //
-// The two numbers are compared with neither the Length nor the bits left.
+// The two counts are not compared with the Length or the bits left.
 #pragma once
 
 #include "frame/block.h"

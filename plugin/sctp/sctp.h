@@ -15,13 +15,12 @@
 //   |                                                               |
 //   +---------------------------------------------------------------+
 //
-// Nothing is tested that SCTP itself would test. Nor does a chunk have a border, except in INIT and ABORT: the next
-// Chunk Type is read where the last field of the chunk before ended. So padding, and whatever a body does not read,
-// show as chunks of their own. `payloadOctets`, which ends the walk, follows the Lengths and not the cursor; where the
-// two part, the walk ends with the bits.
+// Nothing that an SCTP endpoint verifies is verified here. A chunk has no limit, except INIT and ABORT: the next Chunk
+// Type is read where the last field of the previous chunk ended. So padding, and octets that no field of a chunk
+// covers, are shown as chunks. `payloadOctets`, which ends the walk, is counted by the Lengths and not by the cursor.
+// If the two differ, the walk ends with the bits.
 //
-// Where a decision goes through `test`, the host sees it as the state's `condition`, and the list of error causes goes
-// by the last one.
+// A decision made by `test` is seen by the host as the state's `condition`. The list of error causes uses the last one.
 #pragma once
 
 #include <array>
@@ -89,7 +88,7 @@ inline constexpr std::array chunkTypeRows = {
 // clang-format on
 inline constexpr ValueNames chunkTypeNames{.rows = chunkTypeRows, .hasBriefs = true};
 
-// Only the first chunk of a packet has a key and a summary in its short text.
+// Only the type of the first chunk of a packet is a key field, and has a summary as its short text.
 // clang-format off
 inline constexpr Field sourcePort      {795, "SCTP Source Port Number",      octets(2), "%n=%u"};
 inline constexpr Field destinationPort {796, "SCTP Destination Port Number", octets(2), "%n=%u"};
@@ -127,7 +126,7 @@ NETFLOOR_INLINE inline std::uint32_t readChunkType(Reader<Pass> &reader) {
     return type;
 }
 
-// What a busy association consists of, DATA and SACK, is read in line, the rest out of line.
+// DATA and SACK, which are most of the chunks of a busy association, are read in line; the others are run out of line.
 template <class Pass>
 NETFLOOR_INLINE inline void chunkBody(Reader<Pass> &reader, std::uint32_t type) {
     switch (type) {
@@ -150,8 +149,8 @@ NETFLOOR_INLINE inline void chunkBody(Reader<Pass> &reader, std::uint32_t type) 
     }
 }
 
-// Each round reads one Chunk Type octet at least, or ends the walk, whatever the Lengths say and whatever a next layer
-// that led back into this pass has left in the variables.
+// Each round reads at least the octet of a Chunk Type, or ends the walk. This holds for all Lengths, and for all values
+// that a next layer which ran this pass again has left in the variables.
 template <class Pass>
 NETFLOOR_INLINE inline void chunks(Reader<Pass> &reader) {
     auto &variables = reader.variables();
@@ -184,7 +183,7 @@ void packet(Reader<Pass> &reader) {
     chunks(reader);
 }
 
-// The chunks stand in the order of their types.
+// The chunks are listed in the order of their types.
 // clang-format off
 using PacketRows = JoinedRows<
     Rows<

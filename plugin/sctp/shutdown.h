@@ -13,7 +13,7 @@
 //   |   Type = 14   |   Reserved  |T|          Length = 4           |
 //   +---------------+-------------+-+-------------------------------+
 //
-// SHUTDOWN ACK is a head alone. Whatever a larger Length covers is read as the next chunk.
+// SHUTDOWN ACK has no more than a head. Octets that a larger Length covers are read as the next chunk.
 #pragma once
 
 #include <array>

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: MIT
-// The catalogue of all fields, and of all key fields: the rows of the protocols, joined. The fields stand in the order
-// of the published field table: depth first, a protocol where the grammar first comes to it.
+// The catalogue of all fields and of all key fields: the joined rows of the protocols. The fields have the order of the
+// published field table: depth first, each protocol where the grammar first reaches it. A new protocol comes last, so
+// that the rows of the others keep their numbers, which hosts may have stored.
 #pragma once
 
 #include <cstdint>
@@ -46,8 +47,8 @@ using CatalogueKeys = CatalogueRows::Keys;
 
 inline constexpr auto &catalogue = CatalogueFields::pointers;
 
-// These have another number than the rest in the highest octet of their flags. Hosts keep the number; what it means
-// is not known.
+// These fields have another number than the others in the highest octet of their flags. Hosts keep the number; its
+// meaning is not known.
 using CatalogueOfTopOctet6 = Joined<tcp::FieldsOfTopOctet6, udp::FieldsOfTopOctet6, sctp::FieldsOfTopOctet6>;
 
 // The id under which the TO pass reports a field: that of the first field of the same name.

@@ -17,7 +17,7 @@
 
 namespace netfloor::plugin {
 
-// Here, as this file is compiled once.
+// Checked here, as this file is compiled once.
 static_assert(sizeof(CheckedCatalogue<CatalogueFields, CatalogueKeys>) > 0);
 
 // The highest octet of a field's flags.
@@ -48,7 +48,7 @@ inline constexpr std::uint32_t flagsOf = sizeClass(field.place) | (isListedAddre
                                          (isKeyField(field) ? 1u : 0u) << 16 |
                                          (isListed<CatalogueOfTopOctet6, field> ? otherTopOctet : usualTopOctet) << 24;
 
-// The zero-terminated name without blanks behind. Where there are none it is the field's own literal.
+// The zero-terminated name without trailing blanks. A name without any is the field's own literal.
 template <std::size_t index>
 inline constexpr auto bareNameText = [] {
     constexpr std::string_view name = catalogue[index]->bareName();

@@ -35,7 +35,7 @@ public:
     [[nodiscard]] constexpr std::string_view operator[](std::size_t number) const { return texts_[number]; }
 
 private:
-    // FNV-1a, of the first characters and the length: enough to tell most names apart.
+    // FNV-1a, of the first characters and the length: few names have the same.
     [[nodiscard]] static constexpr std::uint32_t hash(std::string_view text) {
         std::uint32_t value = 2166136261u ^ static_cast<std::uint32_t>(text.size());
         for (const char character : text.substr(0, 24)) {
@@ -88,7 +88,7 @@ private:
     std::uint32_t count_ = 0;
 };
 
-// The empty range that stands for any value without a row of its own.
+// The empty range, which means any value without a row of its own.
 inline constexpr std::uint32_t anyFrom = 50;
 inline constexpr std::uint32_t anyTo = 0;
 
@@ -112,7 +112,7 @@ inline constexpr auto displayLines = []<const Field &...fields>(FieldList<fields
 }
 (CatalogueFields{});
 
-// Texts and value names, worked out together since both stand in the order of the fields.
+// Texts and value names, computed together since both have the order of the fields.
 struct TextTables {
     TextNumbers<2048> texts;
     ValuePool<1024> pool;
@@ -154,7 +154,7 @@ inline constexpr TextTables textTables = [] {
         if (!field.hasNames()) {
             continue;
         }
-        // The rows of a list are the same wherever it comes again.
+        // A list that is used again has the same rows again.
         if (const std::size_t first = firstWithNamesOf(i); first != i) {
             std::copy_n(tables.values.begin() + tables.valueStart[first], valueRowCount(field),
                         tables.values.begin() + tables.valueStart[i]);

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
 // The published layouts: where the bits of a field lie, in the code that netfloor/descriptors.h describes. Fields of
-// one layout share a record; records stand in the order of first use.
+// one layout share a record; the records have the order of first use.
 #pragma once
 
 #include <array>
@@ -61,13 +61,12 @@ inline constexpr std::uint32_t countByPacket = 0;  // reference in the place of 
 inline constexpr std::uint32_t fixedLength = 0;    // reference at the end
 inline constexpr std::uint32_t variableLength = 1; // reference at the end
 
-// A field that is read ahead, or by groups that no piece describes, has no layout.
+// A field that is peeked, or read by groups that no piece describes, has no layout.
 [[nodiscard]] constexpr bool hasLayout(const Place &place) {
     return place.shape != Shape::ahead && place.shape != Shape::groups;
 }
 
-// The pieces of which a field is made, and how often they repeat. Nibbles that come again in the next octet are
-// listed once.
+// The pieces of a field, and how often they repeat. Nibbles that are repeated in the next octet are listed once.
 [[nodiscard]] constexpr std::uint32_t distinctPieces(const Place &place) {
     const bool repeats = place.count == 4 && place.pieces[2].low == place.pieces[0].low + bitsPerOctet &&
                          place.pieces[3].low == place.pieces[1].low + bitsPerOctet;
@@ -105,9 +104,9 @@ constexpr void addPieces(LayoutRecord &record, const Place &place) {
     }
 }
 
-// How often the pieces of a fixed field repeat, and the bits from one repeat to the next. The step of octets is also
-// that of ipv6::payloadLengthAhead, which leaves the cursor where it is: it shares the record of "Total Length", and a
-// reader of the tables alone expects the field behind it two octets further on.
+// How often the pieces of a fixed field repeat, and the bits from one repeat to the next. The step of
+// ipv6::payloadLengthAhead is that of octets too, although it does not move the cursor: it shares the record of "Total
+// Length". From the tables alone, the field after it seems to start two octets later than it does.
 [[nodiscard]] constexpr std::uint32_t repeats(const Place &place) {
     return place.shape == Shape::pieces ? place.count / distinctPieces(place) : place.count;
 }

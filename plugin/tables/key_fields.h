@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: MIT
 // The key-field table: which fields the XTR pass can deliver.
 //
-// The rows stand in the order in which the grammar comes to its key fields, a row for each place. A field is
-// stored in the last row that has its name, so of several rows of one name only the last is ever filled.
+// The rows have the order in which the grammar reaches its key fields, a row for each place. A field is stored in the
+// last row of its name: of several rows of one name, only the last one is filled.
 #pragma once
 
 #include <array>
@@ -14,7 +14,7 @@
 
 namespace netfloor::plugin {
 
-// The key fields, a row each, in the order in which the grammar comes to them.
+// The key fields, a row each, in the order in which the grammar reaches them.
 inline constexpr auto &keySites = CatalogueKeys::pointers;
 
 inline constexpr std::uint32_t noKeyRow = 0xffffffff;
@@ -22,7 +22,7 @@ inline constexpr std::uint32_t noKeyRow = 0xffffffff;
 // The table ends with a row without a name, which no field fills: a host can mark it present.
 inline constexpr std::uint32_t keyRowCount = keySites.size() + 1;
 
-// Whether a field is a key field goes by its id, as other fields may bear its name.
+// The id decides whether a field is a key field, as other fields may have the same name.
 [[nodiscard]] constexpr bool isKeyField(const Field &field) {
     for (const Field *const key : keySites) {
         if (key->id == field.id) {

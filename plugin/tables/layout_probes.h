@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
 // Two records of known contents, by which a host checks how the plug-in lays out its records. Each has a head, a
-// body with a mark wherever a pointer would stand, and pairs of offsets: of a pointer, and of what it points to.
+// body with a placeholder for each pointer, and pairs of offsets: of a pointer, and of what it points to.
 #pragma once
 
 #include <array>

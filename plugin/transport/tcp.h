@@ -19,8 +19,9 @@
 //   |                      Options and padding                      |
 //   +---------------------------------------------------------------+
 //
-// The checksum is not verified. What stands behind the acknowledgement number is a limited block, as long as the
-// Data Offset says; a Data Offset that reaches past the packet, or is below 3, keeps the payload from the next layer.
+// The checksum is not verified. The part after the acknowledgement number is a limited block, whose length comes from
+// the Data Offset. If the Data Offset is below 3 or reaches past the packet, the payload is not handed to the next
+// layer.
 #pragma once
 
 #include <cstdint>
@@ -60,16 +61,16 @@ inline constexpr Field urgentPointer            {408, "Urgent Pointer",         
 // clang-format on
 
 struct TcpVariables : OptionVariables {
-    std::uint32_t tcpLengthShort; // a header was longer than the payload of its datagram
+    std::uint32_t tcpLengthShort; // 1 once a header was longer than the payload of its datagram
 };
 
 inline constexpr std::int32_t fixedHeaderOctets = 20;
 
-// The header's words in front of its limited block.
+// The words of the header before its limited block.
 inline constexpr std::uint32_t wordsBeforeLimit = 3;
 inline constexpr std::uint32_t bitsPerWord = 32;
 
-// The fields that stand in the limited block.
+// The fields in the limited block.
 template <class Pass>
 NETFLOOR_INLINE inline void fieldsFromDataOffset(Reader<Pass> &reader) {
     read<dataOffset>(reader);
@@ -85,13 +86,13 @@ NETFLOOR_INLINE inline void fieldsFromDataOffset(Reader<Pass> &reader) {
     read<urgentPointer>(reader);
 }
 
-// Reads the header from the Data Offset on and gives its length in octets. A Data Offset of 3 or 4 has no room for the
-// fixed header: the header then counts for as many octets, not words, and what is behind its block for payload.
+// Reads the header from the Data Offset on and gives its length in octets. A Data Offset of 3 or 4 is too short for the
+// fixed header: then the result is 3 or 4 octets, and the payload starts after the block.
 template <class Pass>
 NETFLOOR_INLINE inline std::int32_t limitedPart(Reader<Pass> &reader) {
     LimitedBlock<Pass> block{reader, "INLINE BLOCK"};
     const std::uint32_t words = peek(reader, dataOffset.place).value_or(0);
-    // Below three words this wraps to a huge number, which is more than any packet holds.
+    // For fewer than three words this wraps to a number larger than any packet.
     block.limit((words - wordsBeforeLimit) * bitsPerWord);
     checkedRun<dataOffset, urgentPointer, fieldsFromDataOffset<Pass>>(reader);
     if (!reader.live) {
@@ -103,7 +104,8 @@ NETFLOOR_INLINE inline std::int32_t limitedPart(Reader<Pass> &reader) {
     return headerOctets;
 }
 
-// Takes the header off the payload. Once one was longer than its payload, no later one of the packet is taken off.
+// Subtracts the header from the payload. Once a header was longer than its payload, later headers of the packet are not
+// subtracted.
 template <class Pass>
 NETFLOOR_INLINE inline void accountFor(Reader<Pass> &reader, std::int32_t headerOctets) {
     auto &variables = reader.variables();

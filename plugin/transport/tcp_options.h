@@ -7,11 +7,11 @@
 //   kind 2  Maximum Segment Size       kind  8  Timestamps
 //   kind 3  Window Scale               kind 19  MD5 Signature
 //
-// Kind 0 ends nothing: the list goes on behind it. Any other kind turns the rest of the area into padding.
+// Kind 0 does not end the list: the next option follows. Any other kind makes the rest of the area padding.
 //
-// Each kind that has its turn in a round and does not find its option raises the mark of a failed expectation, and
-// so does a round that needs no padding. So every TCP header raises it, a sound one too, and the one with no
-// options: in TCP the mark says nothing about damage.
+// A kind that has its turn in a round and does not find its option raises the flag of a failed expectation, and so does
+// a round without padding. So every TCP header raises this flag, also a valid one and one without options. In TCP the
+// flag does not mean damage.
 #pragma once
 
 #include <algorithm>
@@ -48,7 +48,7 @@ inline constexpr Field sackLength        {462, "Length",                        
 inline constexpr Field leftEdge          {466, "Left Edge of Block",                     octets(4),   "  %n=%x"};
 inline constexpr Field rightEdge         {467, "Right Edge of Block",                    octets(4),   "  %n=%x"};
 
-// Both stamps are taken as little-endian numbers.
+// Both timestamps are read as little-endian numbers.
 inline constexpr Field timestamps       {468, "TCP Option Kind", octets(1),                  "%n=%u (Timestamps Option)"};
 inline constexpr Field timestampsLength {469, "Length",          octets(1),                  "  %n=%u octet(s)"};
 inline constexpr Field timestampValue   {472, "TS value",        piece(0, 31).advancing(32), "  %n=%u"};
@@ -64,14 +64,14 @@ inline constexpr Field optionPadding    {439, "Padding",         octetRun(),    
 // The kinds, in the order of their turns in a round.
 inline constexpr std::array<std::uint8_t, 8> optionKinds = {0, 1, 2, 3, 4, 5, 8, 19};
 
-// These count as long as they should be, whatever their length says.
+// These options always take their proper length off the area, whatever their length field says.
 inline constexpr std::int32_t maximumSegmentOctets = 4;
 inline constexpr std::int32_t windowScaleOctets = 3;
 inline constexpr std::int32_t sackPermittedOctets = 2;
 inline constexpr std::int32_t timestampsOctets = 10;
 
 struct OptionVariables {
-    OptionArea tcpOptions; // behind the fixed header
+    OptionArea tcpOptions; // after the fixed header
 };
 
 template <class Pass>
@@ -94,7 +94,7 @@ NETFLOOR_INLINE inline void sackPermittedOption(Reader<Pass> &reader, OptionArea
     optionHead<sackPermitted, permittedLength>(reader, area, sackPermittedOctets);
 }
 
-// The limit ends the blocks: the first edge that does not fit in.
+// The limit ends the list: at the first edge that does not fit.
 template <class Pass>
 NETFLOOR_INLINE inline void sackOption(Reader<Pass> &reader, OptionArea &area) {
     const OptionBlock<Pass> option{reader, ""};
@@ -106,7 +106,7 @@ NETFLOOR_INLINE inline void sackOption(Reader<Pass> &reader, OptionArea &area) {
     }
 }
 
-// The production of a stretch gets the reader alone.
+// The production of a checked run has no other parameter than the reader.
 template <class Pass>
 NETFLOOR_INLINE inline void timestampsFields(Reader<Pass> &reader) {
     optionHead<timestamps, timestampsLength>(reader, reader.variables().tcpOptions, timestampsOctets);
@@ -121,7 +121,7 @@ NETFLOOR_INLINE inline void timestampsOption(Reader<Pass> &reader) {
     checkedRun<timestamps, timestampEcho, timestampsFields<Pass>>(reader);
 }
 
-// The digest is what the length leaves, and one octet at least, so that it is cut short where nothing is left.
+// The digest is the rest of the option, but at least one octet: if nothing is left, the digest is cut short.
 template <class Pass>
 NETFLOOR_INLINE inline void md5SignatureOption(Reader<Pass> &reader, OptionArea &area) {
     const OptionBlock<Pass> option{reader, ""};
@@ -130,7 +130,7 @@ NETFLOOR_INLINE inline void md5SignatureOption(Reader<Pass> &reader, OptionArea 
     readRun<md5Digest>(reader, static_cast<std::int32_t>(digestOctets));
 }
 
-// Takes the option under the cursor, which is of a known kind.
+// Reads the option at the cursor, which is of a known kind.
 template <class Pass>
 NETFLOOR_INLINE inline void option(Reader<Pass> &reader, std::uint8_t kind, OptionArea &area) {
     switch (kind) {
@@ -154,8 +154,8 @@ NETFLOOR_INLINE inline void padding(Reader<Pass> &reader, OptionArea &area) {
     }
 }
 
-// One turn for each kind, in order; once the area is used up none takes an option any more. A round in which none did
-// ends the list with padding.
+// One turn for each kind, in order. No kind reads an option once the area is used up. If no kind read an option, the
+// rest is padding, which ends the list.
 template <class Pass>
 NETFLOOR_INLINE inline void optionRound(Reader<Pass> &reader, OptionArea &area) {
     area.taken = false;
@@ -182,8 +182,8 @@ NETFLOOR_INLINE inline void optionRound(Reader<Pass> &reader, OptionArea &area) 
     }
 }
 
-// The options stand in the block that the Data Offset limits, and their live flag is that block's: an option that
-// reaches past the header ends the list, but not the segment, whose payload starts where the Data Offset says.
+// The options lie in the block that the Data Offset limits, and use the live flag of that block. So an option that
+// reaches past the header ends the list, but not the segment. The payload starts at the Data Offset.
 template <class Pass>
 NETFLOOR_INLINE inline void options(Reader<Pass> &reader) {
     if (!reader.live) {

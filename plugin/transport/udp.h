@@ -8,8 +8,8 @@
 //   |     Length      |    Checksum     |
 //   +--------+--------+--------+--------+
 //
-// Neither the length nor the checksum is compared with anything. What goes to the next layer is reckoned from
-// the IP layer's lengths.
+// Neither the length nor the checksum is verified. The length of the next layer is computed from the lengths in the IP
+// header.
 #pragma once
 
 #include "frame/block.h"
@@ -56,7 +56,7 @@ NETFLOOR_INLINE inline void headerAndPayload(Reader<Pass> &reader) {
     read<checksum>(reader);
     if (reader.live) {
         variables.payloadOctets -= headerOctets;
-        // A server's reply goes to the next layer under the server's port.
+        // The reply of a RADIUS server is handed off by the server's port.
         if (isRadius(variables.sourcePort)) {
             variables.destinationPort = variables.sourcePort;
         }

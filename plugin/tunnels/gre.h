@@ -12,8 +12,8 @@
 //   |               Sequence Number, where S is 1                   |
 //   +---------------------------------------------------------------+
 //
-// The protocol is shown and not dispatched on: whatever GRE carries is taken as a frame between two HDLC flags (RFC
-// 1662), which is what it carries for point-to-point links, and as plain octets behind that.
+// The protocol is shown, but does not choose a production. The payload is read as a frame between two HDLC flags (RFC
+// 1662), which GRE carries for point-to-point links. Octets after the frame are data.
 #pragma once
 
 #include <array>
@@ -75,12 +75,12 @@ inline constexpr Field closingFlag     {724, "HDLC Flag",               octets(1
 inline constexpr Field payload         {715, "GRE Payload",             octets(1),                  "%n=0x%x"};
 // clang-format on
 
-// What the fixed header takes, and so does each of its additions.
+// The octets of the fixed header, and of each optional part.
 inline constexpr std::int32_t partOctets = 4;
 
 inline constexpr std::uint32_t hdlcFlag = 0x7e;
 
-// Takes octets that were read off the payload.
+// Subtracts octets that were read from the payload.
 template <class Pass>
 NETFLOOR_INLINE inline void account(const Reader<Pass> &reader, std::int32_t octetCount) {
     if (reader.live) {
@@ -121,8 +121,8 @@ NETFLOOR_INLINE inline bool flagAhead(Reader<Pass> &reader) {
     return peek(reader, octets(1)) == hdlcFlag;
 }
 
-// The frame from its opening flag on, which stands under the cursor. A frame that the payload ends before its closing
-// flag just stops; one that the packet ends is a fault.
+// Reads a frame, whose opening flag is at the cursor. If the payload ends before the closing flag, the frame ends there
+// without a fault. If the packet ends first, this is a fault.
 template <class Pass>
 NETFLOOR_INLINE inline void frame(Reader<Pass> &reader) {
     const auto &variables = reader.variables();

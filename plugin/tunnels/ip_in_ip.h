@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// The header of a datagram inside an IPv4 datagram (RFC 2003). It is laid out like the header around it.
+// The header of a datagram inside an IPv4 datagram (RFC 2003). It has the layout of the outer header.
 //
 //    0                   1                   2                   3
 //    0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1
@@ -16,8 +16,8 @@
 //   |                     Options and padding                       |
 //   +---------------------------------------------------------------+
 //
-// The inner lengths take the place of the outer ones, but open no limit: bits are bounded by the outermost header. A
-// fragment inside is read as if it were whole.
+// The inner lengths replace the outer ones, but set no limit: the outermost header alone limits the bits. An inner
+// fragment is read as a whole datagram.
 #pragma once
 
 #include <cstdint>

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// The forwarding header of minimal encapsulation (RFC 2004), which stands between an IPv4 header and its payload.
+// The forwarding header of minimal encapsulation (RFC 2004), between an IPv4 header and its payload.
 //
 //    0                   1                   2                   3
 //    0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1 2 3 4 5 6 7 8 9 0 1
@@ -11,7 +11,7 @@
 //   |             Original Src Address, where S is 1                |
 //   +---------------------------------------------------------------+
 //
-// The lengths are those of the header around it, less what the forwarding header takes.
+// The lengths are those of the outer header, less the octets of the forwarding header.
 #pragma once
 
 #include <array>
@@ -30,7 +30,7 @@ inline constexpr std::array sourcePresentRows = {
 };
 inline constexpr ValueNames sourcePresentNames{sourcePresentRows};
 
-// The checksum is shown digit by digit.
+// The checksum is shown as one element for each digit.
 // clang-format off
 inline constexpr Field protocol           {640, "MIPinIP Protocol",      octets(1),                                               "%n=%-S",                &protocolNames,      "MIPinIP - %-S"};
 inline constexpr Field reserved           {641, "  Reserved",            piece(0, 6),                                             "  %n=%x"};
@@ -60,7 +60,7 @@ NETFLOOR_INLINE inline void header(Reader<Pass> &reader) {
         variables.ipTotalLength -= sourceAddressOctets;
         read<sourceAddress>(reader);
     }
-    // The options of the header around it stand in front of the forwarding header: what follows here is the payload.
+    // The options of the outer header come before the forwarding header: what follows here is the payload.
     if (reader.live) {
         variables.payloadOctets = static_cast<std::int32_t>(variables.ipTotalLength - variables.ipHeaderOctets);
     }

@@ -30,6 +30,9 @@ BarePlugin::BarePlugin(std::vector<std::int32_t> results, std::uint16_t presence
 // Fills the table whatever the result is. Only the low octet of the mask counts.
 std::int32_t BarePlugin::initialise(KeyFieldRow *table, std::uint32_t count, std::uint16_t *presenceRow) noexcept {
     rowCount = count;
+    if (count > KeyRoom::rows) {
+        return -1;
+    }
     if (calls == 0) {
         tableAtLoad.assign(table, table + count);
     }
@@ -38,7 +41,7 @@ std::int32_t BarePlugin::initialise(KeyFieldRow *table, std::uint32_t count, std
         table[row].valueOffset = static_cast<std::uint32_t>(offsetof(KeyRoom, values) + 8 * row);
         table[row].presenceMask = 0xabcd1200u | KeyRoom::ownPresence;
     }
-    *presenceRow = presenceRow_;
+    *presenceRow = std::min(presenceRow_, static_cast<std::uint16_t>(count - 1));
     return results_[std::min<std::size_t>(calls++, results_.size() - 1)];
 }
 

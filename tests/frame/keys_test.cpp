@@ -15,7 +15,8 @@
 namespace netfloor::test {
 namespace {
 
-// The names of all 113 rows, in the order in which a host finds them, each with a bar behind it.
+// The names of the rows, in the order in which a host finds them, each with a bar after it. Rows of new fields follow,
+// and a last one without a name.
 constexpr std::string_view names =
     "Version|Total Length|Identification|Time to Live|Protocol|Source Address|Destination Address|DF|MF|"
     "Fragment Offset|IP Address|ICMP Message Type|ICMP Message Type|ICMP Message Type|Code|ICMP Sequence Number|"
@@ -34,7 +35,7 @@ constexpr std::string_view names =
     "Initial Transmission Sequence Number(I_TSN)|Initial Transmission Sequence Number(I_TSN)|Cumulative TSN Ack|"
     "Cumulative TSN Ack|Payload Length|Payload Length|Source IP Address|Destination IP Address|Next Header|"
     "IP Address|fragment Offset|M Flag|SPI|Sequence Number|SPI|Sequency Number|Header Extention length|"
-    "Option Type|Option Type|Option Type|Opt Data Length||";
+    "Option Type|Option Type|Option Type|Opt Data Length|";
 
 // Octets of the example's key fields, numbers in the order of a little-endian host.
 constexpr const char *exampleKeys = "0=04\n1=28 00\n2=ab 00\n3=40\n4=11\n5=01 00 00 0a\n6=02 00 a8 c0\n7=01\n8=01\n"
@@ -44,7 +45,6 @@ TEST(KeyTable, isHandedToTheHost) {
     BarePlugin plugin;
     BareRun run(examplePacket(), {}, plugin);
     EXPECT_EQ(run.enter(Pass::xtr), 1);
-    EXPECT_EQ(plugin.rowCount, 113u);
     std::string found;
     for (const KeyFieldRow &entry : plugin.tableAtLoad) {
         found.append(entry.fieldName).append("|");
@@ -52,7 +52,8 @@ TEST(KeyTable, isHandedToTheHost) {
         EXPECT_EQ(entry.presenceOffset | entry.valueOffset | entry.presenceMask, 0u);
         EXPECT_EQ(entry.zero[0] | entry.zero[1] | entry.zero[2], 0u);
     }
-    EXPECT_EQ(found, names);
+    EXPECT_TRUE(found.starts_with(names)) << found;
+    EXPECT_TRUE(found.ends_with("||") && found.find("||") == found.size() - 2) << found;
 }
 
 // A value takes the octets of its field's width and no more; other marks in a presence octet stay.
@@ -116,6 +117,8 @@ TEST(KeyRecord, reachOfTheAddressesOfAPacket) {
     }
 }
 
+constexpr std::uint16_t lastRow = 0xffff;
+
 struct SetUpCase {
     std::vector<std::int32_t> answers; // of the host, in turn
     std::uint16_t presenceRow;
@@ -135,7 +138,7 @@ TEST(KeyTable, isSetUpUntilItIsDone) {
         {{0, -7, 1}, 7, {1, -7, -7}, {1, 2, 2}, ""},
         {{2, -1}, 7, {1, 1, 1}, {1, 1, 1}, "7=\n"},
         {{0, 300, -1}, 0, {1, 1, 1}, {1, 2, 2}, "0=\n"},
-        {{2}, 112, {1, 1}, {1, 1}, "112=\n"}, // the row of no field
+        {{2}, lastRow, {1, 1}, {1, 1}, ""}, // the row of no field
     };
     for (const SetUpCase &setUp : cases) {
         BarePlugin plugin(setUp.answers, setUp.presenceRow);
@@ -152,13 +155,15 @@ TEST(KeyTable, isSetUpUntilItIsDone) {
                 EXPECT_EQ(run.xtr.bitsLeft, 0xeeeeeeeeu);
                 continue;
             }
-            EXPECT_EQ(run.keyText(), exampleKeys + std::string(setUp.presenceRow == 112 ? setUp.marked : ""));
+            const std::string ofLastRow =
+                setUp.presenceRow == lastRow ? std::to_string(plugin.rowCount - 1) + "=\n" : "";
+            EXPECT_EQ(run.keyText(), exampleKeys + ofLastRow);
             if (plugin.calls < setUp.callsThen.back()) {
                 continue;
             }
             BareRun empty({}, {}, plugin);
             EXPECT_EQ(empty.enter(Pass::xtr), 1);
-            EXPECT_EQ(empty.keyText(), setUp.marked);
+            EXPECT_EQ(empty.keyText(), setUp.marked + ofLastRow);
         }
         BareRun other(examplePacket(), {}, plugin); // only the XTR pass asks
         EXPECT_EQ(other.enter(Pass::md), 1);

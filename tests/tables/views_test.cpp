@@ -332,25 +332,30 @@ TEST(Views, nameValues) {
 TEST(Views, tellKeyTypes) {
     const struct {
         KeyType type;
-        std::size_t count; // of names; 58 rows are filled at all
         std::set<std::string> telling;
     } cases[] = {
-        {KeyType::number8, 25, {"Code", "Code ", "DF", "Time to Live"}},
-        {KeyType::number16, 16, {"Fragment Offset", "fragment Offset", "Identification"}},
-        {KeyType::number32, 9, {"SPI", "Sequence Number", "Sequency Number", "TSN"}},
+        {KeyType::number8, {"Code", "Code ", "DF", "Time to Live"}},
+        {KeyType::number16, {"Fragment Offset", "fragment Offset", "Identification"}},
+        {KeyType::number32, {"SPI", "Sequence Number", "Sequency Number", "TSN"}},
         {KeyType::ipv4Address,
-         5,
          {"Address Mask", "Destination Address", "Original Dest Address", "Original Src Address", "Source Address"}},
-        {KeyType::ipv6Address, 3, {"Destination IP Address", "IP Address", "Source IP Address"}},
+        {KeyType::ipv6Address, {"Destination IP Address", "IP Address", "Source IP Address"}},
     };
+    std::set<std::string> missing; // the key fields that are in no packet
+    for (const FieldDescription &field : tables().fields()) {
+        if (field.keyIndex != 0) {
+            missing.insert(std::string(field.name));
+        }
+    }
     std::map<KeyType, std::set<std::string>> found;
     for (const Octets &packet : packetsOfAllFields()) {
         for (const KeyValue &key : sharedHost().run(Pass::xtr, packet).keys) {
             found[key.type].insert(key.name);
+            missing.erase(key.name);
         }
     }
-    for (const auto &[type, count, telling] : cases) {
-        EXPECT_EQ(found[type].size(), count);
+    EXPECT_EQ(missing, std::set<std::string>());
+    for (const auto &[type, telling] : cases) {
         EXPECT_TRUE(std::ranges::includes(found[type], telling)) << *telling.begin();
     }
 }
