@@ -18,7 +18,7 @@
 
 #include "netfloor-capture/capture_file.h"
 #include "netfloor-capture/link_layer.h"
-#include "netfloor-host/text.h"
+#include "netfloor-host/value_text.h"
 #include "peers/packet.h"
 #include "peers/pairs.h"
 #include "peers/partings.h"
