@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// The tables as a host finds them behind vx_DLLGetPtr and vx_DLLGetTable, word by word.
+// The tables as a host gets them from vx_DLLGetPtr and vx_DLLGetTable, word by word.
 #include <algorithm>
 #include <functional>
 #include <map>
@@ -24,7 +24,7 @@ const Row *table(std::int32_t number) {
     return static_cast<const Row *>(rows);
 }
 
-// Walks end where the tables say, and a bound keeps a table without an end from being walked for ever.
+// The end of each table by its own end row, and a bound for a table without one.
 constexpr std::size_t bound = 10000;
 
 struct Tables {
@@ -107,8 +107,8 @@ Octets le32(std::initializer_list<std::uint32_t> words) {
     return octets;
 }
 
-Octets text(std::string_view characters, const Octets &behind) {
-    return Octets(characters.begin(), characters.end()) + behind;
+Octets text(std::string_view characters, const Octets &after) {
+    return Octets(characters.begin(), characters.end()) + after;
 }
 
 TEST(Exports, giveSamplesOfTheLayoutOfRecords) {
@@ -172,10 +172,10 @@ TEST(FieldTable, hasItsRowsInEveryWord) {
     EXPECT_TRUE(std::ranges::all_of(end.zero, [](std::uint32_t word) { return word == 0; }));
 }
 
-// Facts that hold in each row, and in so many of them.
+// What holds for each row, and how many rows have certain properties.
 TEST(FieldTable, holdsTogether) {
     std::set<std::uint32_t> ids;
-    std::set<std::uint32_t> marked;
+    std::set<std::uint32_t> ofTopOctet6;
     std::uint32_t keys = 0;
     std::map<std::string, int> names; // how the two names of a row differ
     std::size_t nextValue = 0;
@@ -194,7 +194,7 @@ TEST(FieldTable, holdsTogether) {
         EXPECT_TRUE(field.keyIndex == 0 || field.keyIndex == ++keys);
         if (field.flags >> 24 != 5) {
             EXPECT_EQ(field.flags >> 24, 6U);
-            marked.insert(field.fieldId);
+            ofTopOctet6.insert(field.fieldId);
         }
         EXPECT_EQ(field.valueStart, field.valueCount == 0 ? -1 : static_cast<std::int32_t>(nextValue));
         nextValue += static_cast<std::size_t>(field.valueCount);
@@ -203,18 +203,18 @@ TEST(FieldTable, holdsTogether) {
         EXPECT_TRUE(std::ranges::all_of(field.unused2, [](std::int32_t word) { return word == -1; }));
         const std::string name = field.name;
         const std::string brief = field.shortName;
-        ++names[name == brief ? "equal" : name == brief + " " ? "blank behind" : name + "|" + brief];
+        ++names[name == brief ? "equal" : name == brief + " " ? "trailing blank" : name + "|" + brief];
         EXPECT_FALSE(name.starts_with(' '));
     }
     EXPECT_EQ(keys, 102U);
     EXPECT_EQ(nextValue, 4539U);
     EXPECT_EQ(lists[292], 8);  // ports
     EXPECT_EQ(lists[139], 14); // protocols
-    EXPECT_EQ(marked, (std::set<std::uint32_t>{396, 398, 399, 400, 401, 402, 403, 404, 405, 406, 407, 408, 489, 490,
-                                               848, 852}));
+    EXPECT_EQ(ofTopOctet6, (std::set<std::uint32_t>{396, 398, 399, 400, 401, 402, 403, 404, 405, 406, 407, 408, 489,
+                                                    490, 848, 852}));
     EXPECT_EQ(names,
               (std::map<std::string, int>{
-                  {"equal", 356}, {"blank behind", 24}, {"unkown option type, discard packet|discard packet", 1}}));
+                  {"equal", 356}, {"trailing blank", 24}, {"unkown option type, discard packet|discard packet", 1}}));
 }
 
 TEST(ValueTables, haveTheirNumbers) {
@@ -225,27 +225,27 @@ TEST(ValueTables, haveTheirNumbers) {
     EXPECT_EQ(std::count_if(all.values, all.values + 4539, [](const ValueMapRow &row) { return row.kind == 65536; }),
               40);
 
-    // The pool: what each stretch of it holds.
+    // The pool, part by part.
     for (std::int32_t number = 0; number <= 137; ++number) {
         EXPECT_EQ(all.pool[number], number);
     }
-    const auto stretch = [&](std::size_t from, std::size_t to) {
+    const auto numbers = [&](std::size_t from, std::size_t to) {
         return std::vector(all.pool + from, all.pool + to + 1);
     };
     using Numbers = std::vector<std::int32_t>;
-    EXPECT_EQ(stretch(138, 139), (Numbers{138, 252}));
-    EXPECT_EQ(stretch(140, 154), (Numbers{5039, 9822, 13809, 19900, 24083, 27618, 30797, 35031, 39544, 44937, 48420,
+    EXPECT_EQ(numbers(138, 139), (Numbers{138, 252}));
+    EXPECT_EQ(numbers(140, 154), (Numbers{5039, 9822, 13809, 19900, 24083, 27618, 30797, 35031, 39544, 44937, 48420,
                                           50539, 54980, 57909, 61850}));
-    EXPECT_EQ(stretch(155, 156), (Numbers{50, 0}));
-    const Numbers ports = stretch(157, 335);
-    const Numbers carried = stretch(336, 357);
+    EXPECT_EQ(numbers(155, 156), (Numbers{50, 0}));
+    const Numbers ports = numbers(157, 335);
+    const Numbers carried = numbers(336, 357);
     EXPECT_EQ((Numbers{ports.front(), ports.back(), carried.front(), carried.back()}),
               (Numbers{139, 8002, 254, 65535}));
     EXPECT_EQ(std::ranges::adjacent_find(ports, std::greater_equal<>()), ports.end());
     EXPECT_EQ(std::ranges::adjacent_find(carried, std::greater_equal<>()), carried.end());
-    EXPECT_EQ(stretch(358, 370), (Numbers{5, 127, 15, 62, 64, 126, 128, 190, 192, 254, 255, 32768, 0}));
+    EXPECT_EQ(numbers(358, 370), (Numbers{5, 127, 15, 62, 64, 126, 128, 190, 192, 254, 255, 32768, 0}));
 
-    // Each number of the pool but the last is used, and each list stands by rising value with its default in front.
+    // Each number of the pool but the last is used, and each list is in ascending order after its default row.
     std::set<std::uint32_t> used;
     for (const FieldDescriptor &field : all.rows()) {
         std::int32_t above = -1;
@@ -293,7 +293,7 @@ TEST(TextTable, holdsEachTextOnceInFirstUse) {
     }
     EXPECT_EQ(next, 824U);
 
-    // By conversions, those of a list cut down to what stands between "%-[" and "]".
+    // How many texts have which conversions. Of a list only the text from "%-[" to "]" counts.
     std::map<std::string, int> conversions;
     for (std::size_t row = 0; row < 824; ++row) {
         std::string found;
@@ -318,10 +318,9 @@ TEST(TextTable, holdsEachTextOnceInFirstUse) {
                                                        {R"(%-["%x":":"])", 1},
                                                        {"%c", 1},
                                                        {R"(%-["%c"])", 1}}));
-    const std::map<std::string, int> behind = {{"(dec)", 8},     {" octets", 5},     {"*4 octets", 4},
-                                               {" octet(s)", 4}, {"*8 octet(s)", 2}, {"(th) octet", 1},
-                                               {" (msec.)", 1}};
-    for (const auto &[words, count] : behind) {
+    const std::map<std::string, int> after = {{"(dec)", 8},       {" octets", 5},    {"*4 octets", 4}, {" octet(s)", 4},
+                                              {"*8 octet(s)", 2}, {"(th) octet", 1}, {" (msec.)", 1}};
+    for (const auto &[words, count] : after) {
         EXPECT_EQ(std::count_if(all.texts, all.texts + 824,
                                 [&](std::string_view format) { return format.ends_with("%u" + words); }),
                   count)
@@ -329,7 +328,7 @@ TEST(TextTable, holdsEachTextOnceInFirstUse) {
     }
 }
 
-// A record as a test writes it: pieces "5-8", count "1", "?" (told by the packet) or "1-16", step.
+// A record as a test writes it: pieces "5-8", count "1", "?" (the packet gives it) or "1-16", step.
 Octets layoutRecord(const std::vector<std::pair<int, int>> &pieces, std::pair<int, int> count, int step, int end) {
     const auto constant = [](int number) { return Octets{0x10, 0, 0, 0, static_cast<std::uint8_t>(number)}; };
     const auto span = [&](std::pair<int, int> ends) {
