@@ -41,7 +41,7 @@ double Figures::of(Statistic statistic, std::string_view set, std::string_view w
 }
 
 bool runAll(int argc, char **argv, Figures &figures) {
-    // What comes later on the command line wins.
+    // A later option on the command line overrides an earlier one.
     std::array<std::string, 3> defaults = {"--benchmark_enable_random_interleaving=true", "--benchmark_repetitions=9",
                                            "--benchmark_min_time=0.05"};
     std::vector<char *> arguments = {argv[0]};

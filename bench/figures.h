@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
 // Collects the figures of one run, so that ratios can be given: in ns a packet, the median of all repetitions and the
-// fastest one. On a quiet machine the two are close; on a busy one the fastest is nearer to the truth.
+// fastest one. On a quiet machine the two are close; on a busy one the fastest is nearer to the cost of the code alone.
 #pragma once
 
 #include <map>
@@ -22,7 +22,7 @@ public:
     bool ReportContext(const Context &context) override;
     void ReportRuns(const std::vector<Run> &runs) override;
 
-    // Nothing measured: 0.
+    // 0 where nothing was measured.
     [[nodiscard]] double of(Statistic statistic, std::string_view set, std::string_view what) const;
 
     // Spread of the repetitions: standard deviation over mean, the greatest of all figures.
@@ -48,7 +48,7 @@ void measure(std::string_view set, std::string_view what, std::size_t packets, B
 }
 
 // Runs all that was registered: nine repetitions of each, interleaved, unless the arguments say otherwise.
-// False where an argument is not understood.
+// False where an argument is unknown.
 [[nodiscard]] bool runAll(int argc, char **argv, Figures &figures);
 
 // A figure in a column of 9, a dash where there is none.

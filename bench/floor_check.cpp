@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// Tells whether the hand-written code does the work that it is compared with: the same calls with the same texts,
+// Checks that the hand-written code does the work that it is compared with: the same calls with the same texts,
 // names, ids, values and bit ranges as the MD pass, and the same key record as the XTR pass.
 //
 //     bench_floor_check build/plugin/libnetfloor.so
@@ -65,7 +65,7 @@ bool sameKeys(NetfloorExtract xtr) {
 
 } // namespace
 
-// This host keeps what it is told. Its other operations are the null host's.
+// This host keeps each call. Its other operations are those of the null host.
 std::int32_t hs_AddDecodedFieldsData(PreDecodeContext *context, std::uint32_t outputRangeCount, const BitRange *ranges,
                                      const char *display, std::uint32_t, const char *fieldName, std::uint32_t fieldId,
                                      std::uint32_t, std::uint32_t bitOrder) {

@@ -25,7 +25,7 @@ constexpr std::array<std::string_view, 2> moreFragments = {"Last Fragment", "Mor
 
 // The digits of every octet.
 struct OctetText {
-    std::array<char, 4> digits; // zeros behind them
+    std::array<char, 4> digits; // zeros after them
     std::uint32_t size;
 };
 
@@ -48,7 +48,7 @@ std::uint32_t load32(const std::uint8_t *octets) {
     return load16(octets) << 16 | load16(octets + 2);
 }
 
-// Stands apart from the writer, so that its members can stay in registers. Large enough for every line.
+// Not a member of the writer, so that the members can stay in registers. Large enough for every line.
 std::array<char, 256> line;
 
 // Writes the line of a field and reports it.

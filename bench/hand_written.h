@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// What one would write by hand for one kind of packet and nothing else: IPv4 without options + UDP, whole and
-// unfragmented. The floor to which the passes are compared.
+// Code by hand for one kind of packet and nothing else: IPv4 without options + UDP, whole and unfragmented. It is
+// the least cost, with which the passes are compared.
 #pragma once
 
 #include <cstdint>

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: MIT
-// The null host: the seven operations of a host, doing nothing, so that what is measured is the plug-in.
+// The null host: the seven operations of a host, which do nothing, so that the plug-in alone is measured.
 //
-// The library stands in front of the reference host's libraries in the link order of the benchmark, so that its
-// operations are the ones that a plug-in finds when it is loaded.
+// The benchmark links this library before the reference host's libraries, so that a plug-in finds its operations
+// first.
 #pragma once
 
 #include <cstddef>
@@ -10,7 +10,7 @@
 
 namespace netfloor::bench {
 
-// How the null host lays out key records: a bit for each row that tells whether it is present, then a place of
+// How the null host lays out key records: a presence bit for each row, then a place of
 // four octets for each row, then the area for values stored as octets.
 inline constexpr std::size_t presenceOctets = 16;
 inline constexpr std::size_t mostKeyRows = presenceOctets * 8;

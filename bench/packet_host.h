@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// What a host keeps to run packets through a plug-in, and what it does for each packet: no more than the
-// boundary demands.
+// The storage of a host that runs packets through a plug-in, and its work for each packet: no more than the
+// boundary requires.
 #pragma once
 
 #include <algorithm>
@@ -86,7 +86,7 @@ private:
         state_.condition = 0;
         state_.advance = 0;
         *state_.blockName = '\0';
-        // In pieces: a copy of this size as one makes compilers choose a string instruction, which starts slowly.
+        // In pieces: for one copy of this size compilers choose a string instruction, which starts slowly.
         for (std::size_t word = 0; word < std::size(state_.scratch); word += 8) {
             std::memset(state_.scratch + word, 0, 8 * sizeof *state_.scratch);
         }
@@ -104,7 +104,7 @@ private:
     std::array<char, 64> blockName_{};
     std::array<char, 255> fieldName_{};
     std::array<char, 255> valueText_{};
-    std::array<std::uint8_t, 1000> fieldRecord_{}; // the null host keeps writing the same one
+    std::array<std::uint8_t, 1000> fieldRecord_{}; // the null host uses the same one for all fields
     std::array<std::uint8_t, keyRecordOctets> keyRecord_{};
 };
 

@@ -43,7 +43,7 @@ Octets udpOf(std::uint16_t source, std::uint16_t destination, std::size_t payloa
     return udp(source, destination, Octets(payloadOctets, 0x61));
 }
 
-// What the backbone of a mobile network carries, without the rare: no ping, no fragment.
+// The usual packets in the backbone of a mobile network, without the rare ones: no ping, no fragment.
 std::vector<Octets> mix() {
     return {
         ipv4({.protocol = tcpNumber, .payload = tcpSyn(), .fragment = 0x4000}),
@@ -65,7 +65,7 @@ Octets hopByHopAndDestinationOptions() {
     )");
 }
 
-// Selective acknowledgement first, as control chunks stand in front of DATA.
+// Selective acknowledgement first, as control chunks come before DATA.
 Octets sackAndData() {
     return hex(R"(
         0b 59 0b 59  12 34 56 78  00 00 00 00   # ports 2905, verification tag, checksum

@@ -17,7 +17,7 @@ using test::Octets;
 struct PacketSet {
     std::string_view name;
     std::vector<Octets> packets;
-    bool peerKnows; // libtins takes the packets apart up to the transport header
+    bool peerKnows; // libtins decodes the packets up to the transport header
 };
 
 // The packet for which there is hand-written code: IPv4 + UDP with 60 octets of payload, ports without a name.

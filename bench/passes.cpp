@@ -87,7 +87,7 @@ struct Bench {
         }
     }
 
-    // What is measured is the plug-in with the null host, and it runs to the end of each packet.
+    // Checks that the plug-in runs with the null host, and to the end of each packet.
     void check(const Passes &passes, const char *name) {
         for (Octets &packet : packets) {
             if (host.run(passes.xtr, packet) != 1) {

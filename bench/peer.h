@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// The peer: libtins takes the same packets apart and reads the same keys.
+// The peer: libtins decodes the same packets and reads the same keys.
 #pragma once
 
 #include <array>
@@ -32,7 +32,7 @@ struct PeerKeys {
     bool finish;
 };
 
-// Throws what libtins throws for a packet that it cannot take apart.
+// Throws what libtins throws for a packet that it cannot decode.
 void readKeys(std::span<const std::uint8_t> packet, PeerKeys &keys);
 
 } // namespace netfloor::bench

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// The second figure: the passes in the reference host, with a sink that does nothing, and with one that keeps all.
+// The benchmark of the reference host: each pass with a sink that does nothing, and with one that keeps everything.
 //
 //     bench_reference_host build/plugin/libnetfloor.so [--benchmark_...]
 #include <cstdio>

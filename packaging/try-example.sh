@@ -1,6 +1,6 @@
 #!/bin/sh
 # SPDX-License-Identifier: MIT
-# Builds the example as a user of netfloor does, and compares what it prints with what stands beside it.
+# Builds the example as a user of netfloor does, and compares its output with expected.txt in its directory.
 #
 #   try-example.sh CMAKE EXAMPLE installed BUILD-DIRECTORY ARGUMENT...     against an installation, which was moved
 #   try-example.sh CMAKE EXAMPLE sources SOURCE-DIRECTORY ARGUMENT...      with netfloor as a part of its own build
@@ -29,7 +29,7 @@ installed)
     ;;
 sources)
     "$cmake" -S "$example" -B "$work/build" -DNETFLOOR_SOURCE="$netfloor" >/dev/null
-    # What a project has not asked for stays as it was.
+    # netfloor changes no setting of the project around it.
     grep -q '^CMAKE_BUILD_TYPE:STRING=$' "$work/build/CMakeCache.txt" || fail "netfloor chose the build type"
     [ ! -e "$work/build/compile_commands.json" ] || fail "netfloor wrote compile_commands.json"
     ;;

@@ -11,6 +11,6 @@ if [ ! -f build/build.ninja ] || ! command -v ninja >/dev/null; then
     trap 'rm -f "$log"' EXIT
     cmake --preset release -DNETFLOOR_TESTS=OFF -DNETFLOOR_BENCH=OFF >"$log" 2>&1 || { cat "$log" >&2; exit 1; }
 fi
-# ninja's lines are kept, but for those that say that there was nothing to do.
+# Shows ninja's lines, except those that say that there was nothing to do.
 NINJA_STATUS='netfloor: [%f/%t] ' ninja -C build netfloor netfloor_command 2>&1 |
     sed -u -e '/Re-checking globbed/d' -e '/no work to do/d' -e '/Entering directory/d' >&2

@@ -1,11 +1,11 @@
 #!/bin/sh
 # SPDX-License-Identifier: MIT
-# Holds the order of the rooms in plugin/: a file includes files of its own room and of rooms below it, never of one
-# above, and rooms of one floor do not know each other. Names what breaks the order, and fails.
+# Checks the order of the rooms, which are the folders of plugin/: a file includes files of its own room and of rooms on
+# lower floors, never of one on the same floor or above. Names each include that breaks the order, and fails.
 set -eu
 cd "$(dirname "$0")/../plugin"
 
-# From the ground up, a floor a line.
+# One floor a line, the lowest first.
 floors='frame
 names
 ip

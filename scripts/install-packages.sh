@@ -1,8 +1,8 @@
 #!/bin/sh
 # SPDX-License-Identifier: MIT
-# Installs the Debian packages that are missing, and says nothing when none is.
+# Installs the Debian packages that are missing. Silent when none is.
 #
-#   scripts/install-packages.sh decode    what it takes to build the command and decode a capture
+#   scripts/install-packages.sh decode    what the build of the command needs
 #   scripts/install-packages.sh all       that, and what the tests, the checks and the benchmarks need
 set -eu
 

@@ -1,7 +1,7 @@
 #!/bin/sh
 # SPDX-License-Identifier: MIT
 # clang-tidy over every source of the build in $1 (default: build), a file a core. A file that passed
-# is not looked at again until it, a header or the set of checks has changed.
+# is not checked again until it, a header or the set of checks has changed.
 set -eu
 cd "$(dirname "$0")/.."
 build=${1:-build}

@@ -29,7 +29,7 @@ constexpr std::array magics = {
     Magic{"\x34\xcd\xb2\xa1"sv, Format::pcap}, Magic{"\x0a\x0d\x0d\x0a"sv, Format::pcapng},
 };
 
-// What users hand over by mistake, and the program that unpacks it.
+// Packed files that users give by mistake, and the program that unpacks them.
 struct Packing {
     std::string_view octets;
     std::string_view name;

@@ -13,7 +13,7 @@ namespace {
 
 constexpr int snapOctets = 262144;
 
-// What tells an expression without meaning from one that just does not suit a link type.
+// Usual link types. An expression that compiles for none of them is wrong, and not only unsuitable for one link type.
 constexpr std::array usualLinkTypes = {DLT_EN10MB, DLT_RAW, DLT_LINUX_SLL, DLT_IEEE802_11_RADIO, DLT_PPP};
 
 } // namespace

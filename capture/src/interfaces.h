@@ -29,7 +29,7 @@ struct Interface {
 
 class InterfaceTable {
 public:
-    // More are counted and not kept, so that a small packed file cannot take all memory.
+    // Further interfaces are counted and not kept, so that a small packed file cannot take all memory.
     static constexpr std::uint32_t mostKept = std::uint32_t{256} * 1024;
 
     void add(const Interface &interface) {

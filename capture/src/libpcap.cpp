@@ -17,7 +17,7 @@ bool find(void *library, const char *name, Function &function) {
 }
 
 std::optional<Libpcap> load() {
-    // Debian and its kin have kept a name of their own; both name the same ABI.
+    // Debian and its derivatives use a name of their own; both names mean the same ABI.
     for (const char *const name : {"libpcap.so.0.8", "libpcap.so.1"}) {
         void *const library = ::dlopen(name, RTLD_LAZY | RTLD_LOCAL);
         if (library == nullptr) {

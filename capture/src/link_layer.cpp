@@ -64,7 +64,7 @@ std::string hexText(const char *kind, std::uint32_t number) {
     return text.data();
 }
 
-// Goes over the headers in front of the IP header, one step for each kind of header.
+// Walks over the headers before the IP header, one step for each kind of header.
 class LinkWalk {
 public:
     explicit LinkWalk(std::span<const std::uint8_t> packet) : packet_(packet) {}
@@ -95,7 +95,7 @@ public:
         const std::uint32_t asWritten = std::uint32_t{u16(0)} << 16U | u16(2);
         const std::uint32_t reversed = __builtin_bswap32(asWritten);
         skip(4);
-        // A family is a small number, which tells the order.
+        // A family is a small number, so that its octets show the order.
         const std::uint32_t family = networkOrder || asWritten < 0x10000 ? asWritten : reversed;
         // 10 Linux, 24 NetBSD and OpenBSD, 28 FreeBSD, 30 macOS, 23 Windows: AF_INET6.
         constexpr std::array<std::uint32_t, 5> ipv6Families = {10, 23, 24, 28, 30};
@@ -105,7 +105,7 @@ public:
         return other(NotIp(NotIp::Kind::addressFamily, family));
     }
 
-    // RFC 1661 and 1662: address and control field and the first octet of the protocol may be left out.
+    // RFC 1661 and 1662: address and control field, and the first octet of the protocol, may be omitted.
     NetworkPart ppp() {
         if (has(2) && packet_[at_] == 0xff && packet_[at_ + 1] == 0x03) {
             skip(2);
@@ -130,7 +130,7 @@ public:
         return afterPppProtocol(protocol);
     }
 
-    // One octet of direction in front of PPP; pppd leaves it in the place of the address field.
+    // One octet of direction before PPP; pppd writes it in place of the address field.
     NetworkPart pppWithDirection(bool controlFollows) {
         const std::size_t headOctets = controlFollows ? 2 : 1;
         if (!has(headOctets)) {
@@ -231,7 +231,7 @@ namespace link_type {
 constexpr int null = 0;
 constexpr int ethernet = 1;
 constexpr int ppp = 9;
-constexpr int rawOfSystems = 12; // written by mistake: the numbers of FreeBSD and OpenBSD themselves
+constexpr int rawOfSystems = 12; // written by mistake: the numbers that FreeBSD and OpenBSD use inside
 constexpr int rawOfOpenBsd = 14;
 constexpr int pppSerial = 50;
 constexpr int pppEthernet = 51;

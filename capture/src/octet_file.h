@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// The octets of a file or of standard input as they come.
+// The octets of a file or of standard input, as they come.
 //
 // They are read and not mapped: a mapped file that another program shortens ends this one with a signal.
 #pragma once
@@ -20,7 +20,8 @@ public:
     OctetFile(const OctetFile &) = delete;
     OctetFile &operator=(const OctetFile &) = delete;
 
-    // What there is at once, so that a live source shows each packet as it comes; 0 at the end.
+    // Reads what is available without waiting for more, so that a live source shows each packet as it comes; 0 at the
+    // end.
     [[nodiscard]] std::size_t read(std::span<std::uint8_t> octets);
 
     [[nodiscard]] const std::string &name() const { return name_; }
@@ -34,7 +35,7 @@ private:
     void checkKind();
 
     std::string name_;
-    bool isOwn_; // standard input is the program's
+    bool isOwn_; // false for standard input, which is the program's
     int file_;
     bool live_ = false;
     std::uint64_t size_ = 0; // 0 where it is not known

@@ -10,7 +10,7 @@ namespace netfloor {
 
 namespace {
 
-// Large enough that a packet's share of a system call is small, and small enough for a core's own cache.
+// Large enough that a packet's share of a system call is small, and small enough for the cache of one core.
 constexpr std::size_t bufferOctets = std::size_t{256} * 1024;
 
 } // namespace
@@ -29,7 +29,7 @@ const std::string &OctetStream::error() const {
     return unpacker_ && file_.error().empty() ? unpacker_->error() : file_.error();
 }
 
-// realloc() moves pages where a new buffer would be there beside the old one.
+// realloc() can move pages. A new buffer would need memory in addition to the old one.
 void OctetStream::grow(std::size_t least) {
     auto *const larger = static_cast<std::uint8_t *>(std::realloc(buffer_.get(), least));
     if (larger == nullptr) {
@@ -40,7 +40,7 @@ void OctetStream::grow(std::size_t least) {
     size_ = least;
 }
 
-// The buffer grows only as octets come, and not by what a damaged length promises.
+// The buffer grows only as octets come, so that a damaged length cannot make it large.
 std::size_t OctetStream::fill(std::size_t count) {
     std::memmove(buffer_.get(), buffer_.get() + begin_, end_ - begin_);
     end_ -= begin_;

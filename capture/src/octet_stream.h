@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: MIT
-// The octets of a capture, unpacked: looked at in a buffer, and taken from it once they are known.
+// The octets of a capture, unpacked. A reader peeks at them in a buffer, and takes them once it knows how many it
+// needs.
 #pragma once
 
 #include <cstddef>
@@ -27,13 +28,13 @@ public:
         return {buffer_.get() + begin_, count};
     }
 
-    // Takes octets that have been peeked at. They stay where they are until the next call that reads.
+    // Takes octets that a peek gave. They are valid until the next call that reads.
     void take(std::size_t count) {
         begin_ += count;
         position_ += count;
     }
 
-    // Takes octets without looking; false when the capture ends before.
+    // Takes octets without a peek; false when the capture ends before.
     [[nodiscard]] bool skip(std::size_t count);
 
     [[nodiscard]] std::uint64_t position() const { return position_; } // octets taken

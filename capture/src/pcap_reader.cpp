@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// pcap files (draft-ietf-opsawg-pcap). They are not left to libpcap because it copies each packet and tells no
-// positions, and because a program without a filter then starts without it.
+// pcap files (draft-ietf-opsawg-pcap). libpcap does not read them here: it copies each packet and gives no positions,
+// and a program without a filter starts faster without it.
 #include "records.h"
 
 namespace netfloor {
@@ -54,7 +54,7 @@ public:
         const std::uint32_t units = head.u32(4);
         std::uint32_t captured = head.u32(8);
         std::uint32_t onWire = head.u32(12);
-        if (swaps_ || (maySwap_ && captured > onWire)) { // old versions have the two in the other order
+        if (swaps_ || (maySwap_ && captured > onWire)) { // old versions have these two in the other order
             std::swap(captured, onWire);
         }
         if (captured > most_) {

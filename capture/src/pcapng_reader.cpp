@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// pcapng files (draft-ietf-opsawg-pcapng). They are not left to libpcap because it gives up a file, before its
-// first packet, whose interfaces differ in link type or snap length, as captures on "any" and merged captures do.
+// pcapng files (draft-ietf-opsawg-pcapng). libpcap does not read them here: it refuses a file whose interfaces differ
+// in link type or snap length, as in captures on "any" and merged captures, even before the first packet.
 #include "interfaces.h"
 #include "records.h"
 
@@ -14,10 +14,11 @@ constexpr std::uint32_t packetBlock = 2; // obsolete, still found
 constexpr std::uint32_t simplePacket = 3;
 constexpr std::uint32_t enhancedPacket = 6;
 
-constexpr std::uint32_t orderMark = 0x1a2b3c4d; // as a section in network order has it
-constexpr std::uint32_t frameOctets = 12;       // type and length in front of a block's body, the length again after it
+constexpr std::uint32_t byteOrderMagic = 0x1a2b3c4d; // as a section in network order has it
+constexpr std::uint32_t frameOctets = 12;            // type and length before a block's body, the length again after it
 constexpr std::uint32_t mostBlockOctets = 2 * mostPacketOctets;
-// What is looked at as a whole stands in the buffer: an interface's description, a packet with its comments.
+// Two kinds of blocks are read as a whole, and so must fit into the buffer: the description of an interface, and a
+// packet with its comments.
 constexpr std::uint32_t mostInterfaceOctets = std::uint32_t{1024} * 1024;
 constexpr std::uint32_t mostOptionOctets = std::uint32_t{1024} * 1024;
 
@@ -33,7 +34,7 @@ struct Block {
 
 class PcapngReader final : public RecordReader {
 public:
-    // A file that is damaged before its first packet is no capture, and told at once.
+    // A file that is damaged before its first packet is no capture, and refused at once.
     explicit PcapngReader(OctetStream &stream) : stream_(stream) {
         try {
             (void)findPacket();
@@ -77,7 +78,7 @@ private:
         return false;
     }
 
-    // Looks at the start of a block, and takes nothing. False at the end.
+    // Peeks at the start of a block. False at the end.
     bool readBlockHead() {
         block_.position = stream_.position();
         const auto octets = stream_.peek(frameOctets);
@@ -87,13 +88,13 @@ private:
         if (octets.size() < frameOctets) {
             throw cut();
         }
-        // The first word of a section header reads the same in both orders; the third tells the order.
+        // The first word of a section header reads the same in both orders; the third shows the order.
         if (NumberView(octets, true).u32(0) == sectionHeader) {
             const std::uint32_t order = NumberView(octets, true).u32(8);
-            if (order != orderMark && order != __builtin_bswap32(orderMark)) {
+            if (order != byteOrderMagic && order != __builtin_bswap32(byteOrderMagic)) {
                 throw damage("a section header without a byte order");
             }
-            bigEndian_ = order == orderMark;
+            bigEndian_ = order == byteOrderMagic;
             interfaces_.clear();
         }
         const NumberView head(octets, bigEndian_);
@@ -175,13 +176,13 @@ private:
         packet.octets = takeBlock().subspan(headOctets, captured);
     }
 
-    // A simple packet block says what was on the wire, and not what was captured.
+    // A simple packet block has the length on the wire, and not the captured length.
     static std::uint32_t simpleOctets(std::uint32_t onWire, const Interface &from, std::uint32_t room) {
         const std::uint32_t captured = std::min(onWire, room);
         return from.snapOctets == 0 ? captured : std::min(captured, from.snapOctets);
     }
 
-    // Before the buffer has to hold the block.
+    // Checked before the buffer has to hold the block.
     void checkLengths(std::uint32_t captured, std::uint32_t room, const Interface &from) const {
         if (captured > room) {
             throw damage("a packet larger than its block");

@@ -73,7 +73,7 @@ constexpr std::uint32_t usualSnapOctets = 262144;
     return snapOctets == 0 ? mostPacketOctets : std::clamp(snapOctets, usualSnapOctets, mostPacketOctets);
 }
 
-// "NAME: REASON in packet 7, which begins at octet 910 ..."; `packetNumber` is that of the packet that is lost.
+// "NAME: REASON in packet 7, which begins at octet 910 ..."; `packetNumber` is the number of the lost packet.
 [[nodiscard]] CaptureDamage damageAt(const OctetStream &stream, std::uint64_t packetNumber, std::uint64_t position,
                                      const std::string &reason);
 

@@ -17,13 +17,13 @@ namespace netfloor {
 
 class Unpacker {
 public:
-    // `start`: what has been read of the file already.
+    // `start`: the octets that were already read from the file.
     explicit Unpacker(std::span<const std::uint8_t> start);
     ~Unpacker();
     Unpacker(const Unpacker &) = delete;
     Unpacker &operator=(const Unpacker &) = delete;
 
-    // Some octets, or none at the end, which is in order only after a whole member.
+    // Some octets, or none at the end. The end is an error unless a member of the file has just ended.
     [[nodiscard]] std::size_t read(OctetFile &file, std::span<std::uint8_t> octets);
 
     // Why the octets ended early, or empty.

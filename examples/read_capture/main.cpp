@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// Reads a capture and prints for each packet where it stands, when it came, and what the plug-in thinks of it.
+// Reads a capture and prints for each packet its position in the file, its time and the plug-in's verdict.
 #include <exception>
 #include <iostream>
 
@@ -37,7 +37,7 @@ int main(int argumentCount, char **arguments) {
     }
     try {
         readCapture(arguments[1]);
-    } catch (const std::exception &error) { // damage comes after the packets that are whole
+    } catch (const std::exception &error) { // damage is thrown after the whole packets before it
         std::cout.flush();
         std::cerr << error.what() << '\n';
         return 1;

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
 // The shortest output: a tree of the fields of each packet, written as the plug-in reports them. Nothing is kept, and
-// the headers of a tunnel stand side by side.
+// the headers of a tunnel are shown side by side.
 #include <cstdint>
 #include <iostream>
 #include <string>

@@ -92,13 +92,13 @@ void BlockTracker::open(std::uint32_t firstBit, std::uint32_t limitDepth) {
     ++depth_;
 }
 
-// A block that begins where the block shown around it does is part of that, and no link that follows.
+// A block that begins where the block shown around it begins is part of that block, and no later link.
 bool BlockTracker::beginsWithItsParent(std::uint32_t level) const {
     const std::uint32_t shownParent = levels_[level].shownParent;
     return shownParent != none && views_[shownParent].firstBit == views_[level].firstBit;
 }
 
-// Gives the innermost block its name. Where one of that name is shown around it, it takes its place.
+// Gives the innermost block its name. Where a block of that name is shown around it, it takes the place of that one.
 void BlockTracker::name(std::string_view name) {
     Level &innermost = levels_[depth_ - 1];
     BlockView &view = views_[depth_ - 1];
@@ -108,7 +108,7 @@ void BlockTracker::name(std::string_view name) {
         return;
     }
     for (std::uint32_t level = innermost.shownParent; level != none; level = levels_[level].shownParent) {
-        // Names stand in one place each, so that equal ones have one address.
+        // Each name is stored once, so that equal names have one address.
         if (views_[level].name.data() == name.data()) {
             innermost.shownParent = levels_[level].shownParent;
             break;

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
-// Keeps track of the blocks in which fields stand, from what a host sees of them when a field is reported:
-// the name of the innermost block, and where each open block began. Two blocks without a name of their own that begin
-// at the same bit cannot be told apart, and count as one.
+// Keeps track of the blocks around the fields. When a field is reported, a host sees the name of the innermost block,
+// and where each open block began. Two blocks without a name of their own that begin at the same bit look the same,
+// and count as one.
 //
 // It also decides how they are shown; netfloor-host/sink.h describes the rules.
 #pragma once
@@ -26,8 +26,8 @@ public:
     // Before a packet.
     void reset();
 
-    // Moves to the block in which the field stands that is being reported; the sink gets the blocks that are closed and
-    // opened on the way. The cost is that of the blocks that changed.
+    // Moves to the block of the field that is being reported. The sink gets the blocks that are closed and opened for
+    // that. The cost grows with the number of blocks that changed.
     void moveTo(const DecodeState &state, NamedField &field, Sink &sink) {
         const auto depth = static_cast<std::uint32_t>(state.blockStarts.top - state.blockStarts.base);
         if (!isKnown(depth, *state.blockStarts.top)) {
@@ -48,19 +48,19 @@ public:
 private:
     static constexpr std::uint32_t none = static_cast<std::uint32_t>(-1);
 
-    // What belongs to an open block beside its view. Blocks are given by their place among the open ones.
+    // What belongs to an open block in addition to its view. Blocks are given by their index among the open ones.
     struct Level {
-        bool hasField = false;        // a field stood directly in it, so that its name is known
+        bool hasField = false;        // a field was read directly in it, so that its name is known
         bool wasShown = false;        // opened in the sink
-        bool isInChain = false;       // `chainParent` tells where links are shown
+        bool isInChain = false;       // `chainParent` is where its links are shown
         std::uint32_t limitDepth = 0; // limits open when it was first seen
         std::uint32_t shownParent = none;
         std::uint32_t chainParent = none;
     };
 
-    // Whether the block at this depth, which begins at this bit, is one in which a field stood before. What is opened
-    // after a field begins at or after the cursor of that call. So a block that begins in front of it is the same as
-    // then, and so are all around it.
+    // Whether the block at this depth, which begins at this bit, is one in which a field was read before. What is
+    // opened after a field begins at or after the cursor of that call. So a block that begins before that cursor is the
+    // same as then, and so are all around it.
     [[nodiscard]] bool isKnown(std::uint32_t depth, std::uint32_t firstBit) const {
         return depth != 0 && depth <= depth_ && firstBit < lastCursor_ && views_[depth - 1].firstBit == firstBit &&
                levels_[depth - 1].hasField;

@@ -31,7 +31,7 @@ constexpr std::array sections = {
     FieldSpan{"IPv6 extensions", {"Header Extention length"}, {"Authentication Data"}},
 };
 
-// Key fields that are addresses or masks, but displayed as numbers, so that the plug-in's tables do not tell.
+// Key fields that are addresses or masks. The plug-in's tables display them as numbers.
 struct KnownKeyType {
     std::string_view section;
     FieldName field;
@@ -48,7 +48,7 @@ constexpr std::string_view tcpOptionsWhy = "every TCP header leaves it, as none 
 constexpr std::string_view tcpPayloadWhy = "a TCP payload of at most 4 octets stays unread";
 
 constexpr std::array designedFlags = {
-    // The plug-in asks for each kind of option in turn. Each kind that is not there is an expectation not met.
+    // The plug-in asks for each kind of option in turn. Each kind that is missing is an expectation not met.
     FlagByDesign{NETFLOOR_FLAG_EXPECTATION, endOfTcpHeader, 0, tcpOptionsWhy},
     FlagByDesign{NETFLOOR_FLAG_EXPECTATION, tcpOptions, 0, tcpOptionsWhy},
     FlagByDesign{NETFLOOR_FLAG_EXPECTATION,
@@ -64,10 +64,10 @@ constexpr std::array designedFlags = {
                  "a UDP payload of at most 4 octets stays unread"},
 };
 
-// A chunk's type and flags, and a cause's code, are in front of the length and counted by it.
+// A chunk's type and flags, and a cause's code, are before the length and counted by it.
 constexpr std::uint32_t sctpHead = 16;
 constexpr std::string_view causesWhy =
-    "a list of SCTP error causes leaves it, as another cause is looked for after the last";
+    "a list of SCTP error causes leaves it, as the plug-in tries to read one cause more after the last";
 constexpr std::array lengths = {
     LengthField{"SCTP INIT, INIT ACK",
                 {"Length", 824},
@@ -126,13 +126,13 @@ void FieldKnowledge::addSections(Fields fields) {
         for (const FieldDescription &field : locate(fields, span)) {
             const bool isNew = known_.try_emplace(field.id, Known{span.section, nullptr, {}}).second;
             if (!isNew) {
-                miss(span.section, {field.name, field.id}, "stands in two sections");
+                miss(span.section, {field.name, field.id}, "is in two sections");
             }
         }
     }
     for (const FieldDescription &field : fields) {
         if (!known_.contains(field.id)) {
-            miss({}, {field.name, field.id}, "stands in no section: add a row, or move an end, in 'sections'");
+            miss({}, {field.name, field.id}, "is in no section: add a row, or move an end, in 'sections'");
         }
     }
 }
@@ -176,7 +176,7 @@ FieldKnowledge::Fields FieldKnowledge::locate(Fields fields, const FieldSpan &sp
         return {};
     }
     if (last < first) {
-        miss(span.section, span.last, "is the last of some fields, but stands before their first");
+        miss(span.section, span.last, "is the last field of the row, but comes before its first");
         return {};
     }
     return {first, last + 1};

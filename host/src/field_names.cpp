@@ -6,7 +6,7 @@
 namespace netfloor {
 namespace {
 
-// Ids are small; a table with others would not be worth the room.
+// Ids are small. Larger ones count as unknown, so that the vector of names stays small.
 constexpr std::uint32_t mostIds = 65536;
 
 } // namespace

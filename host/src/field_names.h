@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// Names, resolved once: those of fields from the plug-in's tables, and those of blocks, which come with each report,
-// from what was seen before.
+// Names of fields and of blocks. Those of fields are read once from the plug-in's tables. Those of blocks come with
+// each report, and each is stored when it is first seen.
 #pragma once
 
 #include <cstdint>
@@ -20,7 +20,7 @@ struct NamedField {
     std::string_view name;
     bool isKey = false;
     bool isKnown = false;
-    const char *lastBlock = ""; // the name of the block in which the field stood last
+    const char *lastBlock = ""; // the name of the block in which the field was last read
 };
 
 class FieldNames {
@@ -31,8 +31,8 @@ public:
     // Ids that the tables do not know share one element.
     [[nodiscard]] NamedField &find(std::uint32_t id) { return fields_[id < fields_.size() ? id : 0]; }
 
-    // The same text, at a place that all equal ones share. A field usually stands in the same block, so that one
-    // comparison is enough.
+    // The stored text that equals `name`. A field is usually read in the same block as before, so that one comparison
+    // is enough.
     [[nodiscard]] const char *blockName(NamedField &field, const char *name) {
         return std::strcmp(field.lastBlock, name) == 0 ? field.lastBlock : findBlockName(field, name);
     }
@@ -40,7 +40,7 @@ public:
 private:
     [[nodiscard]] const char *findBlockName(NamedField &field, std::string_view name);
 
-    std::vector<NamedField> fields_; // by id; the first stands for all unknown ones
+    std::vector<NamedField> fields_; // by id; all unknown ids share the first
     std::set<std::string, std::less<>> blockNames_;
 };
 

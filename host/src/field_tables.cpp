@@ -56,7 +56,7 @@ private:
     static constexpr std::uint8_t referenceTag = 0x08;
     static constexpr std::uint8_t constantTag = 0x10;
 
-    // An operand. A constant is a span of one number; a reference, which tells nothing, is 0 to 0.
+    // An operand. A constant is a span of one number; a reference, which has no number here, is 0 to 0.
     BitSpan readSpan() {
         constexpr std::uint32_t referenceOctets = 3;
         switch (*at_) {
@@ -138,7 +138,7 @@ void appendNumber(std::string &text, char letter, std::uint32_t value) {
         std::to_chars(digits.data(), digits.data() + digits.size(), value, letter == 'x' ? hexadecimal : decimal).ptr);
 }
 
-// Appends the elements by the inside of a list's brackets: "%x":"."
+// Appends the elements as the text inside a list's brackets says: "%x":"."
 void appendList(std::string &text, std::string_view list, std::span<const std::uint32_t> elements) {
     constexpr std::size_t letterAt = 2;
     const std::size_t colon = list.find("\":\"");

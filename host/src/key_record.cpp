@@ -30,8 +30,8 @@ std::uint32_t loadAs(KeyType type, const std::uint8_t *place) {
     }
 }
 
-// The octets of an address. None where it did not fit, or where later addresses have come over it: what was
-// stored whole ends in front of the offset at which the pass left off.
+// The octets of an address. None where it did not fit, or where later addresses have overwritten it: an address
+// that is complete ends at or before the offset at which the pass ended.
 std::span<const std::uint8_t> loadOctets(const std::uint8_t *record, const std::uint8_t *place,
                                          std::uint16_t byteAreaOffset) {
     const std::uint32_t bits = loadNumber<std::uint16_t>(place);

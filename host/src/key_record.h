@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: MIT
 // The key record: where the XTR pass stores the values of a packet's key fields.
 //
-// A plug-in writes an address at any 16-bit offset of the record and has no bound but the room for one, so
-// the first 128 KiB belong to addresses. Presence bits and values stand after them, out of its way.
+// A plug-in may write an address at any 16-bit offset of the record, so the first 128 KiB are for addresses.
+// Presence bits and values come after them, where no address can overwrite them.
 #pragma once
 
 #include <cstddef>
@@ -33,13 +33,13 @@ public:
 
     KeyRecord();
 
-    // Before a packet: no row is present. Of the rest only what was stored is read.
+    // Before a packet: no row is present. Values need not be cleared: only those of rows that are present are read.
     void reset();
 
     [[nodiscard]] std::uint8_t *octets() { return octets_.get(); }
 
-    // Reports the rows that are marked present, of a table with these columns. `byteAreaOffset` is that of the context
-    // after the pass.
+    // Reports the rows whose presence bit is set, of a table with these columns. `byteAreaOffset` is that of the
+    // context after the pass.
     void report(std::span<const KeyColumn> columns, std::uint16_t byteAreaOffset, Sink &sink) const;
 
 private:

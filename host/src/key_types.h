@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
 // The widths and kinds of key fields.
 //
-// The key-field table does not say how wide a value is. The field tables do, for the field of the same name.
+// The key-field table does not say how wide a value is. The field tables say it, for the field of the same name.
 #pragma once
 
 #include <span>

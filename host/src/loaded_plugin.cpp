@@ -30,7 +30,7 @@ constexpr std::string_view advice = " Give the path of a netfloor plug-in, such 
     throw PluginError("cannot use " + path.string() + " as a plug-in: " + std::string(reason) + std::string(whatToDo));
 }
 
-// The loader's own messages for these are obscure, so they are told apart first.
+// The loader's own messages for these cases are obscure, so they are checked first.
 void checkFile(const std::filesystem::path &path) {
     std::error_code error;
     const std::filesystem::file_status status = std::filesystem::status(path, error);
@@ -45,15 +45,15 @@ void checkFile(const std::filesystem::path &path) {
     if (!file) {
         refuse(path, "it cannot be read.", " Check the permissions of the file.");
     }
-    std::array<char, SELFMAG> mark = {};
-    file.read(mark.data(), mark.size());
-    if (std::string_view(mark.data(), mark.size()) != std::string_view(ELFMAG, SELFMAG)) {
+    std::array<char, SELFMAG> magic = {};
+    file.read(magic.data(), magic.size());
+    if (std::string_view(magic.data(), magic.size()) != std::string_view(ELFMAG, SELFMAG)) {
         refuse(path, "it is not a shared library.", advice);
     }
 }
 
-// The plug-in finds the three libraries by their names among those that the process has loaded; naming their
-// operations here keeps them loaded in every program that uses this library.
+// The plug-in finds the three libraries by their names among those that the process has loaded. Using their
+// operations here keeps them linked into every program that uses this library.
 [[gnu::used]] const std::array boundary = {
     reinterpret_cast<void (*)()>(&hs_Malloc),
     reinterpret_cast<void (*)()>(&hd_PreDecode),
@@ -85,8 +85,8 @@ void resolve(void *handle, const char *name, Entry &entry, std::string &missing)
     }
 }
 
-// A file in memory with the same content. A library is known to the loader by its file, so that a copy
-// loads as another library.
+// A file in memory with the same content. The loader identifies a library by its file, so that a copy loads as
+// another library.
 int copyToMemory(const std::filesystem::path &path) {
     const auto fail = [&](int descriptor) {
         const std::string reason = std::strerror(errno);
@@ -145,7 +145,7 @@ std::int32_t LoadedPlugin::initialise(KeyFieldRow *table, std::uint32_t rowCount
     const std::vector<std::int32_t> &results = keySetUp.results;
     const std::int32_t result = results.empty() ? 1 : results[std::min<std::size_t>(keySetUpCalls, results.size() - 1)];
     ++keySetUpCalls;
-    keysAreSettled_ = result != 0 || rowCount > KeyRecord::mostRows;
+    keySetUpIsFinal_ = result != 0 || rowCount > KeyRecord::mostRows;
     if (rowCount > KeyRecord::mostRows) {
         return -1;
     }
@@ -162,7 +162,7 @@ std::int32_t LoadedPlugin::initialise(KeyFieldRow *table, std::uint32_t rowCount
 }
 
 std::int32_t LoadedPlugin::enterExtract(XtrContext *context) {
-    if (keysAreSettled_) {
+    if (keySetUpIsFinal_) {
         return extract(context);
     }
     netfloor_setKeyOptions(this);
@@ -171,20 +171,21 @@ std::int32_t LoadedPlugin::enterExtract(XtrContext *context) {
     return result;
 }
 
-// Of a nested pass the user is this thread, and it alone touches what is not atomic.
+// In a nested pass this thread is the user already. Only the user's thread accesses `isHandingOff_`, which need not be
+// atomic therefore.
 PluginUse::PluginUse(LoadedPlugin &plugin) : plugin_(plugin) {
-    thread_local const char mark = 0;
+    thread_local const char thisThread = 0;
     const void *user = nullptr;
-    isOutermost_ = plugin_.user_.compare_exchange_strong(user, &mark, std::memory_order_acquire);
-    if (!isOutermost_ && user != &mark) {
+    isOutermost_ = plugin_.user_.compare_exchange_strong(user, &thisThread, std::memory_order_acquire);
+    if (!isOutermost_ && user != &thisThread) {
         throw PluginBusy("the plug-in " + plugin_.path().string() +
-                         " is at work in another thread, and it serves one packet at a time. Give each thread a Host "
+                         " is running in another thread, and it serves one packet at a time. Give each thread a Host "
                          "of its own, with a copy of the plug-in by PluginLibrary::openCopy.");
     }
     if (!isOutermost_ && !plugin_.isHandingOff_) {
         throw PluginBusy("the plug-in " + plugin_.path().string() +
-                         " is in the middle of a packet. A sink cannot run it: keep what the other packet is needed "
-                         "for until this one is through, or use a copy by PluginLibrary::openCopy.");
+                         " is in the middle of a packet. A sink cannot run it: run the other packet after this one, or "
+                         "use a copy by PluginLibrary::openCopy.");
     }
     plugin_.isHandingOff_ = false;
 }

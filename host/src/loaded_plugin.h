@@ -15,8 +15,8 @@ namespace netfloor {
 
 class LoadedPlugin final : public standin::KeyOptions {
 public:
-    // `loadPath` is the name that the loader gets where it differs from the file's own, and `descriptor` a file
-    // descriptor to be closed after the unloading, or -1.
+    // The loader gets `loadPath`, which may differ from `path`. `descriptor` is a file descriptor to be closed after
+    // the unloading, or -1.
     LoadedPlugin(std::filesystem::path path, const std::filesystem::path &loadPath, int descriptor);
     ~LoadedPlugin();
     LoadedPlugin(const LoadedPlugin &) = delete;
@@ -50,16 +50,17 @@ private:
     void *handle_;
     std::span<const KeyFieldRow> keyTable_;
     std::vector<KeyColumn> keyColumns_;
-    bool keysAreSettled_ = false; // the plug-in does not ask again
+    bool keySetUpIsFinal_ = false; // the plug-in does not ask again
 
     friend class PluginUse;
     friend class OwnerTurn;
-    std::atomic<const void *> user_ = nullptr; // the thread that is running a pass, by the address of a mark of its own
-    bool isHandingOff_ = false;                // the user's: its innermost pass waits for the owner of a next layer
+    // The thread that is running a pass, by the address of a variable of its own.
+    std::atomic<const void *> user_ = nullptr;
+    bool isHandingOff_ = false; // the innermost pass of that thread waits for the owner of a next layer
 };
 
-// The right to run a pass, held from its start to its end. Throws PluginBusy where another pass is running, unless that
-// one waits in this thread for the owner of a next layer.
+// The right to run a pass, held from its start to its end. The constructor throws PluginBusy where another pass is
+// running, unless that pass waits in this thread for the owner of a next layer.
 class PluginUse {
 public:
     explicit PluginUse(LoadedPlugin &plugin);

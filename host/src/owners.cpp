@@ -15,7 +15,7 @@ constexpr std::uint32_t protocolNumbers = 256;
 constexpr std::uint32_t sctpProtocol = 132;
 constexpr std::uint32_t hostsOwnDecoder = 0;
 
-// "Data=12 octets", "Data - 3 octets and 4 bits", without storage of its own.
+// "Data=12 octets", "Data - 3 octets and 4 bits". It allocates nothing.
 class DataText {
 public:
     DataText(std::string_view start, std::uint32_t bits) {
@@ -55,7 +55,7 @@ void takeBitsAsData(NextLayer &next, std::uint32_t bits) {
     }
 }
 
-// The user data of the DATA chunk whose 16 octets of head stand in front of the payload.
+// The user data of the DATA chunk whose head is the 16 octets before the payload.
 struct UserData {
     std::uint32_t octets;
     std::uint32_t paddingOctets;

@@ -90,7 +90,7 @@ void PacketRun::prepareContext(const TestRunOptions *test) {
     context.decodeState = &state();
     if (pass_ == Pass::md) {
         blocks_.reset();
-        markFieldRecord();
+        fillFieldRecordHead();
     }
 }
 
@@ -113,7 +113,7 @@ std::int32_t PacketRun::enter() {
     return 0;
 }
 
-// The XTR pass stops at a hand-off, and it is for the host to go on with the owner.
+// The XTR pass stops at a hand-off, and the host goes on with the owner.
 std::int32_t PacketRun::enterExtract() {
     const std::int32_t result = plugin_.enterExtract(&xtr_);
     if (result != 1 || state().layerHandedOff == 0 || !followStop_) {
@@ -142,7 +142,7 @@ std::int32_t PacketRun::preDecode(std::uint32_t mode) noexcept {
     }
     try {
         if (mode != modeOf(pass_)) {
-            throw PluginError("the plug-in " + plugin_.path().string() + " hands on in mode " + std::to_string(mode) +
+            throw PluginError("the plug-in " + plugin_.path().string() + " hands off in mode " + std::to_string(mode) +
                               " during the pass " + std::string(passName(pass_)) + ": it does not fit this host.");
         }
         return handOff() == Handled::refused ? refusal : 0;
@@ -211,7 +211,7 @@ void PacketRun::addField(std::uint32_t outputRangeCount, const BitRange *ranges,
             .recordHead = {head[0], head[1], head[2]},
         });
         preDecode_.context.fieldRecordCount = (preDecode_.context.fieldRecordCount + 1) % fieldRecordCount;
-        markFieldRecord();
+        fillFieldRecordHead();
     } catch (...) {
         keepException();
     }
@@ -229,8 +229,7 @@ void PacketRun::addDisplay(const char *display, std::uint32_t displayId) noexcep
     }
 }
 
-// The plug-in writes the record on return whatever happens here: without storage there is no way on, and the
-// process ends.
+// When this returns, the plug-in writes the record without a test. So without storage the process ends.
 void PacketRun::growLayerInfo() noexcept {
     PreDecodeContext &context = preDecode_.context;
     layerInfo_.resize(2 * (std::size_t{context.layerInfoCount} + 1));

@@ -1,6 +1,5 @@
 // SPDX-License-Identifier: MIT
-// One pass over one packet at a time: what answers the plug-in's calls while it runs. The storage is kept from packet
-// to packet.
+// Runs one pass over one packet at a time, and answers the plug-in's calls. The storage is kept from packet to packet.
 #pragma once
 
 #include <array>
@@ -28,12 +27,12 @@ class PacketRun final : public standin::RunOperations {
 public:
     PacketRun(LoadedPlugin &plugin, FieldNames &names);
 
-    // `test`, if there is one, is `options` as well.
+    // `test` is null, or the same object as `options`.
     Ending run(Pass pass, std::span<const std::uint8_t> packet, const OwnerRegistry &owners, Sink &sink,
                const RunOptions &options, const TestRunOptions *test);
 
-    // What the plug-in calls, by way of the stand-ins. No exception may pass the plug-in, so the first is kept until
-    // it has returned. Nothing is reported after it.
+    // The calls of the plug-in, which come through the stand-ins. No exception may pass through the plug-in, so the
+    // first one is kept until the plug-in has returned. Nothing is reported after it.
     void addField(std::uint32_t outputRangeCount, const BitRange *ranges, const char *display, const char *fieldName,
                   std::uint32_t fieldId, std::uint32_t bitOrder) noexcept override;
     void addDisplay(const char *display, std::uint32_t displayId) noexcept override;
@@ -43,8 +42,8 @@ public:
 private:
     friend class NextLayer;
 
-    // The plug-in gets records of this size and marks the one that is current; the host reads the head at
-    // once, so that two in turn are enough for a packet of any length.
+    // The plug-in writes the head of the current record of this size. The host reads it at once, so that two records
+    // in turn are enough for a packet of any length.
     static constexpr std::size_t fieldRecordOctets = 1000;
     static constexpr std::uint32_t fieldRecordCount = 2;
     static constexpr std::size_t headOctets = std::tuple_size_v<decltype(FieldView::recordHead)>;
@@ -67,8 +66,8 @@ private:
     [[nodiscard]] std::uint8_t *fieldRecordHead() {
         return fieldRecords_.data() + preDecode_.context.fieldRecordCount * fieldRecordOctets;
     }
-    // Marks the head of the current field record, so that what the plug-in leaves alone can be told.
-    void markFieldRecord() { std::memset(fieldRecordHead(), untouchedOctet, headOctets); }
+    // Fills the head of the current field record, so that the host sees what the plug-in did not write.
+    void fillFieldRecordHead() { std::memset(fieldRecordHead(), untouchedOctet, headOctets); }
     void keepException() noexcept;
     Ending finish(std::int32_t result);
 
@@ -81,7 +80,7 @@ private:
     std::vector<LayerInfoRecord> layerInfo_;
     BlockTracker blocks_;
 
-    // The pass that is going on.
+    // The current pass.
     Pass pass_ = Pass::md;
     const OwnerRegistry *owners_ = nullptr;
     Sink *sink_ = nullptr;

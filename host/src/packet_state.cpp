@@ -32,7 +32,7 @@ std::uint32_t checkedBits(std::span<const std::uint8_t> packet, const StateOptio
         throw std::invalid_argument("totalBits is above the bits that the packet has");
     }
     if (options.cursor == 0 || options.cursor - 1 > totalBits) {
-        throw std::invalid_argument("the cursor stands outside the packet");
+        throw std::invalid_argument("the cursor is outside the packet");
     }
     if (options.blockCapacity == 0 || options.limitCapacity == 0 || options.layerCapacity == 0 ||
         options.rangeCapacity == 0) {
@@ -41,7 +41,7 @@ std::uint32_t checkedBits(std::span<const std::uint8_t> packet, const StateOptio
     return totalBits;
 }
 
-// An array on the host's heap, which the plug-in may let grow and move: the record alone knows where it is.
+// An array on the host's heap. The plug-in may let it grow and move: only the record has its current address.
 template <typename Element>
 Element *allocate(std::size_t count, standin::HeapKeeper &keeper) {
     void *const block = standin::allocateBlock(&keeper, count * sizeof(Element));
@@ -79,7 +79,7 @@ struct PacketState::Storage final : standin::HeapKeeper {
         standin::freeBlock(state.blockStarts.base);
     }
 
-    // Not the constructor: what has been allocated when a later part fails is to be freed.
+    // Not in the constructor: the destructor must free the earlier arrays when a later one fails.
     void setUpFor(std::span<const std::uint8_t> octets, const StateOptions &options) {
         allowGrowth = options.allowGrowth;
         const std::uint32_t totalBits = checkedBits(octets, options);
@@ -117,7 +117,7 @@ struct PacketState::Storage final : standin::HeapKeeper {
         state.condition = 0;
         state.advance = 0;
         *state.blockName = '\0';
-        // In pieces: a copy of this size as one makes compilers choose a string instruction, which starts slowly.
+        // In pieces: for one copy of this size compilers choose a string instruction, which starts slowly.
         constexpr std::size_t wordsEach = 8;
         for (std::size_t word = 0; word < std::size(state.scratch); word += wordsEach) {
             std::memset(state.scratch + word, 0, wordsEach * sizeof *state.scratch);
@@ -137,7 +137,7 @@ struct PacketState::Storage final : standin::HeapKeeper {
     // Copies the octets; the state shows the copy and the original.
     void take(std::span<const std::uint8_t> octets, std::size_t copied) {
         if (copied > copyOctets || !copy) {
-            copy.reset(); // room for both is not needed
+            copy.reset(); // first, so that old and new need no memory at the same time
             copyOctets = 0;
             copy = std::make_unique_for_overwrite<std::uint8_t[]>(copied);
             copyOctets = copied;

@@ -8,8 +8,8 @@
 
 namespace netfloor {
 
-// The storage of the passes of a host. There is one run, and more only where an owner of a next layer runs other
-// packets by the same host.
+// The storage of the passes of a host. There is one run. There are more only where an owner of a next layer runs other
+// packets on the same host.
 class Host::Runs {
 public:
     explicit Runs(const PluginLibrary &library) : plugin_(*library.loaded_), names_(plugin_.getTable) {}

@@ -64,7 +64,7 @@ void ReportSink::field(const FieldView &field) {
     kept.recordHead = field.recordHead;
 }
 
-// Blocks that are new are the innermost ones, and their numbers follow one another.
+// New blocks are the innermost ones, and their numbers are consecutive.
 void ReportSink::keepBlocks(std::span<const BlockView> blocks) {
     std::size_t known = blocks.size();
     while (known > 0 && blocks[known - 1].number >= report_.blocks.size()) {

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// libhd_HostDispatch: the road from one layer to the next.
+// libhd_HostDispatch: gives the next layer to its owner.
 #include "links.h"
 
 [[gnu::visibility("default")]] std::int32_t hd_PreDecode(PreDecodeContext *context, std::uint32_t mode) {

@@ -1,10 +1,9 @@
 // SPDX-License-Identifier: MIT
-// How the three stand-in libraries reach the host library above them, without linking to it and without
-// knowing more of it than these interfaces.
+// How the three stand-in libraries call the host library, without linking to it: by these interfaces alone.
 //
-// A run is found by its context record, which is the first member of a PreDecodeRun. A block of the heap
-// names its keeper in front of itself, since hs_Realloc gets no context. hx_InitialiseOptXTR gets nothing to go
-// by, so the host names the plug-in that its thread is about to enter (netfloor_setKeyOptions).
+// A run is found by its context record, which is the first member of a PreDecodeRun. A block of the heap has its
+// keeper's address in front of it, since hs_Realloc gets no context. hx_InitialiseOptXTR gets no context either, so
+// the host names the plug-in that its thread is about to enter (netfloor_setKeyOptions).
 #pragma once
 
 #include <cstddef>
@@ -37,7 +36,7 @@ protected:
     ~RunOperations() = default;
 };
 
-// What the host's contexts really are: the plug-in sees the first member.
+// A context of the host. The plug-in sees the first member alone.
 struct PreDecodeRun {
     PreDecodeContext context;
     RunOperations *operations;
@@ -57,7 +56,7 @@ protected:
     ~KeyOptions() = default;
 };
 
-// Stands in front of each block of the heap.
+// The octets in front of each block of the heap.
 struct alignas(std::max_align_t) BlockHead {
     HeapKeeper *keeper;
 };
@@ -86,6 +85,6 @@ inline void freeBlock(void *block) {
 
 } // namespace netfloor::standin
 
-// libhx_KeyOptions: names what answers hx_InitialiseOptXTR on this thread, or null for nobody. This is the one thing
-// that a stand-in exports beside the operations of netfloor/host.h.
+// libhx_KeyOptions: sets what answers hx_InitialiseOptXTR on this thread; null for nothing. No other stand-in exports
+// more than the operations of netfloor/host.h.
 extern "C" void netfloor_setKeyOptions(netfloor::standin::KeyOptions *options);

@@ -11,10 +11,10 @@
  *     }
  *
  * The tables are constant and belong to the plug-in: they stay where they are until it is unloaded, may be read from
- * any thread, and are neither changed nor freed by a host. Texts are ASCII and zero-terminated. Words stand in the byte
+ * any thread, and are neither changed nor freed by a host. Texts are ASCII and zero-terminated. Words are in the byte
  * order of the machine, numbers in the layouts and probes in little-endian order. Indices count from 0, bits from 1.
  *
- * Three things only the grammar knows, and a host that wants them takes them from the reports of the MD pass:
+ * Three things are not in the tables. A host that needs them takes them from the reports of the MD pass:
  *
  *   - which field follows which, and under what condition;
  *   - the order of octets in a value, see "Layouts" below;
@@ -32,11 +32,11 @@ extern "C" {
 /* Numbers of the tables, and what the two exports give for each. There is none for any other number. */
 enum {
     NETFLOOR_TABLE_VERSION = 1,  /* both: a text, the version of this interface */
-    NETFLOOR_TABLE_IDENTITY = 2, /* Ptr: the ProtocolIdentity; Table: its slots, 16 octets behind */
+    NETFLOOR_TABLE_IDENTITY = 2, /* Ptr: the ProtocolIdentity; Table: its slots, 16 octets after */
     NETFLOOR_TABLE_FIELDS = 4,   /* Ptr: a probe; Table: FieldDescriptor rows, ended by a FieldTableEnd */
-    NETFLOOR_TABLE_SAMPLE = 5,   /* Ptr: a probe; Table: its body, 16 octets behind */
+    NETFLOOR_TABLE_SAMPLE = 5,   /* Ptr: a probe; Table: its body, 16 octets after */
     NETFLOOR_TABLE_VALUES = 6,   /* Ptr: none; Table: ValueMapRow rows, ended by a row of zeros */
-    NETFLOOR_TABLE_POOL = 7,     /* Ptr: none; Table: int32_t numbers of the value rows, without an end mark */
+    NETFLOOR_TABLE_POOL = 7,     /* Ptr: none; Table: int32_t numbers of the value rows, without an end row */
     NETFLOOR_TABLE_TEXTS = 8,    /* Ptr: none; Table: const char * texts, ended by NETFLOOR_LAST_TEXT */
     NETFLOOR_TABLE_LAYOUTS = 9   /* Ptr: none; Table: octets, records of bit places, ended by a length of 0 */
 };
@@ -45,12 +45,12 @@ enum {
 #define NETFLOOR_TABLE_FOUND 0u
 #define NETFLOOR_TABLE_UNKNOWN 0xd0410001u
 
-/* What ends the tables. */
+/* The ends of the tables. */
 #define NETFLOOR_LAST_FIELD "$_$LAST_FIELD_$_$"
 #define NETFLOOR_LAST_TEXT "$$_FINAL_STRING_$$"
 #define NETFLOOR_NO_FIELD 0xffffffffu
 
-/* Width of a field whose length the packet tells, and of an IPv6 address that is read in groups or nibbles. */
+/* Width of a field whose length the packet gives, and of an IPv6 address that is read in groups or nibbles. */
 #define NETFLOOR_WIDTH_VARIABLE 0xffffffffu
 
 /* Kinds of a value row. */
@@ -72,7 +72,7 @@ typedef struct ProtocolIdentity {
 } ProtocolIdentity;
 
 /*
- * One field. Rows stand in the order of the grammar; the ids do not rise.
+ * One field. The rows are in the order of the grammar, and not in that of the ids.
  *
  * Flags, from the low octet up:
  *
@@ -80,15 +80,15 @@ typedef struct ProtocolIdentity {
  *   1   3 for an address of fixed width, shown as a list of its elements, else 0
  *   2   1 for a key field, else 0
  *   3   5, but 6 for 396 and 398 to 408 (the TCP header from its 13th octet on), 489 and 490 (UDP length and checksum),
- *       848 and 852 (lengths of SCTP parameters); what it says is not published, and no reader needs it
+ *       848 and 852 (lengths of SCTP parameters); its meaning is not published, and no reader needs it
  */
 typedef struct FieldDescriptor {
     uint32_t flags;          /* four octets, see "Flags" above; NETFLOOR_NO_FIELD in the row that ends the table */
     uint32_t fieldId;        /* the id under which the MD pass reports it, in one row only */
     uintptr_t keyIndex;      /* 1, 2, 3... for the key fields, 0 for the others; no index of a KeyFieldRow */
-    const char *name;        /* as the MD pass reports it, without blanks in front; several fields may bear one name,
+    const char *name;        /* as the MD pass reports it, without leading blanks; several fields may have one name,
                                 and the TO pass reports all of them under the id of the first */
-    const char *shortName;   /* the same without a blank behind; for 243 a shorter one, which the passes report */
+    const char *shortName;   /* the same without a trailing blank; for 243 a shorter one, which the passes report */
     int32_t valueCount;      /* rows of its list of value names; 0: none */
     int32_t valueStart;      /* index of the first of them; -1: none */
     uint32_t width;          /* 0xffff0000 plus the bits of its pieces times their count, or NETFLOOR_WIDTH_VARIABLE */
@@ -127,24 +127,24 @@ typedef struct ValueMapRow {
 } ValueMapRow;
 
 /*
- * Texts: each distinct display line and value name once. A display line is that of the MD pass, blanks in front
- * included. Its conversions, besides which all is literal ("%u*4 octets" shows the value as it is):
+ * Texts: each distinct display line and value name once. A display line is that of the MD pass, leading blanks
+ * included. Its conversions, apart from which all is literal ("%u*4 octets" shows the value as it is):
  *
  *   %u %x %c        the value in decimal, in hexadecimal without leading zeros, as one character
  *   %-S             the name of the value
- *   %-["%x":"."]    a list: each element of the field in %u, %x or %c, with what the second quotes hold between them
+ *   %-["%x":"."]    a list: each element of the field in %u, %x or %c, with the text of the second quotes between them
  *   %-["%x"]        a list with nothing between its elements
  *
  * An element is a BitRange of the report. Where an address is shown in groups it is a group of 16 bits, its digits for
  * each octet the low nibble and then the high one.
  *
- * Layouts: where the bits of a field lie, a record each, one behind the other without padding:
+ * Layouts: where the bits of a field lie, a record each, one after the other without padding:
  *
- *   length      two octets: octets behind them
+ *   length      two octets: number of octets after them
  *   head        ff 02 55 01 04
  *   number      one octet: number of pieces, 1 to 4
  *   pieces      each a range, or for a single bit a constant: bits, of which 1 is the bit at the cursor
- *   count       how often the pieces repeat: a constant; a range, from least to most; a reference, as the packet tells
+ *   count       how often the pieces repeat: a constant; a range, from least to most; a reference, as the packet says
  *   step        a constant: bits from one repeat to the next, and from the last one to where the cursor goes
  *   end         a reference: 1 where the count is a reference, else 0
  *
@@ -152,8 +152,9 @@ typedef struct ValueMapRow {
  *   range       05, and two constants: from, to; of a piece from above to: its bits are read in reverse order
  *   reference   08 n 00
  *
- * A record of length 3, ff 00 00, tells no place: its fields are shown ahead of their turn, or are addresses in groups.
- * The cursor moves on by the count times the step; but not for id 168, which is shown ahead, whatever its record says.
+ * A record of length 3, ff 00 00, gives no place: its fields are shown ahead of their turn, or are addresses in groups.
+ * The cursor moves on by the count times the step; but not for id 168, which is shown ahead: it stays, against its
+ * record.
  *
  * Pieces and repeats are read in the order of the record, and the first read counts most in the value, with these
  * exceptions: of the pieces 9 to 16 and 1 to 8 the second is read first; the ids 201, 208, 209, 215, 216, 555, 895, 925

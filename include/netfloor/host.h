@@ -55,9 +55,9 @@ int32_t NETFLOOR_CDECL hs_AddFieldsToDisplayData(PreDecodeContext *context, cons
 
 /*
  * Decodes the next layer, at `cursor` of the DecodeState, in the pass that `mode` names, with the
- * plug-in that owns `nextLayerKey` and `nextLayerProtocol` of the current LayerFrame. `cursor` and
- * `bitsLeft` stand on return as that plug-in left them. A negative result refuses, and cuts the
- * pass off.
+ * plug-in that owns `nextLayerKey` and `nextLayerProtocol` of the current LayerFrame. On
+ * return, `cursor` and `bitsLeft` are as that plug-in left them. A negative result refuses, and
+ * cuts the pass off.
  */
 int32_t NETFLOOR_CDECL hd_PreDecode(PreDecodeContext *context, uint32_t mode);
 
@@ -67,8 +67,8 @@ int32_t NETFLOOR_CDECL hd_PreDecode(PreDecodeContext *context, uint32_t mode);
  * Sets up the key-field table for the XTR pass: fills presenceOffset, valueOffset and presenceMask
  * of all `rowCount` rows (113). Every row must point to room that may be written. Negative: key
  * fields are refused for good. 0: not ready, the plug-in asks again at the next entry. 1: ready.
- * Above 1: ready, and the row whose number is stored at `presenceRow` is to be marked present in
- * every record.
+ * Above 1: ready, and the plug-in sets the presence bit of the row whose number is stored at
+ * `presenceRow` in every record.
  */
 int32_t NETFLOOR_CDECL hx_InitialiseOptXTR(KeyFieldRow *table, uint32_t rowCount, uint16_t *presenceRow);
 

@@ -34,7 +34,7 @@ typedef struct BitRange {
 
 /*
  * The field read last, complete whenever the plug-in calls the host, and on return. In the MV and XTR passes, what that
- * field does not write itself in `ranges` may be older than the field before: elements behind the last one, flag words
+ * field does not write itself in `ranges` may be older than the field before: elements past the last one, flag words
  * of octets, bit numbers of the later groups of an address.
  */
 typedef struct FieldRecord {
@@ -61,7 +61,7 @@ typedef struct BitStack {
     uint32_t capacity; /* elements that there is room for, at least 1 */
 } BitStack;
 
-/* One layer of the packet, as the plug-ins hand it from one to the next. */
+/* One layer of the packet. The plug-in of a layer fills it for the plug-in of the next. */
 typedef struct LayerFrame {
     uint32_t firstBit;          /* bit number at which the layer starts */
     uint32_t cleared1[10];      /* 0 when the layer is opened; the host's own afterwards */
@@ -78,7 +78,7 @@ typedef struct LayerInfoRecord {
     uint32_t layerNumber; /* number of the layer */
 } LayerInfoRecord;
 
-/* Bits of `flags` in DecodeState. Any of them makes the MV pass set its verdict. */
+/* The flags, bits of `flags` in DecodeState. Any of them makes the MV pass set its verdict. */
 enum {
     NETFLOOR_FLAG_EXPECTATION = 0x2,            /* a fixed value, a bound or a count was not met */
     NETFLOOR_FLAG_LIMIT_TOO_LONG = 0x8,         /* a length reaches past the bits left (MV) */
@@ -90,14 +90,14 @@ enum {
 
 /* Named indices of `scratch` in DecodeState. */
 enum {
-    NETFLOOR_NEXT_LAYER_OCTETS = 1, /* octets of payload behind the transport header */
-    NETFLOOR_PRECEDING_OCTETS = 3,  /* octets of the IPv4 datagram in front of that payload */
+    NETFLOOR_NEXT_LAYER_OCTETS = 1, /* octets of payload after the transport header */
+    NETFLOOR_PRECEDING_OCTETS = 3,  /* octets of the IPv4 datagram before that payload */
     NETFLOOR_NEXT_LAYER_PORT = 4    /* port by which the next layer was chosen */
 };
 
 /*
- * The working record of one packet. It lives as long as the packet's decoding and passes from
- * layer to layer and from plug-in to plug-in.
+ * The working record of one packet. It lives as long as the packet's decoding and is passed
+ * from layer to layer and from plug-in to plug-in.
  *
  * Before the first entry of a packet the host gives: `data` with a copy of the packet,
  * `sourceData`, `totalBits`; `bitsLeft` = `totalBits`, `cursor` = 1; `flags`, `condition`,
@@ -123,7 +123,7 @@ typedef struct DecodeState {
     uint32_t scratch[32];      /* NETFLOOR_NEXT_LAYER_OCTETS and its like; the rest is the host's */
     FieldRecord fieldRecord;   /* the field read last */
     LayerFrame *layerFrames;   /* the layers of the packet */
-    uint32_t layerHandedOff;   /* 0 while a layer decodes, 1 once it has handed on */
+    uint32_t layerHandedOff;   /* 0 while a layer decodes, 1 after its hand-off */
     uint32_t layerIndex;       /* index of the current element of `layerFrames` */
     uint32_t layerCapacity;    /* elements that `layerFrames` has room for, at least 1 */
 } DecodeState;
@@ -158,9 +158,9 @@ typedef struct XtrContext {
  * hx_InitialiseOptXTR; the plug-in stores a field's value without asking whether it is wanted.
  */
 typedef struct KeyFieldRow {
-    uint32_t presenceOffset;  /* octets from the key record to the octet that marks the row present */
+    uint32_t presenceOffset;  /* octets from the key record to the octet with the row's presence bit */
     uint32_t valueOffset;     /* octets from the key record to the row's value */
-    uint32_t presenceMask;    /* its low octet is or-ed into the presence octet */
+    uint32_t presenceMask;    /* the row's presence bit; its low octet is or-ed into that octet */
     const char *protocolName; /* "netfloor" */
     const char *fieldName;    /* name of the field; of several rows of one name the last is filled */
     uint32_t zero[3];         /* 0, not used */

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// A host that has seen a packet allocates nothing for another one like it. The program is one of its own, as it counts
-// all calls of the C library's heap, those of operator new and of the stand-ins included.
+// A host that has run a packet allocates nothing for another one like it. This is a program of its own, as it counts
+// all calls of the C library's heap, including those of operator new and of the stand-ins.
 #include <atomic>
 #include <cstddef>
 
@@ -47,7 +47,7 @@ void *realloc(void *old, std::size_t size) {
 namespace netfloor::test {
 namespace {
 
-// Looks at all that it gets.
+// Reads all that it gets.
 class Counter final : public Sink {
 public:
     void field(const FieldView &field) override { seen += field.text.view().size() + field.name.size(); }
@@ -57,7 +57,7 @@ public:
     std::size_t seen = 0;
 };
 
-TEST(SteadyState, AllocatesNothing) {
+TEST(SteadyState, allocatesNothing) {
     const std::vector<Octets> packets = packetsOfAllFields();
     Host host(PluginLibrary::open(NETFLOOR_PLUGIN));
     Counter sink;

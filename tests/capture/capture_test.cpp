@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// Captures as they should be: what comes out of each form, and what it costs.
+// Good captures: the packets of each format, and what reading them costs.
 #include <optional>
 #include <string>
 #include <vector>
@@ -96,7 +96,7 @@ TEST(Pcapng, timesFollowTheInterface) {
         {"bf", "00*8", all, "1+999999999", 9},
         {"c0", "00*8", all, "0+999999999", 9},
         {"ff", "00*8", all, "0+0", 9},
-        {"00", "00*8", all, "none", 0}, // more seconds than can be told
+        {"00", "00*8", all, "none", 0}, // more seconds than 64 bits hold
         {"06", "7fffffffffffffff", 1'000'000, "none", 6},
         {"06", "7fffffffffffffff", 1, "9223372036854775807+1000", 6},
         {"06", "8000000000000000", 1'000'000, "-9223372036854775807+0", 6},
@@ -147,7 +147,7 @@ TEST(Times, areWrittenWithoutOverflow) {
     EXPECT_EQ((CaptureTime{most / 1'000'000'000, 999'999'999}.inNanoseconds()), std::nullopt);
 }
 
-// Nothing is allocated for a packet, whatever the form of the capture, and with all that a program does to it.
+// Nothing is allocated for a packet, in any format of capture, link layer, filter and time text included.
 TEST(Reading, allocatesNothingOnceItRuns) {
     const Octets ethernet = hex("ff*6 02*6 0800") + ipv4({.protocol = 17, .payload = udp(1, 53, hex("61*8"))});
     const std::vector<Octets> kinds = {ethernet, hex("ff*6 02*6 0806 00*46"), hex("ff*6 02*6 1234 00*46"), hex("ff*9")};
@@ -170,7 +170,7 @@ TEST(Reading, allocatesNothingOnceItRuns) {
         std::optional<std::uint64_t> before;
         std::size_t ip = 0;
         while (capture.next(packet)) {
-            if (packet.number == 8) { // each kind has been there twice
+            if (packet.number == 8) { // each kind has come twice
                 before = allocations();
             }
             (void)filter.passes(packet);

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// Captures as they should not be: what is told of them, and that they take no more than their share.
+// Damaged and hostile captures: their messages, and the bound of the memory that they take.
 #include <fstream>
 #include <string>
 #include <vector>
@@ -48,7 +48,7 @@ Ending readAll(const std::string &path) {
     return ending;
 }
 
-TEST(Damage, isToldWithItsPlaceAfterThePacketsBeforeIt) {
+TEST(Damage, isReportedWithItsPlaceAfterThePacketsBeforeIt) {
     const Octets pcap = Numbers{true}.pcapHead(0xa1b2c3d4, 65535, 1) + pcapRecord(50, ethernet);
     const Octets pcapng = pcapngSection() + pcapngInterface(1, {}) + pcapngPacket(0, 1, ethernet);
     const std::uint64_t end = pcap.size();
@@ -86,7 +86,7 @@ TEST(Damage, isToldWithItsPlaceAfterThePacketsBeforeIt) {
     }
 }
 
-// A packet that is as large as its capture allows is none.
+// A packet that is as large as its capture allows is no damage.
 TEST(Damage, isNoLargePacket) {
     const std::uint32_t size = std::uint32_t{3} << 20;
     const Octets file = Numbers{true}.pcapHead(0xa1b2c3d4, 4 << 20, 1) + pcapRecord(size, Octets(size, 7));
@@ -117,7 +117,7 @@ constexpr long mostKiB = 96L * 1024; // the sanitizer keeps what is freed for a 
 constexpr long mostKiB = 24L * 1024;
 #endif
 
-// Small files that unpack to much, or promise much. What they take at most is what the library may take at all.
+// Small files that unpack to much data, or announce much. The bound holds for any capture.
 TEST(Memory, staysBounded) {
     const Octets section = pcapngSection();
     const Octets interface = pcapngInterface(1, {});
@@ -149,7 +149,7 @@ TEST(Memory, staysBounded) {
     for (const Row &row : rows) {
         SCOPED_TRACE(row.what);
         if (!resetPeak()) {
-            GTEST_SKIP() << "this system does not tell peaks of memory";
+            GTEST_SKIP() << "this system does not measure the peak of memory";
         }
         const long before = statusKiB("VmRSS");
         const Ending ending = readAll(row.path);
@@ -181,7 +181,7 @@ Filtered filterAll(const std::string &expression, const Octets &file) {
     return result;
 }
 
-// A link type without a meaning for the expression costs its own packets, and no others.
+// A link type for which the expression does not compile loses its own packets, and no others.
 TEST(Filter, leavesOutOnlyWhatItCannotFilter) {
     constexpr std::uint16_t unknown = 147; // for private use
     const Octets ip(ethernet.begin() + 14, ethernet.end());

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// Files of the forms that tests of this library alone need.
+// Files that only the tests of this library need.
 #pragma once
 
 #include <algorithm>

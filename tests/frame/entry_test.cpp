@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// Heads and tails of the entries: frames, layer records, the verdict, and packets that are no IP.
+// Start and end of the entries: frames, layer records, the verdict, and packets that are no IP.
 #include <algorithm>
 #include <string>
 #include <vector>
@@ -23,7 +23,7 @@ std::string layerText(const BareRun &run, std::uint32_t count) {
     return text;
 }
 
-TEST(Entry, otherVersionsAreLeftToTheHost) {
+TEST(Entry, readsNoOtherVersion) {
     for (unsigned version = 0; version < 16; ++version) {
         if (version == 4 || version == 6) {
             continue;
@@ -41,7 +41,7 @@ TEST(Entry, otherVersionsAreLeftToTheHost) {
     }
 }
 
-// A first layer has the frame that is there; a later one takes the next. All its words are cleared.
+// The first layer uses the current frame; a later one takes the next. All words of the frame are cleared.
 TEST(Entry, opensALayerFrame) {
     for (const Pass pass : allPasses) {
         for (const bool first : {true, false}) {
@@ -67,7 +67,7 @@ TEST(Entry, opensALayerFrame) {
     }
 }
 
-// What lies behind the limits' own end is nobody's: a datagram that ends gives back all up to that end.
+// The bits left are counted up to the end of the outer limit, and not from `bitsLeft` at the entry.
 TEST(Entry, bitsLeftComeFromTheLimits) {
     for (const Pass pass : allPasses) {
         StateOptions options;
@@ -125,7 +125,7 @@ TEST(Entry, layerRecordsOfMdAndToAlone) {
         } else {
             EXPECT_EQ(layerText(run, run.context().layerInfoCount), "0 of 0: 0-0\n0 of 0: 0-0\n"
                                                                     "255 of 7: 1-224\n0 of 7: 257-320\n");
-            EXPECT_EQ(run.layerInfoGrowths, 2u); // at the entry and behind the hand-off
+            EXPECT_EQ(run.layerInfoGrowths, 2u); // at the entry and after the hand-off
         }
     }
     BareRun room(examplePacket());
@@ -167,7 +167,7 @@ TEST(Entry, verdictGoesByTheFlags) {
     EXPECT_EQ(clean.context().verdict, 1); // the host clears it, not the plug-in
 }
 
-TEST(Entry, oneAfterAnotherStartsAnew) {
+TEST(Entry, startsAnewEachTime) {
     const Octets fragment = ipv4({.protocol = 17, .payload = hex("61*3"), .fragment = 1});
     for (const Pass pass : allPasses) {
         std::string first;

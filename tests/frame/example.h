@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// The packet of most tests of the frame: fields of every kind, a hand-off with 12 octets of payload, 3 octets
-// behind the datagram.
+// The packet of most tests of the frame: fields of every kind, a hand-off with 12 octets of payload, 3 octets after
+// the datagram.
 #pragma once
 
 #include <array>

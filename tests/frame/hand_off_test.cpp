@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// The hand-off to the next layer: the choice of its key, what stands in the records, and what comes back.
+// The hand-off to the next layer: the choice of its key, the records at the hand-off, and the state after it.
 #include <limits>
 #include <optional>
 #include <string>
@@ -42,7 +42,7 @@ TEST(HandOffKey, goesByThePorts) {
         {1024, 40000, 1024, 1024, 17},
         {2000, 9000, 2000, 2000, 17},
         {8999, 9000, 8999, 8999, 17},
-        // neither: the protocol is the key
+        // neither is: the protocol is the key
         {9000, 9000, unset, 17, 0},
         {65535, 65535, unset, 17, 0},
         // a server of RADIUS answers under its own port (RFC 2865, RFC 2866)
@@ -85,7 +85,7 @@ TEST(HandOff, whatTheNextLayerFinds) {
         SCOPED_TRACE(passName(pass));
         BareRun run(examplePacket());
         bool called = false;
-        const auto look = [&] {
+        const auto check = [&] {
             called = true;
             EXPECT_EQ(frameText(run.state()), "frame 0 from 1 key 53 protocol 17 handed off 1");
             EXPECT_EQ(openText(run.state()),
@@ -99,11 +99,11 @@ TEST(HandOff, whatTheNextLayerFinds) {
             EXPECT_EQ(run.context().layerNumber, pass == Pass::xtr ? 1 : 2);
             return 0;
         };
-        run.nextLayer = look;
+        run.nextLayer = check;
         EXPECT_EQ(run.enter(pass), 1);
         EXPECT_EQ(called, pass != Pass::xtr);
         if (pass == Pass::xtr) {
-            look();
+            check();
             continue;
         }
         const std::uint32_t mode = pass == Pass::md ? 1 : pass == Pass::mv ? 2 : 0;
@@ -111,7 +111,7 @@ TEST(HandOff, whatTheNextLayerFinds) {
     }
 }
 
-// What the next layer leaves is skipped up to the datagram's end, and the layer that goes on is on record.
+// What the next layer leaves is skipped up to the datagram's end. The layer that goes on gets a record of its own.
 TEST(HandOff, whatComesBack) {
     for (const Pass pass : passesThatHandOn) {
         SCOPED_TRACE(passName(pass));
@@ -175,7 +175,7 @@ TEST(HandOff, aNegativeResultCutsThePassOff) {
     }
 }
 
-// Packets in packets, by way of the host. The pass has one set of variables: the plug-in's id that goes back into
+// Packets in packets, by way of the host. The pass has one set of variables: the decoder id that it writes back into
 // the context is that of the innermost entry.
 TEST(HandOff, entriesInsideOneAnother) {
     Octets packet = ipv4({.protocol = 17, .payload = udp(2000, 2001, hex("61*12"))});
@@ -224,7 +224,7 @@ TEST(HandOff, entriesInsideOneAnother) {
     }
 }
 
-// The host may enter the XTR pass again at the stop, on the stacks as they stand.
+// The host may enter the XTR pass again at the stop, on the stacks as they are.
 TEST(HandOff, extractionGoesOnAtTheStop) {
     const Octets inner = ipv4({.protocol = 17, .payload = udp(2000, 2001, hex("61*12")), .identification = 0x77});
     const Octets packet = ipv4({.protocol = 17, .payload = udp(53, 53, inner)});

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// The passes leave the same state, though two of them put off what they write till the host can look.
+// The passes leave the same state, although two of them defer their writes until the host can read the state.
 #include <algorithm>
 #include <array>
 #include <cstddef>
@@ -17,8 +17,8 @@
 namespace netfloor::test {
 namespace {
 
-// Without the flags, of which the MV pass raises more, and without what the last field does not write itself in the
-// elements.
+// Without the flags, of which the MV pass raises more, and without the parts of the elements that the last field does
+// not write.
 std::string leftIn(const DecodeState &state) {
     const FieldRecord &record = state.fieldRecord;
     std::ostringstream out;
@@ -56,7 +56,7 @@ Left leftBehind(Pass pass, const Octets &packet, const StateOptions &options) {
     return left;
 }
 
-// Every field, and what is handed on.
+// Every field, and what is handed off.
 std::vector<Octets> packets() {
     std::vector<Octets> all = packetsOfAllFields();
     const Octets segment = hex("9c 40 c3 50 00 00 00 01 00 00 00 02 80 18 01 f6 00 00 00 00") +
@@ -71,7 +71,7 @@ std::vector<Octets> packets() {
 }
 
 TEST(Passes, leaveTheSameState) {
-    StateOptions narrow; // each growth is a place where the host looks
+    StateOptions narrow; // at each growth the host can read the state
     narrow.blockCapacity = narrow.limitCapacity = narrow.layerCapacity = narrow.rangeCapacity = 1;
     const std::array<StateOptions, 2> rooms = {StateOptions{}, narrow};
     std::minstd_rand random(20260201);

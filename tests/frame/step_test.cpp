@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// The field step: what the host can see at each call, and what stays behind.
+// The field step: what the host can see at each call, and what remains after a run.
 #include <algorithm>
 #include <string>
 #include <vector>
@@ -13,7 +13,7 @@
 namespace netfloor::test {
 namespace {
 
-// Marks all that the plug-in is to leave alone, or to overwrite only as far as a field reaches.
+// Fills all that the plug-in must not write, or must overwrite only as far as a field reaches.
 void seed(DecodeState &state) {
     state.reserved1 = 0x11;
     state.reserved2 = 0x22;
@@ -45,14 +45,14 @@ const std::string &stateAt(const BareRun &run, std::uint32_t id) {
     return std::ranges::find(run.seen, id, &Seen::id)->state;
 }
 
-// The cursor stands behind the field already. A single or written-out element clears its flag word, the octets of
-// a loop leave it as it was: 90 in front of each field.
+// The cursor is after the field already. A single or written-out element clears its flag word. The octets of a loop
+// leave it as it was: 90 before each field.
 TEST(FieldStep, whatTheHostSeesDuringACall) {
-    const auto mark = [](BareRun &run) {
+    const auto fill = [](BareRun &run) {
         std::for_each_n(run.state().fieldRecord.ranges, 200, [](BitRange &range) { range.flagWord = 90; });
     };
     BareRun md(examplePacket(), seeded());
-    md.afterCall = [&] { mark(md); };
+    md.afterCall = [&] { fill(md); };
     EXPECT_EQ(md.enter(Pass::md), 1);
     ASSERT_EQ(md.seen.size(), 22u);
     const std::string states = stateAt(md, 150) + '\n' + stateAt(md, 152) + '\n' + stateAt(md, 286) + '\n' +
@@ -74,7 +74,7 @@ TEST(FieldStep, whatTheHostSeesDuringACall) {
     )"));
 
     BareRun to(examplePacket(), seeded());
-    to.afterCall = [&] { mark(to); };
+    to.afterCall = [&] { fill(to); };
     EXPECT_EQ(to.enter(Pass::to), 1);
     ASSERT_EQ(to.seen.size(), md.seen.size());
     for (std::size_t i = 0; i < md.seen.size(); ++i) {
@@ -83,7 +83,7 @@ TEST(FieldStep, whatTheHostSeesDuringACall) {
     }
 }
 
-TEST(FieldStep, whatStaysBehindARun) {
+TEST(FieldStep, whatRemainsAfterARun) {
     for (const Pass pass : allPasses) {
         SCOPED_TRACE(passName(pass));
         BareRun run(examplePacket(), seeded());
@@ -112,10 +112,9 @@ TEST(FieldStep, whatStaysBehindARun) {
     }
 }
 
-// Elements are used again and again, and keep what a field wrote until another field needs them: behind the two
-// elements of the last field stands the end of the destination address.
-// The other two passes write the record for the last field alone: what earlier fields would have left in the elements
-// above its own is nobody's to read.
+// Elements are used again, and keep what a field wrote until another field needs them: after the two elements of the
+// last field comes the end of the destination address.
+// The other two passes write the record for the last field alone. The elements past its own are undefined there.
 TEST(FieldStep, elementsKeepWhatWasReadIntoThem) {
     for (const Pass pass : {Pass::md, Pass::to}) {
         BareRun run(examplePacket(), seeded());
@@ -143,8 +142,8 @@ TEST(FieldStep, fieldThatDoesNotFitLeavesTheRecord) {
     }
 }
 
-// Where a lower layer has changed the working copy, a reversed address puts the source back, in front of itself too
-// and behind: the second parameter is of type 6 again, and not of type 0x1006.
+// Where a lower layer has changed the working copy, a reversed address restores it from the source, before and after
+// the address as well: the second parameter is of type 6 again, and not of type 0x1006.
 TEST(FieldStep, reversedAddressRestoresTheWorkingCopy) {
     const Octets packet = ipv4({.protocol = 132, .payload = hex(R"(
         0b 59 0b 5a 00 00 00 2a 00 00 00 00   # SCTP

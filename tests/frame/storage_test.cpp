@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// Arrays that grow, and that do not.
+// Arrays that grow, and arrays that cannot grow.
 #include <string>
 #include <string_view>
 #include <vector>
@@ -69,7 +69,7 @@ TEST(Storage, growsStepByStep) {
     }
 }
 
-// A pass that is cut off by missing storage leaves everything where it stands.
+// A pass that is cut off by missing storage leaves everything as it is.
 TEST(Storage, eachGrowthThatFailsCutsThePassOff) {
     for (const Pass pass : allPasses) {
         TightRun whole(pass, TightRun::never);

@@ -40,7 +40,7 @@ TEST(FieldKnowledge, holdsForEveryFieldOfThePlugin) {
     }
 }
 
-// A plug-in that gets, loses, renames or moves fields is told from one that the rows describe.
+// A plug-in with fields that are new, missing, renamed or moved does not fit the rows, and each is named.
 TEST(FieldKnowledge, namesWhatDoesNotFit) {
     const FieldDescription stranger = fieldNamed("Stranger");
     const FieldDescription namesake = fieldNamed("Urgent Pointer");
@@ -50,17 +50,17 @@ TEST(FieldKnowledge, namesWhatDoesNotFit) {
         const char *mismatch;
     } cases[] = {
         {"a protocol at the end", [&](Fields &all) { all.push_back(stranger); },
-         "'Stranger' (9999) stands in no section: add a row, or move an end, in 'sections'"},
+         "'Stranger' (9999) is in no section: add a row, or move an end, in 'sections'"},
         {"a protocol between two", [&](Fields &all) { all.insert(place(all, 479), stranger); },
-         "'Stranger' (9999) stands in no section: add a row, or move an end, in 'sections'"},
+         "'Stranger' (9999) is in no section: add a row, or move an end, in 'sections'"},
         {"the first of a section", [](Fields &all) { place(all, 479)->name = "Source"; },
          "UDP: 'UDP Source Port' is no field of the plug-in there"},
         {"an end that is no longer the only one", [&](Fields &all) { all.insert(place(all, 408), namesake); },
          "TCP: 'Urgent Pointer' is the name of several fields: add the id"},
         {"ends that changed places", [](Fields &all) { std::swap(*place(all, 795), *place(all, 820)); },
-         "SCTP: 'Payload Protocol Identifier' is the last of some fields, but stands before their first"},
+         "SCTP: 'Payload Protocol Identifier' is the last field of the row, but comes before its first"},
         {"a field in two sections", [](Fields &all) { std::swap(*place(all, 407), *place(all, 479)); },
-         "UDP: 'Urgent Pointer' (408) stands in two sections"},
+         "UDP: 'Urgent Pointer' (408) is in two sections"},
         {"a flag's field", [](Fields &all) { place(all, 698)->name = "Protocol Type"; },
          "GRE: 'GRE Protocol' is no field of the plug-in there"},
         {"a length", [](Fields &all) { place(all, 946)->name = "Length"; },

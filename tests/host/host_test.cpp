@@ -38,7 +38,7 @@ std::vector<std::string> texts(const Report &report) {
 }
 
 // The tree of blocks follows the plug-in's, and two blocks of one name stay two.
-TEST(Host, tellsTheBlocksOfFields) {
+TEST(Host, reportsTheBlocksOfFields) {
     Host host = newHost();
     const Report report = host.run(Pass::md, udpPacket(40001, twelveOctets));
     const auto blockOf = [&](std::string_view name) { return report.field(name)->block; };
@@ -47,9 +47,9 @@ TEST(Host, tellsTheBlocksOfFields) {
     EXPECT_EQ(report.path(*report.field("Protocol")), "Ip Header/IPv4 Header/Extra/Protocol");
     EXPECT_EQ(report.path(*report.field("DF"), " > "), "Ip Header > IPv4 Header > Extra > Flag and Fragment Offset");
     EXPECT_EQ(report.path(*report.field("data")), "Ip Header/IPv4 Header/Extra/User Datagram Protocol/NEXT LAYER");
-    EXPECT_EQ(blockOf("Identification"), blockOf("Destination Address")) << "Extra goes on behind Protocol";
+    EXPECT_EQ(blockOf("Identification"), blockOf("Destination Address")) << "Extra goes on after Protocol";
     EXPECT_EQ(report.blocks[blockOf("Identification")].firstBit, 33U);
-    EXPECT_EQ(report.blockName(*report.field("Checksum")), "") << "the block behind the ports has no name";
+    EXPECT_EQ(report.blockName(*report.field("Checksum")), "") << "the block after the ports has no name";
     EXPECT_EQ(report.blocks[blockOf("Checksum")].parent, blockOf("UDP Source Port"));
 }
 
@@ -82,7 +82,7 @@ TEST(Host, listsLayersAndHandOffs) {
 }
 
 // What a caller of the boundary sees of an XTR stop.
-TEST(Host, leavesAnXtrStopAlone) {
+TEST(Host, doesNotFollowAnXtrStopOnRequest) {
     Host host = newHost();
     TestRunOptions options;
     options.followStop = false;
@@ -139,11 +139,11 @@ TEST(Owners, seeTheirPayloadAndMayLeaveBits) {
     });
     const Octets payload = hex("01 02 03 04 05 06 07 08 09 0a 0b 0c");
     for (const Pass pass : allPasses) {
-        // Three octets behind the datagram are no payload.
+        // Three octets after the datagram are no payload.
         const Report report = host.run(pass, udpPacket(7000, payload) + hex("ee ee ee"));
         EXPECT_EQ(seen, payload);
         EXPECT_EQ(report.handOffs.front().consumedBits, 16U);
-        // The enclosing limit sweeps what is left, which the MV pass reports.
+        // The end of the enclosing limit skips what is left, and the MV pass raises a flag for it.
         EXPECT_EQ(report.flags, pass == Pass::mv ? 0x10U : 0U);
         EXPECT_EQ(report.verdict.fault(), pass == Pass::mv);
         EXPECT_EQ(report.field("head") != nullptr, pass == Pass::md);
@@ -164,8 +164,8 @@ TEST(Owners, refuseAndThrow) {
     }
 }
 
-// IPv4 in UDP in IPv4 and so on: an owner leads back into the plug-in, in each pass.
-TEST(Owners, leadBackIntoThePlugin) {
+// IPv4 in UDP in IPv4 and so on: an owner runs the plug-in again, in each pass.
+TEST(Owners, runThePluginAgain) {
     Host host = newHost();
     host.owners().add(7000, [](NextLayer &next) {
         if (next.runPlugin()) {
@@ -198,11 +198,11 @@ TEST(Owners, leadBackIntoThePlugin) {
     EXPECT_EQ(std::ranges::count(fields.blocks, "User Datagram Protocol", &Block::name), levels);
 }
 
-// The head of a DATA chunk is put in front of the payload by an owner that takes 16 octets first.
+// An owner that takes 16 octets first puts the head of a DATA chunk before the payload.
 TEST(Owners, takeTheUserDataOfAnSctpChunk) {
     const struct {
         std::string_view chunk;
-        std::uint32_t taken; // octets behind the head
+        std::uint32_t taken; // octets after the head
         std::string_view text;
     } cases[] = {
         {"00 03 0014  00*12  aaaaaaaa  05 00 0004", 4, "Data=4 octets"},
@@ -271,10 +271,10 @@ TEST(Storage, cutsOffWhenGrowthIsRefused) {
 TEST(Storage, takesPreparedStates) {
     Host host = newHost();
     const Octets packet = udpPacket(7000, twelveOctets);
-    Octets behind = hex("ff") + packet;
+    const Octets shifted = hex("ff") + packet;
     TestRunOptions options;
     options.state.cursor = 9;
-    const Report report = host.run(Pass::md, behind, options);
+    const Report report = host.run(Pass::md, shifted, options);
     EXPECT_EQ(report.field("Version")->ranges, (std::vector<ReportedRange>{{4, 13, 16}}));
     EXPECT_EQ(report.layerIndex, 1U);
 

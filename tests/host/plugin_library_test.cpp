@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// Loading a plug-in: what is refused, and with which words.
+// Loading a plug-in: what is refused, and with which message.
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
@@ -91,7 +91,7 @@ TEST_F(Refusal, saysWhatIsWrongWhereAndWhatToDo) {
 }
 
 TEST_F(Refusal, namesEachExportThatIsMissing) {
-    // A library that is loaded anyway, and is no plug-in.
+    // A library that every process loads, and that is no plug-in.
     const std::filesystem::path stranger =
         std::filesystem::path(NETFLOOR_PLUGIN).parent_path().parent_path() / "host" / "libhd_HostDispatch.so";
     try {
@@ -106,7 +106,7 @@ TEST_F(Refusal, namesEachExportThatIsMissing) {
     }
 }
 
-TEST(PluginLibrary, sharesOneLoadAndCopiesStandAlone) {
+TEST(PluginLibrary, sharesOneLoadAndCopiesDoNot) {
     const PluginLibrary first = PluginLibrary::open(NETFLOOR_PLUGIN);
     // The same file by a relative path is the same load.
     const PluginLibrary second = PluginLibrary::open(std::filesystem::relative(NETFLOOR_PLUGIN));
@@ -124,7 +124,7 @@ TEST(PluginLibrary, writesDates) {
     EXPECT_EQ(library.dateText(951827696), "2000-02-29 12:34:56");
 }
 
-// Each load asks for its set-up until it is told 1 or more, or is refused for good.
+// Each load asks for its set-up until it gets another result than 0.
 TEST(PluginLibrary, setsUpKeysOncePerLoad) {
     const std::vector<std::uint8_t> packet = {0x45};
     const struct {
@@ -137,7 +137,7 @@ TEST(PluginLibrary, setsUpKeysOncePerLoad) {
         {{{0, 0, 0, 1}, 0}, {1, 1, 1, 1, 1}, 4, 1}, // not ready three times
         {{{-7}, 0}, {-7, -7}, 1, 0},
         {{{0, -3}, 0}, {1, -3, -3}, 2, 0},
-        {{{2}, 7}, {1, 1}, 1, 2}, // row 7 is marked in every record
+        {{{2}, 7}, {1, 1}, 1, 2}, // row 7 is present in every record
     };
     for (const auto &[setUp, results, calls, keysAtLast] : cases) {
         Host host(PluginLibrary::openCopy(NETFLOOR_PLUGIN));

@@ -57,12 +57,12 @@ Octets tunnelled(Octets packet, std::size_t levels) {
     return packet;
 }
 
-TEST(Sink, ShowsLinksOfAChainSideBySide) {
+TEST(Sink, showsLinksOfAChainSideBySide) {
     const Octets smallUdp = udp(40000, 40001, hex("01020304"));
     const struct {
         const char *name;
         Octets packet;
-        std::string_view tree; // what stands in the block at the end of the trunk
+        std::string_view tree; // the end of the text
     } cases[] = {
         {"extension headers", ipv6({.nextHeader = 0, .payload = hex(R"(
              3c 00 01 04 00*4   # hop by hop
@@ -86,7 +86,7 @@ TEST(Sink, ShowsLinksOfAChainSideBySide) {
          "Ip Header{.IPv6 Header{...IPv6 Body{.Next Header{.}.IP Address{..}IP Address{..}}}"
          "IPv6 Header{...IPv6 Body{.Next Header{.}.IP Address{..}IP Address{..}}}"
          "IPv6 Header{...IPv6 Body{.Next Header{.}.IP Address{..}IP Address{..}User Datagram Protocol{....}}}}"},
-        {"a header that stands inside one",
+        {"a header inside a header",
          ipv4({.protocol = 1, .payload = hex("03 01 00 00 00000000") + ipv4({.protocol = 17, .payload = smallUdp})}),
          "Destination Unreachable Message{...Internet Protocol Message in ICMP{..............Embedded IP Protocols{.}"
          "...}..}}}}}"},
@@ -98,8 +98,8 @@ TEST(Sink, ShowsLinksOfAChainSideBySide) {
     }
 }
 
-// The braces of all packets match, and no packet can make them stand deep.
-TEST(Sink, ShowsNoPacketDeeperThanItsNames) {
+// The braces of all packets match, and no packet can nest them deep.
+TEST(Sink, showsNoPacketDeeperThanItsNames) {
     constexpr std::size_t mostDepth = 16;
     const auto repeated = [](const char *octets, std::size_t count) {
         Octets all;
@@ -137,8 +137,8 @@ std::string everything(const Report &report) {
     return out.str();
 }
 
-// A packet leaves nothing to the next one: the storage that is kept gives what a new one gives.
-TEST(Sink, GetsTheSameFromStorageThatIsKept) {
+// No packet changes the report of the next one: used storage gives the same as new storage.
+TEST(Sink, getsTheSameFromStorageThatIsKept) {
     const std::vector<Octets> packets = packetsOfAllFields();
     Host host(PluginLibrary::open(NETFLOOR_PLUGIN));
     for (const Pass pass : allPasses) {
@@ -180,7 +180,7 @@ private:
     int left_;
 };
 
-TEST(Sink, EndsThePassByAnException) {
+TEST(Sink, endsThePassByAnException) {
     Host host(PluginLibrary::open(NETFLOOR_PLUGIN));
     const Octets packet = ipv4({.protocol = 17, .payload = udp(40000, 40001, hex("00*12"))});
     const std::string before = everything(host.run(Pass::md, packet));
@@ -209,7 +209,7 @@ private:
     Host &host_;
 };
 
-TEST(Busy, AnOwnerMayRunAnotherPacketAndASinkMayNot) {
+TEST(Busy, anOwnerMayRunAnotherPacketAndASinkMayNot) {
     Host host(PluginLibrary::open(NETFLOOR_PLUGIN));
     const Octets inner = ipv6({.nextHeader = 17, .payload = udp(53, 53, hex("00*8"))});
     const Octets outer = ipv4({.protocol = 17, .payload = udp(40000, 7000, hex("00*12"))});
@@ -230,7 +230,7 @@ TEST(Busy, AnOwnerMayRunAnotherPacketAndASinkMayNot) {
     EXPECT_EQ(host.run(Pass::to, outer).ending, Ending::complete);
 }
 
-TEST(Busy, SaysWhatToDoForASecondThread) {
+TEST(Busy, saysWhatToDoForASecondThread) {
     const PluginLibrary library = PluginLibrary::open(NETFLOOR_PLUGIN);
     const Octets packet = ipv4({.protocol = 17, .payload = udp(40000, 7000, hex("00*12"))});
     std::latch entered(1);

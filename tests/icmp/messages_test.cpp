@@ -27,7 +27,7 @@ TEST(Icmp, everyFieldOfEachMessage) {
     struct MessageCase {
         Octets message;
         std::string keys;  // but for the type
-        const char *lines; // behind the type
+        const char *lines; // after the type
     };
     const std::vector<MessageCase> cases = {
         {hex("08 00 ab cd 00 0a 00 64 41 00"), "row 36 Code=0\nrow 37 ICMP Sequence Number=100\n", R"(
@@ -54,7 +54,7 @@ TEST(Icmp, everyFieldOfEachMessage) {
             585 |6 | "Identifier" "  Identifier=2" 193-208/8 > 544 "2"
             586 |6 | "ICMP Sequence Number" "  ICMP Sequence Number=3" 209-224/8 > 545 "3"
         )"},
-        // Entries take 8 octets, whatever their size is said to be.
+        // Entries take 8 octets, also where the message gives another size.
         {hex("09 00 00 01 02 04 07 08 0a 00 00 01 00 00 00 05 0a 00 00 02 80 00 00 00"), "row 36 Code=0\n", R"(
             587 |6 | "Code" "Code=0" 169-176 > 542 "0"
             588 |6 | "Checksum" "  Checksum=1" 177-192/8 > 543 "1"
@@ -97,7 +97,7 @@ TEST(Icmp, everyFieldOfEachMessage) {
 TEST(Icmp, everyFieldOfEachErrorMessage) {
     struct ErrorCase {
         const char *head;
-        const char *lines; // behind the type, without the quoted header
+        const char *lines; // after the type, without the quoted header
     };
     const std::vector<ErrorCase> cases = {
         {"03 03 00 0a 00 00 00 01", R"(
@@ -193,7 +193,7 @@ TEST(Icmp, nameOfEachCode) {
     }
 }
 
-// Messages that know one code only: with another one, or none, they are not read.
+// Messages that have one code only: with another one, or none, they are not read.
 TEST(Icmp, messagesWithCodeZeroOnly) {
     for (const std::uint8_t type : hex("00 04 08 09 0a 0d 0e 0f 10 11 12")) {
         SCOPED_TRACE(int{type});
@@ -238,14 +238,14 @@ TEST(Icmp, countsOfOctetsAndEntries) {
         {"other type with less data than the header length leaves",
          ipv4({.protocol = 1, .payload = hex("02 01"), .headerWords = 4}), "541", 1, 0},
         {"no router", icmp(hex("09 00 00 00 00 02 00 00")), "595", 0, 0},
-        {"cut behind the first of three routers", icmp(advertisement + hex("01*8")), "595", 1, 2},
+        {"cut after the first of three routers", icmp(advertisement + hex("01*8")), "595", 1, 2},
         {"cut inside the second router", icmp(advertisement + hex("01*12")), "595", 2, 2},
-        {"cut behind the second router", icmp(advertisement + hex("01*16")), "595", 2, 0},
+        {"cut after the second router", icmp(advertisement + hex("01*16")), "595", 2, 0},
         {"cut inside the third router", icmp(advertisement + hex("01*20")), "595", 3, 0},
         {"more than the routers", icmp(advertisement + hex("01*25")), "595", 3, 0x10},
         {"seven octets of the datagram", icmp(error + hex("61*7")), "570", 0, 0x10},
         {"eight octets of the datagram", icmp(error + hex("61*8")), "570", 1, 0},
-        {"none behind the datagram", icmp(hex("03 01 00*6") + quotedHeader() + hex("61*8")), "555", 0, 0},
+        {"none after the datagram", icmp(hex("03 01 00*6") + quotedHeader() + hex("61*8")), "555", 0, 0},
     };
     for (const CountCase &one : cases) {
         SCOPED_TRACE(one.name);

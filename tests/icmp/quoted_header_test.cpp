@@ -11,7 +11,7 @@
 namespace netfloor::test {
 namespace {
 
-// A time exceeded message with this behind its own fields.
+// A time exceeded message with these octets after its own fields.
 Octets timeExceeded(const Octets &quoted, const Octets &options = {}) {
     return ipv4({.protocol = 1, .payload = hex("0b 00 00*6") + quoted, .options = options});
 }
@@ -80,8 +80,8 @@ TEST(QuotedHeader, names) {
     EXPECT_EQ(md.fields.back().text, "  Fragment Offset=65528");
 }
 
-// The protocol's field tells the message, and whether it came through a tunnel.
-TEST(QuotedHeader, protocolInEachCarriage) {
+// The field of the protocol depends on the message, and on whether it came through a tunnel.
+TEST(QuotedHeader, protocolAndOuterProtocol) {
     struct MessageType {
         std::uint8_t type;
         std::uint32_t idInTunnel, id;
@@ -112,7 +112,7 @@ TEST(QuotedHeader, protocolInEachCarriage) {
     }
 }
 
-// Its options are as long as it says itself, whatever the header around it says.
+// Its options are as long as its own header length says, and not that of the header around it.
 TEST(QuotedHeader, lengthOfItsOptions) {
     const Octets rest = hex("01 01 01 00 61*8");
     for (const char *outerOptions : {"", "01 01 01 00", "01*8"}) {
@@ -123,7 +123,7 @@ TEST(QuotedHeader, lengthOfItsOptions) {
             EXPECT_EQ(fieldValues(runAll(timeExceeded(header(words) + rest, options)).md, 625), "570=61616161")
                 << int{words};
         }
-        // More than there is: neither padding nor data.
+        // More than is left: neither padding nor data.
         const Runs runs = runAll(timeExceeded(header(15) + hex("61*39"), options));
         EXPECT_EQ(fieldValues(runs.md, 625), "");
         EXPECT_EQ(verdictLine(runs.mv), "verdict -52 flags 0x10\n");

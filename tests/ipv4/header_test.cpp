@@ -113,7 +113,7 @@ TEST(Ipv4Header, nameOfEachServiceAndFragmentBit) {
 }
 
 // FNV-1a over the lines "0|HOPOPT" to "255|" of the numbers and names, as the registry had them up to 137, then
-// "Unassigned" up to 252, then no name: a digest of a list written down apart from the plug-in's.
+// "Unassigned" up to 252, then no name: a digest of a list that was not made from the plug-in's.
 constexpr std::uint64_t digestOfProtocolNames = 0xefa29dd9aed18018;
 
 std::uint64_t digest(std::string_view text) {
@@ -158,7 +158,7 @@ struct LengthCase {
     std::uint32_t flagsOfMv;
 };
 
-// A header, five octets of payload and five behind the datagram: what each Total Length lets the passes read.
+// A header, five octets of payload and five after the datagram: what each Total Length lets the passes read.
 TEST(Ipv4Header, totalLengthLimitsTheDatagram) {
     const std::vector<LengthCase> cases = {
         // Below 4 the limit wraps around to more than there is, as it is above the packet.
@@ -250,7 +250,7 @@ TEST(Ipv4Dispatch, goesByFragmentAndProtocol) {
     }
 }
 
-// What the header length says is missing from the payload is expected and not there.
+// With a header length below 5 more octets of payload are expected than the packet has left, which raises a flag.
 TEST(Ipv4Dispatch, headerLengthBelowTheHeader) {
     for (const std::uint8_t words : hex("00 01 04")) {
         Ipv4 header = withPayload(253);
@@ -261,7 +261,7 @@ TEST(Ipv4Dispatch, headerLengthBelowTheHeader) {
         EXPECT_EQ(verdictLine(runs.mv), "verdict -52 flags 0x2\n");
     }
     Ipv4 header = withPayload(253, {});
-    header.headerWords = 4; // expected: 4 octets; there: none
+    header.headerWords = 4; // expected: 4 octets; present: none
     EXPECT_EQ(runAll(ipv4(header)).mv.flags, 0x2u);
 }
 

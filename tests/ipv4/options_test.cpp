@@ -120,7 +120,7 @@ struct OptionsCase {
 TEST(Ipv4Options, lengthsAndOrders) {
     const std::vector<OptionsCase> cases = {
         {"01 01 00 00", 0, "318=1 318=1 381=0 306=0 285=61 285=62"},
-        // In packet order, though the types are tried in another.
+        // In packet order, although the types are tried in another order.
         {"07 07 04 01 02 03 04 82 04 00 00 00", 0,
          "348=7 349=7 352=4 355=1020304 321=82 322=4 325=0 381=0 285=61 285=62"},
         // An unknown type ends the list.
@@ -142,7 +142,7 @@ TEST(Ipv4Options, lengthsAndOrders) {
         {"44 08 05 12 00 00 00 01", 0x10, "362=44 363=8 366=5 367=1 368=2 285=61 285=62"},
         // Longer than the area: what it takes of the payload is missing there.
         {"88 05 12 34", 0x12, "357=88 358=5 361=1234 285=62"},
-        // Longer than the packet: read as far as it goes, and nothing behind it.
+        // Longer than the packet: read as far as it goes, and nothing past its end.
         {"83 ff 04 0a 00 00 01 01", 0x18, "329=83 330=ff 333=4 336=a000001"},
     };
     for (const OptionsCase &one : cases) {
@@ -154,7 +154,7 @@ TEST(Ipv4Options, lengthsAndOrders) {
     }
 }
 
-// At most 20 of a kind, whatever the length says; the length reaches into the payload here.
+// At most 20 elements, also with a greater length, which reaches into the payload here.
 TEST(Ipv4Options, boundOfEachRepeat) {
     const Runs route = runAll(ipv4({.payload = hex("61*84"), .options = hex("83 57 04 00")}));
     EXPECT_EQ(count(route, "336"), 20);
@@ -174,7 +174,7 @@ TEST(Ipv4Options, packetThatEndsInThem) {
     expectValues(160,
                  {
                      {"neither padding nor payload", ipv4({.payload = hex("61*39"), .headerWords = 15}), "", 0, 0x10},
-                     // The types behind the last option of the area are still tried in its round: on the payload.
+                     // The types after the last option of the area are still tried in its round: on the payload.
                      {"end of the list in the payload", ipv4({.payload = hex("00 62"), .options = hex("88 04 12 34")}),
                       "357=88 358=4 361=1234 381=0 285=62", 0, 2},
                  });

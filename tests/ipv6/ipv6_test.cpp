@@ -51,7 +51,7 @@ TEST(Ipv6Header, everyFieldInEveryPass) {
 
 struct LengthCase {
     std::uint16_t payloadLength;
-    std::size_t present; // octets behind the header
+    std::size_t present; // octets after the header
     std::size_t fields;
     std::uint32_t mvFlags, bitsLeft;
 };
@@ -60,8 +60,8 @@ TEST(Ipv6Header, payloadLengthLimitsTheDatagram) {
     for (const LengthCase &one : std::vector<LengthCase>{
              {8, 8, 19, 0, 0},
              {8, 10, 19, 0, 16},
-             {0, 3, 11, 0, 24},  // no payload, whatever the Next Header says
-             {8, 7, 18, 0xa, 0}, // one or two octets short: read as far as there is
+             {0, 3, 11, 0, 24},  // no payload with any Next Header
+             {8, 7, 18, 0xa, 0}, // one or two octets short: read to its end
              {8, 6, 17, 0xa, 0},
              {8, 5, 4, 0, 328}, // more than that: left unread
              {1, 0, 11, 0xa, 0},
@@ -75,7 +75,7 @@ TEST(Ipv6Header, payloadLengthLimitsTheDatagram) {
         EXPECT_EQ(runs.mv.flags, one.mvFlags);
         EXPECT_EQ(runs.md.bitsLeft, one.bitsLeft);
     }
-    // An address that the packet cuts is not read from what lies behind.
+    // An address that the packet cuts is not read from the octets past its end.
     const Runs runs = runAll(shortened(ipv6({}), 39));
     EXPECT_EQ(runs.mv.flags, 0x18u);
     EXPECT_EQ(linesWith(lines(runs.md), "954"), "");
@@ -94,7 +94,7 @@ TEST(Ipv6Header, roomForAddressesInTheKeyRecord) {
     }
 }
 
-// One header behind another.
+// One header after another.
 TEST(Ipv6Chain, everyFieldInEveryPass) {
     const Runs runs = runAll(ipv6({.nextHeader = 0, .payload = hex(R"(
         2b 00  01 04 12 34 00 00                                   # hop by hop: PadN
@@ -191,13 +191,13 @@ TEST(Ipv6Chain, headers) {
         {"a fragment without payload", 44, hex("3b 00 00 00 00*4"), "220 197 198 199 200 201"},
         {"a later fragment is read all the same", 44, hex("11 00 03 20 00*4") + udp(9, 9),
          "220 197 198 199 200 201 479 488 489 490"},
-        {"fragment cut behind what is shown of M", 44, hex("3b 00 00"), "220 197", 0x10},
+        {"fragment cut after the field of M", 44, hex("3b 00 00"), "220 197", 0x10},
         {"unknown routing with segments left", 43, hex("3b 00 02 01 00*4"), "177 188", 0x10},
-        {"unknown routing, through", 43, hex("3b 00 02 00 00*4"), "177 188 220 222 193", 0x10},
-        {"and longer: the next is looked for 4 octets early", 43, hex("3b 01 02 00 00*12 61"),
+        {"unknown routing without segments left", 43, hex("3b 00 02 00 00*4"), "177 188 220 222 193", 0x10},
+        {"and longer: the next header is read 4 octets early", 43, hex("3b 01 02 00 00*12 61"),
          "177 188 220 222 193 285", 0x10},
-        {"unknown routing cut in front of its segments", 43, hex("3b 00 02"), "177", 0x10},
-        {"routing cut in front of its type", 43, hex("3b 00"), "", 0x10},
+        {"unknown routing cut before its segments", 43, hex("3b 00 02"), "177", 0x10},
+        {"routing cut before its type", 43, hex("3b 00"), "", 0x10},
         {"spare longer than the packet", 43, hex("3b 01 02 00 00*7"), "177 188 220 222", 0x10},
         {"an odd length", 43, hex("3b 03 00 00 00*4") + address + hex("00*8"), "177 220 222 180 181 182 948 950", 0x10},
         {"two addresses", 43, hex("3b 04 00 00 00*4") + address + address, "177 220 222 180 181 182 948 950 948 950"},
@@ -206,13 +206,13 @@ TEST(Ipv6Chain, headers) {
         {"ESP shorter than its header", 50, hex("00*7"), "215", 0x12},
         {"ESP with less than was counted", 0, hex("32 00 01 06 00*6  00*8 61*4"),
          "220 222 223 226 227 229 215 216 218 218 218 218", 0x2},
-        {"AH that tells no length", 51, hex("3b 00 00*10"), ah, 0x2},
+        {"AH of length 0", 51, hex("3b 00 00*10"), ah, 0x2},
         {"AH with twelve octets", 51, hex("3b 04 00*22 61"),
          ah + " 211 211 211 211 211 211 211 211 211 211 211 211 285"},
         {"AH cut between the reserved octets", 51, hex("3b 04 00"), "220 206 207", 0x2},
         {"AH cut in its data", 51, hex("3b 02 00*13"), ah + " 211 211 211", 0x2},
         {"Pad1 and no more", 0, hex("3b 00 00*6"), "220 222 223 232", 0x10},
-        {"the next header is looked for behind Pad1", 0, hex("3c 00 00  3b 00 01 02 00 00  00*7"),
+        {"the next header is read after Pad1", 0, hex("3c 00 00  3b 00 01 02 00 00  00*7"),
          "220 222 223 232 220 222 223 226 227 229", 0x10},
         {"PadN of no octet", 60, hex("3b 00 01 00 00*4"), "220 222 223 226 227 229", 0x10},
         {"PadN longer than the packet", 60, hex("3b 00 01 05 00*4"), "220 222 223 226 227", 0x10},
@@ -241,11 +241,11 @@ TEST(Ipv6Chain, headerInAHeader) {
     const Octets whole = ipv6({.nextHeader = 59, .payload = hex("61 62"), .source = {0xfe, 0x80}});
     const std::vector<Ipv6Case> cases = {
         {"whole", 41, whole, inner + " 285 285"},
-        {"octets behind it", 41, whole + hex("63"), inner + " 285 285", 0x10},
+        {"octets after it", 41, whole + hex("63"), inner + " 285 285", 0x10},
         {"no payload", 41, ipv6({.nextHeader = 17}), inner},
         {"one octet short", 41, Octets(whole.begin(), whole.end() - 1), inner + " 285", 0xa},
         {"more than two short", 41, ipv6({.payloadLength = 3}), "166 167 168", 0x10},
-        {"behind a fragment header", 44, hex("29 00 00 00 00*4") + whole,
+        {"after a fragment header", 44, hex("29 00 00 00 00*4") + whole,
          "220 197 198 199 200 201 " + inner + " 285 285"},
     };
     for (const Ipv6Case &one : cases) {
@@ -269,7 +269,7 @@ Octets times(std::size_t count, const Octets &unit) {
     return all;
 }
 
-// The longest packets whose headers stand in one another.
+// The longest packets of headers inside headers.
 TEST(Ipv6Chain, deepestOnASmallStack) {
     Octets alternating = ipv6({.nextHeader = 59, .payload = hex("61")});
     Octets tunnels = alternating;

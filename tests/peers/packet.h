@@ -45,7 +45,7 @@ struct Difference {
     [[nodiscard]] bool oursAreFewer() const { return begins(ours, theirs); }
     [[nodiscard]] bool oursAreMore() const { return begins(theirs, ours); }
 
-    // The number that tshark shows next behind those that both have.
+    // The number that tshark shows next after those that both have.
     [[nodiscard]] unsigned long firstMissing() const { return std::stoul(theirs.at(ours.size())); }
 
 private:

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// Which fields are compared with which of tshark's.
+// Which of our fields are compared with which of tshark's.
 #pragma once
 
 #include <array>
@@ -11,7 +11,7 @@
 
 namespace netfloor::test {
 
-// What stands in a field, so that both sides can be written in one way.
+// The form of a value, so that both sides can be written in the same way.
 enum class Form : std::uint8_t {
     number,
     words,     // ours counts 4 octets, tshark's one

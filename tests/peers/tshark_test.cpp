@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// Real captures against what tshark says of them: every value of every pair of fields in every packet.
+// Real captures, compared with what tshark says of them: every value of every pair of fields in every packet.
 //
 // Captures of another folder are compared with
 //     NETFLOOR_PEER_CAPTURES=FOLDER build/tests/test_peers
@@ -18,10 +18,10 @@
 
 #include "netfloor-capture/capture_file.h"
 #include "netfloor-capture/link_layer.h"
-#include "netfloor-host/text.h"
+#include "netfloor-host/value_text.h"
+#include "peers/known_differences.h"
 #include "peers/packet.h"
 #include "peers/pairs.h"
-#include "peers/partings.h"
 #include "support/runs.h"
 
 namespace netfloor::test {
@@ -43,10 +43,10 @@ std::string ourText(Form form, const FieldReport &field, std::span<const std::ui
     return address ? ipv6Text(*address) : "no IPv6 address";
 }
 
-// Ours of all pairs, in the order of the pairs.
+// Our values of all pairs, in the order of the pairs.
 std::vector<Values> ourValues(const Packet &packet) {
     std::vector<Values> values(pairs.size());
-    std::uint32_t header = ipv6Protocol; // in which the next field stands; "Next Header" is the first in each but IPv6
+    std::uint32_t header = ipv6Protocol; // of the next field; "Next Header" is the first field in each header but IPv6
     std::uint32_t next = ipv6Protocol;
     for (const FieldReport &field : packet.md.fields) {
         if (field.id == nextHeaderId) {
@@ -100,10 +100,10 @@ std::vector<std::string> linesOf(const std::string &command) {
     return lines;
 }
 
-// A line a packet: what the values are is in the order of the pairs.
+// A line a packet, with the values in the order of the pairs.
 std::vector<std::string> tsharkLines(const std::string &capture) {
-    // Each packet as it is on the wire: nothing put together, nothing reckoned. It counts the blocks of pcapng that are
-    // no packets as packets of raw data.
+    // Each packet as it is on the wire: nothing reassembled, nothing computed. tshark counts the blocks of pcapng that
+    // are no packets as packets of raw data.
     std::string command =
         "tshark -n -r '" + capture + "' -Y '!(frame.protocols == \"data\")' -T fields -E separator=/t";
     for (const char *const off : {"ip.defragment", "ipv6.defragment", "ip.decode_tos_as_diffserv", "ip.tso_support",
@@ -121,7 +121,7 @@ public:
     void addCapture(const std::string &file) {
         SCOPED_TRACE(file);
         const std::vector<std::string> lines = tsharkLines(file);
-        told_.clear();
+        reported_.clear();
         CaptureFile capture(file);
         std::size_t packets = 0;
         for (CapturedPacket captured; capture.next(captured); ++packets) {
@@ -129,20 +129,20 @@ public:
             if (network.isIp()) {
                 ASSERT_LT(packets, lines.size());
                 SCOPED_TRACE("packet " + std::to_string(captured.number));
-                const Runs runs = runAll(network.octets); // the key fields and the other passes agree with MD
+                const Runs runs = runAll(network.octets); // checks the key fields and the other passes against MD
                 addPacket({runs.md, network.octets, captured.isCut()}, lines[packets]);
             }
         }
         EXPECT_EQ(packets, lines.size());
     }
 
-    // No check that cannot fail: each pair has been compared, and each parting has been needed.
+    // Each pair must have been compared, and each known difference must have been used; else a row checks nothing.
     void expectAllUsed() const {
         for (std::size_t i = 0; i < pairs.size(); ++i) {
             EXPECT_GT(compared_[i], 0U) << pairs[i].peer << " has never been compared";
         }
-        for (const Parting &parting : partings) {
-            EXPECT_TRUE(used_.contains(&parting)) << "never needed: " << parting.why;
+        for (const KnownDifference &known : knownDifferences) {
+            EXPECT_TRUE(used_.contains(&known)) << "never used: " << known.why;
         }
     }
 
@@ -160,20 +160,21 @@ private:
                 continue;
             }
             const Difference difference{pairs[i].peer, ours[i], theirs[i]};
-            if (!explained(packet, difference) && told_.insert(pairs[i].peer).second) {
+            if (!explained(packet, difference) && reported_.insert(pairs[i].peer).second) {
                 ADD_FAILURE() << pairs[i].peer << ": ours " << testing::PrintToString(ours[i]) << ", tshark's "
-                              << testing::PrintToString(theirs[i]) << "; others of this capture are not told";
+                              << testing::PrintToString(theirs[i])
+                              << "; others of this pair in this capture are not reported";
             }
         }
     }
 
     [[nodiscard]] bool explained(const Packet &packet, const Difference &difference) {
-        for (const Parting &parting : partings) {
-            const bool concerns = std::any_of(parting.peers.begin(), parting.peers.end(), [&](std::string_view start) {
+        for (const KnownDifference &known : knownDifferences) {
+            const bool concerns = std::any_of(known.peers.begin(), known.peers.end(), [&](std::string_view start) {
                 return difference.peer.starts_with(start);
             });
-            if (concerns && parting.applies(packet, difference)) {
-                used_.insert(&parting);
+            if (concerns && known.applies(packet, difference)) {
+                used_.insert(&known);
                 return true;
             }
         }
@@ -181,8 +182,8 @@ private:
     }
 
     std::vector<std::size_t> compared_ = std::vector<std::size_t>(pairs.size()); // values, by pair
-    std::set<const Parting *> used_;
-    std::set<std::string_view> told_; // pairs whose difference in this capture has been shown
+    std::set<const KnownDifference *> used_;
+    std::set<std::string_view> reported_; // pairs with a difference in this capture
 };
 
 TEST(Tshark, agreesOnRealCaptures) {

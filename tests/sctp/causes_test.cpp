@@ -50,7 +50,7 @@ TEST(SctpCauses, everyCauseInEveryPass) {
             912 |9 Error Causes| "    Cause Code" "    Cause Code=Out Of Resource" 289-304/8
             923 |10 Out Of Resource| "      Cause Length" "      Cause Length=4" 305-320/8)",
          R"(912 "Out Of Resource"; 921 "4")", 0x8},
-        // The address and the chunk go from the last octet to the first.
+        // The address and the chunk are read from the last octet to the first.
         {"00 05 00 0c  00 05 00 08  0a 00 00 01", R"(
             912 |9 Error Causes| "    Cause Code" "    Cause Code=Unresolvable Address" 289-304/8
             924 |10 Unresolvable Address| "      Length" "      Length=12" 305-320/8
@@ -108,7 +108,7 @@ TEST(SctpCauses, limitsOfAbort) {
     const std::vector<SctpCase> cases = {
         {"the second cause passes unread", abortChunk("00 03 00 08 00 00 00 01  00 03 00 08 00 00 00 02"),
          " 912 921 922", 0x18},
-        {"the walk goes on behind ABORT", abortChunk("00 01 00 08 00 07 00 00") + hex("0b 00 00 04"),
+        {"the walk goes on after ABORT", abortChunk("00 01 00 08 00 07 00 00") + hex("0b 00 00 04"),
          " 912 914 915 916 805 892 808", 0x8},
         {"half a cause code", abortChunk("00"), "", 0x10},
         {"a cause code alone", abortChunk("00 07"), " 912"},
@@ -135,7 +135,7 @@ TEST(SctpCauses, limitsOfAbort) {
     }
 }
 
-// ERROR has no limit: the list goes on in the chunks behind it as long as its last test held.
+// ERROR has no limit: the list goes on in the chunks after it as long as its last test held.
 TEST(SctpCauses, errorReadsOn) {
     const Octets sack = hex("03 00 00 10  00 00 00 2a  00 00 10 00  00 00 00 00");
     const std::vector<SctpCase> cases = {

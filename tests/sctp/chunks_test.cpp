@@ -59,7 +59,7 @@ TEST(Sctp, headerCutOff) {
 }
 
 struct TypeNames {
-    unsigned last; // from the entry in front of it up to this type
+    unsigned last; // from the type after the last row up to this type
     const char *longText, *shortText;
 };
 
@@ -111,7 +111,7 @@ struct Body {
     const char *chunk, *md, *to, *keys;
 };
 
-// Each kind of chunk but INIT and INIT ACK, as the only one of its packet: what stands behind its type.
+// Each kind of chunk but INIT and INIT ACK, as the only one of its packet: the fields after its type.
 TEST(SctpChunk, everyFieldInEveryPass) {
     const std::vector<Body> bodies = {
         {"00 fe 00 14  00 00 00 2a  00 03 00 04  00 00 00 2e  61 62 63 64", R"(
@@ -175,7 +175,7 @@ TEST(SctpChunk, everyFieldInEveryPass) {
             909 |8 Error| "  Chunk flags" "  Chunk flags=0" 265-272
             910 |8 Error| "  Chunk Length" "  Chunk Length=4" 273-288/8)",
          R"(884 "0"; 808 "4")", ""},
-        // A cookie goes from its last octet to its first.
+        // A cookie is read from its last octet to its first.
         {"0a 00 00 08  0a b0 00 01", R"(
             893 |8 Cookie Echo| "  Chunk flags" "  Chunk flags=0" 265-272
             808 |9 Length| "  Chunk Length" "  Chunk Length=8" 273-288/8
@@ -230,7 +230,7 @@ TEST(SctpChunk, bitsWithNames) {
     EXPECT_EQ(runPass(Pass::md, sctp(hex("0e 01"))).field("  T bit")->text, "  T bit=no sender TCB");
 }
 
-// What the walk takes from the payload follows the Lengths; where it reads on follows the fields.
+// How much of the payload the walk takes depends on the Lengths; where it reads on depends on the fields.
 TEST(SctpWalk, lengthsAndFields) {
     const std::string data = "802 814 815 816 808 817 818 819 820";
     const std::string initAlone = "802 823 824 825 826 827 828 829";
@@ -239,9 +239,10 @@ TEST(SctpWalk, lengthsAndFields) {
         {"a type alone", hex("0b"), "802"},
         {"Length 0 takes nothing", hex("08 00 00 00  0b 00 00 04"), "802 887 888 805 892 808"},
         {"Length above the packet ends the walk", hex("0b 00 ff ff  0b 00 00 04"), "802 892 808", 0x10},
-        {"SACK's Length is taken once more behind ABORT", hex("03 00 00 10 00*12  06 00 00 04  0b 00 00 04"),
+        {"SACK's Length is taken once more after ABORT", hex("03 00 00 10 00*12  06 00 00 04  0b 00 00 04"),
          "802 873 874 875 876 877 878 805 944 945 946", 0x10},
-        {"nothing to take behind an ABORT in front", hex("06 00 00 04  0b 00 00 04"), "802 944 945 946 805 892 808"},
+        {"nothing to take after an ABORT that comes first", hex("06 00 00 04  0b 00 00 04"),
+         "802 944 945 946 805 892 808"},
         {"padding of a cookie reads as DATA", hex("0a 00 00 09 01 02 03 04 05  00 00 00  0b 00 00 04"),
          "802 893 808 895 805 814 815 816 808", 0x10},
         {"the rest of a long SHUTDOWN is the next chunk", hex("07 00 00 0c 00 00 00 2a  0b 00 00 04  0e 00 00 04"),
@@ -259,10 +260,10 @@ TEST(SctpWalk, lengthsAndFields) {
          "802 809 808 813 805 892 808 805 892 808"},
         {"reserved, cut short", hex("ff 00 00 06 61"), "802 809 808", 0x10},
         {"DATA without user data", hex("00 03 00 10 00*12  0b 00 00 04"), data + " 805 892 808"},
-        {"DATA cut in front of its user data", hex("00 03 00 40 00*11"), "802 814 815 816 808 817 818 819", 0x10},
+        {"DATA cut before its user data", hex("00 03 00 40 00*11"), "802 814 815 816 808 817 818 819", 0x10},
         {"INIT's limit takes the next octet", hex("01 00 00 14 00*16  0b 00 00 04"), initAlone + " 805 814 815 816",
          0x10},
-        {"INIT cut in front of its Length", hex("01 00 00"), "802 823", 0x18},
+        {"INIT cut before its Length", hex("01 00 00"), "802 823", 0x18},
         {"INIT ACK without parameters", hex("02 00 00 14 00*16  00*3"),
          "802 835 836 837 838 839 840 841 805 814 815 816", 0x10},
     };
@@ -342,8 +343,8 @@ TEST(SctpData, handsOnAndGoesOn) {
     EXPECT_EQ(last.xtr.key("Cumulative TSN Ack")->number, 43u);
 }
 
-// An owner that leads back into the plug-in leaves its own variables to the walk, which still ends with the bits.
-TEST(SctpData, ownerLeadsBack) {
+// An owner that runs the plug-in again changes the variables of the walk, which still ends with the bits.
+TEST(SctpData, ownerRunsThePluginAgain) {
     Host host = freshHost();
     std::size_t calls = 0;
     host.owners().addProtocol(132, [&calls](NextLayer &next) {
@@ -359,7 +360,8 @@ TEST(SctpData, ownerLeadsBack) {
     const std::vector<Octets> packets = {
         tunnel,
         sctp(many),
-        sctp(hex("00 03 00 14 00*12") + sctp(hex("02 00 ff ff 00*64")) + many), // leaves a large count behind
+        sctp(hex("00 03 00 14 00*12") + sctp(hex("02 00 ff ff 00*64")) +
+             many), // leaves a large count for the next packet
         sctp(hex("00 03 00 14 00*12") + sctp(hex("0a 00 ff ff 00*9")) + hex("0b 00 00 04")),
     };
     for (const Octets &packet : packets) {
@@ -415,7 +417,7 @@ TEST(SctpWalk, overIpv6) {
     EXPECT_EQ(runs.mv.flags, 0u);
 }
 
-// 65535 octets with a chunk, or what else the walk goes round for, in every four of them.
+// 65535 octets with a chunk, or another reason for a round of the walk, in every four of them.
 TEST(SctpWalk, longestPacketsOnASmallStack) {
     constexpr std::size_t most = 65535 - 32;
     const std::vector<std::pair<Octets, std::size_t>> packets = {

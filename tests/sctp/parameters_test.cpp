@@ -140,7 +140,7 @@ TEST(SctpInitAck, everyParameterInEveryPass) {
     EXPECT_EQ(runs.mv.flags, 0u);
 }
 
-// Each parameter of INIT is a limit of its own, and what goes wrong in it stays in it.
+// Each parameter of INIT has a limit of its own, and a fault in it does not go further.
 TEST(SctpInit, parametersKeepTheirFaults) {
     const std::vector<SctpCase> cases = {
         {"an address longer than four octets", init(hex("00 05 00 0c 0a 00 00 01 ff ff ff ff  c0 00 00 04")),
@@ -150,9 +150,9 @@ TEST(SctpInit, parametersKeepTheirFaults) {
         {"an odd octet of address types", init(hex("00 0c 00 07 00 05 ff")), " 847 848 870", 0x18},
         {"address types cut short", shortened(init(hex("00 0c 00 08 00 05 00 06")), 26), " 847 848 870", 0xa},
         {"a value longer than the packet", init(hex("00 0b 00 20 61 62  80 00 00 04")), " 847 848", 0x18},
-        {"a Length of 3: the next one starts behind three octets", init(hex("80 00 00 03  00 00 04")),
+        {"a Length of 3: the next one starts after three octets", init(hex("80 00 00 03  00 00 04")),
          " 847 847 848 872", 0x18},
-        {"no type for an IPv4 Address behind one", init(hex("00 05 00 08 0a 00 00 01 00")), " 847 848 855", 0x18},
+        {"no type for an IPv4 Address after one", init(hex("00 05 00 08 0a 00 00 01 00")), " 847 848 855", 0x18},
         {"a following chunk: one octet is INIT's", init(hex("00 05 00 08 0a 00 00 01")) + hex("0b 00 00 04"),
          " 847 848 855 805 814 815 816", 0x18},
         {"State Cookie has no place here", init(hex("00 07 00 06 61 62")), " 847 848 872", 0x8},
@@ -165,7 +165,7 @@ TEST(SctpInit, parametersKeepTheirFaults) {
     EXPECT_EQ(restored.md.field("        IP Address")->text, "        IP Address=10.0.0.1");
 }
 
-// A parameter of Length 0, or a head that does not fit where nothing was read in front, would come again and again.
+// A parameter of Length 0, or a first head that does not fit, would be read again and again.
 TEST(SctpInit, listThatWouldNotEnd) {
     for (const char *parameters : {"00 05 00 00", "00*8", "00 0b 00 06 68 69 00 00 00 00 00 00", "00 05 00 02 00 02",
                                    "00 0c 00 06 00 05  00 05 00 00 00 00", "00 05 00 01", "00 00", "00 00 00", "00"}) {
@@ -178,7 +178,7 @@ TEST(SctpInit, listThatWouldNotEnd) {
     }
 }
 
-// INIT ACK has no limits: it reads on where a field ends, and what does not fit ends the walk.
+// INIT ACK has no limits: it reads on where a field ends, and a field that does not fit ends the walk.
 TEST(SctpInitAck, parametersFollowTheFields) {
     const std::vector<SctpCase> cases = {
         {"padding of a cookie is the next type", initAck(hex("00 07 00 11 61*13 00 00 00  00 05 00 08 0a 00 00 01")),

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// SCTP packets (RFC 9260) and what was read behind their common header.
+// SCTP packets (RFC 9260) and the fields after their common header.
 #pragma once
 
 #include <string>
@@ -30,26 +30,26 @@ inline Octets repeated(const char *octets, std::size_t room) {
     return all;
 }
 
-// The ids of the fields behind the common header; * is what the host took at a hand-off.
+// The ids of the fields after the common header; * is a report of the host's owner at a hand-off.
 inline std::string chunkIds(const Report &md) {
     std::string ids;
-    bool behindHeader = false;
+    bool afterHeader = false;
     for (const FieldReport &field : md.fields) {
-        if (behindHeader) {
+        if (afterHeader) {
             ids += (ids.empty() ? "" : " ") + (field.id == 0 ? "*" : std::to_string(field.id));
         }
-        behindHeader |= field.id == 798;
+        afterHeader |= field.id == 798;
     }
     return ids;
 }
 
-// One packet, the fields behind `front` and the flags.
+// One packet, the ids of its fields after the ids in `front`, and its flags.
 struct SctpCase {
     const char *what;
     Octets chunks;
     std::string ids;
     std::uint32_t mvFlags = 0;
-    std::uint32_t mdFlags = 0; // those that all passes set
+    std::uint32_t mdFlags = 0; // flags that all passes raise
 };
 
 inline Runs checkCase(const SctpCase &one, const std::string &front = {}) {

@@ -20,7 +20,7 @@ std::string writeFile(const std::string &name, const Octets &octets);
 // `wireOctets` is more than it has was cut by the snap length.
 struct PcapPacket {
     Octets octets;
-    std::uint32_t wireOctets = 0; // 0: all are there
+    std::uint32_t wireOctets = 0; // 0: as many as it has
 };
 [[nodiscard]] Octets pcapFile(std::uint32_t linkType, const std::vector<PcapPacket> &packets);
 

@@ -8,7 +8,7 @@
 namespace netfloor::test {
 namespace {
 
-// A payload as it comes directly, in a tunnel (RFC 2003) and behind minimal encapsulation (RFC 2004).
+// A payload in IPv4 directly, in a tunnel (RFC 2003) and after minimal encapsulation (RFC 2004).
 void addCarried(std::vector<Octets> &packets, std::uint8_t protocol, const Octets &payload) {
     packets.push_back(ipv4({.protocol = protocol, .payload = payload}));
     packets.push_back(ipv4({.protocol = 4, .payload = ipv4({.protocol = protocol, .payload = payload})}));
@@ -20,7 +20,7 @@ Octets tcp(const Octets &options, const Octets &payload) {
            hex("12 7210 beef 0007") + options + payload;
 }
 
-// The common header and one chunk behind it.
+// The common header and one chunk after it.
 Octets sctp(const Octets &chunk) {
     return ipv4({.protocol = 132, .payload = hex("0b59 0b5a 11223344 55667788") + chunk});
 }
@@ -95,7 +95,7 @@ void addSctp(std::vector<Octets> &packets) {
          }) {
         packets.push_back(sctp(hex(chunk)));
     }
-    // The causes of an ABORT; the last ones stand in an ERROR.
+    // The causes of an ABORT; the last ones are in an ERROR.
     for (const char *const cause :
          {"0001 0008 0007 0000", "0002 000a 00000001 0009", "0003 0008 00000005", "0004 0004", "0005 0008 01020304",
           "0006 0008 01020304", "0007 0004", "0008 000c c000 0008 01020304", "0009 0008 00000005", "000a 0004",
@@ -115,7 +115,7 @@ void addIpv6(std::vector<Octets> &packets) {
                                               {60, "3b 00 9e 04 01020304"},                        // discarded
                                               {43, "3b 02 00 01 00000000 20010db8 00*11 01"},      // type 0
                                               {43, "3b 00 04 00 01020304 0506"},                   // unknown
-                                              {43, "3b 00 04 01 01020304"},                        // not through
+                                              {43, "3b 00 04 01 01020304"},                        // segments left
                                               {44, "3b 00 abcd 01020304 61"},                      // fragment
                                               {50, "01020304 00000005 61 62"},                     // security
                                               {51, "3b 02 0000 01020304 00000005 61626364 71"}}) { // authentication

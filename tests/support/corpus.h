@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// Packets that between them hold every field of the plug-in.
+// Packets that together hold every field of the plug-in.
 #pragma once
 
 #include <vector>

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// Places in which a fault shows: octets with an inaccessible page behind them, and a small stack.
+// Memory in which a fault shows: octets with an inaccessible page after them, and a small stack.
 #pragma once
 
 #include <cstddef>
@@ -9,7 +9,7 @@
 
 namespace netfloor::test {
 
-// A copy of some octets that ends where an inaccessible page begins: a read behind the last octet is fatal.
+// A copy of some octets that ends where an inaccessible page begins: a read past the last octet is fatal.
 class GuardedOctets {
 public:
     explicit GuardedOctets(std::span<const std::uint8_t> octets);
@@ -26,7 +26,7 @@ private:
 };
 
 // Runs `work` on a thread with a stack of 64 KiB (more under a sanitizer, whose frames are larger) and waits
-// for it. Passes on what it throws.
+// for it. Throws what `work` throws.
 void onSmallStack(const std::function<void()> &work);
 
 } // namespace netfloor::test

@@ -118,7 +118,7 @@ Octets shortened(const Octets &packet, std::size_t octets) {
     return cut;
 }
 
-// The first bit of an octet is its least significant one, so the packet moves up through the octets.
+// The first bit of an octet is its least significant one, so the bits of the packet move up in each octet.
 Octets shifted(const Octets &packet, unsigned shift) {
     Octets moved(packet.size() + 1);
     moved[0] = static_cast<std::uint8_t>((1u << shift) - 1);

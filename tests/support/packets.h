@@ -7,7 +7,7 @@
 //         61*4          # four octets of payload
 //     )")});
 //
-// Lengths and header words are worked out where a test does not give them; checksums are not (0).
+// Lengths and header words are computed where a test does not give them; checksums are not (0).
 #pragma once
 
 #include <array>
@@ -22,13 +22,13 @@ namespace netfloor::test {
 
 using Octets = std::vector<std::uint8_t>;
 
-// Two digits an octet, blanks and line ends as it pleases; "61*4" repeats an octet; a comment reaches from
+// Two digits an octet, blanks and line ends anywhere between octets; "61*4" repeats an octet; a comment reaches from
 // '#' to the end of the line. Throws std::invalid_argument for anything else.
 [[nodiscard]] Octets hex(std::string_view text);
 
 [[nodiscard]] std::string hexText(std::span<const std::uint8_t> octets);
 
-// One behind the other.
+// One after the other.
 [[nodiscard]] Octets operator+(Octets front, const Octets &back);
 
 // A number in network order.
@@ -41,7 +41,7 @@ struct Ipv4 { // RFC 791
     Octets options = {}; // a multiple of 4 octets
     std::uint8_t typeOfService = 0;
     std::uint16_t identification = 0x1234;
-    std::uint16_t fragment = 0; // flags and fragment offset as they stand in the packet
+    std::uint16_t fragment = 0; // flags and fragment offset as in the packet
     std::uint8_t timeToLive = 64;
     std::uint32_t source = 0x0a000001;      // 10.0.0.1
     std::uint32_t destination = 0xc0a80002; // 192.168.0.2
@@ -68,7 +68,7 @@ struct Ipv6 { // RFC 8200
 // The first `octets` octets of an IPv4 or IPv6 packet whose length field says that this is all of it.
 [[nodiscard]] Octets shortened(const Octets &packet, std::size_t octets);
 
-// The packet at another bit of the first octet: `shift` bits, all set, stand in front of it.
+// The packet at another bit of the first octet: `shift` bits, all set, come before it.
 [[nodiscard]] Octets shifted(const Octets &packet, unsigned shift);
 
 } // namespace netfloor::test

@@ -19,24 +19,24 @@ std::uint32_t widthOf(const ReportedRange &range) {
     return range.lastBit - range.firstBit + 1;
 }
 
-// The ranges from `at` on that one line item shows.
-std::size_t joined(const std::vector<ReportedRange> &ranges, std::size_t at) {
-    std::size_t end = at + 1;
+// The end of the ranges from `first` on that one item of the line shows.
+std::size_t joined(const std::vector<ReportedRange> &ranges, std::size_t first) {
+    std::size_t end = first + 1;
     while (end < ranges.size() && ranges[end].firstBit == ranges[end - 1].lastBit + 1 &&
-           widthOf(ranges[end]) == widthOf(ranges[at])) {
+           widthOf(ranges[end]) == widthOf(ranges[first])) {
         ++end;
     }
     return end;
 }
 
 void writeRanges(std::ostream &out, const std::vector<ReportedRange> &ranges) {
-    for (std::size_t at = 0; at < ranges.size();) {
-        const std::size_t end = joined(ranges, at);
-        out << ' ' << ranges[at].firstBit << '-' << ranges[end - 1].lastBit;
-        if (end - at > 1) {
-            out << '/' << widthOf(ranges[at]);
+    for (std::size_t first = 0; first < ranges.size();) {
+        const std::size_t end = joined(ranges, first);
+        out << ' ' << ranges[first].firstBit << '-' << ranges[end - 1].lastBit;
+        if (end - first > 1) {
+            out << '/' << widthOf(ranges[first]);
         }
-        at = end;
+        first = end;
     }
 }
 
@@ -84,7 +84,7 @@ bool hasField(const Report &md, const KeyValue &key) {
     });
 }
 
-// A nested hand-off ends before the one that it stands in.
+// A nested hand-off ends before the one around it, so the first to start need not be the first in the list.
 const HandOff &firstOf(const Report &report) {
     return *std::ranges::min_element(report.handOffs, {}, &HandOff::cursor);
 }
@@ -106,7 +106,7 @@ std::string firstHandOff(const Report &report) {
     return out.str();
 }
 
-// Collects what differs.
+// Collects the differences.
 class Comparison {
 public:
     template <typename Value>
@@ -126,7 +126,7 @@ private:
     std::ostringstream out_;
 };
 
-// What all passes but an XTR pass that has stopped leave alike.
+// What all passes leave in the same state, except an XTR pass that has stopped.
 void compareEnds(Comparison &comparison, const Report &md, const Report &other) {
     const std::string_view pass = passName(other.pass);
     comparison.same("bits left of the state", pass, md.stateBitsLeft, other.stateBitsLeft);
@@ -228,7 +228,7 @@ std::string disagreements(const Runs &runs) {
 
 void cutEverywhere(const Octets &packet, const std::function<void(std::size_t, const Runs &)> &check, Host &host) {
     for (std::size_t octets = 0; octets <= packet.size(); ++octets) {
-        SCOPED_TRACE("cut behind " + std::to_string(octets) + " octets");
+        SCOPED_TRACE("cut after " + std::to_string(octets) + " octets");
         const Runs runs = runAll(std::span(packet).first(octets), {}, host);
         if (check) {
             check(octets, runs);

@@ -8,8 +8,8 @@
 //         ...
 //     )"));
 //
-// runAll does what every test wants done: octets end at an inaccessible page, and a disagreement between the
-// four passes fails the test. Give a packet to it rather than to one pass.
+// Prefer runAll to a run of one pass: the octets end at an inaccessible page, and a disagreement between the four
+// passes fails the test.
 //
 // One line a report (lines):
 //
@@ -20,7 +20,7 @@
 //     MV   verdict -52 flags 0x10
 //     XTR  row 0 Version=4                    addresses in their usual form
 //
-// What the host's own owner of a next layer reported has no line.
+// Reports of the host's own owner of a next layer have no line.
 #pragma once
 
 #include <array>
@@ -53,29 +53,29 @@ struct Runs {
 // The four passes, each over octets that end at an inaccessible page. Fails the test where they disagree.
 Runs runAll(std::span<const std::uint8_t> packet, const TestRunOptions &options = {}, Host &host = sharedHost());
 
-// In what the four passes disagree, a line each; empty when they agree: cursor, bits left, depth of the stacks,
-// layers, hand-offs, number of fields and texts, flags as far as they are those of all passes, the verdict, and
+// A line for each difference between the four passes, empty when they agree: cursor, bits left, depth of the stacks,
+// layers, hand-offs, number of fields and texts, the flags that all passes raise, the verdict, and
 // for each key field a field of that name and value in MD.
 [[nodiscard]] std::string disagreements(const Runs &runs);
 
-// runAll for the first n octets of the packet, for every n, and once more with the packet's length field made to
-// say n. `check`, if there is one, gets n and the runs of the first kind.
+// runAll for the first n octets of the packet, for every n, and once more with n in the packet's length field.
+// `check`, if there is one, gets n and the runs with the length field unchanged.
 void cutEverywhere(const Octets &packet, const std::function<void(std::size_t, const Runs &)> &check = {},
                    Host &host = sharedHost());
 
-// All that a report holds in lines, see above.
+// All that a report holds, as lines, see above.
 [[nodiscard]] std::string lines(const Report &report);
 
 // MD in the form of TO: 150 "Version=4". The other passes as `lines`.
 [[nodiscard]] std::string shortLines(const Report &report);
 
-// The lines of `text` with which `word` starts or which have it in quotes, for tests of a few fields.
+// The lines of `text` that start with `word`, or have it in quotes, for tests of a few fields.
 [[nodiscard]] std::string linesWith(std::string_view text, std::string_view word);
 
-// The lines from the first one on that starts with `word`, so that a test needs not repeat the headers in front.
+// The lines from the first one on that starts with `word`, so that a test need not repeat the headers before it.
 [[nodiscard]] std::string linesFrom(std::string_view text, std::string_view word);
 
-// The lines in one: 884 "0"; 808 "4"
+// The lines joined into one: 884 "0"; 808 "4"
 [[nodiscard]] std::string oneLine(std::string_view lines);
 
 // The verdict's line: "verdict -52 flags 0x10".
@@ -87,8 +87,9 @@ void cutEverywhere(const Octets &packet, const std::function<void(std::size_t, c
 // layer 1 of 1: 1-224          number, decoder id, first and last bit
 [[nodiscard]] std::string layerLines(const Report &report);
 
-// What is written in a test, as the functions above give it: without indentation, empty lines, and comments,
-// which are lines that start with '#'. A text that ends with a bracket needs a raw string like R"x(...)x".
+// Turns expected lines, as a test writes them, into the form of the functions above: without indentation, empty lines,
+// and comments, which are lines that start with '#'. A text that ends with a bracket needs a raw string like
+// R"x(...)x".
 [[nodiscard]] std::string expected(std::string_view text);
 
 } // namespace netfloor::test

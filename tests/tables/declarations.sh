@@ -1,7 +1,7 @@
 #!/bin/sh
 # SPDX-License-Identifier: MIT
 # What must not compile, and what the compiler says of it: each case is a mistake in the declaration of a field, with
-# the words that its message has to hold. One sound declaration shows that the rest does compile.
+# the words that its message must contain. One correct declaration shows that the rest does compile.
 #
 #   declarations.sh PLUGIN-DIRECTORY INCLUDE-DIRECTORY
 set -u

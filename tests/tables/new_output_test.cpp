@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// How to write a new output over the fields: one file that walks the catalogue. It touches no protocol, and nothing
-// has to know of it. This one lists id, name and display line, and the test compares it with the loaded plug-in.
+// How to write a new output over the fields: one file that walks the catalogue. No protocol changes for it, and no
+// other file refers to it. This one lists id, name and display line, and the test compares it with the loaded plug-in.
 #include <string>
 
 #include <gtest/gtest.h>

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// The two views of a field agree: what the MD pass reports of it is what a reader of the tables works out.
+// The two views of a field agree: the reports of the MD pass are what a reader of the tables expects.
 #include <algorithm>
 #include <filesystem>
 #include <fstream>
@@ -27,7 +27,7 @@ const FieldTables &tables() {
 // The pass keeps a display line in a buffer of 256 octets.
 constexpr std::size_t longestText = 255;
 
-// Bits first to last, the later octet the more significant one, straight from the numbering of bits.
+// Bits first to last, the later octet the more significant one: the numbering of bits, taken literally.
 std::uint32_t bits(const Octets &packet, std::uint32_t first, std::uint32_t last) {
     std::uint32_t value = 0;
     for (std::uint32_t bit = last; bit >= first; --bit) {
@@ -36,7 +36,7 @@ std::uint32_t bits(const Octets &packet, std::uint32_t first, std::uint32_t last
     return value;
 }
 
-// What the tables do not tell, and the grammar does.
+// Facts that the grammar has and the tables do not.
 const std::set<std::uint32_t> scaledByEight = {294, 619};
 const std::set<std::uint32_t> readBackward = {201, 208, 209, 215, 216, 555, 895, 925, 927}; // last octet first
 constexpr std::uint32_t reportedByShortName = 243;
@@ -57,7 +57,7 @@ public:
 
     std::map<std::uint32_t, std::set<std::uint32_t>> values; // by id, of fields of up to 16 bits
     std::set<std::uint32_t> followed;                        // another field with a layout followed
-    std::set<std::uint32_t> moved;                           // and stood where the advance leads
+    std::set<std::uint32_t> moved;                           // and it was where the advance leads
     std::set<std::uint32_t> reversed;                        // reported in the other order than the layout's
     std::uint64_t reports = 0;
 
@@ -140,11 +140,11 @@ private:
         if (!bitsReversed) {
             return bits(packet, range.firstBit, range.lastBit);
         }
-        // Of octets whose bits are reversed, read backward: they come out in network order.
+        // Octets whose bits are reversed are read backward, which gives network order.
         return bits(packet, range.firstBit, range.firstBit + 7) << 8 | bits(packet, range.lastBit - 7, range.lastBit);
     }
 
-    // The elements of a list. A field that is shown by groups reports one stretch of bits for all of them.
+    // The elements of a list. A field that is shown by groups reports one range for all of them.
     static std::vector<std::uint32_t> elementsOf(const Octets &packet, const FieldReport &report,
                                                  const FieldDescription &known) {
         std::vector<std::uint32_t> elements;
@@ -216,8 +216,9 @@ std::set<std::uint32_t> valuesToTry(const FieldDescription &field) {
     return values;
 }
 
-// A byte of these values decides what is read, so that the field is there with some of them only: types, lengths that
-// come with them, codes that must be 0, flags of a frame. What is read ahead has no place in which to put a value.
+// The octet of these fields decides what is read, so that the field itself is read with some of its values only: types,
+// lengths that come with them, codes that must be 0, flags of a frame. A field that is read ahead has no bits of its
+// own to change.
 const std::set<std::uint32_t> there = {177, 180, 188, 223, 226, 232, 235, 238, 243, 318, 321, 322, 329, 330, 339, 340,
                                        348, 349, 357, 358, 362, 363, 381, 398, 441, 444, 447, 448, 452, 453, 457, 458,
                                        461, 462, 468, 469, 474, 475, 542, 556, 576, 583, 587, 597, 600, 716, 719, 724};
@@ -262,14 +263,14 @@ TEST(Views, agreeOnEveryField) {
     EXPECT_EQ(idsText(elsewhere), "168"); // is read a second time
     EXPECT_GE(all.followed.size(), 340U);
     EXPECT_GE(all.reports, 100000U);
-    // All ports of one field; those of the others have the same names.
+    // All ports of one field; the other fields have the same names.
     EXPECT_EQ(all.values.at(479).size(), 65536U);
     for (const std::uint32_t id : {384, 387, 391, 393, 482, 486, 488}) {
         EXPECT_TRUE(std::ranges::equal(tables().find(id)->values, tables().find(479)->values)) << id;
     }
 }
 
-// Whatever else stands in a packet: octets changed at random, and all that looks like a packet in the captures.
+// Any other packet: octets changed at random, and all octets in the captures that look like the start of a packet.
 TEST(Views, agreeOnAnyPacket) {
     Comparison all;
     std::minstd_rand random(20260101);
@@ -304,7 +305,7 @@ TEST(Views, nameValues) {
         {295, 138, "Unassigned"}, // a range, ends included
         {295, 252, "Unassigned"},
         {295, 253, ""},                // no row at all
-        {247, 4, "Parameter Problem"}, // a row of its own in front of a range
+        {247, 4, "Parameter Problem"}, // a row of its own before a range
         {247, 5, "Undefined"},
         {247, 127, "Undefined"},
         {247, 128, "Echo Request"},
@@ -328,8 +329,8 @@ TEST(Views, nameValues) {
     EXPECT_EQ(tables().find(151), nullptr);
 }
 
-// The key-field table tells neither width nor kind; the host takes both from the field of the same name.
-TEST(Views, tellKeyTypes) {
+// The key-field table has neither width nor kind; the host takes both from the field of the same name.
+TEST(Views, giveKeyTypes) {
     const struct {
         KeyType type;
         std::set<std::string> telling;

@@ -35,7 +35,7 @@ PortNames portNames(std::uint16_t port) {
     return {name, mnemonic};
 }
 
-// For each named port, FNV-1a over "port|long text|mnemonic", from a list written down apart from the plug-in's.
+// For each named port, FNV-1a over "port|long text|mnemonic", from a list that was not made from the plug-in's.
 const std::unordered_map<unsigned, std::uint32_t> digests = {
     {1, 0x46c4ffb5},    {2, 0x2c979db7},    {3, 0x65cc41e9},    {5, 0x0fea2432},    {7, 0xae68a838},
     {9, 0x9a41fd4c},    {11, 0x58453ae7},   {13, 0x0aec2885},   {17, 0xb1bd6335},   {18, 0xe6b0f491},

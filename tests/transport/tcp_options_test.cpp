@@ -10,7 +10,7 @@
 namespace netfloor::test {
 namespace {
 
-// A segment with these options and a payload that is handed on.
+// A segment with these options and a payload that is handed off.
 Octets withOptions(const Octets &options) {
     return ipv4({.protocol = 6,
                  .payload = hex("00 35 9c 40 00 00 00 01 00 00 00 02") +
@@ -45,13 +45,13 @@ TEST(TcpOptions, theRarerKinds) {
 
 struct OptionsCase {
     const char *octets;
-    std::uint32_t flagsOfMv; // but for 0x2, which each header leaves
+    std::uint32_t flagsOfMv; // without 0x2, which each header leaves
     const char *values;
 };
 
 TEST(TcpOptions, lengthsAndOrders) {
     const std::vector<OptionsCase> cases = {
-        // The list goes on behind its end.
+        // The list goes on after End of Option List.
         {"00 01 00 00", 0, "441=0 444=1 441=0 441=0"},
         // An unknown kind makes padding of all that follows it, in the round that takes nothing else.
         {"09 02 01 01", 0, "439=9020101"},
@@ -76,7 +76,7 @@ TEST(TcpOptions, lengthsAndOrders) {
         // Digests: none, and more than 16 octets.
         {"13 02 01 01", 0, "474=13 475=2 444=1 444=1"},
         {"13 14 00*15 10 aa bb", 0x10, "474=13 475=14 478=10"},
-        // A length that reaches behind the header: read as far as the header goes.
+        // A length that reaches past the header: read as far as the header goes.
         {"02 08 05 b4", 8, "447=2 448=8 451=5b4"},
         {"01 13 ff 0a", 8, "444=1 474=13 475=ff 478=a"},
     };
@@ -87,7 +87,7 @@ TEST(TcpOptions, lengthsAndOrders) {
         EXPECT_EQ(fieldValues(runs.md, 408), one.values);
         EXPECT_EQ(runs.md.flags, 2u);
         EXPECT_EQ(runs.mv.flags, 2u | one.flagsOfMv);
-        // Whatever stands in the options, the next layer gets what is behind the data offset.
+        // With any options, the next layer gets the octets after the data offset.
         ASSERT_EQ(runs.md.handOffs.size(), 1u);
         EXPECT_EQ(runs.md.handOffs[0].cursor, 321 + 8 * options.size());
         EXPECT_EQ(runs.md.handOffs[0].nextLayerOctets, 5u);

@@ -13,7 +13,7 @@ namespace netfloor::test {
 namespace {
 
 constexpr std::size_t ipv4Fields = 18;
-constexpr std::uint32_t unwritten = 0xabcdef; // what the scratch area holds beforehand
+constexpr std::uint32_t unwritten = 0xabcdef; // in the scratch area at the start
 
 // Ports 53 and 40000 and a header whose data offset a test chooses.
 Octets tcp(std::uint8_t dataOffset, const Octets &rest = {}) {
@@ -96,7 +96,7 @@ struct HeaderCase {
     const char *handOff;
 };
 
-// What the data offset says: how much is read, what the next layer is told, and who gets it.
+// The data offset decides how much is read, which lengths the next layer gets, and which owner it has.
 TEST(Tcp, dataOffsetAndRoomForIt) {
     // An inner datagram that says it is shorter than the segment in it.
     const Octets shortTunnel =
@@ -116,8 +116,8 @@ TEST(Tcp, dataOffsetAndRoomForIt) {
         {"offset 2", overIpv4(tcp(2, hex("01*6"))), 16, 2, 0x1a, unwritten, unwritten, ""},
         {"offset 3", overIpv4(tcp(3)), 5, 0, 0, 17, 23,
          "hand-off key 53 protocol 6 port 53 at 257 bits 64 octets 17 preceding 23\n"},
-        {"offset 4, 32 bits behind it", overIpv4(tcp(4)), 14, 0, 0x10, 16, 24, ""},
-        {"offset 4, 40 bits behind it", overIpv4(tcp(4, hex("61"))), 14, 0, 0, 17, 24,
+        {"offset 4, 32 bits after it", overIpv4(tcp(4)), 14, 0, 0x10, 16, 24, ""},
+        {"offset 4, 40 bits after it", overIpv4(tcp(4, hex("61"))), 14, 0, 0, 17, 24,
          "hand-off key 53 protocol 6 port 53 at 289 bits 40 octets 17 preceding 24\n"},
         {"over IPv6", ipv6({.nextHeader = 6, .payload = tcp(5, hex("61*5"))}), 16, 2, 2, 5, 0u - 5,
          "hand-off key 53 protocol 6 port 53 at 481 bits 40 octets 5 preceding 4294967291\n"},
@@ -153,7 +153,7 @@ TEST(Tcp, segmentThatEndsEarly) {
     cutEverywhere(withUsualOptions());
 }
 
-TEST(Tcp, destinationPortTellsTheCarriage) {
+TEST(Tcp, destinationPortNamesTheOuterProtocol) {
     const Octets segment = tcp(5);
     const Octets inner = overIpv4(segment);
     const Octets minimal = hex("06 00 00 00 0a 00 00 01");
@@ -164,11 +164,11 @@ TEST(Tcp, destinationPortTellsTheCarriage) {
         {ipv4({.protocol = 4, .payload = ipv4({.protocol = 55, .payload = minimal + segment})}), 387, "IPinIP - "},
         {ipv4({.protocol = 55, .payload = minimal + segment}), 391, "MIPinIP - "},
     };
-    for (const auto &[packet, id, carriage] : cases) {
+    for (const auto &[packet, id, outer] : cases) {
         const Runs runs = runAll(packet);
         EXPECT_EQ(runs.md.field("TCP Destination Port")->id, id);
         EXPECT_EQ(linesWith(lines(runs.to), "384"), "384 \"TCP - DOMAIN (53)\"\n");
-        EXPECT_EQ(linesWith(lines(runs.to), "387"), "387 \"" + carriage + "TCP -  (40000)\"\n");
+        EXPECT_EQ(linesWith(lines(runs.to), "387"), "387 \"" + outer + "TCP -  (40000)\"\n");
     }
 }
 

@@ -46,7 +46,7 @@ struct SizeCase {
     bool handsOff;
 };
 
-// What is left behind the fields is skipped, unless it is enough to be handed on.
+// What is left after the fields is skipped, unless it is enough for a hand-off.
 TEST(Udp, datagramOfEachSize) {
 
     const std::vector<SizeCase> cases = {
@@ -82,7 +82,8 @@ TEST(Udp, lengthFieldDecidesNothing) {
     }
 }
 
-// A limit that no header agrees with: the header length takes away what the next layer is told, not what it gets.
+// A limit that no header agrees with: the header length reduces the length that is written for the next layer, not the
+// octets that it gets.
 TEST(Udp, headerLengthCountsForTheNextLayer) {
     const Runs runs = runAll(ipv4({.protocol = 17, .payload = udp(53, 53, hex("61*6")), .headerWords = 3}));
     EXPECT_EQ(handOffLines(runs.md), "hand-off key 53 protocol 17 port 53 at 225 bits 48 octets 14 preceding 20\n");

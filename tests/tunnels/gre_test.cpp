@@ -23,7 +23,7 @@ TEST(Gre, everyFieldInEveryPass) {
     const Octets packet = gre(hex(R"(
         fa ff 88 0b                           # all of the first bits, reserved bits, version 7, PPP
         0a bc 01 02 00 00 01 00 ff ff ff fe   # checksum, key, sequence number
-        7e ff 00 7e 45                        # a frame, and an octet behind it
+        7e ff 00 7e 45                        # a frame, and an octet after it
     )"));
     const Runs runs = runAll(packet);
     EXPECT_EQ(fieldLines(runs, 160), expected(R"x(
@@ -61,24 +61,23 @@ TEST(Gre, framesAndLengths) {
     expectValues(
         698,
         {
-            {"nothing behind the header", gre(head), "", 2, 2},
+            {"nothing after the header", gre(head), "", 2, 2},
             {"no frame", gre(head + hex("45 00 7e")), "715=45 715=0 715=7e", 2, 2},
             {"a frame", gre(head + hex("7e 01 02 7e")), "716=7e 719=1 719=2 724=7e", 0, 0},
             {"an empty frame", gre(head + hex("7e 7e")), "716=7e 724=7e", 0, 0},
-            {"octets behind the frame", gre(head + hex("7e 01 7e 7e 55")), "716=7e 719=1 724=7e 715=7e 715=55", 0, 0},
+            {"octets after the frame", gre(head + hex("7e 01 7e 7e 55")), "716=7e 719=1 724=7e 715=7e 715=55", 0, 0},
             {"a frame without an end", gre(head + hex("7e 01")), "716=7e 719=1", 0, 0},
             {"a frame of its flag alone", gre(head + hex("7e")), "716=7e", 0, 0},
             {"key only", gre(hex("20 00 08 00 00 00 00 07 7e")), "707=7 716=7e", 0, 0},
             {"sequence number only", gre(hex("10 00 08 00 00 00 00 07 7e")), "711=7 716=7e", 0, 0},
             {"half a checksum", gre(hex("b0 00 08 00 12 34")), "702=1234", 0, 2},
             {"half a key", gre(hex("a0 00 08 00 12 34 00 00 61")), "702=1234 703=0", 0, 0x12},
-            // The length of the payload is another than that of the limit.
-            {"frame ends in front of the payload's end",
+            // The length of the payload differs from that of the limit.
+            {"frame ends before the payload's end",
              ipv4({.protocol = 47, .payload = head + hex("7e 01"), .headerWords = 4}), "716=7e 719=1", 2, 2},
-            {"payload ends in front of the frame's end", inTunnel(26, head + hex("7e 01 02 7e")), "716=7e 719=1", 0,
-             0x10},
-            {"payload ends in front of the frame", inTunnel(24, head + hex("7e 01")), "716=7e", 0, 0x10},
-            {"payload ends behind the frame", inTunnel(28, head + hex("7e 01 7e 55 56")), "716=7e 719=1 724=7e 715=55",
+            {"payload ends before the frame's end", inTunnel(26, head + hex("7e 01 02 7e")), "716=7e 719=1", 0, 0x10},
+            {"payload ends before the frame", inTunnel(24, head + hex("7e 01")), "716=7e", 0, 0x10},
+            {"payload ends after the frame", inTunnel(28, head + hex("7e 01 7e 55 56")), "716=7e 719=1 724=7e 715=55",
              0, 0x10},
             {"payload ends inside the header", inTunnel(22, head + hex("45")), "", 2, 0x12},
         });

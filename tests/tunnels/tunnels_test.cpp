@@ -94,19 +94,19 @@ TEST(MinimalEncapsulation, everyFieldInEveryPass) {
     EXPECT_EQ(verdictLine(runs.mv), "verdict 0 flags 0x0\n");
 }
 
-// The first field that each protocol leads to. What the outer header knows, the tunnels know in part.
+// The first field that each protocol leads to. A tunnel carries only some of the protocols of the outer header.
 TEST(Tunnels, dispatch) {
     const std::vector<std::tuple<std::uint8_t, std::uint32_t, std::uint32_t>> cases = {
         {1, 531, 535},  {4, 629, 629},  {6, 384, 384},  {17, 479, 479},  {41, 285, 285},
         {47, 692, 285}, {55, 640, 640}, {58, 285, 285}, {132, 285, 285}, {0, 285, 285}};
     for (const auto &[protocol, inIp, inMinimal] : cases) {
         SCOPED_TRACE(int{protocol});
-        // An offset sends nothing to the unknown here.
+        // A fragment offset does not make the payload unknown data here.
         const Octets fragment = ipv4({.protocol = protocol, .payload = hex("00*20"), .fragment = 1});
         EXPECT_EQ(runAll(tunnel(4, fragment)).md.fields[36].id, inIp);
         EXPECT_EQ(runAll(tunnel(55, minimal(protocol, hex("00*20")))).md.fields[23].id, inMinimal);
     }
-    // The outermost header names the carriage, whatever comes between.
+    // The protocol of the outermost header counts, also with another tunnel between.
     const Octets message = hex("08 00*7");
     const auto type = [](const Octets &packet) { return linesWith(lines(runAll(packet).to), "531"); };
     EXPECT_EQ(type(tunnel(4, tunnel(55, minimal(1, message)))), "531 \"IPinIP - ICMP - EM (8)\"\n");
@@ -128,14 +128,14 @@ TEST(Tunnels, lengthsOfHeadersAndPayload) {
                  {"inner options beyond the end", tunnel(4, inner(15, 99)), "", 0, 0x10},
                  {"options of the outer header only",
                   ipv4({.protocol = 4, .payload = inner(5, 23), .options = hex("00*4")}), "285=61 285=62 285=63", 0, 0},
-                 {"options of a tunnel in front of minimal encapsulation", tunnel(4, withOptions),
+                 {"options of a tunnel before minimal encapsulation", tunnel(4, withOptions),
                   "318=1 318=1 318=1 381=0 640=fd 641=0 642=0 643=0 646=a000001 285=61 285=62 285=63", 0, 0},
              });
-    expectValues(
-        646, {
-                 {"no options behind minimal encapsulation", withOptions, "285=61 285=62 285=63", 0, 0},
-                 {"source address announced, not there", tunnel(55, hex("fd 80 00 00 0a 00 00 01 61 62")), "", 0, 0x10},
-             });
+    expectValues(646, {
+                          {"no options after minimal encapsulation", withOptions, "285=61 285=62 285=63", 0, 0},
+                          {"source address announced, but missing", tunnel(55, hex("fd 80 00 00 0a 00 00 01 61 62")),
+                           "", 0, 0x10},
+                      });
 }
 
 TEST(Tunnels, cutAtEveryOctet) {
@@ -143,7 +143,7 @@ TEST(Tunnels, cutAtEveryOctet) {
         tunnel(4, tunnel(55, hex("04 80 00 00 0a 00 00 01 0a 00 00 02") + tunnel(17, udp(53, 53, hex("61*5"))))));
 }
 
-// As deep as 65535 octets go, with a datagram at the bottom, and with nothing.
+// As deep as 65535 octets go, with a datagram innermost, and with nothing.
 TEST(Tunnels, deepestOnASmallStack) {
     for (const bool datagram : {true, false}) {
         const Octets bottom = datagram ? udp(53, 40000, hex("61*8")) : Octets{};
@@ -186,7 +186,7 @@ TEST(Tunnels, growthThatFails) {
         options.state.blockCapacity = capacity;
         options.state.allowGrowth = [](std::size_t) { return false; };
         const Runs runs = runAll(packet, options);
-        // The service block of a level stands at depth 6, 7 and so on, behind the level's first two fields.
+        // The service block of a level is at depth 6, 7 and so on, after the level's first two fields.
         const std::size_t levels = capacity - 6;
         const bool whole = levels == 4;
         EXPECT_EQ(runs.md.ending, whole ? Ending::complete : Ending::cutOff);

@@ -7,7 +7,7 @@
 //         const netfloor::NetworkPart network = netfloor::findNetworkPart(packet.linkType, packet.octets);
 //     }
 //
-// Memory is bounded whatever the file holds, and nothing is allocated for a packet unless it is the largest so far.
+// Memory is bounded for any file, and nothing is allocated for a packet unless it is the largest so far.
 #pragma once
 
 #include <memory>

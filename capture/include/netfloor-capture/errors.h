@@ -14,7 +14,7 @@ public:
     using std::runtime_error::runtime_error;
 };
 
-// The file ends in the middle of a packet or goes on with what is no packet; all packets before it are good.
+// The file ends in the middle of a packet, or the next octets are no packet. All packets before are good.
 class CaptureDamage : public std::runtime_error {
 public:
     CaptureDamage(const std::string &sentence, std::uint64_t packetNumber, std::uint64_t position)

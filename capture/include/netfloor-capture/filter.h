@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// libpcap's filter language over packets of any link type. libpcap is loaded when a filter is made, and not before: it
-// and the libraries it brings along cost a program more to start than a small capture costs to read.
+// libpcap's filter language for packets of any link type. libpcap is loaded with the first filter: loading it and the
+// libraries that it needs takes longer than reading a small capture.
 #pragma once
 
 #include <cstdint>
@@ -21,17 +21,17 @@ public:
     PacketFilter(const PacketFilter &) = delete;
     PacketFilter &operator=(const PacketFilter &) = delete;
 
-    // Throws FilterError when the expression has a meaning neither on the packet's link type nor on a usual one.
-    // Where only this link type is the reason, the packet does not pass, and is counted among the refused.
+    // Throws FilterError when the expression compiles neither for the packet's link type nor for a usual one. Where it
+    // does not compile for this link type alone, the packet does not pass, and is counted among the refused.
     [[nodiscard]] bool passes(const CapturedPacket &packet);
 
-    // Packets on whose link type the expression has no meaning.
+    // Packets for whose link type the expression does not compile.
     struct Refused {
         std::string reason; // libpcap's words
         std::uint64_t packets = 0;
     };
     [[nodiscard]] const std::map<int, Refused> &refused() const { return refused_; } // by link type
-    // Whether the expression had no meaning on any packet that came.
+    // Whether the expression compiled for no packet that came.
     [[nodiscard]] bool refusedAll() const { return programs_.empty() && !refused_.empty(); }
 
 private:
@@ -45,7 +45,7 @@ private:
     std::map<int, std::unique_ptr<Program>> programs_; // by link type
     std::map<int, Refused> refused_;
     bool isSound_ = false; // it has been compiled for one link type
-    int linkType_ = -1;    // of the packet before, with one of:
+    int linkType_ = -1;    // of the last packet, with one of:
     Program *program_ = nullptr;
     Refused *refusal_ = nullptr;
 };

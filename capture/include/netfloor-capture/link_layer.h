@@ -11,7 +11,7 @@
 
 namespace netfloor {
 
-// What a packet is when it is not IP. It is a number or a name; the text is made only where it is shown.
+// What a packet is when it is not IP. It is a number or a name; the text is made only when it is needed.
 class NotIp {
 public:
     enum class Kind : std::uint8_t {

@@ -16,8 +16,8 @@ class TimeText {
 public:
     explicit TimeText(TimeForm form) : form_(form) {}
 
-    // Takes note of each packet in the order of the capture: the first one with a time is where the others count from,
-    // and decides whether all of them get 6 digits or 9.
+    // Call it for each packet in the order of the capture. The first packet with a time is the start of the count, and
+    // decides whether all times get 6 digits or 9.
     void see(const CapturedPacket &packet);
 
     // Empty for a packet without a time; valid until the next call.

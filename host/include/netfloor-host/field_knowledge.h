@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// What a host knows of particular fields and the plug-in's own tables do not tell: where the fields of a protocol
+// What a host knows of particular fields and does not find in the plug-in's tables: where the fields of a protocol
 // start and end, which numbers are addresses, and which flags are by design. The rows are in field_knowledge.cpp.
 #pragma once
 
@@ -16,7 +16,7 @@
 
 namespace netfloor {
 
-// Fields by their name; the id is given only where one field must be told from others of the same name.
+// Fields by their name. The id is given only where several fields have that name and one of them is meant.
 struct FieldName {
     std::string_view name;
     std::uint32_t id = 0;
@@ -33,16 +33,17 @@ struct FieldSpan {
     FieldName last;
 };
 
-// A flag that a pass raises after one of some fields, and that says nothing against the packet.
+// A flag that a pass raises after a field of the span, although nothing is wrong with the packet.
 struct FlagByDesign {
     std::uint32_t flag = 0; // NETFLOOR_FLAG_...
     FieldSpan after;
-    std::uint32_t mostUnreadBits = 0; // with more bits that no field covers, it is not by design
+    std::uint32_t mostUnreadBits = 0; // by design only up to so many bits that no field covers
     std::string_view why;
 };
 
-// A length in octets, which starts `bitsBefore` in front of its field. With a reason, NETFLOOR_FLAG_LIMIT_TOO_LONG is
-// by design where the packet holds all that this length and those inside it count. Without, the length is one inside.
+// A length in octets, which counts from `bitsBefore` bits before its field. A row with a reason says that
+// NETFLOOR_FLAG_LIMIT_TOO_LONG is by design where the packet holds all that this length and the lengths inside it
+// count. A row without a reason is a length inside another.
 struct LengthField {
     std::string_view section;
     FieldName field;
@@ -56,12 +57,12 @@ struct LengthField {
 // The type of a key field whose display hides it. A key field is known by its name alone.
 [[nodiscard]] std::optional<KeyType> knownKeyType(std::string_view keyFieldName);
 
-// The knowledge, applied to the fields of one plug-in. It keeps nothing of `fields`.
+// The rows, matched with the fields of one plug-in. It keeps no reference to `fields`.
 class FieldKnowledge {
 public:
     explicit FieldKnowledge(std::span<const FieldDescription> fields);
 
-    // The part of the grammar in which a field stands: "TCP options". Empty for a field in no section.
+    // The section that holds a field, such as "TCP options". Empty for a field in no section.
     [[nodiscard]] std::string_view section(std::uint32_t fieldId) const;
 
     // The row that explains `flag`, raised after that field with so many bits unread there, or null.
@@ -72,7 +73,7 @@ public:
     [[nodiscard]] const LengthField *lengthField(std::uint32_t fieldId) const;
 
     // A sentence for each field in no section or in two, and for each row whose field the plug-in does not have.
-    // Whoever adds a protocol completes the rows until there is none.
+    // A new protocol needs rows until the list is empty.
     [[nodiscard]] const std::vector<std::string> &mismatches() const { return mismatches_; }
 
 private:
@@ -88,7 +89,7 @@ private:
     void addLengths(Fields fields);
     void checkKeyTypes(Fields fields);
 
-    // The fields from the first to the last of a span; empty, with a mismatch, where they are not told.
+    // The fields from the first to the last of a span; empty, with a mismatch, where an end is not found.
     [[nodiscard]] Fields locate(Fields fields, const FieldSpan &span);
     // The only field of that name, or null with a mismatch.
     [[nodiscard]] const FieldDescription *only(Fields fields, std::string_view section, const FieldName &name);

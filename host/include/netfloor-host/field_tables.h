@@ -34,7 +34,7 @@ struct NamedValue {
     friend bool operator==(const NamedValue &, const NamedValue &) = default;
 };
 
-// Bits, with both ends, counted as the lists of the struct say it.
+// Bits from `first` to `last`, both included. What bit 1 is, each use says.
 struct BitSpan {
     std::uint32_t first = 0;
     std::uint32_t last = 0;
@@ -46,31 +46,32 @@ struct BitSpan {
 struct FieldLayout {
     enum class Kind : std::uint8_t {
         fixed,
-        variable, // as long as the packet tells
-        none,     // the tables do not say: the field is read ahead of its turn, or by groups
+        variable, // as long as the packet says
+        none,     // not in the tables: the field is read ahead of its turn, or by groups
     };
 
     Kind kind = Kind::none;
     std::vector<BitSpan> pieces;  // counted from 1 at the cursor; first above last: read with the bits reversed
     std::uint32_t leastCount = 0; // how often the pieces repeat; the same number twice for a fixed field
     std::uint32_t mostCount = 0;  // 0: no bound
-    std::uint32_t step = 0;       // bits from one repeat to the next, and behind the last one
+    std::uint32_t step = 0;       // bits from one repeat to the next, and from the last one to where the cursor goes
 
-    // Bits that the cursor moves on behind `count` repeats, as the tables have it: id 168, which is shown ahead, stays.
+    // Bits by which `count` repeats move the cursor, as the tables have it. In fact id 168, which is shown ahead, does
+    // not move it.
     [[nodiscard]] std::uint32_t advance(std::uint32_t count) const { return count * step; }
 };
 
 struct FieldDescription {
     std::uint32_t id = 0;
-    std::string_view name;              // without blanks in front
-    std::string_view shortName;         // without blanks behind, too, or shorter
+    std::string_view name;              // without leading blanks
+    std::string_view shortName;         // without trailing blanks, too, or shorter
     std::uint32_t keyIndex = 0;         // number among the key fields, from 1; 0: none
     std::uint32_t flags = 0;            // FieldDescriptor::flags
     std::optional<std::uint32_t> width; // bits; none: variable
     std::string_view format;            // of the display line: %u %x %c, %-S the name of the value, %-["%x":"."] a list
     std::vector<NamedValue> values;
     FieldLayout layout;
-    std::uint32_t layoutOffset = 0; // of the layout's record, by which fields of one layout are told
+    std::uint32_t layoutOffset = 0; // of the layout's record; fields of one layout share it
 
     // The row that names `value`: the one for this value, else the range that holds it, else the default.
     [[nodiscard]] const NamedValue *findValue(std::uint32_t value) const;
@@ -82,7 +83,7 @@ struct FieldDescription {
     [[nodiscard]] std::string display(std::uint32_t value, std::span<const std::uint32_t> elements = {}) const;
 
     // The bits of a field that starts at bit `cursor`, piece by piece in the order of the table, the lower bit
-    // first. A variable field is laid out for `count` repeats. Empty where the tables do not tell.
+    // first. A variable field is laid out for `count` repeats. Empty where the tables have no layout.
     [[nodiscard]] std::vector<BitSpan> layOut(std::uint32_t cursor, std::optional<std::uint32_t> count = {}) const;
 };
 
@@ -95,7 +96,7 @@ public:
     // In the order of the plug-in's grammar.
     [[nodiscard]] const std::vector<FieldDescription> &fields() const { return fields_; }
 
-    // The field of that id, or null; without a search, so that a host may ask for each field of a report.
+    // The field of that id, or null. It is a hash lookup, cheap enough for each field of a report.
     [[nodiscard]] const FieldDescription *find(std::uint32_t id) const;
 
     // The first field of that name or short name, or null; `named` gives all.

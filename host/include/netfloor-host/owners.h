@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// Owners of next layers: what a host runs on the payload that a plug-in hands on.
+// Owners of next layers: what a host runs on the payload that a plug-in hands off.
 #pragma once
 
 #include <cstdint>
@@ -46,8 +46,8 @@ public:
     // Opens and closes a record for the bits that `decode` consumes in the list of layers (MD and TO).
     void layer(std::uint32_t decoderId, const std::function<void()> &decode);
 
-    // Leads back into the plug-in: runs the same pass on the same state from the cursor on, hand-offs of its
-    // own included. False when that pass was cut off, or would be nested deeper than the host allows.
+    // Runs the plug-in again: the same pass on the same state from the cursor on, its own hand-offs included.
+    // False when that pass was cut off, or would be nested deeper than the host allows.
     [[nodiscard]] bool runPlugin();
 
 private:
@@ -62,15 +62,15 @@ enum class Handled : std::uint8_t {
     refused, // hd_PreDecode gives a negative result, which cuts the pass off
 };
 
-// Decodes the next layer at the cursor. It may leave bits. An exception ends the pass and reaches the caller
-// of Host::run.
+// Decodes the next layer at the cursor. It need not take all bits. An exception ends the pass and reaches the
+// caller of Host::run.
 using Owner = std::function<Handled(NextLayer &)>;
 
 // Takes all that is left as data.
 [[nodiscard]] Handled takeAsData(NextLayer &next);
 
-// Takes the user data of an SCTP DATA chunk (RFC 9260, 3.3.1) and the padding behind it, so that the walk over
-// the chunks goes on with the next one. Takes all that is left where no DATA chunk stands in front of it.
+// Takes the user data of an SCTP DATA chunk (RFC 9260, 3.3.1) and the padding after it, so that the plug-in goes
+// on with the next chunk. Takes all that is left where the octets before the cursor are no DATA chunk.
 [[nodiscard]] Handled takeSctpUserData(NextLayer &next);
 
 // Who owns which next layer.
@@ -79,7 +79,7 @@ public:
     // takeSctpUserData for all of SCTP, takeAsData for the rest.
     OwnerRegistry();
 
-    void add(std::uint32_t key, Owner owner);                         // this key, whatever the protocol
+    void add(std::uint32_t key, Owner owner);                         // this key with any protocol
     void add(std::uint32_t key, std::uint32_t protocol, Owner owner); // this key with this IP protocol
     void addProtocol(std::uint32_t protocol, Owner owner);            // any key of this IP protocol
     void setDefault(Owner owner);                                     // everything else

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// The host: runs the passes of a plug-in over packets and tells a sink what they report, or gives it back as a whole.
+// The host: runs the passes of a plug-in over packets. What they report goes to a sink, or comes back as a whole.
 //
 //     netfloor::Host host(netfloor::PluginLibrary::open("build/plugin/libnetfloor.so"));
 //     const netfloor::Report report = host.run(netfloor::Pass::md, packet);
@@ -17,7 +17,7 @@
 #include "netfloor-host/plugin_library.h"
 #include "netfloor-host/reports.h"
 #include "netfloor-host/sink.h"
-#include "netfloor-host/text.h"
+#include "netfloor-host/value_text.h"
 #include "netfloor-host/version.h"
 
 namespace netfloor {
@@ -25,13 +25,13 @@ namespace netfloor {
 struct RunOptions {
     std::uint8_t layerNumber = 1;   // of the first layer
     std::uint32_t decoderId = 1;    // the host's word for the plug-in
-    std::uint32_t mostNesting = 64; // how often owners may lead back into the plug-in, one in another
+    std::uint32_t mostNesting = 64; // how deep owners may nest calls of NextLayer::runPlugin
 };
 
 struct TestRunOptions; // testing.h
 
-// A host keeps its storage from packet to packet: nothing is allocated for a packet that needs no more of it than one
-// before.
+// A host keeps its storage from packet to packet. A packet that needs no more of it than an earlier one allocates
+// nothing.
 //
 // A plug-in serves one packet at a time. `run` throws PluginBusy when another thread is running the same load of the
 // plug-in: each thread needs a Host of its own with a PluginLibrary::openCopy. In one thread an owner of a next layer
@@ -48,13 +48,13 @@ public:
     [[nodiscard]] OwnerRegistry &owners() { return owners_; }
 
     // Runs one pass over one packet, which starts with an IP header at its first octet, and reports to `sink`. Throws
-    // PluginBusy, what an owner or the sink throws, and std::invalid_argument for a packet of half a GiB.
+    // PluginBusy, what an owner or the sink throws, and std::invalid_argument for a packet of half a GiB or more.
     Ending run(Pass pass, std::span<const std::uint8_t> packet, Sink &sink, const RunOptions &options = {});
 
-    // The same, with all that is reported kept.
+    // The same; the report keeps everything.
     [[nodiscard]] Report run(Pass pass, std::span<const std::uint8_t> packet, const RunOptions &options = {});
 
-    // The same in a state made for a test. Throws std::invalid_argument for options that contradict the packet, too.
+    // The same in a state made for a test. Also throws std::invalid_argument for options that contradict the packet.
     Ending run(Pass pass, std::span<const std::uint8_t> packet, Sink &sink, const TestRunOptions &options);
     [[nodiscard]] Report run(Pass pass, std::span<const std::uint8_t> packet, const TestRunOptions &options);
 

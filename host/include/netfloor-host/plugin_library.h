@@ -27,18 +27,18 @@ public:
     using std::logic_error::logic_error;
 };
 
-// How this host answers hx_InitialiseOptXTR: with the results in turn, the last of them for good.
+// How this host answers hx_InitialiseOptXTR: each call gets the next result, and calls after the last one repeat it.
 struct KeySetUp {
     std::vector<std::int32_t> results = {1};
-    std::uint16_t presenceRow = 0; // what a result above 1 marks as present in every record
+    std::uint16_t presenceRow = 0; // with a result above 1: the row that is present in every record
 };
 
 class LoadedPlugin;
 
 // A handle of a loaded plug-in; copies share it.
 //
-// A pass of a plug-in keeps its variables in statics and serves one packet at a time. Who decodes in several
-// threads, or wants the key-field table set up anew, opens a copy for each. The functions of a handle may not be called
+// A pass of a plug-in keeps its variables in statics and serves one packet at a time. Decoding in several threads
+// needs a copy for each, and so does a new set-up of the key-field table. The functions of a handle may not be called
 // while another thread runs or sets up the same load.
 class PluginLibrary {
 public:
@@ -57,7 +57,7 @@ public:
     [[nodiscard]] NetfloorPreDecode preDecodeMV() const;
     [[nodiscard]] NetfloorExtract extract() const;
     [[nodiscard]] NetfloorDateConv dateConv() const;
-    [[nodiscard]] NetfloorGetTable getPtr() const; // FieldTables reads what these two give
+    [[nodiscard]] NetfloorGetTable getPtr() const; // FieldTables reads the tables of these two
     [[nodiscard]] NetfloorGetTable getTable() const;
 
     // Any other export by its name, or null.
@@ -66,8 +66,8 @@ public:
     // The time stamp `seconds` since 1970-01-01 00:00:00 UTC as the plug-in's date_conv writes it.
     [[nodiscard]] std::string dateText(std::uint32_t seconds) const;
 
-    // Decides what later calls of hx_InitialiseOptXTR get. A plug-in that was told 1 or more, or a negative
-    // number, does not ask again: open a copy first.
+    // Decides what later calls of hx_InitialiseOptXTR get. A plug-in that got another result than 0 does not ask
+    // again: open a copy first.
     void setKeySetUp(KeySetUp keySetUp);
 
     // How often the plug-in has called hx_InitialiseOptXTR.

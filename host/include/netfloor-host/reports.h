@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// What a pass reported about one packet, kept as plain records, and the sink that keeps them. For tests and for
-// programs that look at a packet as a whole; who writes an output takes what it needs as it comes, see sink.h.
+// What a pass reported about one packet, kept as plain records, and the sink that keeps them. It is for tests and for
+// programs that need a packet as a whole. An output that needs each report only once is a sink of its own, see sink.h.
 #pragma once
 
 #include <array>
@@ -23,8 +23,8 @@ struct ReportedRange {
     friend bool operator==(const ReportedRange &, const ReportedRange &) = default;
 };
 
-// A named stretch of the packet in which fields were read. A block in which no field was read directly, but
-// only in blocks inside it, has an empty name: a plug-in gives a block's name with its fields.
+// A named part of the packet in which fields were read. A block in which no field was read directly, but only
+// in blocks inside it, has an empty name: a plug-in gives a block's name with its fields.
 struct Block {
     static constexpr std::size_t none = static_cast<std::size_t>(-1);
 
@@ -36,7 +36,7 @@ struct Block {
 // MD: one field.
 struct FieldReport {
     std::uint32_t id = 0; // 0 for what an owner in the host reported
-    std::string name;     // letter for letter, leading blanks included
+    std::string name;     // unchanged, leading blanks included
     std::string text;     // the display line; may be empty
     std::uint32_t value = 0;
     std::vector<ReportedRange> ranges; // in the order in which they were read
@@ -44,7 +44,7 @@ struct FieldReport {
     std::uint32_t flags = 0;           // of the decode state: what was raised before it was reported
     std::size_t block = Block::none;   // index in Report::blocks
     // What the plug-in wrote into the head of the host's field record: the layer number, then two octets
-    // that are 0, or 0xff where the plug-in left them alone.
+    // that are 0, or 0xff where the plug-in did not write them.
     std::array<std::uint8_t, 3> recordHead = {};
 
     [[nodiscard]] std::uint8_t layerNumber() const { return recordHead[0]; }
@@ -65,7 +65,7 @@ struct KeyValue {
     std::uint32_t number = 0;         // every type but ipv6Address; an IPv4 address has its first octet on top
     std::vector<std::uint8_t> octets; // ipv6Address: as stored, that is with the nibbles of each octet exchanged
 
-    // For what takes keys as they come, such as keyText().
+    // So that functions for a KeyView, such as keyText(), take it as well.
     operator KeyView() const { return {name, row, type, number, octets}; } // NOLINT(*-explicit-*)
 };
 
@@ -86,7 +86,7 @@ struct Report {
     std::vector<LayerRecord> layers;     // MD and TO
     std::vector<HandOff> handOffs;       // all passes, in the order of their ends
 
-    // What the decode state held at the end, for who compares plug-ins.
+    // What the decode state held at the end, for programs that compare plug-ins.
     std::uint32_t stateBitsLeft = 0;
     std::uint32_t blockDepth = 0;
     std::uint32_t limitDepth = 0;
@@ -97,7 +97,7 @@ struct Report {
     std::uint32_t decoderId = 0;
     std::array<std::uint32_t, 32> scratch = {};
 
-    // The blocks in which a field stands, from the outside in, joined by `separator`; blocks without a name
+    // The names of the blocks around a field, the outermost first, joined by `separator`. Blocks without a name
     // are left out.
     [[nodiscard]] std::string path(const FieldReport &field, std::string_view separator = "/") const;
 
@@ -111,8 +111,7 @@ struct Report {
     [[nodiscard]] const KeyValue *key(std::string_view name) const;
 };
 
-// Keeps all of one pass in `report`, which has to outlive it. An owner that wants to know what was reported so far
-// looks there.
+// Keeps all of one pass in `report`, which has to outlive it. An owner may read there what was reported so far.
 class ReportSink final : public Sink {
 public:
     explicit ReportSink(Report &report) : report_(report) {}

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// What a pass tells about a packet while it runs, and the class that takes it: the way to write an output.
+// The reports of a pass while it runs, and the class that takes them. An output is such a class.
 //
 //     class Lines final : public netfloor::Sink {
 //     public:
@@ -13,7 +13,7 @@
 //     host.run(netfloor::Pass::md, packet, lines);
 //
 // A view is valid during the call that gives it, with two exceptions: the name of a field of the plug-in's tables and
-// the name of a block stay where they are as long as the Host.
+// the name of a block are valid as long as the Host lives.
 //
 // Bits are numbered as in netfloor/records.h: from 1, and within an octet from the least significant up.
 #pragma once
@@ -35,8 +35,8 @@ enum class Pass : std::uint8_t {
     xtr, // the values of the key fields
 };
 
-// A text that ends with a zero, as the plug-in gives it, or one of known length. The length is found when it is asked
-// for, since many sinks look at a few texts only.
+// A text that ends with a zero, as the plug-in gives it, or one of known length. The length is computed when it is
+// needed, since many sinks use a few texts only.
 class LazyText {
 public:
     LazyText() = default;
@@ -61,18 +61,18 @@ private:
 //
 // `depth` is the depth at which it is shown. It is not the number of blocks that the plug-in has open: a grammar keeps
 // the links of a chain (tunnels, extension headers, chunks, options) open inside one another, and thousands of links
-// would stand thousands of levels deep. The host shows links side by side:
+// would be thousands of levels deep. The host shows links side by side:
 //
 //   - A block of the same name as one that is shown around it takes the place of that one.
 //   - A block is a link if its parent has no field of its own so far and does not begin where the block shown around
-//     it begins. It stands beside the first link under the same limit.
+//     it begins. It is shown beside the first link under the same limit.
 //
 // So the depth never exceeds the number of names that blocks have.
 struct BlockView {
     std::string_view name;      // empty where no field was read directly in the block so far, or where it has none
     std::uint32_t number = 0;   // 0, 1, 2... in the order in which the blocks of this pass were opened
     std::uint32_t firstBit = 0; // where it starts
-    std::uint32_t depth = 0;    // of its name; its fields stand one deeper
+    std::uint32_t depth = 0;    // of its name; its fields are one level deeper
     bool continued = false;     // it was shown before, and another took its place in between
 };
 
@@ -80,9 +80,9 @@ struct BlockView {
 struct FieldView {
     std::uint32_t id = 0;    // 0 for what an owner in the host reported
     std::string_view name;   // as the field tables have it, or as it was reported where they do not know the id
-    bool isKey = false;      // one of the key fields, by which the plug-in says what matters of a packet
+    bool isKey = false;      // one of the key fields, which the XTR pass stores
     LazyText text;           // the display line; may be empty
-    LazyText reportedName;   // letter for letter, leading blanks included
+    LazyText reportedName;   // unchanged, leading blanks included
     std::uint32_t value = 0; // as the field record has it
     std::span<const BitRange> ranges;  // in the order in which they were read; value, firstBit, lastBit count
     std::uint32_t bitOrder = 0;        // 8 where the bits of each octet were read reversed
@@ -90,7 +90,7 @@ struct FieldView {
     std::uint32_t depth = 0;           // blocks that are shown around it
     std::span<const BlockView> blocks; // all that the plug-in has open, the outermost first, nameless ones included
     // What the plug-in wrote into the head of the host's field record: the layer number, then two octets
-    // that are 0, or 0xff where the plug-in left them alone.
+    // that are 0, or 0xff where the plug-in did not write them.
     std::array<std::uint8_t, 3> recordHead = {};
 
     [[nodiscard]] std::uint8_t layerNumber() const { return recordHead[0]; }
@@ -141,7 +141,7 @@ struct HandOff {
     std::uint32_t contextBitsLeft = 0;
     std::uint32_t blockDepth = 0; // blocks and limits open, the bottom elements not counted
     std::uint32_t limitDepth = 0;
-    std::uint32_t nesting = 0;      // how many hand-offs this one stands in
+    std::uint32_t nesting = 0;      // how many hand-offs are around this one
     std::uint32_t consumedBits = 0; // what the owner took
     bool refused = false;           // the owner refused; the pass was cut off
 };
@@ -149,7 +149,7 @@ struct HandOff {
 // MV.
 struct Verdict {
     std::int32_t value = 0;  // 0, or -52 when a flag is set
-    std::uint32_t flags = 0; // NETFLOOR_FLAG_..., see flagNames() in text.h
+    std::uint32_t flags = 0; // NETFLOOR_FLAG_..., see flagNames() in value_text.h
     [[nodiscard]] bool fault() const { return value != 0; }
 };
 
@@ -189,9 +189,9 @@ public:
 
     virtual void begin(Pass /*pass*/, std::span<const std::uint8_t> /*packet*/) {}
 
-    // MD. The calls are brackets: each block that is opened is closed, the last one first, and `depth` of them stand
-    // open when one opens. Each block that has a name and fields of its own is opened in front of the first of them.
-    // It is opened again, `continued`, where a field follows after another block took its place.
+    // MD. Each block that is opened is closed, the last one first, and `depth` blocks are open when one opens. Each
+    // block that has a name and fields of its own is opened before the first of them. It is opened again, with
+    // `continued`, where a field follows after another block took its place.
     virtual void blockOpened(const BlockView & /*block*/) {}
     virtual void blockClosed(const BlockView & /*block*/) {}
     virtual void field(const FieldView & /*field*/) {}

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// For tests of a plug-in, and of nothing else: states set up as no packet needs them, and memory of exact size, so that
-// a memory checker sees each read past the end.
+// For tests of a plug-in, and for nothing else: states with any set-up, also one that no packet needs, and memory of
+// exact size, so that a memory checker sees each read past the end.
 #pragma once
 
 #include <cstddef>
@@ -55,7 +55,7 @@ public:
     PacketState &operator=(const PacketState &) = delete;
 
     // Takes another packet, with all its octets, into the same storage. The working copy may have more room than the
-    // packet needs. What is cleared is what the packet before may have left and the next one may see.
+    // packet needs. Only what the last packet may have left, and the next one may see, is cleared.
     void reset(std::span<const std::uint8_t> packet);
 
     [[nodiscard]] DecodeState &state();

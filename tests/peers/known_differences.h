@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// Where the values part from tshark's, and why. Each row must come to use on the captures.
+// Where the values differ from tshark's, and why. Each row must be used on the captures.
 #pragma once
 
 #include <set>
@@ -10,15 +10,15 @@
 
 namespace netfloor::test {
 
-struct Parting {
+struct KnownDifference {
     std::string_view why;
-    std::vector<std::string_view> peers; // what tshark's names start with
+    std::vector<std::string_view> peers; // how the names of tshark's fields start
     bool (*applies)(const Packet &, const Difference &);
 };
 
 // Whether a header of IPv6 options has more than its first option.
 inline bool optionsGoOn(const Packet &packet) {
-    std::uint32_t optionOctets = 0; // that the lengths of the options headers tell
+    std::uint32_t optionOctets = 0; // by the lengths of the options headers
     for (const FieldReport &field : packet.md.fields) {
         switch (field.id) {
         case 222: optionOctets = field.value * 8 + 6; break;
@@ -43,8 +43,8 @@ inline bool isLaterFragment(const Packet &packet) {
     return packet.value(294).value_or(0) > 0 || packet.value(198).value_or(0) > 0;
 }
 
-inline const std::vector<Parting> partings = {
-    {"a packet that the snap length has cut holds less than its length, and is not read behind it",
+inline const std::vector<KnownDifference> knownDifferences = {
+    {"a packet that the snap length has cut holds less than its length, and is not read past its end",
      {""},
      [](const Packet &packet, const Difference &difference) { return packet.isCut && difference.oursAreFewer(); }},
     {"tshark gives up where the header length is below 5, or the total length below the header length",
@@ -62,7 +62,7 @@ inline const std::vector<Parting> partings = {
          static const std::set<unsigned long> known = {0, 1, 7, 68, 130, 131, 136, 137};
          return difference.oursAreFewer() && !known.contains(difference.firstMissing());
      }},
-    {"behind the last IPv4 option an octet 0 of the payload is read as End of Option List",
+    {"after the last IPv4 option an octet 0 of the payload is read as End of Option List",
      {"ip.opt.type", "icmp."},
      [](const Packet &packet, const Difference &difference) {
          return packet.has(381) &&
@@ -73,10 +73,10 @@ inline const std::vector<Parting> partings = {
      [](const Packet &packet, const Difference &difference) {
          return isLaterFragment(packet) && difference.oursAreMore();
      }},
-    {"behind the addresses of the header that an ICMP message quotes the octets are one field",
+    {"after the addresses of the header that an ICMP message quotes, the octets are one field",
      {"icmp.", "udp.", "tcp.", "sctp."},
      [](const Packet &packet, const Difference &difference) { return packet.has(605) && difference.oursAreFewer(); }},
-    {"an ICMP message with one code only is not read with another",
+    {"an ICMP message that has one code only is not read with another",
      {"icmp."},
      [](const Packet &packet, const Difference &difference) {
          return packet.md.fields.back().id == 537 && difference.oursAreFewer();
@@ -100,10 +100,10 @@ inline const std::vector<Parting> partings = {
          static const std::set<unsigned long> known = {0, 1, 2, 3, 4, 5, 8, 19};
          return difference.oursAreFewer() && !known.contains(difference.firstMissing());
      }},
-    {"End of Option List is an option like the others, and those behind it are read",
+    {"End of Option List is an option like the others, and those after it are read",
      {"tcp.option"},
      [](const Packet &packet, const Difference &difference) { return packet.has(441) && difference.oursAreMore(); }},
-    {"behind the first option of an IPv6 header the next header is looked for",
+    {"the octets after the first option of an IPv6 header are read as the next header",
      {"ipv6.opt.", "ipv6.dstopts.", "ipv6.routing.", "ah.", "icmpv6.", "udp.", "tcp."},
      [](const Packet &packet, const Difference &) { return optionsGoOn(packet); }},
     {"a routing header of an unknown type with segments left ends the chain",
@@ -135,7 +135,7 @@ inline const std::vector<Parting> partings = {
      [](const Packet &packet, const Difference &difference) {
          return packet.value(247).value_or(0) > 129 && difference.oursAreFewer();
      }},
-    {"the padding behind an SCTP parameter is read as the type of the next one",
+    {"the padding after an SCTP parameter is read as the type of the next one",
      {"sctp.parameter_type"},
      [](const Packet &packet, const Difference &difference) {
          return packet.any([](const FieldReport &field) { return field.id == 848 && field.value % 4 != 0; }) &&

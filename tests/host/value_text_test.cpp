@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// Results in words: addresses, flags, key fields.
+// Values as text: addresses, flags, key fields.
 #include <cstdint>
 #include <numeric>
 #include <string>
@@ -42,7 +42,7 @@ TEST(Text, showsIpv6AddressesAsRfc5952Asks) {
     EXPECT_EQ(ipv4Text(0xffffffff), "255.255.255.255");
 }
 
-// `count` ranges of `bits` bits, one behind the other.
+// `count` ranges of `bits` bits, one after the other.
 FieldReport fieldOf(std::uint32_t firstBit, std::uint32_t count, std::uint32_t bits) {
     FieldReport field;
     for (std::uint32_t i = 0; i < count; ++i) {
@@ -64,14 +64,14 @@ TEST(Text, findsIpv6AddressesByTheirRanges) {
     EXPECT_EQ(ipv6Address(fieldOf(17, 1, 32), packet), std::nullopt);
     EXPECT_EQ(ipv6Address(fieldOf(17, 0, 0), packet), std::nullopt);
     EXPECT_EQ(ipv6Address(fieldOf(20, 1, 128), packet), std::nullopt) << "off an octet border";
-    EXPECT_EQ(ipv6Address(fieldOf(41, 1, 128), packet), std::nullopt) << "behind the packet's end";
+    EXPECT_EQ(ipv6Address(fieldOf(41, 1, 128), packet), std::nullopt) << "past the packet's end";
     FieldReport scattered = fieldOf(17, 8, 16);
     scattered.ranges[3].firstBit += 16;
     scattered.ranges[3].lastBit += 16;
     EXPECT_EQ(ipv6Address(scattered, packet), std::nullopt);
 }
 
-// What the plug-in shows as groups in its own digit order, and stores with exchanged nibbles.
+// The plug-in shows the addresses as groups in its own digit order, and stores them with exchanged nibbles.
 TEST(Text, showsTheAddressesOfAnIpv6Packet) {
     Host host(PluginLibrary::open(NETFLOOR_PLUGIN));
     const Octets packet = ipv6({.nextHeader = 17, .payload = udp(40000, 40001)});

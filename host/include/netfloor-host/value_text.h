@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// Results in words.
+// Values as text: addresses, key fields, flags, passes.
 #pragma once
 
 #include <array>
@@ -16,7 +16,7 @@ namespace netfloor {
 
 using Ipv6Octets = std::array<std::uint8_t, 16>;
 
-// The bits of DecodeState::flags in words, the lowest first; a bit without a name as "flag 0x...".
+// A text for each flag set in DecodeState::flags, the lowest first; "flag 0x..." for a flag without a name.
 [[nodiscard]] std::vector<std::string> flagNames(std::uint32_t flags);
 
 // "MD", "TO", "MV", "XTR".
@@ -26,13 +26,13 @@ using Ipv6Octets = std::array<std::uint8_t, 16>;
 [[nodiscard]] std::string ipv6Text(const Ipv6Octets &octets);
 [[nodiscard]] std::string ipv4Text(std::uint32_t address);
 
-// The IPv6 address that a field stands on, taken from the packet by the field's bit ranges, or none when the
-// field is no IPv6 address: it is one if its ranges are one stretch of 128 bits, 8 groups of 16 bits or 32
-// nibbles, one after the other on octet borders.
+// The IPv6 address of a field, taken from the packet by the field's bit ranges. None when the field is no IPv6
+// address: it is one if its ranges are 128 bits in one piece, 8 groups of 16 bits or 32 nibbles, follow one another
+// without a gap, and start on an octet border.
 [[nodiscard]] std::optional<Ipv6Octets> ipv6Address(const FieldReport &field, std::span<const std::uint8_t> packet);
 [[nodiscard]] std::optional<Ipv6Octets> ipv6Address(const FieldView &field, std::span<const std::uint8_t> packet);
 
-// The IPv6 address of a key field, its nibbles put back in order, or none when the key field holds no address.
+// The IPv6 address of a key field, with its nibbles in their usual order. None when the key field holds no address.
 [[nodiscard]] std::optional<Ipv6Octets> ipv6Address(const KeyView &key);
 
 // The value of a key field in its usual form: a decimal number, or an address.

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-#include "netfloor-host/text.h"
+#include "netfloor-host/value_text.h"
 
 #include <algorithm>
 #include <charconv>
@@ -73,14 +73,14 @@ std::string joinGroups(const Groups &groups, std::size_t first, std::size_t end)
     return text;
 }
 
-// The bits of a field whose ranges lie one behind the other.
-struct Stretch {
+// The bits of a field whose ranges follow one another without a gap.
+struct ContiguousBits {
     std::uint32_t firstBit;
     std::uint32_t bits;
 };
 
 template <typename Range>
-std::optional<Stretch> stretchOf(std::span<const Range> ranges, std::uint32_t bitsEach) {
+std::optional<ContiguousBits> contiguousBits(std::span<const Range> ranges, std::uint32_t bitsEach) {
     const std::uint32_t firstBit = ranges.front().firstBit;
     std::uint32_t next = firstBit;
     for (const Range &range : ranges) {
@@ -89,7 +89,7 @@ std::optional<Stretch> stretchOf(std::span<const Range> ranges, std::uint32_t bi
         }
         next = range.lastBit + 1;
     }
-    return Stretch{firstBit, next - firstBit};
+    return ContiguousBits{firstBit, next - firstBit};
 }
 
 // The bits in each range of a field that is an address of so many ranges, or 0.
@@ -109,11 +109,11 @@ std::optional<Ipv6Octets> addressOf(std::span<const Range> ranges, std::span<con
     if (bitsEach == 0) {
         return std::nullopt;
     }
-    const std::optional<Stretch> stretch = stretchOf(ranges, bitsEach);
-    if (!stretch || (stretch->firstBit - 1) % bitsPerOctet != 0) {
+    const std::optional<ContiguousBits> bits = contiguousBits(ranges, bitsEach);
+    if (!bits || (bits->firstBit - 1) % bitsPerOctet != 0) {
         return std::nullopt;
     }
-    const std::size_t first = (stretch->firstBit - 1) / bitsPerOctet;
+    const std::size_t first = (bits->firstBit - 1) / bitsPerOctet;
     Ipv6Octets octets = {};
     if (first > packet.size() || packet.size() - first < octets.size()) {
         return std::nullopt;
