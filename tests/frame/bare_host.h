@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// A host that shows everything: the records as the plug-in left them, the state that the host could see at each call,
-// and a key record in which every stray store shows.
+// A host that hides nothing: the records as the plug-in left them, what the host could see at each call, and a
+// key record of a form in which every stray store shows.
 #pragma once
 
 #include <array>
@@ -16,13 +16,8 @@
 
 namespace netfloor::test {
 
-<<<<<<< HEAD
 // A plug-in with statics of its own, whose questions for the key-field set-up the test answers: with the results
 // in turn, the last of them for good. A presence row past the table stands for its last row.
-=======
-// A plug-in with statics of its own. The test answers its key-field set-up: each call gets the next result, and calls
-// after the last one repeat it.
->>>>>>> words
 class BarePlugin final : public standin::KeyOptions {
 public:
     explicit BarePlugin(std::vector<std::int32_t> results = {1}, std::uint16_t presenceRow = 0);
@@ -32,7 +27,7 @@ public:
     PluginLibrary library;
     std::uint32_t calls = 0;
     std::uint32_t rowCount = 0;
-    std::vector<KeyFieldRow> tableAtLoad; // as the plug-in gave it
+    std::vector<KeyFieldRow> tableAtLoad; // as the plug-in handed it over
 
 private:
     std::vector<std::int32_t> results_;
@@ -42,7 +37,7 @@ private:
 // One for all tests in which the key-field set-up succeeds.
 [[nodiscard]] BarePlugin &sharedBarePlugin();
 
-// Row r of the key record: a presence octet, in which bits of other rows are set, and eight octets for the value.
+// Row r of the key record: a presence octet, which has a bit of another's in it, and eight octets for the value.
 struct KeyRoom {
     static constexpr std::size_t rows = 160; // or fewer
     static constexpr std::uint8_t othersPresence = 0x41;
@@ -56,7 +51,7 @@ struct KeyRoom {
 
     std::array<std::uint8_t, rows> presence;
     std::array<std::array<std::uint8_t, 8>, rows> values;
-    std::array<std::uint8_t, 4096> addresses = {}; // room for IPv6 addresses, where the context gives it
+    std::array<std::uint8_t, 4096> addresses = {}; // of IPv6, for whom the context says so
 };
 
 // What the host could see during one call of the MD or TO output.
@@ -87,7 +82,7 @@ public:
     PreDecodeContext &context() { return record_.context; }
     [[nodiscard]] std::uint32_t contextBitsLeft(Pass pass) const;
 
-    // The rows whose presence bit is set with the octets stored, "7=01", and rows with stray octets.
+    // The rows that are present and the octets stored, "7=01", and what was stored where it must not be.
     [[nodiscard]] std::string keyText() const;
 
     XtrContext xtr = {};

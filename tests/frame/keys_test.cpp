@@ -15,12 +15,8 @@
 namespace netfloor::test {
 namespace {
 
-<<<<<<< HEAD
 // The names of the rows, in the order in which a host finds them, each with a bar after it. Rows of new fields follow,
 // and a last one without a name.
-=======
-// The names of all 113 rows, in the order in which a host finds them, each with a bar after it.
->>>>>>> words
 constexpr std::string_view names =
     "Version|Total Length|Identification|Time to Live|Protocol|Source Address|Destination Address|DF|MF|"
     "Fragment Offset|IP Address|ICMP Message Type|ICMP Message Type|ICMP Message Type|Code|ICMP Sequence Number|"
@@ -60,7 +56,7 @@ TEST(KeyTable, isHandedToTheHost) {
     EXPECT_TRUE(found.ends_with("||") && found.find("||") == found.size() - 2) << found;
 }
 
-// A value takes the octets of its field's width and no more; other presence bits in the octet stay.
+// A value takes the octets of its field's width and no more; other marks in a presence octet stay.
 TEST(KeyRecord, holdsTheFieldsOfAPacket) {
     BareRun run(examplePacket());
     EXPECT_EQ(run.enter(Pass::xtr), 1);
@@ -73,7 +69,7 @@ TEST(KeyRecord, isFilledAsFarAsThePacketGoes) {
     const std::string all = exampleKeys;
     struct Case {
         std::size_t octets;
-        const char *nextRow; // the first that is missing
+        const char *nextRow; // the first that is not there
     };
     for (const Case &cut : {Case{0, "0="}, Case{1, "1="}, Case{3, "1="}, Case{4, "2="}, Case{39, "2="}}) {
         BareRun run(Octets(examplePacket().begin(), examplePacket().begin() + static_cast<std::ptrdiff_t>(cut.octets)));
@@ -98,7 +94,7 @@ Octets packetOfMostAddresses() {
     return ipv6({.nextHeader = 43, .payload = payload});
 }
 
-// How far one packet writes where the host gives all the room that a context can hold.
+// How far one packet writes into the area of a host that sets no end to it.
 TEST(KeyRecord, reachOfTheAddressesOfAPacket) {
     const Octets packet = packetOfMostAddresses();
     const struct {
@@ -128,10 +124,10 @@ struct SetUpCase {
     std::uint16_t presenceRow;
     std::vector<std::int32_t> results;    // of one entry after another
     std::vector<std::uint32_t> callsThen; // of the set-up, after each entry
-    std::string present;                  // rows in the record of a packet without fields
+    std::string present;                  // in the record of a packet without fields
 };
 
-// A refusal is final, and so is ready. After not ready the plug-in asks again.
+// Refused once is refused for good, and so is ready; not ready is asked again.
 TEST(KeyTable, isSetUpUntilItIsDone) {
     constexpr std::int32_t lowest = std::numeric_limits<std::int32_t>::min();
     const std::vector<SetUpCase> cases = {
@@ -159,23 +155,15 @@ TEST(KeyTable, isSetUpUntilItIsDone) {
                 EXPECT_EQ(run.xtr.bitsLeft, 0xeeeeeeeeu);
                 continue;
             }
-<<<<<<< HEAD
             const std::string ofLastRow =
                 setUp.presenceRow == lastRow ? std::to_string(plugin.rowCount - 1) + "=\n" : "";
             EXPECT_EQ(run.keyText(), exampleKeys + ofLastRow);
-=======
-            EXPECT_EQ(run.keyText(), exampleKeys + std::string(setUp.presenceRow == 112 ? setUp.present : ""));
->>>>>>> words
             if (plugin.calls < setUp.callsThen.back()) {
                 continue;
             }
             BareRun empty({}, {}, plugin);
             EXPECT_EQ(empty.enter(Pass::xtr), 1);
-<<<<<<< HEAD
-            EXPECT_EQ(empty.keyText(), setUp.marked + ofLastRow);
-=======
-            EXPECT_EQ(empty.keyText(), setUp.present);
->>>>>>> words
+            EXPECT_EQ(empty.keyText(), setUp.present + ofLastRow);
         }
         BareRun other(examplePacket(), {}, plugin); // only the XTR pass asks
         EXPECT_EQ(other.enter(Pass::md), 1);

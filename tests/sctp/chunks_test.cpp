@@ -202,16 +202,16 @@ TEST(SctpChunk, everyFieldInEveryPass) {
             813 |8 Reserved chunks| "    Reserved contents" "    Reserved contents=ab00" 289-312/8)",
          R"(823 "0x10"; 808 "7"; 813 "ab00")", ""},
     };
-    const auto behindType = [](const std::string &text, const char *type) {
+    const auto afterType = [](const std::string &text, const char *type) {
         const std::string rest = linesFrom(text, type);
         return rest.substr(rest.find('\n') + 1);
     };
     for (const Body &body : bodies) {
         SCOPED_TRACE(body.chunk);
         const Runs runs = runAll(sctp(hex(body.chunk)));
-        EXPECT_EQ(behindType(lines(runs.md), "802"), expected(body.md));
-        EXPECT_EQ(oneLine(behindType(lines(runs.to), "802")), body.to);
-        EXPECT_EQ(behindType(lines(runs.xtr), "row 86"), expected(body.keys));
+        EXPECT_EQ(afterType(lines(runs.md), "802"), expected(body.md));
+        EXPECT_EQ(oneLine(afterType(lines(runs.to), "802")), body.to);
+        EXPECT_EQ(afterType(lines(runs.xtr), "row 86"), expected(body.keys));
         EXPECT_EQ(runs.mv.flags, 0u);
     }
 }
