@@ -15,6 +15,12 @@
 
 #include "records.h"
 
+/*
+ * The number of this boundary: its records, exports and imports. It rises with each change after which a host and a
+ * plug-in that were compiled against different headers no longer fit each other.
+ */
+#define NETFLOOR_BOUNDARY_ABI 1
+
 /* The calling convention of the boundary: cdecl. Only Windows compilers need the keyword. */
 #if defined(_WIN32) && !defined(_WIN64)
 #define NETFLOOR_CDECL __cdecl
