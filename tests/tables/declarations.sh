@@ -100,4 +100,22 @@ reading newField | wrong "stands in no list" "tables/catalogue.h" "newField"
 reading udp::length >"$work/case.cpp"
 compile || fail "a sound field does not compile"
 
+# The example of the page about new protocols, read by a pass.
+{
+    awk '/^```/ { if (inside) exit; inside = 1; next } inside' "$plugin/../docs/adding-a-protocol.md"
+    cat <<'EOF'
+#include "entries/grammar.h"
+#include "frame/passes.h"
+namespace netfloor::plugin {
+using ExampleRows = probe::PacketRows;
+static_assert(sizeof(CheckedCatalogue<ExampleRows::Fields, ExampleRows::Keys>) > 0);
+struct ExampleGrammar : Grammar {
+    using Fields = ExampleRows::Fields;
+};
+void readExample(Reader<MvPass<ExampleGrammar>> &reader) { probe::packet(reader); }
+}
+EOF
+} >"$work/case.cpp"
+compile || fail "the example of docs/adding-a-protocol.md does not compile"
+
 [ $failures -eq 0 ]
