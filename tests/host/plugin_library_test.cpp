@@ -150,7 +150,7 @@ TEST(PluginLibrary, setsUpKeysOncePerLoad) {
         }
         EXPECT_EQ(host.library().keySetUpCalls(), calls);
         EXPECT_EQ(report.keys.size(), keysAtLast);
-        EXPECT_EQ(host.library().keyFieldNames().size(), results.back() < 0 ? 0U : 113U);
+        EXPECT_EQ(host.library().keyFieldNames().empty(), results.back() < 0);
     }
 }
 
