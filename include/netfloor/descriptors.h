@@ -46,7 +46,7 @@ enum {
 #define NETFLOOR_TABLE_UNKNOWN 0xd0410001u
 
 /* The ends of the tables. */
-#define NETFLOOR_LAST_FIELD "$_$LAST_FIELD_$_$"
+#define NETFLOOR_LAST_FIELD "$_$LAST_FIELD$_$"
 #define NETFLOOR_LAST_TEXT "$$_FINAL_STRING_$$"
 #define NETFLOOR_NO_FIELD 0xffffffffu
 

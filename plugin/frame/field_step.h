@@ -26,13 +26,17 @@ NETFLOOR_INLINE inline void store(Store &into, std::uint32_t value) {
 template <const Field &field>
 inline constexpr std::uint32_t neededBits = field.place.needs(field.place.count);
 
-// Whether the bits of a field are there. A field that is not tested needs them in the packet only; where they
-// are not all there it is not reported either, and clears the live flag like any other.
+// Whether the bits of a field are there, which the condition then tells. A field that is not tested needs them in the
+// packet only, and leaves the condition; where they are not all there it does not fit, like any other.
 template <const Field &field, class Pass>
 [[nodiscard]] NETFLOOR_INLINE inline bool fits(Reader<Pass> &reader, std::uint32_t units) {
     constexpr const Place &place = field.place;
     if constexpr (!place.isTested()) {
-        return reader.cursor + neededBits<field> <= reader.state->totalBits + 1;
+        const bool inPacket = reader.cursor + neededBits<field> <= reader.state->totalBits + 1;
+        if (!inPacket) {
+            reader.setCondition(false);
+        }
+        return inPacket;
     }
     const std::uint32_t needs = place.isRun() ? place.needs(units) : neededBits<field>;
     reader.setCondition(reader.left >= needs);

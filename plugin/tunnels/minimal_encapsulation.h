@@ -20,6 +20,7 @@
 #include "frame/field.h"
 #include "frame/field_list.h"
 #include "frame/field_step.h"
+#include "ipv4/options.h"
 #include "names/ip_protocols.h"
 
 namespace netfloor::plugin::minimal {
@@ -60,7 +61,8 @@ NETFLOOR_INLINE inline void header(Reader<Pass> &reader) {
         variables.ipTotalLength -= sourceAddressOctets;
         read<sourceAddress>(reader);
     }
-    // The options of the outer header come before the forwarding header: what follows here is the payload.
+    // The options of the header around it stand before the forwarding header, which has none of its own.
+    ipv4::options(reader, 0);
     if (reader.live) {
         variables.payloadOctets = static_cast<std::int32_t>(variables.ipTotalLength - variables.ipHeaderOctets);
     }

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: MIT
 // The field step: what the host can see at each call, and what remains after a run.
 #include <algorithm>
+#include <cstddef>
 #include <string>
 #include <vector>
 
@@ -138,6 +139,26 @@ TEST(FieldStep, fieldThatDoesNotFitLeavesTheRecord) {
             EXPECT_EQ(run.contextBitsLeft(pass), bits);
             EXPECT_EQ(run.state().flags, 0u);
             EXPECT_TRUE(run.seen.empty());
+        }
+    }
+}
+
+// Where a field without a test of the bits left lies past the packet, it is a field that does not fit.
+TEST(FieldStep, fieldPastThePacketClearsTheCondition) {
+    const std::vector<Octets> cases = {
+        hex("60 00 00 00 00 00 3b 40 01 02 03 04 05 06 07 08 09 0a 0b 0c 0d 0e 0f 10 11 12 13 14 15 16 17 18"
+            "19 1a 1b 1c 1d 1e"),                             // two octets of the destination are missing
+        ipv6({.nextHeader = 43, .payload = hex("3b 00")}),    // routing type
+        ipv6({.nextHeader = 0, .payload = hex("3b 00 ")}),    // option type
+        ipv6({.nextHeader = 43, .payload = hex("3b 00 01")}), // segments left
+    };
+    for (const Octets &packet : cases) {
+        for (const Pass pass : allPasses) {
+            BareRun run(packet, seeded());
+            run.xtr.byteAreaOffset = offsetof(KeyRoom, addresses);
+            run.xtr.byteAreaSize = sizeof run.keys.addresses;
+            EXPECT_EQ(run.enter(pass), 1);
+            EXPECT_EQ(run.state().condition, 0) << passName(pass) << " over " << hexText(packet);
         }
     }
 }

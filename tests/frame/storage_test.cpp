@@ -132,5 +132,25 @@ TEST(Storage, layerFramesHaveRoomForOneMore) {
     }
 }
 
+// A forwarding header of minimal encapsulation has no options, and opens their block all the same: it is the seventh
+// on the stack.
+TEST(Storage, minimalEncapsulationOpensTheBlockOfOptions) {
+    const Octets packet = ipv4({.protocol = 55, .payload = hex("11 00 00 00 c0 00 02 01") + udp(53, 40000, hex("61*8"))});
+    for (const Pass pass : allPasses) {
+        StateOptions options;
+        BareRun *current = nullptr;
+        std::vector<std::string> blocks;
+        options.blockCapacity = 6;
+        options.allowGrowth = [&](std::size_t) {
+            blocks.emplace_back(current->state().blockName);
+            return true;
+        };
+        BareRun run(packet, options);
+        current = &run;
+        EXPECT_EQ(run.enter(pass), 1);
+        EXPECT_EQ(blocks.empty() ? "none" : blocks.front(), "Options") << passName(pass);
+    }
+}
+
 } // namespace
 } // namespace netfloor::test

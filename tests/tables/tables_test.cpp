@@ -164,7 +164,7 @@ TEST(FieldTable, hasItsRowsInEveryWord) {
     const auto &end = reinterpret_cast<const FieldTableEnd &>(tables().fields[tables().fieldCount]);
     EXPECT_EQ(end.flags, 0xffffffffU);
     EXPECT_EQ(end.fieldId, 0xffffU);
-    EXPECT_STREQ(end.marker, "$_$LAST_FIELD_$_$");
+    EXPECT_STREQ(end.marker, "$_$LAST_FIELD$_$");
     EXPECT_EQ((std::vector<std::uintptr_t>{end.words[0], end.words[1], end.counts[0], end.counts[1], end.width}),
               (std::vector<std::uintptr_t>{0, 0xffff, 0xffff, 0xffff, 0xffffffff}));
     EXPECT_TRUE(std::ranges::all_of(end.zero, [](std::uint32_t word) { return word == 0; }));
