@@ -96,6 +96,7 @@ inline constexpr std::string_view shortText = field.shortText == asInLine ? valu
 // Fails to compile where a declaration contradicts itself. The field stands in the compiler's message.
 template <const Field &field>
 struct RequireConsistent {
+    static constexpr bool holds = true;
     static constexpr const Place &place = field.place;
     static constexpr Format line = parseFormat(longText<field>);
     static constexpr Format brief = parseFormat(shortText<field>);
@@ -108,9 +109,8 @@ struct RequireConsistent {
     static_assert(place.mostUnits == 0 || place.isRun(), "only a run has a greatest length: take away atMost()");
     static_assert(place.shape != Shape::ahead || place.advance == 0,
                   "a field that is read ahead leaves the cursor where it is: take away advancing()");
-    static_assert(line.wellFormed,
-                  "the line holds a conversion that is none of %n %u %x %c %-S %-s %-[\"%x\":\"sep\"]");
-    static_assert(brief.wellFormed, "the short text holds a conversion that is none of %u %x %c %-S %-s %-[\"%x\"]");
+    static_assert(line.wellFormed, R"(the line holds a conversion that is none of %n %u %x %c %-S %-s %-["%x":"sep"])");
+    static_assert(brief.wellFormed, R"(the short text holds a conversion that is none of %u %x %c %-S %-s %-["%x"])");
     static_assert(field.tableName().empty() || field.line.find(field.tableName()) == std::string_view::npos ||
                       field.line.find(nameInLine) != std::string_view::npos,
                   "the line repeats the field's name: write %n");
@@ -125,9 +125,9 @@ struct RequireConsistent {
     static_assert(hasElements || (!line.has(Conversion::list) && !brief.has(Conversion::list)),
                   "a text lists elements (%-[...]) of a field that has one: show its value instead");
     static_assert(!line.has(Conversion::list) || line.element != Conversion::none,
-                  "the list in the line does not say how an element is shown: write %-[\"%u\"] or the like");
+                  R"(the list in the line does not say how an element is shown: write %-["%u"] or the like)");
     static_assert(!brief.has(Conversion::list) || brief.element != Conversion::none,
-                  "the list in the short text does not say how an element is shown: write %-[\"%u\"] or the like");
+                  R"(the list in the short text does not say how an element is shown: write %-["%u"] or the like)");
 };
 
 } // namespace netfloor::plugin

@@ -92,6 +92,7 @@ template <class List>
 // Fails to compile where two fields share an id. The two stand in the compiler's message.
 template <const Field &first, const Field &second>
 struct RequireDistinctIds {
+    static constexpr bool holds = true;
     static_assert(first.id != second.id || &first == &second,
                   "two fields share an id, or one field is listed twice: give one of them an id of its own");
 };
@@ -99,6 +100,7 @@ struct RequireDistinctIds {
 // Fails to compile where a key field is no field of the catalogue. The field stands in the compiler's message.
 template <const Field &field, class Catalogue>
 struct RequireFieldOfKey {
+    static constexpr bool holds = true;
     static_assert(isListed<Catalogue, field>,
                   "a key row has no field: add the field to the Fields of its protocol, or take the row away");
 };
@@ -125,19 +127,20 @@ template <const Field &...fields>
 // What must hold of a catalogue: consistent declarations, each id once, and a field for each key row.
 template <class Fields, class Keys>
 struct CheckedCatalogue {
+    static constexpr bool holds = true;
     static constexpr SharedId shared = findSharedId(Fields{});
     static_assert(shared.second == 0 ||
-                  sizeof(RequireDistinctIds<*Fields::pointers[shared.first], *Fields::pointers[shared.second]>) > 0);
+                  RequireDistinctIds<*Fields::pointers[shared.first], *Fields::pointers[shared.second]>::holds);
 
     template <const Field &...fields>
     static consteval bool areConsistent(FieldList<fields...>) {
-        return ((sizeof(RequireConsistent<fields>) > 0) && ...);
+        return (RequireConsistent<fields>::holds && ...);
     }
     static_assert(areConsistent(Fields{}));
 
     template <const Field &...keys>
     static consteval bool keysHaveFields(FieldList<keys...>) {
-        return ((sizeof(RequireFieldOfKey<keys, Fields>) > 0) && ...);
+        return (RequireFieldOfKey<keys, Fields>::holds && ...);
     }
     static_assert(keysHaveFields(Keys{}));
 };

@@ -18,7 +18,7 @@
 namespace netfloor::plugin {
 
 // Checked here, as this file is compiled once.
-static_assert(sizeof(CheckedCatalogue<CatalogueFields, CatalogueKeys>) > 0);
+static_assert(CheckedCatalogue<CatalogueFields, CatalogueKeys>::holds);
 
 // The highest octet of a field's flags.
 inline constexpr std::uint32_t usualTopOctet = 5;

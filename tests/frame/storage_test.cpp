@@ -135,7 +135,8 @@ TEST(Storage, layerFramesHaveRoomForOneMore) {
 // A forwarding header of minimal encapsulation has no options, and opens their block all the same: it is the seventh
 // on the stack.
 TEST(Storage, minimalEncapsulationOpensTheBlockOfOptions) {
-    const Octets packet = ipv4({.protocol = 55, .payload = hex("11 00 00 00 c0 00 02 01") + udp(53, 40000, hex("61*8"))});
+    const Octets packet =
+        ipv4({.protocol = 55, .payload = hex("11 00 00 00 c0 00 02 01") + udp(53, 40000, hex("61*8"))});
     for (const Pass pass : allPasses) {
         StateOptions options;
         BareRun *current = nullptr;

@@ -44,7 +44,7 @@ inline constexpr std::array sound = {ValueName{1, "one"}, ValueName{2, "two"}};
 inline constexpr ValueNames descending{rows};
 inline constexpr ValueNames names{sound};
 inline constexpr Field myField{9001, "My Field", $2};
-static_assert(sizeof(RequireConsistent<myField>) > 0);
+static_assert(RequireConsistent<myField>::holds);
 }
 EOF
 }
@@ -71,7 +71,7 @@ namespace netfloor::plugin {
 inline constexpr Field firstField{9001, "First", octets(1), "%n=%u"};
 inline constexpr Field otherField{9002, "Other", octets(1), "%n=%u"};
 inline constexpr Field secondField{9001, "Second", octets(1), "%n=%u"};
-static_assert(sizeof(CheckedCatalogue<FieldList<firstField, otherField, secondField>, FieldList<>>) > 0);
+static_assert(CheckedCatalogue<FieldList<firstField, otherField, secondField>, FieldList<>>::holds);
 }
 EOF
 
@@ -80,7 +80,7 @@ wrong "a key row has no field" "strayField" <<'EOF'
 namespace netfloor::plugin {
 inline constexpr Field listedField{9001, "Listed", octets(1), "%n=%u"};
 inline constexpr Field strayField{9002, "Stray", octets(1), "%n=%u"};
-static_assert(sizeof(CheckedCatalogue<FieldList<listedField>, FieldList<listedField, strayField>>) > 0);
+static_assert(CheckedCatalogue<FieldList<listedField>, FieldList<listedField, strayField>>::holds);
 }
 EOF
 
@@ -108,7 +108,7 @@ compile || fail "a sound field does not compile"
 #include "frame/passes.h"
 namespace netfloor::plugin {
 using ExampleRows = probe::PacketRows;
-static_assert(sizeof(CheckedCatalogue<ExampleRows::Fields, ExampleRows::Keys>) > 0);
+static_assert(CheckedCatalogue<ExampleRows::Fields, ExampleRows::Keys>::holds);
 struct ExampleGrammar : Grammar {
     using Fields = ExampleRows::Fields;
 };
