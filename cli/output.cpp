@@ -1,8 +1,9 @@
 // SPDX-License-Identifier: MIT
 #include "output.h"
 
+#include <array>
 #include <cerrno>
-#include <cstring>
+#include <string>
 
 #include <unistd.h>
 
@@ -10,7 +11,7 @@ namespace netfloor::cli {
 
 namespace {
 
-constexpr std::size_t flushOctets = std::size_t{64} * 1024;
+constexpr std::string_view digits = "0123456789abcdef";
 
 constexpr std::string_view startOf(Style style) {
     switch (style) {
@@ -24,45 +25,73 @@ constexpr std::string_view startOf(Style style) {
     return "";
 }
 
-} // namespace
-
-void Output::untrusted(std::string_view text) {
-    constexpr std::string_view digits = "0123456789abcdef";
-    for (const char character : text) {
-        const auto octet = static_cast<unsigned char>(character);
-        if (octet >= 0x20 && octet < 0x7f) {
-            buffer_ += character;
-        } else {
-            buffer_ += {'\\', 'x', digits[octet >> 4U], digits[octet & 0xfU]};
-        }
-    }
+constexpr bool isPrintable(unsigned char octet) {
+    return octet >= 0x20 && octet < 0x7f;
 }
 
-void Output::styled(Style style, std::string_view text) {
-    if (!colour_ || style == Style::plain) {
-        buffer_ += text;
-        return;
+// Whether all of eight characters are printable: none is below a blank, none is DEL, none has its top bit set. The
+// subtraction borrows only from where the answer is no already.
+bool areEightPrintable(const char *text) {
+    constexpr std::uint64_t ones = 0x0101010101010101;
+    std::uint64_t word = 0;
+    std::memcpy(&word, text, sizeof word);
+    const std::uint64_t tooSmall = word - ones * 0x20;
+    const std::uint64_t tooLarge = word + ones;
+    return ((word | tooSmall | tooLarge) & ones * 0x80) == 0;
+}
+
+} // namespace
+
+void Output::octet(std::uint8_t octet) {
+    char *const to = room(2);
+    to[0] = digits[octet >> 4U];
+    to[1] = digits[octet & 0xfU];
+    size_ += 2;
+}
+
+void Output::untrusted(std::string_view text) {
+    constexpr std::size_t step = 8;
+    constexpr std::size_t mostEach = 4; // \x1b
+    char *to = room(text.size() * mostEach + step);
+    while (!text.empty()) {
+        if (text.size() >= step && areEightPrintable(text.data())) {
+            std::memcpy(to, text.data(), step);
+            to += step;
+            text.remove_prefix(step);
+            continue;
+        }
+        const auto octet = static_cast<unsigned char>(text.front());
+        text.remove_prefix(1);
+        if (isPrintable(octet)) {
+            *to++ = static_cast<char>(octet);
+            continue;
+        }
+        for (const char character : {'\\', 'x', digits[octet >> 4U], digits[octet & 0xfU]}) {
+            *to++ = character;
+        }
     }
-    buffer_ += startOf(style);
-    buffer_ += text;
-    buffer_ += "\x1b[0m";
+    advanceTo(to);
+}
+
+Output &Output::startStyle(Style style) {
+    return *this << startOf(style);
 }
 
 void Output::rightAligned(std::string_view text, std::size_t width) {
     if (text.size() < width) {
         blanks(width - text.size());
     }
-    buffer_ += text;
+    *this << text;
 }
 
-void Output::endPacket() {
-    if (eachPacket_ || buffer_.size() >= flushOctets) {
-        flush();
-    }
+void Output::rightAligned(std::uint64_t number, std::size_t width) {
+    std::array<char, mostDigits> text;
+    const char *const end = std::to_chars(text.data(), text.data() + text.size(), number).ptr;
+    rightAligned(std::string_view(text.data(), end), width);
 }
 
 void Output::flush() {
-    std::string_view rest = buffer_;
+    std::string_view rest(buffer_.data(), size_);
     while (!rest.empty()) {
         const ssize_t written = ::write(STDOUT_FILENO, rest.data(), rest.size());
         if (written >= 0) {
@@ -73,7 +102,7 @@ void Output::flush() {
             throw OutputError(std::string("the output cannot be written: ") + std::strerror(errno) + ".");
         }
     }
-    buffer_.clear();
+    size_ = 0;
 }
 
 } // namespace netfloor::cli

@@ -44,6 +44,7 @@ Ending PacketRun::run(Pass pass, std::span<const std::uint8_t> packet, const Own
     pass_ = pass;
     owners_ = &owners;
     sink_ = &sink;
+    withBlocks_ = pass == Pass::md && sink.wantsBlocks();
     options_ = options;
     prepare(packet, test);
     sink.begin(pass, packet);
@@ -193,10 +194,9 @@ void PacketRun::addField(std::uint32_t outputRangeCount, const BitRange *ranges,
     }
     try {
         NamedField &field = names_.find(fieldId);
-        blocks_.moveTo(state(), field, *sink_);
         const std::uint8_t *const head = fieldRecordHead();
         const LazyText reportedName(fieldName);
-        sink_->field({
+        FieldView view = {
             .id = fieldId,
             .name = field.isKnown ? field.name : withoutLeadingBlanks(reportedName.view()),
             .isKey = field.isKey,
@@ -205,11 +205,9 @@ void PacketRun::addField(std::uint32_t outputRangeCount, const BitRange *ranges,
             .value = state().fieldRecord.value,
             .ranges = {ranges, outputRangeCount},
             .bitOrder = bitOrder,
-            .flags = state().flags,
-            .depth = blocks_.shownDepth(),
-            .blocks = blocks_.open(),
             .recordHead = {head[0], head[1], head[2]},
-        });
+        };
+        reportField(view, field);
         preDecode_.context.fieldRecordCount = (preDecode_.context.fieldRecordCount + 1) % fieldRecordCount;
         markFieldRecord();
     } catch (...) {
@@ -259,24 +257,32 @@ void PacketRun::addOwnEntry(std::uint32_t bits, std::string_view name, std::stri
     }
     if (pass_ == Pass::md) {
         const BitRange range = {0, state().cursor, state().cursor + bits - 1, 0, {}};
-        blocks_.moveTo(state(), names_.find(0), *sink_);
-        sink_->field({
-            .id = 0,
+        FieldView view = {
             .name = name,
-            .isKey = false,
             .text = LazyText(longText),
             .reportedName = LazyText(name),
-            .value = 0,
             .ranges = {&range, 1},
-            .bitOrder = 0,
-            .flags = state().flags,
-            .depth = blocks_.shownDepth(),
-            .blocks = blocks_.open(),
             .recordHead = {preDecode_.context.layerNumber, 0, 0},
-        });
+        };
+        reportField(view, names_.find(0));
     } else if (pass_ == Pass::to) {
         sink_->text({0, name, false, LazyText(shortText), preDecode_.context.layerNumber});
     }
+}
+
+// Completes the view by what the decode state tells.
+void PacketRun::reportField(FieldView &view, NamedField &field) {
+    view.flags = state().flags;
+    view.cursor = state().cursor;
+    if (withBlocks_) {
+        blocks_.moveTo(state(), field, *sink_);
+        view.depth = blocks_.shownDepth();
+        view.blocks = blocks_.open();
+        view.blockName = LazyText(view.blocks.empty() ? std::string_view() : view.blocks.back().name);
+    } else {
+        view.blockName = LazyText(names_.blockName(field, state().blockName));
+    }
+    sink_->field(view);
 }
 
 void PacketRun::keepException() noexcept {

@@ -69,6 +69,7 @@ private:
     }
     // Marks the head of the current field record, so that what the plug-in leaves alone can be told.
     void markFieldRecord() { std::memset(fieldRecordHead(), untouchedOctet, headOctets); }
+    void reportField(FieldView &view, NamedField &field);
     void keepException() noexcept;
     Ending finish(std::int32_t result);
 
@@ -85,6 +86,7 @@ private:
     Pass pass_ = Pass::md;
     const OwnerRegistry *owners_ = nullptr;
     Sink *sink_ = nullptr;
+    bool withBlocks_ = true; // the sink wants them
     RunOptions options_;
     bool followStop_ = true;
     std::span<const std::uint8_t> packet_;
