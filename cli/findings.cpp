@@ -2,7 +2,6 @@
 #include "findings.h"
 
 #include <algorithm>
-#include <string>
 
 #include <netfloor/records.h>
 
@@ -20,7 +19,11 @@ std::size_t indexOf(std::uint32_t flag) {
 
 } // namespace
 
+FlagExplainer::FlagExplainer(const FieldTables &tables)
+    : tables_(tables), knowledge_(tables.fields()), flagNames_(flagNames(~std::uint32_t{0})) {}
+
 std::span<const Finding> FlagExplainer::explain(std::uint32_t flags, Host &host, std::span<const std::uint8_t> packet) {
+    wanted_ = flags;
     wantsGap_ = (flags & NETFLOOR_FLAG_BITS_LEFT_OVER) != 0;
     wantsLengths_ = (flags & NETFLOOR_FLAG_LIMIT_TOO_LONG) != 0;
     host.run(Pass::md, packet, *this);
@@ -43,6 +46,9 @@ void FlagExplainer::field(const FieldView &field) {
     if (field.flags != flags_) {
         seeFlags(field.flags);
     }
+    if (isSettled()) {
+        return;
+    }
     const auto octets = octetsOf(field);
     if (wantsLengths_ && octets) {
         seeLength(field);
@@ -54,7 +60,7 @@ void FlagExplainer::field(const FieldView &field) {
             gaps_.cover(*octets);
         }
     }
-    last_ = {true, field.id, octets ? octets->end - 1 : 0, 0, field.blockName.view()};
+    last_ = {true, field.id, octets ? octets->end - 1 : last_.lastOctet, 0, field.blockName.view()};
 }
 
 // A field carries the flags that were raised before it. All passes raise a flag at the same place.
@@ -149,7 +155,7 @@ void FlagExplainer::write(Output &out, const Finding &finding) const {
         out << finding.why;
         return;
     }
-    out << flagNames(finding.flag).front();
+    out << flagNames_[indexOf(finding.flag)];
     if (finding.isShortOfCount) {
         out << ": something is shorter than its count";
     }

@@ -7,6 +7,7 @@
 #include <bit>
 #include <cstdint>
 #include <span>
+#include <string>
 #include <string_view>
 #include <vector>
 
@@ -44,7 +45,7 @@ struct Finding {
 // Finds the places in an MD pass over the packet whose MV pass raised the flags.
 class FlagExplainer final : public Sink {
 public:
-    explicit FlagExplainer(const FieldTables &tables) : tables_(tables), knowledge_(tables.fields()) {}
+    explicit FlagExplainer(const FieldTables &tables);
 
     // One finding for each flag, valid until the next call.
     [[nodiscard]] std::span<const Finding> explain(std::uint32_t flags, Host &host,
@@ -68,6 +69,8 @@ private:
 
     static constexpr std::size_t flagCount = 32;
 
+    // Nothing that is still to come matters.
+    [[nodiscard]] bool isSettled() const { return !wantsGap_ && !wantsLengths_ && (wanted_ & ~flags_) == 0; }
     void seeFlags(std::uint32_t flags);
     void seeLength(const FieldView &field);
     void seeGapBefore(std::uint32_t octet);
@@ -77,9 +80,11 @@ private:
 
     FieldTables tables_;
     FieldKnowledge knowledge_;
+    std::vector<std::string> flagNames_; // by bit
     std::vector<Finding> findings_;
 
     // Of the pass.
+    std::uint32_t wanted_ = 0; // flags to explain
     bool wantsGap_ = false;
     bool wantsLengths_ = false;
     std::uint32_t flags_ = 0; // raised so far

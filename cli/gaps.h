@@ -29,11 +29,11 @@ struct OctetSpan {
         return std::nullopt;
     }
     // Some fields are read from the last octet on.
-    std::uint32_t first = field.ranges.front().firstBit;
-    std::uint32_t last = field.ranges.front().lastBit;
-    for (const BitRange &range : field.ranges.subspan(1)) {
-        first = std::min(first, range.firstBit);
-        last = std::max(last, range.lastBit);
+    std::uint32_t first = field.ranges[0].firstBit;
+    std::uint32_t last = field.ranges[0].lastBit;
+    for (std::size_t i = 1; i < field.ranges.size(); ++i) {
+        first = std::min(first, field.ranges[i].firstBit);
+        last = std::max(last, field.ranges[i].lastBit);
     }
     return OctetSpan{(first - 1) / bitsPerOctet, (last - 1) / bitsPerOctet + 1};
 }
@@ -47,10 +47,13 @@ public:
         ahead_.clear();
     }
 
+    // Whether there is none in front of this octet.
+    [[nodiscard]] bool isCovered(std::uint32_t octet) const { return octet <= covered_; }
+
     // What begins at `octet` comes next, and the cursor is there or past it. Gives the gap in front of it; there may be
     // another one after that.
     [[nodiscard]] std::optional<Gap> before(std::uint32_t octet) {
-        return octet <= covered_ ? std::nullopt : nextGap(octet);
+        return isCovered(octet) ? std::nullopt : nextGap(octet);
     }
 
     void cover(OctetSpan octets) {

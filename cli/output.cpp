@@ -29,15 +29,34 @@ constexpr bool isPrintable(unsigned char octet) {
     return octet >= 0x20 && octet < 0x7f;
 }
 
-// Whether all of eight characters are printable: none is below a blank, none is DEL, none has its top bit set. The
-// subtraction borrows only from where the answer is no already.
-bool areEightPrintable(const char *text) {
-    constexpr std::uint64_t ones = 0x0101010101010101;
+constexpr std::size_t wordOctets = 8;
+
+std::uint64_t loadWord(const char *text) {
     std::uint64_t word = 0;
     std::memcpy(&word, text, sizeof word);
-    const std::uint64_t tooSmall = word - ones * 0x20;
-    const std::uint64_t tooLarge = word + ones;
-    return ((word | tooSmall | tooLarge) & ones * 0x80) == 0;
+    return word;
+}
+
+// Has the top bit of an octet set if one of the characters is not printable: below a blank, DEL, or with its own top
+// bit set. A borrow or a carry goes only to octets above one for which the answer is known already.
+constexpr std::uint64_t unprintableIn(std::uint64_t word) {
+    constexpr std::uint64_t ones = 0x0101010101010101;
+    return (word | (word - ones * 0x20) | (word + ones)) & ones * 0x80;
+}
+
+bool areAllPrintable(std::string_view text) {
+    if (text.size() < wordOctets) {
+        bool all = true;
+        for (const char character : text) {
+            all &= isPrintable(static_cast<unsigned char>(character));
+        }
+        return all;
+    }
+    std::uint64_t found = unprintableIn(loadWord(text.data() + text.size() - wordOctets));
+    for (std::size_t i = 0; i + wordOctets < text.size(); i += wordOctets) {
+        found |= unprintableIn(loadWord(text.data() + i));
+    }
+    return found == 0;
 }
 
 } // namespace
@@ -46,31 +65,29 @@ void Output::octet(std::uint8_t octet) {
     char *const to = room(2);
     to[0] = digits[octet >> 4U];
     to[1] = digits[octet & 0xfU];
-    size_ += 2;
+    next_ = to + 2;
 }
 
 void Output::untrusted(std::string_view text) {
-    constexpr std::size_t step = 8;
-    constexpr std::size_t mostEach = 4; // \x1b
-    char *to = room(text.size() * mostEach + step);
-    while (!text.empty()) {
-        if (text.size() >= step && areEightPrintable(text.data())) {
-            std::memcpy(to, text.data(), step);
-            to += step;
-            text.remove_prefix(step);
-            continue;
-        }
-        const auto octet = static_cast<unsigned char>(text.front());
-        text.remove_prefix(1);
+    if (areAllPrintable(text)) {
+        *this << text;
+        return;
+    }
+    for (const char character : text) {
+        const auto octet = static_cast<unsigned char>(character);
         if (isPrintable(octet)) {
-            *to++ = static_cast<char>(octet);
-            continue;
-        }
-        for (const char character : {'\\', 'x', digits[octet >> 4U], digits[octet & 0xfU]}) {
-            *to++ = character;
+            *this << character;
+        } else {
+            *this << '\\' << 'x' << digits[octet >> 4U] << digits[octet & 0xfU];
         }
     }
-    advanceTo(to);
+}
+
+void Output::grow(std::size_t octets) {
+    const std::size_t size = mark();
+    buffer_.resize(2 * buffer_.size() + octets);
+    next_ = buffer_.data() + size;
+    limit_ = buffer_.data() + buffer_.size();
 }
 
 Output &Output::startStyle(Style style) {
@@ -91,7 +108,7 @@ void Output::rightAligned(std::uint64_t number, std::size_t width) {
 }
 
 void Output::flush() {
-    std::string_view rest(buffer_.data(), size_);
+    std::string_view rest = since(0);
     while (!rest.empty()) {
         const ssize_t written = ::write(STDOUT_FILENO, rest.data(), rest.size());
         if (written >= 0) {
@@ -102,7 +119,7 @@ void Output::flush() {
             throw OutputError(std::string("the output cannot be written: ") + std::strerror(errno) + ".");
         }
     }
-    size_ = 0;
+    next_ = buffer_.data();
 }
 
 } // namespace netfloor::cli

@@ -31,17 +31,18 @@ struct Hex {
 class Output {
 public:
     // `eachPacket`: flush after each packet, for who waits in front of a live capture.
-    Output(bool colour, bool eachPacket) : colour_(colour), eachPacket_(eachPacket), buffer_(firstRoom) {}
+    Output(bool colour, bool eachPacket) : colour_(colour), eachPacket_(eachPacket) { grow(firstRoom); }
 
     Output &operator<<(std::string_view text) {
         char *const to = room(text.size());
         std::memcpy(to, text.data(), text.size());
-        size_ += text.size();
+        next_ = to + text.size();
         return *this;
     }
     Output &operator<<(char character) {
-        *room(1) = character;
-        ++size_;
+        char *const to = room(1);
+        *to = character;
+        next_ = to + 1;
         return *this;
     }
     Output &operator<<(std::uint64_t number) {
@@ -77,20 +78,22 @@ public:
     // Blanks up to `width`, then the text or the number.
     void rightAligned(std::string_view text, std::size_t width);
     void rightAligned(std::uint64_t number, std::size_t width);
-    void blanks(std::size_t count) {
-        std::memset(room(count), ' ', count);
-        size_ += count;
+    void blanks(std::size_t count) { repeated(' ', count); }
+    void repeated(char character, std::size_t count) {
+        char *const to = room(count);
+        std::memset(to, character, count);
+        next_ = to + count;
     }
 
     // A place in the text, up to which it can be taken back or looked at until `mayFlush`, `endPacket` or `flush`.
     using Mark = std::size_t;
-    [[nodiscard]] Mark mark() const { return size_; }
-    void takeBack(Mark mark) { size_ = mark; }
-    [[nodiscard]] std::string_view since(Mark mark) const { return {buffer_.data() + mark, size_ - mark}; }
+    [[nodiscard]] Mark mark() const { return static_cast<std::size_t>(next_ - buffer_.data()); }
+    void takeBack(Mark mark) { next_ = buffer_.data() + mark; }
+    [[nodiscard]] std::string_view since(Mark mark) const { return {buffer_.data() + mark, next_}; }
 
     // The text may leave the buffer, which grows as long as it may not. Throws OutputClosed and OutputError.
     void mayFlush() {
-        if (size_ >= flushOctets) {
+        if (mark() >= flushOctets) {
             flush();
         }
     }
@@ -106,21 +109,23 @@ private:
 
     // The end of the text, with room for so many octets.
     [[nodiscard]] char *room(std::size_t octets) {
-        if (buffer_.size() - size_ < octets) {
-            buffer_.resize(2 * buffer_.size() + octets);
+        if (static_cast<std::size_t>(limit_ - next_) < octets) {
+            grow(octets);
         }
-        return buffer_.data() + size_;
+        return next_;
     }
-    Output &advanceTo(const char *end) {
-        size_ = static_cast<std::size_t>(end - buffer_.data());
+    Output &advanceTo(char *end) {
+        next_ = end;
         return *this;
     }
+    void grow(std::size_t octets);
     Output &startStyle(Style style);
 
     bool colour_;
     bool eachPacket_;
     std::vector<char> buffer_;
-    std::size_t size_ = 0; // of the text in it
+    char *next_ = nullptr; // the end of the text in it
+    char *limit_ = nullptr;
 };
 
 } // namespace netfloor::cli

@@ -12,14 +12,6 @@ namespace {
 
 constexpr std::uint32_t bitsPerOctet = 8;
 
-std::uint32_t bitCount(std::span<const BitRange> ranges) {
-    std::uint32_t bits = 0;
-    for (const BitRange &range : ranges) {
-        bits += range.lastBit - range.firstBit + 1;
-    }
-    return bits;
-}
-
 // What stands after the field's name in its text; none where there is only a name.
 std::optional<std::string_view> shownValue(std::string_view text) {
     const auto equals = text.find('=');
@@ -75,10 +67,8 @@ std::string_view nameOf(const FieldView &field) {
     return field.name.empty() ? "(without a name)" : field.name;
 }
 
-std::optional<OctetSpan> unshownOctets(const FieldView &field, std::string_view text) {
-    const std::uint32_t bits = bitCount(field.ranges);
-    if (bits <= sizeof(field.value) * bitsPerOctet ||
-        shownValue(text).value_or("").find_first_not_of("0123456789abcdef") != std::string_view::npos) {
+std::optional<OctetSpan> unshownOctets(const FieldView &field, std::uint32_t bits, std::string_view text) {
+    if (shownValue(text).value_or("").find_first_not_of("0123456789abcdef") != std::string_view::npos) {
         return std::nullopt;
     }
     const OctetSpan octets = *octetsOf(field);
@@ -86,17 +76,11 @@ std::optional<OctetSpan> unshownOctets(const FieldView &field, std::string_view 
     return isWhole ? std::optional(octets) : std::nullopt;
 }
 
-std::optional<std::uint32_t> unshownNumber(const FieldView &field, std::string_view text) {
-    const std::uint32_t bits = bitCount(field.ranges);
-    if (bits != bitsPerOctet && bits != 2 * bitsPerOctet) {
-        return std::nullopt;
-    }
+bool showsItsNumber(std::string_view text, std::uint32_t number) {
     const auto shown = shownValue(text);
-    // A single letter is an octet of text.
-    if (!shown || !(shown->empty() || (shown->size() > 1 && isLetter(shown->front())))) {
-        return std::nullopt;
-    }
-    return showsNumber(*shown, field.value) ? std::nullopt : std::optional(field.value);
+    // A text that starts with a digit is a number; a single letter is an octet of text.
+    const bool isName = shown && (shown->empty() || (shown->size() > 1 && isLetter(shown->front())));
+    return !isName || showsNumber(*shown, number);
 }
 
 } // namespace netfloor::cli

@@ -21,11 +21,19 @@ void writeOctetNumbers(Output &out, OctetSpan octets);
 
 [[nodiscard]] std::string_view nameOf(const FieldView &field);
 
-// The octets of a field that has more than a number can hold and whose text shows only digits, if that: the text leaves
-// out the zeros in front and may be cut. None for other fields.
-[[nodiscard]] std::optional<OctetSpan> unshownOctets(const FieldView &field, std::string_view text);
+[[nodiscard]] inline std::uint32_t bitCount(std::span<const BitRange> ranges) {
+    std::uint32_t bits = 0;
+    for (const BitRange &range : ranges) {
+        bits += range.lastBit - range.firstBit + 1;
+    }
+    return bits;
+}
 
-// The number of a field whose text gives the name of its value, or no name: of types and codes, not of single bits.
-[[nodiscard]] std::optional<std::uint32_t> unshownNumber(const FieldView &field, std::string_view text);
+// The octets of a field of more bits than a number can hold whose text shows only digits, if that: the text leaves out
+// the zeros in front and may be cut. None for other fields.
+[[nodiscard]] std::optional<OctetSpan> unshownOctets(const FieldView &field, std::uint32_t bits, std::string_view text);
+
+// Whether the text tells the number. It does not where it has the name of the value, or nothing, in its place.
+[[nodiscard]] bool showsItsNumber(std::string_view text, std::uint32_t number);
 
 } // namespace netfloor::cli

@@ -43,41 +43,59 @@ std::vector<std::string> keyFieldNames(Host &host) {
 // The values of some rows of the key-field table, of one packet.
 class KeyValues final : public Sink {
 public:
-    KeyValues(std::span<const std::size_t> rows, std::size_t rowCount) : values_(rowCount) {
-        for (const std::size_t row : rows) {
-            values_[row].isWanted = true;
+    // A row may stand in several columns.
+    KeyValues(std::span<const std::size_t> rows, std::size_t rowCount, bool raw)
+        : columnCount_(rows.size()), raw_(raw), columns_(rowCount) {
+        for (std::size_t column = 0; column < rows.size(); ++column) {
+            columns_[rows[column]].push_back(column);
         }
     }
 
-    void reset() {
-        for (const std::uint32_t row : present_) {
-            values_[row].isPresent = false;
-        }
-        present_.clear();
-    }
+    void clear() { values_.clear(); }
 
     void key(const KeyView &key) override {
-        if (key.row >= values_.size() || !values_[key.row].isWanted) {
+        if (key.row >= columns_.size()) {
             return;
         }
-        Value &value = values_[key.row];
-        value.isPresent = true;
-        value.type = key.type;
-        value.number = key.number;
-        value.octetCount = std::min(key.octets.size(), value.octets.size());
-        std::copy_n(key.octets.begin(), value.octetCount, value.octets.begin());
-        present_.push_back(key.row);
+        for (const std::size_t column : columns_[key.row]) {
+            Value &value = values_.emplace_back();
+            value.column = column;
+            value.type = key.type;
+            value.number = key.number;
+            value.octetCount = std::min(key.octets.size(), value.octets.size());
+            std::copy_n(key.octets.begin(), value.octetCount, value.octets.begin());
+        }
     }
 
-    void write(Output &out, std::size_t row, bool raw) const {
-        const Value &value = values_[row];
-        if (!value.isPresent) {
-            return;
+    // A comma in front of each column.
+    void write(Output &out) {
+        const auto byColumn = [](const Value &left, const Value &right) { return left.column < right.column; };
+        if (!std::is_sorted(values_.begin(), values_.end(), byColumn)) {
+            std::sort(values_.begin(), values_.end(), byColumn);
         }
+        std::size_t commas = 0;
+        for (const Value &value : values_) {
+            out.repeated(',', value.column + 1 - commas);
+            commas = value.column + 1;
+            writeValue(out, value);
+        }
+        out.repeated(',', columnCount_ - commas);
+    }
+
+private:
+    struct Value {
+        std::size_t column;
+        KeyType type;
+        std::uint32_t number;
+        std::size_t octetCount;
+        Ipv6Octets octets;
+    };
+
+    void writeValue(Output &out, const Value &value) const {
         const std::span<const std::uint8_t> octets(value.octets.data(), value.octetCount);
         if (value.type < KeyType::ipv4Address) {
             out << value.number;
-        } else if (!raw) {
+        } else if (!raw_) {
             TextRoom room;
             out << keyText({{}, {}, value.type, value.number, octets}, room);
         } else if (value.type == KeyType::ipv6Address) {
@@ -86,16 +104,6 @@ public:
             writeHexadecimal(out, octetsOf(value.number));
         }
     }
-
-private:
-    struct Value {
-        bool isWanted = false;
-        bool isPresent = false;
-        KeyType type = KeyType::number32;
-        std::uint32_t number = 0;
-        std::size_t octetCount = 0;
-        Ipv6Octets octets = {};
-    };
 
     static std::array<std::uint8_t, 4> octetsOf(std::uint32_t number) {
         return {static_cast<std::uint8_t>(number >> 24U), static_cast<std::uint8_t>(number >> 16U),
@@ -108,8 +116,10 @@ private:
         }
     }
 
-    std::vector<Value> values_; // by row
-    std::vector<std::uint32_t> present_;
+    std::size_t columnCount_;
+    bool raw_;
+    std::vector<std::vector<std::size_t>> columns_; // by row
+    std::vector<Value> values_;                     // that the packet has
 };
 
 class KeysPrinter final : public Printer {
@@ -120,16 +130,13 @@ public:
     void print(const PacketToPrint &packet) override {
         const CapturedPacket &captured = packet.captured;
         out() << captured.number << ',' << packet.time << ',' << captured.wireOctets << ',';
-        values_.reset();
+        values_.clear();
         Ending ending = Ending::complete;
         if (packet.network.isIp()) {
             ending = host().run(Pass::xtr, packet.network.octets, values_);
         }
         writeNote(packet, ending);
-        for (const std::size_t row : rows_) {
-            out() << ',';
-            values_.write(out(), row, options().raw);
-        }
+        values_.write(out());
         out() << '\n';
     }
 
@@ -137,7 +144,7 @@ public:
 
 private:
     KeysPrinter(const Options &options, Output &out, Host &host, const std::vector<std::string> &names)
-        : Printer(options, out, host), rows_(chooseRows(names)), values_(rows_, names.size()) {
+        : Printer(options, out, host), rows_(chooseRows(names)), values_(rows_, names.size(), options.raw) {
         out << "packet,time,octets,note";
         for (const std::size_t row : rows_) {
             out << ',';

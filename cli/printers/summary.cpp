@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: MIT
 // One line a packet, out of the short texts of the TO pass.
+#include <array>
 #include <string_view>
 
 #include "printers/field_names.h"
@@ -9,9 +10,13 @@ namespace netfloor::cli {
 
 namespace {
 
-bool isHexDigit(char character) {
-    return (character >= '0' && character <= '9') || (character >= 'a' && character <= 'f');
-}
+constexpr auto isDigitOrStar = [] {
+    std::array<bool, 256> is = {};
+    for (const char character : std::string_view("0123456789abcdef*")) {
+        is[static_cast<unsigned char>(character)] = true;
+    }
+    return is;
+}();
 
 // A text that says nothing without the name of its field: "64", "5f01", "0x1b3", "99(dec)", "28 octets", "5*4 octets".
 bool isBareNumber(std::string_view text) {
@@ -19,11 +24,13 @@ bool isBareNumber(std::string_view text) {
         text.remove_prefix(2);
     }
     std::size_t end = 0;
-    while (end < text.size() && (isHexDigit(text[end]) || text[end] == '*')) {
+    while (end < text.size() && isDigitOrStar[static_cast<unsigned char>(text[end])]) {
         ++end;
     }
-    const std::string_view rest = text.substr(end);
-    return end != 0 && (rest.empty() || rest.starts_with("(dec)") || rest.starts_with(" octet"));
+    if (end == text.size()) {
+        return end != 0;
+    }
+    return end != 0 && (text.substr(end).starts_with("(dec)") || text.substr(end).starts_with(" octet"));
 }
 
 // Writes texts as they come. Texts of one id are a run: a field that was looked at ahead is reported twice, an address
@@ -68,28 +75,30 @@ private:
     static constexpr std::uint64_t mostShown = 4;
 
     void beginRun(const ShortTextView &text) {
-        out_.mayFlush();
         runId_ = text.displayId;
         count_ = 1;
         const DisplayName &field = names_.find(runId_);
         isRunShown_ = showsAll_ || field.isKey;
+        if (isRunShown_) {
+            writeFirst(field, text.text.view());
+        }
+    }
+
+    void writeFirst(const DisplayName &field, std::string_view text) {
+        isRunShown_ = showsAll_ || !text.empty();
         if (!isRunShown_) {
             return;
         }
-        const std::string_view shown = text.text.view();
-        isRunShown_ = showsAll_ || !shown.empty();
-        if (!isRunShown_) {
-            return;
-        }
+        out_.mayFlush();
         if (!isFirst_) {
             out_.styled(Style::dim, " | ");
         }
         isFirst_ = false;
-        if (isBareNumber(shown)) {
+        if (isBareNumber(text)) {
             out_ << field.name << '=';
         }
         lastText_ = out_.mark();
-        out_.untrusted(shown);
+        out_.untrusted(text);
         lastSize_ = out_.mark() - lastText_;
     }
 

@@ -13,6 +13,8 @@ namespace netfloor::cli {
 namespace {
 
 constexpr std::uint32_t bitsPerOctet = 8;
+constexpr std::uint32_t numberBits = 32; // that a field record holds
+constexpr std::uint32_t addressBits = 128;
 constexpr std::uint32_t leastRun = 5;       // fewer octets of data stand on lines of their own
 constexpr std::uint32_t octetsPerLine = 16; // of data
 constexpr std::uint32_t mostDataLines = 4;  // without --all
@@ -99,7 +101,7 @@ bool Tree::isReadAgain(const FieldView &field, std::string_view text) const {
            ipv6Address(field, packet_) && field.ranges.front().firstBit == addressBit_;
 }
 
-void Tree::writeGapsBefore(std::uint32_t octet, std::uint32_t depth) {
+void Tree::writeGaps(std::uint32_t octet, std::uint32_t depth) {
     while (const auto gap = gaps_.before(octet)) {
         newLine(depth);
         out_.start(Style::dim) << "[in no field: ";
@@ -109,11 +111,12 @@ void Tree::writeGapsBefore(std::uint32_t octet, std::uint32_t depth) {
 }
 
 void Tree::writeField(const FieldView &field, std::string_view text) {
-    const auto address = ipv6Address(field, packet_);
+    const std::uint32_t bits = bitCount(field.ranges);
+    const auto address = bits == addressBits ? ipv6Address(field, packet_) : std::nullopt;
     addressName_ = address ? field.name : std::string_view();
     addressBit_ = address ? field.ranges.front().firstBit : 0;
-    if (!address) {
-        if (const auto octets = unshownOctets(field, text)) {
+    if (bits > numberBits && !address) {
+        if (const auto octets = unshownOctets(field, bits, text)) {
             return writeOctets(nameOf(field), *octets, field.depth);
         }
     }
@@ -123,8 +126,8 @@ void Tree::writeField(const FieldView &field, std::string_view text) {
     if (address) {
         TextRoom room;
         (out_.start(Style::good) << "  (" << ipv6Text(*address, room) << ')').stop(Style::good);
-    } else if (const auto number = unshownNumber(field, text)) {
-        (out_.start(Style::dim) << "  (" << *number << ')').stop(Style::dim);
+    } else if ((bits == bitsPerOctet || bits == 2 * bitsPerOctet) && !showsItsNumber(text, field.value)) {
+        (out_.start(Style::dim) << "  (" << field.value << ')').stop(Style::dim); // of types and codes, no single bits
     }
     if (bits_ && !field.ranges.empty()) {
         out_.start(Style::dim) << "  [";

@@ -49,7 +49,12 @@ private:
         out_.blanks(2 * (std::size_t{depth} + 1 + extra));
         depth_ = depth;
     }
-    void writeGapsBefore(std::uint32_t octet, std::uint32_t depth);
+    void writeGapsBefore(std::uint32_t octet, std::uint32_t depth) {
+        if (!gaps_.isCovered(octet)) {
+            writeGaps(octet, depth);
+        }
+    }
+    void writeGaps(std::uint32_t octet, std::uint32_t depth);
     void writeField(const FieldView &field, std::string_view text);
     void writeOctets(std::string_view name, OctetSpan octets, std::uint32_t depth);
 
