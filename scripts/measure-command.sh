@@ -79,8 +79,8 @@ for ((round = 0; round < rounds; ++round)); do
     measure verify "$netfloor" verify "$capture"
     measure 'tshark -n -T fields' tshark -n -T fields "${peer_fields[@]/#/-e}" -r "$capture"
     measure keys "$netfloor" keys "${key_fields[@]/#/--column=}" "$capture"
+    measure 'a start' "$netfloor" --count 3 "$capture"
 done
-measure 'a start' "$netfloor" --count 3 "$capture"
 
 row() { # OURS PEER WANTED
     [ -n "${best[$1]:-}" ] && [ -n "${best[$2]:-}" ] || return 0

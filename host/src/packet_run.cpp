@@ -196,18 +196,16 @@ void PacketRun::addField(std::uint32_t outputRangeCount, const BitRange *ranges,
         NamedField &field = names_.find(fieldId);
         const std::uint8_t *const head = fieldRecordHead();
         const LazyText reportedName(fieldName);
-        FieldView view = {
-            .id = fieldId,
-            .name = field.isKnown ? field.name : withoutLeadingBlanks(reportedName.view()),
-            .isKey = field.isKey,
-            .text = LazyText(display),
-            .reportedName = reportedName,
-            .value = state().fieldRecord.value,
-            .ranges = {ranges, outputRangeCount},
-            .bitOrder = bitOrder,
-            .recordHead = {head[0], head[1], head[2]},
-        };
-        reportField(view, field);
+        view_.id = fieldId;
+        view_.name = field.isKnown ? field.name : withoutLeadingBlanks(reportedName.view());
+        view_.isKey = field.isKey;
+        view_.text = LazyText(display);
+        view_.reportedName = reportedName;
+        view_.value = state().fieldRecord.value;
+        view_.ranges = {ranges, outputRangeCount};
+        view_.bitOrder = bitOrder;
+        view_.recordHead = {head[0], head[1], head[2]};
+        reportField(field);
         preDecode_.context.fieldRecordCount = (preDecode_.context.fieldRecordCount + 1) % fieldRecordCount;
         markFieldRecord();
     } catch (...) {
@@ -257,32 +255,36 @@ void PacketRun::addOwnEntry(std::uint32_t bits, std::string_view name, std::stri
     }
     if (pass_ == Pass::md) {
         const BitRange range = {0, state().cursor, state().cursor + bits - 1, 0, {}};
-        FieldView view = {
-            .name = name,
-            .text = LazyText(longText),
-            .reportedName = LazyText(name),
-            .ranges = {&range, 1},
-            .recordHead = {preDecode_.context.layerNumber, 0, 0},
-        };
-        reportField(view, names_.find(0));
+        view_.id = 0;
+        view_.name = name;
+        view_.isKey = false;
+        view_.text = LazyText(longText);
+        view_.reportedName = LazyText(name);
+        view_.value = 0;
+        view_.ranges = {&range, 1};
+        view_.bitOrder = 0;
+        view_.recordHead = {preDecode_.context.layerNumber, 0, 0};
+        reportField(names_.find(0));
     } else if (pass_ == Pass::to) {
         sink_->text({0, name, false, LazyText(shortText), preDecode_.context.layerNumber});
     }
 }
 
 // Completes the view by what the decode state tells.
-void PacketRun::reportField(FieldView &view, NamedField &field) {
-    view.flags = state().flags;
-    view.cursor = state().cursor;
+void PacketRun::reportField(NamedField &field) {
+    view_.flags = state().flags;
+    view_.cursor = state().cursor;
     if (withBlocks_) {
         blocks_.moveTo(state(), field, *sink_);
-        view.depth = blocks_.shownDepth();
-        view.blocks = blocks_.open();
-        view.blockName = LazyText(view.blocks.empty() ? std::string_view() : view.blocks.back().name);
+        view_.depth = blocks_.shownDepth();
+        view_.blocks = blocks_.open();
+        view_.blockName = LazyText(view_.blocks.empty() ? std::string_view() : view_.blocks.back().name);
     } else {
-        view.blockName = LazyText(names_.blockName(field, state().blockName));
+        view_.depth = 0;
+        view_.blocks = {};
+        view_.blockName = LazyText(names_.blockName(field, state().blockName));
     }
-    sink_->field(view);
+    sink_->field(view_);
 }
 
 void PacketRun::keepException() noexcept {

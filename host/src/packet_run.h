@@ -69,7 +69,7 @@ private:
     }
     // Marks the head of the current field record, so that what the plug-in leaves alone can be told.
     void markFieldRecord() { std::memset(fieldRecordHead(), untouchedOctet, headOctets); }
-    void reportField(FieldView &view, NamedField &field);
+    void reportField(NamedField &field);
     void keepException() noexcept;
     Ending finish(std::int32_t result);
 
@@ -87,6 +87,7 @@ private:
     const OwnerRegistry *owners_ = nullptr;
     Sink *sink_ = nullptr;
     bool withBlocks_ = true; // the sink wants them
+    FieldView view_;         // of the field at hand; to clear a new one takes as long as all else that is done for it
     RunOptions options_;
     bool followStop_ = true;
     std::span<const std::uint8_t> packet_;
