@@ -108,8 +108,7 @@ private:
             }
             if (!filter_ || filter_->passes(packet)) {
                 const NetworkPart network = findNetworkPart(packet.linkType, packet.octets);
-                tally_.add(network);
-                printer_->print(packet, network, times_.text(packet));
+                printer_->print({packet, network, tally_.add(network), times_.text(packet)});
                 out_.endPacket();
             }
             if (options_.packet) {

@@ -2,11 +2,9 @@
 #include "findings.h"
 
 #include <algorithm>
-#include <optional>
 
 #include <netfloor/records.h>
 
-#include "gaps.h"
 #include "text.h"
 
 namespace netfloor::cli {
@@ -15,118 +13,164 @@ namespace {
 
 constexpr std::uint32_t bitsPerOctet = 8;
 
-// A place in the packet where a flag was raised: after a field, with the bits that were skipped there.
-struct Place {
-    const FieldReport *after = nullptr;
-    std::uint32_t skippedBits = 0;
-};
-
-std::uint32_t lastBitOf(const FieldReport &field) {
-    std::uint32_t last = 0;
-    for (const ReportedRange &range : field.ranges) {
-        last = std::max(last, range.lastBit);
-    }
-    return last;
+std::size_t indexOf(std::uint32_t flag) {
+    return static_cast<std::size_t>(std::countr_zero(flag));
 }
 
-// Where the MD pass raised the flag. All passes raise it there.
-std::optional<Place> placeOfFlag(std::uint32_t flag, const Report &detail) {
-    if ((detail.flags & flag) == 0) {
-        return std::nullopt;
+} // namespace
+
+FlagExplainer::FlagExplainer(const FieldTables &tables)
+    : tables_(tables), knowledge_(tables.fields()), flagNames_(flagNames(~std::uint32_t{0})) {}
+
+std::span<const Finding> FlagExplainer::explain(std::uint32_t flags, Host &host, std::span<const std::uint8_t> packet) {
+    wanted_ = flags;
+    wantsGap_ = (flags & NETFLOOR_FLAG_BITS_LEFT_OVER) != 0;
+    wantsLengths_ = (flags & NETFLOOR_FLAG_LIMIT_TOO_LONG) != 0;
+    host.run(Pass::md, packet, *this);
+    findings_.clear();
+    for (std::uint32_t left = flags; left != 0; left &= left - 1) {
+        findings_.push_back(finding(left & -left));
     }
-    // A field carries the flags that were raised before it.
-    const auto next = std::find_if(detail.fields.begin(), detail.fields.end(),
-                                   [flag](const FieldReport &field) { return (field.flags & flag) != 0; });
-    return Place{next == detail.fields.begin() ? nullptr : &*(next - 1), 0};
+    return findings_;
 }
 
-// Where bits were skipped first.
-std::optional<Place> placeOfGap(const Report &detail) {
-    const std::vector<Gap> gaps = findGaps(detail);
-    if (gaps.empty()) {
-        return std::nullopt;
-    }
-    const Gap &first = gaps.front();
-    return Place{first.fieldBefore(detail), first.lastBit - first.firstBit + 1};
+void FlagExplainer::begin(Pass /*pass*/, std::span<const std::uint8_t> /*packet*/) {
+    flags_ = 0;
+    last_ = {};
+    gap_ = {};
+    gaps_.reset();
+    lengths_.clear();
 }
 
-std::string placeText(const Place &place, const Report &detail) {
-    std::string text;
-    if (place.skippedBits != 0) {
-        text = ": " + countText(place.skippedBits / bitsPerOctet, "octet");
+void FlagExplainer::field(const FieldView &field) {
+    if (field.flags != flags_) {
+        seeFlags(field.flags);
     }
-    text += " after '" + std::string(withoutLeadingBlanks(place.after->name)) + "' at octet " +
-            std::to_string((lastBitOf(*place.after) - 1) / bitsPerOctet);
-    if (const std::string path = detail.path(*place.after); !path.empty()) {
-        text += " (" + path + ")";
+    if (isSettled()) {
+        return;
     }
-    return text;
+    const auto octets = octetsOf(field);
+    if (wantsLengths_ && octets) {
+        seeLength(field);
+    }
+    if (wantsGap_) {
+        const std::uint32_t passed = (field.cursor - 1) / bitsPerOctet;
+        seeGapBefore(octets ? std::min(octets->first, passed) : passed);
+        if (octets) {
+            gaps_.cover(*octets);
+        }
+    }
+    last_ = {true, field.id, octets ? octets->end - 1 : last_.lastOctet, 0, field.blockName.view()};
 }
 
-// Whether each length inside `outer` ends no later than that.
-bool innerLengthsFit(const FieldReport &outer, std::uint32_t endOfOuter, const Report &detail,
-                     const FieldKnowledge &knowledge) {
-    const std::uint32_t start = outer.ranges.front().firstBit;
-    return std::none_of(detail.fields.begin(), detail.fields.end(), [&](const FieldReport &field) {
-        const LengthField *const inner = knowledge.lengthField(field.id);
-        if (inner == nullptr || !inner->why.empty() || field.ranges.empty()) {
+// A field carries the flags that were raised before it. All passes raise a flag at the same place.
+void FlagExplainer::seeFlags(std::uint32_t flags) {
+    for (std::uint32_t raised = flags & ~flags_; raised != 0; raised &= raised - 1) {
+        places_[indexOf(raised)] = last_;
+    }
+    flags_ = flags;
+}
+
+void FlagExplainer::seeLength(const FieldView &field) {
+    if (const LengthField *const length = knowledge_.lengthField(field.id)) {
+        lengths_.push_back({length, field.ranges.front().firstBit, length->endBit(field)});
+    }
+}
+
+void FlagExplainer::seeGapBefore(std::uint32_t octet) {
+    if (gap_.isKnown) {
+        return;
+    }
+    if (const auto gap = gaps_.before(octet)) {
+        gap_ = last_;
+        gap_.skippedOctets = gap->octets;
+    }
+}
+
+void FlagExplainer::end(const PassEnd &end) {
+    seeFlags(end.state.flags);
+    cursor_ = end.state.cursor;
+    if (wantsGap_) {
+        seeGapBefore((cursor_ - 1) / bitsPerOctet);
+    }
+}
+
+Finding FlagExplainer::finding(std::uint32_t flag) const {
+    Finding finding;
+    finding.flag = flag;
+    if (flag == NETFLOOR_FLAG_LIMIT_TOO_LONG) {
+        if (const LengthField *const length = lengthByDesign()) {
+            finding.kind = FindingKind::byDesign;
+            finding.why = length->why;
+        }
+        return finding;
+    }
+    const bool wasRaised = (flags_ & flag) != 0;
+    if (flag == NETFLOOR_FLAG_EXPECTATION && !wasRaised) {
+        finding.isShortOfCount = true; // only the MV pass raises the flag for this
+        return finding;
+    }
+    const bool isGap = flag == NETFLOOR_FLAG_BITS_LEFT_OVER;
+    finding.kind = isGap ? FindingKind::unread : FindingKind::damage;
+    if (isGap) {
+        finding.place = gap_;
+    } else if (wasRaised) {
+        finding.place = places_[indexOf(flag)];
+    }
+    if (!finding.place.isKnown) {
+        return finding;
+    }
+    const auto *const design =
+        knowledge_.flagByDesign(flag, finding.place.fieldId, finding.place.skippedOctets * bitsPerOctet);
+    if (design != nullptr) {
+        finding.kind = FindingKind::byDesign;
+        finding.why = design->why;
+    }
+    return finding;
+}
+
+// Whether each length inside the outer one ends no later than that.
+bool FlagExplainer::innerLengthsFit(std::size_t outer) const {
+    for (std::size_t i = outer + 1; i < lengths_.size() && lengths_[i].firstBit < lengths_[outer].endBit; ++i) {
+        if (lengths_[i].row->why.empty() && lengths_[i].endBit > lengths_[outer].endBit) {
             return false;
         }
-        const std::uint32_t first = field.ranges.front().firstBit;
-        return start < first && first < endOfOuter && inner->endBit(field) > endOfOuter;
-    });
+    }
+    return true;
 }
 
 // The length whose limit is longer than what is left by design: the packet holds all that the length counts.
-const LengthField *lengthByDesign(const Report &detail, const FieldKnowledge &knowledge) {
-    for (const FieldReport &field : detail.fields) {
-        const LengthField *const length = knowledge.lengthField(field.id);
-        if (length == nullptr || length->why.empty() || field.ranges.empty()) {
-            continue;
-        }
-        const std::uint32_t end = length->endBit(field);
-        if (end <= detail.cursor && innerLengthsFit(field, end, detail, knowledge)) {
-            return length;
+const LengthField *FlagExplainer::lengthByDesign() const {
+    for (std::size_t i = 0; i < lengths_.size(); ++i) {
+        const Length &length = lengths_[i];
+        if (!length.row->why.empty() && length.endBit <= cursor_ && innerLengthsFit(i)) {
+            return length.row;
         }
     }
     return nullptr;
 }
 
-Finding explain(std::uint32_t flag, const Report &detail, const FieldKnowledge &knowledge) {
-    Finding finding{flag, FindingKind::damage, flagNames(flag).front()};
-    if (flag == NETFLOOR_FLAG_LIMIT_TOO_LONG) {
-        if (const LengthField *const length = lengthByDesign(detail, knowledge)) {
-            return {flag, FindingKind::byDesign, std::string(length->why)};
-        }
-        return finding;
+void FlagExplainer::write(Output &out, const Finding &finding) const {
+    if (finding.kind == FindingKind::byDesign) {
+        out << finding.why;
+        return;
     }
-    if (flag == NETFLOOR_FLAG_EXPECTATION && (detail.flags & flag) == 0) {
-        finding.text += ": something is shorter than its count"; // only the MV pass raises the flag for this
-        return finding;
+    out << flagNames_[indexOf(finding.flag)];
+    if (finding.isShortOfCount) {
+        out << ": something is shorter than its count";
     }
-    const bool isGap = flag == NETFLOOR_FLAG_BITS_LEFT_OVER;
-    finding.kind = isGap ? FindingKind::unread : FindingKind::damage;
-    const auto place = isGap ? placeOfGap(detail) : placeOfFlag(flag, detail);
-    if (!place || place->after == nullptr) {
-        return finding;
+    const FlagPlace &place = finding.place;
+    if (!place.isKnown) {
+        return;
     }
-    if (const auto *const design = knowledge.flagByDesign(flag, place->after->id, place->skippedBits)) {
-        return {flag, FindingKind::byDesign, std::string(design->why)};
+    if (place.skippedOctets != 0) {
+        (out << ": ").count(place.skippedOctets, "octet");
     }
-    finding.text += placeText(*place, detail);
-    return finding;
-}
-
-} // namespace
-
-std::vector<Finding> explainFlags(std::uint32_t flags, const Report &detail, const FieldKnowledge &knowledge) {
-    std::vector<Finding> findings;
-    for (std::uint32_t flag = 1; flag != 0; flag <<= 1U) {
-        if ((flags & flag) != 0) {
-            findings.push_back(explain(flag, detail, knowledge));
-        }
+    const FieldDescription *const field = tables_.find(place.fieldId);
+    out << " after '" << (field == nullptr ? "data" : field->name) << "' at octet " << place.lastOctet;
+    if (!place.block.empty()) {
+        out << " (" << withoutLeadingBlanks(place.block) << ')';
     }
-    return findings;
 }
 
 } // namespace netfloor::cli

@@ -1,26 +1,74 @@
 // SPDX-License-Identifier: MIT
-// Octets that a pass went over and that no field covers.
+// Octets that the MD pass went over and that no field covers, found while it goes.
 #pragma once
 
+#include <algorithm>
 #include <cstdint>
+#include <optional>
 #include <vector>
 
-#include "netfloor-host/reports.h"
+#include "netfloor-host/sink.h"
 
 namespace netfloor::cli {
 
 struct Gap {
-    std::size_t nextField = 0; // index of the field after it, or the number of fields
-    std::uint32_t firstBit = 0;
-    std::uint32_t lastBit = 0;
-
-    // The field before it, or null.
-    [[nodiscard]] const FieldReport *fieldBefore(const Report &detail) const {
-        return nextField == 0 ? nullptr : &detail.fields[nextField - 1];
-    }
+    std::uint32_t firstOctet = 0;
+    std::uint32_t octets = 0;
 };
 
-// Of an MD report, in the order of the packet.
-[[nodiscard]] std::vector<Gap> findGaps(const Report &detail);
+// Bits of a packet, from their lowest to their highest octet.
+struct OctetSpan {
+    std::uint32_t first = 0;
+    std::uint32_t end = 0; // the one after the last
+};
+
+// The octets of a field. None for a field that was looked at ahead of its turn and has no ranges.
+[[nodiscard]] inline std::optional<OctetSpan> octetsOf(const FieldView &field) {
+    constexpr std::uint32_t bitsPerOctet = 8;
+    if (field.ranges.empty()) {
+        return std::nullopt;
+    }
+    // Some fields are read from the last octet on.
+    std::uint32_t first = field.ranges[0].firstBit;
+    std::uint32_t last = field.ranges[0].lastBit;
+    for (std::size_t i = 1; i < field.ranges.size(); ++i) {
+        first = std::min(first, field.ranges[i].firstBit);
+        last = std::max(last, field.ranges[i].lastBit);
+    }
+    return OctetSpan{(first - 1) / bitsPerOctet, (last - 1) / bitsPerOctet + 1};
+}
+
+// A pass reads forwards, but it looks ahead now and then. So an octet is in no field when the cursor is past it and no
+// field before has covered it.
+class GapFinder {
+public:
+    void reset() {
+        covered_ = 0;
+        ahead_.clear();
+    }
+
+    // Whether there is none in front of this octet.
+    [[nodiscard]] bool isCovered(std::uint32_t octet) const { return octet <= covered_; }
+
+    // What begins at `octet` comes next, and the cursor is there or past it. Gives the gap in front of it; there may be
+    // another one after that.
+    [[nodiscard]] std::optional<Gap> before(std::uint32_t octet) {
+        return isCovered(octet) ? std::nullopt : nextGap(octet);
+    }
+
+    void cover(OctetSpan octets) {
+        if (octets.first <= covered_) {
+            covered_ = std::max(covered_, octets.end);
+        } else {
+            ahead_.push_back(octets);
+        }
+    }
+
+private:
+    [[nodiscard]] std::optional<Gap> nextGap(std::uint32_t end);
+
+    std::uint32_t covered_ = 0; // all octets up to this one are in fields, or in gaps that were told
+    std::vector<OctetSpan> ahead_;
+};
 
 } // namespace netfloor::cli

@@ -1,8 +1,9 @@
 // SPDX-License-Identifier: MIT
 #include "output.h"
 
+#include <array>
 #include <cerrno>
-#include <cstring>
+#include <string>
 
 #include <unistd.h>
 
@@ -10,7 +11,7 @@ namespace netfloor::cli {
 
 namespace {
 
-constexpr std::size_t flushOctets = std::size_t{64} * 1024;
+constexpr std::string_view digits = "0123456789abcdef";
 
 constexpr std::string_view startOf(Style style) {
     switch (style) {
@@ -24,45 +25,90 @@ constexpr std::string_view startOf(Style style) {
     return "";
 }
 
+constexpr bool isPrintable(unsigned char octet) {
+    return octet >= 0x20 && octet < 0x7f;
+}
+
+constexpr std::size_t wordOctets = 8;
+
+std::uint64_t loadWord(const char *text) {
+    std::uint64_t word = 0;
+    std::memcpy(&word, text, sizeof word);
+    return word;
+}
+
+// Has the top bit of an octet set if one of the characters is not printable: below a blank, DEL, or with its own top
+// bit set. A borrow or a carry goes only to octets above one for which the answer is known already.
+constexpr std::uint64_t unprintableIn(std::uint64_t word) {
+    constexpr std::uint64_t ones = 0x0101010101010101;
+    return (word | (word - ones * 0x20) | (word + ones)) & ones * 0x80;
+}
+
+bool areAllPrintable(std::string_view text) {
+    if (text.size() < wordOctets) {
+        bool all = true;
+        for (const char character : text) {
+            all &= isPrintable(static_cast<unsigned char>(character));
+        }
+        return all;
+    }
+    std::uint64_t found = unprintableIn(loadWord(text.data() + text.size() - wordOctets));
+    for (std::size_t i = 0; i + wordOctets < text.size(); i += wordOctets) {
+        found |= unprintableIn(loadWord(text.data() + i));
+    }
+    return found == 0;
+}
+
 } // namespace
 
+void Output::octet(std::uint8_t octet) {
+    char *const to = room(2);
+    to[0] = digits[octet >> 4U];
+    to[1] = digits[octet & 0xfU];
+    next_ = to + 2;
+}
+
 void Output::untrusted(std::string_view text) {
-    constexpr std::string_view digits = "0123456789abcdef";
+    if (areAllPrintable(text)) {
+        *this << text;
+        return;
+    }
     for (const char character : text) {
         const auto octet = static_cast<unsigned char>(character);
-        if (octet >= 0x20 && octet < 0x7f) {
-            buffer_ += character;
+        if (isPrintable(octet)) {
+            *this << character;
         } else {
-            buffer_ += {'\\', 'x', digits[octet >> 4U], digits[octet & 0xfU]};
+            *this << '\\' << 'x' << digits[octet >> 4U] << digits[octet & 0xfU];
         }
     }
 }
 
-void Output::styled(Style style, std::string_view text) {
-    if (!colour_ || style == Style::plain) {
-        buffer_ += text;
-        return;
-    }
-    buffer_ += startOf(style);
-    buffer_ += text;
-    buffer_ += "\x1b[0m";
+void Output::grow(std::size_t octets) {
+    const std::size_t size = mark();
+    buffer_.resize(2 * buffer_.size() + octets);
+    next_ = buffer_.data() + size;
+    limit_ = buffer_.data() + buffer_.size();
+}
+
+Output &Output::startStyle(Style style) {
+    return *this << startOf(style);
 }
 
 void Output::rightAligned(std::string_view text, std::size_t width) {
     if (text.size() < width) {
         blanks(width - text.size());
     }
-    buffer_ += text;
+    *this << text;
 }
 
-void Output::endPacket() {
-    if (eachPacket_ || buffer_.size() >= flushOctets) {
-        flush();
-    }
+void Output::rightAligned(std::uint64_t number, std::size_t width) {
+    std::array<char, mostDigits> text;
+    const char *const end = std::to_chars(text.data(), text.data() + text.size(), number).ptr;
+    rightAligned(std::string_view(text.data(), end), width);
 }
 
 void Output::flush() {
-    std::string_view rest = buffer_;
+    std::string_view rest = since(0);
     while (!rest.empty()) {
         const ssize_t written = ::write(STDOUT_FILENO, rest.data(), rest.size());
         if (written >= 0) {
@@ -73,7 +119,7 @@ void Output::flush() {
             throw OutputError(std::string("the output cannot be written: ") + std::strerror(errno) + ".");
         }
     }
-    buffer_.clear();
+    next_ = buffer_.data();
 }
 
 } // namespace netfloor::cli

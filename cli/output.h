@@ -2,10 +2,13 @@
 // Results on standard output: buffered, coloured on a terminal, and quiet when the reader goes away.
 #pragma once
 
+#include <charconv>
+#include <cstddef>
 #include <cstdint>
+#include <cstring>
 #include <stdexcept>
-#include <string>
 #include <string_view>
+#include <vector>
 
 namespace netfloor::cli {
 
@@ -20,38 +23,109 @@ public:
 
 enum class Style : std::uint8_t { plain, dim, bold, good, warning, bad };
 
+// A number in hexadecimal, without leading zeros.
+struct Hex {
+    std::uint32_t number;
+};
+
 class Output {
 public:
-    // `eachPacket`: flush behind each packet, for who waits in front of a live capture.
-    Output(bool colour, bool eachPacket) : colour_(colour), eachPacket_(eachPacket) {}
+    // `eachPacket`: flush after each packet, for who waits in front of a live capture.
+    Output(bool colour, bool eachPacket) : colour_(colour), eachPacket_(eachPacket) { grow(firstRoom); }
 
     Output &operator<<(std::string_view text) {
-        buffer_ += text;
+        char *const to = room(text.size());
+        std::memcpy(to, text.data(), text.size());
+        next_ = to + text.size();
         return *this;
     }
     Output &operator<<(char character) {
-        buffer_ += character;
+        char *const to = room(1);
+        *to = character;
+        next_ = to + 1;
         return *this;
     }
-    Output &operator<<(std::uint64_t number) { return *this << std::string_view(std::to_string(number)); }
+    Output &operator<<(std::uint64_t number) {
+        char *const to = room(mostDigits);
+        return advanceTo(std::to_chars(to, to + mostDigits, number).ptr);
+    }
+    Output &operator<<(std::uint32_t number) {
+        char *const to = room(mostDigits);
+        return advanceTo(std::to_chars(to, to + mostDigits, number).ptr);
+    }
+    Output &operator<<(Hex value) {
+        char *const to = room(mostDigits);
+        return advanceTo(std::to_chars(to, to + mostDigits, value.number, 16).ptr);
+    }
+
+    // "1 octet", "2 octets".
+    Output &count(std::uint64_t number, std::string_view thing) {
+        *this << number << ' ' << thing;
+        return number == 1 ? *this : *this << 's';
+    }
+
+    // Two digits.
+    void octet(std::uint8_t octet);
 
     // Text that came out of a packet: what a terminal would not just print is shown as \x1b.
     void untrusted(std::string_view text);
 
-    void styled(Style style, std::string_view text);
+    // What stands between the two is in that style, if there is colour.
+    Output &start(Style style) { return colour_ ? startStyle(style) : *this; }
+    Output &stop(Style style) { return colour_ && style != Style::plain ? *this << "\x1b[0m" : *this; }
+    void styled(Style style, std::string_view text) { (start(style) << text).stop(style); }
 
-    // Blanks up to `width`, then `text`.
+    // Blanks up to `width`, then the text or the number.
     void rightAligned(std::string_view text, std::size_t width);
-    void blanks(std::size_t count) { buffer_.append(count, ' '); }
+    void rightAligned(std::uint64_t number, std::size_t width);
+    void blanks(std::size_t count) { repeated(' ', count); }
+    void repeated(char character, std::size_t count) {
+        char *const to = room(count);
+        std::memset(to, character, count);
+        next_ = to + count;
+    }
+
+    // A place in the text, up to which it can be taken back or looked at until `mayFlush`, `endPacket` or `flush`.
+    using Mark = std::size_t;
+    [[nodiscard]] Mark mark() const { return static_cast<std::size_t>(next_ - buffer_.data()); }
+    void takeBack(Mark mark) { next_ = buffer_.data() + mark; }
+    [[nodiscard]] std::string_view since(Mark mark) const { return {buffer_.data() + mark, next_}; }
+
+    // The text may leave the buffer, which grows as long as it may not. Throws OutputClosed and OutputError.
+    void mayFlush() {
+        if (mark() >= flushOctets) {
+            flush();
+        }
+    }
 
     // A packet, or the whole, is through. Both throw OutputClosed and OutputError.
-    void endPacket();
+    void endPacket() { eachPacket_ ? flush() : mayFlush(); }
     void flush();
 
 private:
-    std::string buffer_;
+    static constexpr std::size_t flushOctets = std::size_t{256} * 1024;
+    static constexpr std::size_t firstRoom = flushOctets + std::size_t{64} * 1024;
+    static constexpr std::size_t mostDigits = 24;
+
+    // The end of the text, with room for so many octets.
+    [[nodiscard]] char *room(std::size_t octets) {
+        if (static_cast<std::size_t>(limit_ - next_) < octets) {
+            grow(octets);
+        }
+        return next_;
+    }
+    Output &advanceTo(char *end) {
+        next_ = end;
+        return *this;
+    }
+    void grow(std::size_t octets);
+    Output &startStyle(Style style);
+
     bool colour_;
     bool eachPacket_;
+    std::vector<char> buffer_;
+    char *next_ = nullptr; // the end of the text in it
+    char *limit_ = nullptr;
 };
 
 } // namespace netfloor::cli

@@ -9,7 +9,12 @@
 namespace netfloor::cli {
 
 // Names and texts carry blanks in front, by which a host may lay them out; here a tree does.
-[[nodiscard]] std::string_view withoutLeadingBlanks(std::string_view text);
+[[nodiscard]] inline std::string_view withoutLeadingBlanks(std::string_view text) {
+    while (text.starts_with(' ')) {
+        text.remove_prefix(1);
+    }
+    return text;
+}
 
 // "1 octet", "2 octets".
 [[nodiscard]] std::string countText(std::uint64_t count, const char *thing);

@@ -7,7 +7,7 @@
 set -eu
 
 decode="g++ cmake ninja-build pkg-config libpcap-dev libcli11-dev zlib1g-dev nlohmann-json3-dev"
-all="$decode libgtest-dev libbenchmark-dev libtins-dev clang clang-format clang-tidy tshark"
+all="$decode libgtest-dev libbenchmark-dev libtins-dev clang clang-format clang-tidy tshark tcpdump"
 
 case "${1:-all}" in
 decode) wanted=$decode ;;

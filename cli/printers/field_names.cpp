@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: MIT
 #include "printers/field_names.h"
 
+#include <algorithm>
 #include <set>
 #include <string_view>
 
@@ -8,24 +9,30 @@
 
 namespace netfloor::cli {
 
-FieldNames::FieldNames(const PluginLibrary &library) {
+namespace {
+
+// Ids are small; a table with others would not be worth the room.
+constexpr std::uint32_t mostIds = 65536;
+
+} // namespace
+
+FieldNames::FieldNames(const PluginLibrary &library) : names_(1) {
     const FieldTables tables(library);
     // A display id stands for all fields of one name, and any of them may be the one with the key.
     std::set<std::string_view> keyNames;
+    std::uint32_t lastId = 0;
     for (const FieldDescription &field : tables.fields()) {
         if (field.keyIndex != 0) {
             keyNames.insert(field.name);
         }
+        lastId = std::max(lastId, field.id < mostIds ? field.id : 0);
     }
+    names_.resize(std::size_t{lastId} + 1);
     for (const FieldDescription &field : tables.fields()) {
-        names_.try_emplace(field.id, DisplayName{std::string(field.shortName), keyNames.contains(field.name)});
+        if (field.id != 0 && field.id <= lastId) {
+            names_[field.id] = {std::string(field.shortName), keyNames.contains(field.name)};
+        }
     }
-}
-
-const DisplayName &FieldNames::find(std::uint32_t displayId) const {
-    static const DisplayName unknown;
-    const auto found = names_.find(displayId);
-    return found == names_.end() ? unknown : found->second;
 }
 
 } // namespace netfloor::cli

@@ -1,10 +1,10 @@
 // SPDX-License-Identifier: MIT
-// What is behind the display ids of the TO pass, whose texts bear no names.
+// What the display ids of the TO pass stand for, whose texts bear no names.
 #pragma once
 
 #include <cstdint>
 #include <string>
-#include <unordered_map>
+#include <vector>
 
 #include "netfloor-host/plugin_library.h"
 
@@ -21,10 +21,12 @@ public:
     explicit FieldNames(const PluginLibrary &library);
 
     // What an owner of a next layer says, whose id is 0, counts like a key field.
-    [[nodiscard]] const DisplayName &find(std::uint32_t displayId) const;
+    [[nodiscard]] const DisplayName &find(std::uint32_t displayId) const {
+        return names_[displayId < names_.size() ? displayId : 0];
+    }
 
 private:
-    std::unordered_map<std::uint32_t, DisplayName> names_;
+    std::vector<DisplayName> names_; // by id; the first stands for all that the tables do not know
 };
 
 } // namespace netfloor::cli

@@ -1,10 +1,8 @@
 // SPDX-License-Identifier: MIT
 #include "printers/field_text.h"
 
-#include <algorithm>
 #include <array>
-#include <cctype>
-#include <cstdio>
+#include <charconv>
 
 #include "text.h"
 
@@ -14,84 +12,75 @@ namespace {
 
 constexpr std::uint32_t bitsPerOctet = 8;
 
-std::uint32_t bitCount(const FieldReport &field) {
-    std::uint32_t bits = 0;
-    for (const ReportedRange &range : field.ranges) {
-        bits += range.lastBit - range.firstBit + 1;
-    }
-    return bits;
-}
-
-// What stands behind the field's name in its text; none where there is only a name.
-std::optional<std::string_view> shownValue(const FieldReport &field) {
-    const std::string_view text = field.text;
+// What stands after the field's name in its text; none where there is only a name.
+std::optional<std::string_view> shownValue(std::string_view text) {
     const auto equals = text.find('=');
     return equals == std::string_view::npos ? std::nullopt : std::optional(text.substr(equals + 1));
 }
 
+// Whether the text is the number in hexadecimal, or ends with "(number)".
+bool showsNumber(std::string_view text, std::uint32_t number) {
+    std::array<char, 12> room;
+    const auto digitsOf = [&](int base) {
+        return std::string_view(room.data(), std::to_chars(room.data(), room.data() + room.size(), number, base).ptr);
+    };
+    if (text == digitsOf(16)) {
+        return true;
+    }
+    if (!text.ends_with(')')) {
+        return false;
+    }
+    text.remove_suffix(1);
+    const std::string_view digits = digitsOf(10);
+    return text.ends_with(digits) && text.substr(0, text.size() - digits.size()).ends_with('(');
+}
+
+bool isLetter(char character) {
+    return (character >= 'a' && character <= 'z') || (character >= 'A' && character <= 'Z');
+}
+
 } // namespace
 
-std::string bitsText(const std::vector<ReportedRange> &ranges) {
-    std::string text;
+void writeBits(Output &out, std::span<const BitRange> ranges) {
     for (std::size_t i = 0; i < ranges.size();) {
         const std::uint32_t first = ranges[i].firstBit;
         std::uint32_t last = ranges[i].lastBit;
+        out << (i == 0 ? "" : ",") << first;
         for (++i; i < ranges.size() && ranges[i].firstBit == last + 1; ++i) {
             last = ranges[i].lastBit;
         }
-        text += text.empty() ? "" : ",";
-        text += std::to_string(first);
         if (last != first) {
-            text += "-" + std::to_string(last);
+            out << '-' << last;
         }
     }
-    return text;
 }
 
-std::string octetsText(std::uint32_t firstBit, std::uint32_t lastBit) {
-    const std::uint32_t first = (firstBit - 1) / bitsPerOctet;
-    const std::uint32_t last = (lastBit - 1) / bitsPerOctet;
-    return first == last ? "octet " + std::to_string(first)
-                         : "octets " + std::to_string(first) + " to " + std::to_string(last);
-}
-
-std::string_view nameOf(const FieldReport &field) {
-    const std::string_view name = withoutLeadingBlanks(field.name);
-    return name.empty() ? "(without a name)" : name;
-}
-
-OctetRun unshownOctets(const FieldReport &field, std::span<const std::uint8_t> packet) {
-    const std::uint32_t bits = bitCount(field);
-    if (bits <= sizeof(field.value) * bitsPerOctet ||
-        shownValue(field).value_or("").find_first_not_of("0123456789abcdef") != std::string_view::npos) {
-        return {};
+void writeOctetNumbers(Output &out, OctetSpan octets) {
+    if (octets.end - octets.first == 1) {
+        out << "octet " << octets.first;
+        return;
     }
-    // Some fields are read from the last octet on.
-    std::uint32_t first = field.ranges.front().firstBit;
-    std::uint32_t last = field.ranges.front().lastBit;
-    for (const ReportedRange &range : field.ranges) {
-        first = std::min(first, range.firstBit);
-        last = std::max(last, range.lastBit);
-    }
-    if (last - first + 1 != bits || first % bitsPerOctet != 1 || bits % bitsPerOctet != 0) {
-        return {};
-    }
-    return {first, packet.subspan((first - 1) / bitsPerOctet, bits / bitsPerOctet)};
+    out << "octets " << octets.first << " to " << octets.end - 1;
 }
 
-std::optional<std::uint32_t> unshownNumber(const FieldReport &field) {
-    const auto shown = shownValue(field);
-    const std::uint32_t bits = bitCount(field);
-    if (!shown || (bits != bitsPerOctet && bits != 2 * bitsPerOctet)) {
+std::string_view nameOf(const FieldView &field) {
+    return field.name.empty() ? "(without a name)" : field.name;
+}
+
+std::optional<OctetSpan> unshownOctets(const FieldView &field, std::uint32_t bits, std::string_view text) {
+    if (shownValue(text).value_or("").find_first_not_of("0123456789abcdef") != std::string_view::npos) {
         return std::nullopt;
     }
-    std::array<char, 16> hexadecimal{};
-    std::snprintf(hexadecimal.data(), hexadecimal.size(), "%x", field.value);
-    const bool isNumber = *shown == hexadecimal.data() || shown->ends_with("(" + std::to_string(field.value) + ")");
-    // A single letter is an octet of text.
-    const bool isName =
-        shown->empty() || (shown->size() > 1 && std::isalpha(static_cast<unsigned char>(shown->front())) != 0);
-    return isName && !isNumber ? std::optional(field.value) : std::nullopt;
+    const OctetSpan octets = *octetsOf(field);
+    const bool isWhole = (octets.end - octets.first) * bitsPerOctet == bits;
+    return isWhole ? std::optional(octets) : std::nullopt;
+}
+
+bool showsItsNumber(std::string_view text, std::uint32_t number) {
+    const auto shown = shownValue(text);
+    // A text that starts with a digit is a number; a single letter is an octet of text.
+    const bool isName = shown && (shown->empty() || (shown->size() > 1 && isLetter(shown->front())));
+    return !isName || showsNumber(*shown, number);
 }
 
 } // namespace netfloor::cli

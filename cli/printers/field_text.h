@@ -5,33 +5,35 @@
 #include <cstdint>
 #include <optional>
 #include <span>
-#include <string>
 #include <string_view>
-#include <vector>
 
-#include "netfloor-host/reports.h"
+#include "gaps.h"
+#include "netfloor-host/sink.h"
+#include "output.h"
 
 namespace netfloor::cli {
 
 // "17-32", and for a field whose pieces do not follow one another "1-5,9-16".
-[[nodiscard]] std::string bitsText(const std::vector<ReportedRange> &ranges);
+void writeBits(Output &out, std::span<const BitRange> ranges);
 
 // "octet 7", "octets 7 to 9"
-[[nodiscard]] std::string octetsText(std::uint32_t firstBit, std::uint32_t lastBit);
+void writeOctetNumbers(Output &out, OctetSpan octets);
 
-[[nodiscard]] std::string_view nameOf(const FieldReport &field);
+[[nodiscard]] std::string_view nameOf(const FieldView &field);
 
-// Octets one behind the other, as they stand in the packet from `firstBit` on.
-struct OctetRun {
-    std::uint32_t firstBit = 0;
-    std::span<const std::uint8_t> octets;
-};
+[[nodiscard]] inline std::uint32_t bitCount(std::span<const BitRange> ranges) {
+    std::uint32_t bits = 0;
+    for (const BitRange &range : ranges) {
+        bits += range.lastBit - range.firstBit + 1;
+    }
+    return bits;
+}
 
-// Those of a field that has more than a number can hold and whose text shows only digits, if that: the text leaves out
-// the zeros in front and may be cut. Empty for other fields.
-[[nodiscard]] OctetRun unshownOctets(const FieldReport &field, std::span<const std::uint8_t> packet);
+// The octets of a field of more bits than a number can hold whose text shows only digits, if that: the text leaves out
+// the zeros in front and may be cut. None for other fields.
+[[nodiscard]] std::optional<OctetSpan> unshownOctets(const FieldView &field, std::uint32_t bits, std::string_view text);
 
-// The number of a field whose text gives the name of its value, or no name: of types and codes, not of single bits.
-[[nodiscard]] std::optional<std::uint32_t> unshownNumber(const FieldReport &field);
+// Whether the text tells the number. It does not where it has the name of the value, or nothing, in its place.
+[[nodiscard]] bool showsItsNumber(std::string_view text, std::uint32_t number);
 
 } // namespace netfloor::cli

@@ -1,11 +1,12 @@
 // SPDX-License-Identifier: MIT
-// What is printed of each packet. Printers know the types of reports, and no protocol.
+// What is printed of each packet. Printers know what a host reports, and no protocol.
 #pragma once
 
 #include <cstdint>
 #include <map>
 #include <memory>
 #include <string>
+#include <string_view>
 
 #include "exit_code.h"
 #include "netfloor-capture/link_layer.h"
@@ -18,14 +19,35 @@
 namespace netfloor::cli {
 
 // What the packets that were shown have been.
-struct Tally {
+class Tally {
+public:
     std::uint64_t packets = 0;
     std::uint64_t withIp = 0;
-    std::map<NotIp, std::uint64_t> others;
 
-    void add(const NetworkPart &network);
+    // Gives what the packet is in words, "ARP"; empty for IP.
+    std::string_view add(const NetworkPart &network);
+
+    [[nodiscard]] bool hasOthers() const { return packets != withIp; }
+
     // "205 packets: 198 with IP, 7 without (4 ARP, 3 LLDP)"
     [[nodiscard]] std::string text() const;
+
+private:
+    struct Other {
+        std::string text;
+        std::uint64_t packets = 0;
+    };
+
+    std::map<NotIp, Other> others_; // of a bounded number: a capture may have millions of kinds
+    Other rest_;                    // the text of the last one, and the packets of all
+};
+
+// One packet, as the printers get it.
+struct PacketToPrint {
+    const CapturedPacket &captured;
+    const NetworkPart &network;
+    std::string_view other; // what it is if it is no IP
+    std::string_view time;  // in the form that the options ask for
 };
 
 class Printer {
@@ -35,10 +57,9 @@ public:
     Printer &operator=(const Printer &) = delete;
     virtual ~Printer() = default;
 
-    // One packet, `time` in the form that the options ask for.
-    virtual void print(const CapturedPacket &packet, const NetworkPart &network, const std::string &time) = 0;
+    virtual void print(const PacketToPrint &packet) = 0;
 
-    // Behind the last packet.
+    // After the last packet.
     virtual void finish(const Tally &tally) = 0;
 
     [[nodiscard]] virtual ExitCode exitCode() const { return ExitCode::good; }
@@ -49,9 +70,11 @@ protected:
     [[nodiscard]] Host &host() const { return host_; }
 
     // The columns that start a line: number, time, octets.
-    void printHead(const CapturedPacket &packet, const std::string &time);
+    void printHead(const PacketToPrint &packet);
     // "no IP: ARP", dimmed.
-    void printOther(const NetworkPart &network) const;
+    void printOther(const PacketToPrint &packet) const;
+    // "cut by the snap length: 96 of 1514 octets", or nothing.
+    void printCut(const CapturedPacket &packet) const;
     void printTally(const Tally &tally) const;
 
 private:
@@ -60,9 +83,6 @@ private:
     Host &host_;
     std::size_t timeWidth_ = 11;
 };
-
-// "cut by the snap length: 96 of 1514 octets", or empty.
-[[nodiscard]] std::string cutText(const CapturedPacket &packet);
 
 [[nodiscard]] std::unique_ptr<Printer> makePrinter(const Options &options, Output &out, Host &host);
 

@@ -2,11 +2,10 @@
 // A verdict on each packet, out of the MV pass, and a total.
 #include <algorithm>
 #include <array>
-#include <cstdio>
+#include <span>
 #include <string_view>
 
 #include "findings.h"
-#include "netfloor-host/field_knowledge.h"
 #include "printers/printer.h"
 
 namespace netfloor::cli {
@@ -36,20 +35,36 @@ constexpr std::array<VerdictWords, 5> words = {{
     {"DAMAGED", "damaged", Style::bad},
 }};
 
+// How the MV pass ended.
+class Outcome final : public Sink {
+public:
+    void end(const PassEnd &end) override {
+        ending = end.ending;
+        verdict = end.verdict;
+        bitsLeft = end.bitsLeft;
+    }
+
+    Ending ending = Ending::complete;
+    Verdict verdict;
+    std::uint32_t bitsLeft = 0;
+};
+
 class VerifyPrinter final : public Printer {
 public:
     VerifyPrinter(const Options &options, Output &out, Host &host)
-        : Printer(options, out, host), knowledge_(FieldTables(host.library()).fields()) {}
+        : Printer(options, out, host), explainer_(FieldTables(host.library())) {}
 
-    void print(const CapturedPacket &packet, const NetworkPart &network, const std::string &time) override {
-        printHead(packet, time);
-        if (network.isIp()) {
-            printVerdict(packet, network.octets);
+    void print(const PacketToPrint &packet) override {
+        printHead(packet);
+        if (packet.network.isIp()) {
+            printVerdict(packet.captured, packet.network.octets);
         } else {
-            printOther(network);
+            printOther(packet);
         }
-        if (packet.isCut()) {
-            out().styled(Style::warning, "  [" + cutText(packet) + "]");
+        if (packet.captured.isCut()) {
+            out().start(Style::warning) << "  [";
+            printCut(packet.captured);
+            (out() << ']').stop(Style::warning);
         }
         out() << '\n';
     }
@@ -64,7 +79,7 @@ public:
         for (std::size_t i = 0; i < words.size(); ++i) {
             if (counts_[i] != 0) {
                 out() << (first ? "" : ", ");
-                out().styled(words[i].style, std::to_string(counts_[i]) + " " + std::string(words[i].total));
+                (out().start(words[i].style) << counts_[i] << ' ' << words[i].total).stop(words[i].style);
                 first = false;
             }
         }
@@ -78,12 +93,12 @@ public:
 
 private:
     void printVerdict(const CapturedPacket &packet, std::span<const std::uint8_t> octets) {
-        const Report report = host().run(Pass::mv, octets);
-        std::vector<Finding> findings;
-        if (report.verdict.fault()) {
-            findings = explainFlags(report.flags, host().run(Pass::md, octets), knowledge_);
+        host().run(Pass::mv, octets, outcome_);
+        std::span<const Finding> findings;
+        if (outcome_.verdict.fault()) {
+            findings = explainer_.explain(outcome_.verdict.flags, host(), octets);
         }
-        const auto verdict = static_cast<std::size_t>(verdictOf(report, findings, packet.isCut()));
+        const auto verdict = static_cast<std::size_t>(verdictOf(outcome_, findings, packet.isCut()));
         ++counts_[verdict];
 
         const VerdictWords &shown = words[verdict];
@@ -91,28 +106,28 @@ private:
         if (!findings.empty()) {
             out().blanks(words.back().verdict.size() - shown.verdict.size());
         }
-        if (report.ending == Ending::cutOff) {
+        if (outcome_.ending == Ending::cutOff) {
             out() << "  the pass was cut off";
         }
         for (const Finding &finding : findings) {
-            std::array<char, 16> flag{};
-            std::snprintf(flag.data(), flag.size(), "  0x%x ", finding.flag);
-            out() << flag.data() << finding.text;
+            out() << "  0x" << Hex{finding.flag} << ' ';
+            explainer_.write(out(), finding);
             if (finding.kind == FindingKind::byDesign) {
                 out().styled(Style::dim, " (by design)");
             }
         }
-        if (report.bitsLeft != 0) {
-            out().styled(Style::dim, "  " + countText(report.bitsLeft / 8, "octet") + " not decoded");
+        if (outcome_.bitsLeft != 0) {
+            (out().start(Style::dim) << "  ").count(outcome_.bitsLeft / 8, "octet") << " not decoded";
+            out().stop(Style::dim);
         }
     }
 
-    [[nodiscard]] static PacketVerdict verdictOf(const Report &report, const std::vector<Finding> &findings,
+    [[nodiscard]] static PacketVerdict verdictOf(const Outcome &outcome, std::span<const Finding> findings,
                                                  bool isCut) {
-        if (report.ending == Ending::cutOff) {
+        if (outcome.ending == Ending::cutOff) {
             return PacketVerdict::damaged;
         }
-        if (!report.verdict.fault()) {
+        if (!outcome.verdict.fault()) {
             return PacketVerdict::good;
         }
         FindingKind worst = FindingKind::byDesign;
@@ -127,7 +142,8 @@ private:
         return isCut ? PacketVerdict::cut : PacketVerdict::damaged;
     }
 
-    FieldKnowledge knowledge_;
+    FlagExplainer explainer_;
+    Outcome outcome_;
     std::array<std::uint64_t, words.size()> counts_ = {};
 };
 

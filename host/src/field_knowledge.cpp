@@ -81,9 +81,9 @@ constexpr std::array lengths = {
 
 } // namespace
 
-std::uint32_t LengthField::endBit(const FieldReport &report) const {
+std::uint32_t LengthField::endBit(const FieldView &view) const {
     constexpr std::uint32_t bitsPerOctet = 8;
-    return report.ranges.front().firstBit - bitsBefore + report.value * bitsPerOctet;
+    return view.ranges.front().firstBit - bitsBefore + view.value * bitsPerOctet;
 }
 
 std::optional<KeyType> knownKeyType(std::string_view keyFieldName) {

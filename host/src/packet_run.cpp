@@ -44,6 +44,7 @@ Ending PacketRun::run(Pass pass, std::span<const std::uint8_t> packet, const Own
     pass_ = pass;
     owners_ = &owners;
     sink_ = &sink;
+    withBlocks_ = pass == Pass::md && sink.wantsBlocks();
     options_ = options;
     prepare(packet, test);
     sink.begin(pass, packet);
@@ -193,23 +194,18 @@ void PacketRun::addField(std::uint32_t outputRangeCount, const BitRange *ranges,
     }
     try {
         NamedField &field = names_.find(fieldId);
-        blocks_.moveTo(state(), field, *sink_);
         const std::uint8_t *const head = fieldRecordHead();
         const LazyText reportedName(fieldName);
-        sink_->field({
-            .id = fieldId,
-            .name = field.isKnown ? field.name : withoutLeadingBlanks(reportedName.view()),
-            .isKey = field.isKey,
-            .text = LazyText(display),
-            .reportedName = reportedName,
-            .value = state().fieldRecord.value,
-            .ranges = {ranges, outputRangeCount},
-            .bitOrder = bitOrder,
-            .flags = state().flags,
-            .depth = blocks_.shownDepth(),
-            .blocks = blocks_.open(),
-            .recordHead = {head[0], head[1], head[2]},
-        });
+        view_.id = fieldId;
+        view_.name = field.isKnown ? field.name : withoutLeadingBlanks(reportedName.view());
+        view_.isKey = field.isKey;
+        view_.text = LazyText(display);
+        view_.reportedName = reportedName;
+        view_.value = state().fieldRecord.value;
+        view_.ranges = {ranges, outputRangeCount};
+        view_.bitOrder = bitOrder;
+        view_.recordHead = {head[0], head[1], head[2]};
+        reportField(field);
         preDecode_.context.fieldRecordCount = (preDecode_.context.fieldRecordCount + 1) % fieldRecordCount;
         fillFieldRecordHead();
     } catch (...) {
@@ -258,24 +254,36 @@ void PacketRun::addOwnEntry(std::uint32_t bits, std::string_view name, std::stri
     }
     if (pass_ == Pass::md) {
         const BitRange range = {0, state().cursor, state().cursor + bits - 1, 0, {}};
-        blocks_.moveTo(state(), names_.find(0), *sink_);
-        sink_->field({
-            .id = 0,
-            .name = name,
-            .isKey = false,
-            .text = LazyText(longText),
-            .reportedName = LazyText(name),
-            .value = 0,
-            .ranges = {&range, 1},
-            .bitOrder = 0,
-            .flags = state().flags,
-            .depth = blocks_.shownDepth(),
-            .blocks = blocks_.open(),
-            .recordHead = {preDecode_.context.layerNumber, 0, 0},
-        });
+        view_.id = 0;
+        view_.name = name;
+        view_.isKey = false;
+        view_.text = LazyText(longText);
+        view_.reportedName = LazyText(name);
+        view_.value = 0;
+        view_.ranges = {&range, 1};
+        view_.bitOrder = 0;
+        view_.recordHead = {preDecode_.context.layerNumber, 0, 0};
+        reportField(names_.find(0));
     } else if (pass_ == Pass::to) {
         sink_->text({0, name, false, LazyText(shortText), preDecode_.context.layerNumber});
     }
+}
+
+// Completes the view by what the decode state tells.
+void PacketRun::reportField(NamedField &field) {
+    view_.flags = state().flags;
+    view_.cursor = state().cursor;
+    if (withBlocks_) {
+        blocks_.moveTo(state(), field, *sink_);
+        view_.depth = blocks_.shownDepth();
+        view_.blocks = blocks_.open();
+        view_.blockName = LazyText(view_.blocks.empty() ? std::string_view() : view_.blocks.back().name);
+    } else {
+        view_.depth = 0;
+        view_.blocks = {};
+        view_.blockName = LazyText(names_.blockName(field, state().blockName));
+    }
+    sink_->field(view_);
 }
 
 void PacketRun::keepException() noexcept {

@@ -68,6 +68,7 @@ private:
     }
     // Fills the head of the current field record, so that the host sees what the plug-in did not write.
     void fillFieldRecordHead() { std::memset(fieldRecordHead(), untouchedOctet, headOctets); }
+    void reportField(NamedField &field);
     void keepException() noexcept;
     Ending finish(std::int32_t result);
 
@@ -84,6 +85,8 @@ private:
     Pass pass_ = Pass::md;
     const OwnerRegistry *owners_ = nullptr;
     Sink *sink_ = nullptr;
+    bool withBlocks_ = true; // the sink wants them
+    FieldView view_;         // of the field at hand; to clear a new one takes as long as all else that is done for it
     RunOptions options_;
     bool followStop_ = true;
     std::span<const std::uint8_t> packet_;

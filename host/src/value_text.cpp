@@ -30,16 +30,35 @@ constexpr NamedFlag namedFlags[] = {
     {NETFLOOR_FLAG_NO_RANGES, "no storage for bit ranges"},
 };
 
-std::string numberText(std::uint32_t number, int base) {
-    char text[16];
-    const auto end = std::to_chars(std::begin(text), std::end(text), number, base).ptr;
-    return {text, end};
+// Writes a text into its room.
+class TextWriter {
+public:
+    explicit TextWriter(TextRoom &room) : room_(room), end_(room.data()) {}
+
+    void character(char character) { *end_++ = character; }
+    void text(std::string_view text) { end_ += text.copy(end_, static_cast<std::size_t>(limit() - end_)); }
+    void number(std::uint32_t number, int base) { end_ = std::to_chars(end_, limit(), number, base).ptr; }
+
+    [[nodiscard]] std::string_view written() const { return {room_.data(), end_}; }
+
+private:
+    [[nodiscard]] char *limit() const { return room_.data() + room_.size(); }
+
+    TextRoom &room_;
+    char *end_;
+};
+
+std::string unnamedFlag(std::uint32_t bit) {
+    TextRoom room;
+    TextWriter text(room);
+    text.text("flag 0x");
+    text.number(bit, hexadecimal);
+    return std::string(text.written());
 }
 
 std::string flagName(std::uint32_t bit) {
     const auto *const found = std::ranges::find(namedFlags, bit, &NamedFlag::bit);
-    return found != std::end(namedFlags) ? std::string(found->name)
-                                         : std::string("flag 0x").append(numberText(bit, hexadecimal));
+    return found != std::end(namedFlags) ? std::string(found->name) : unnamedFlag(bit);
 }
 
 // A run of groups that are 0.
@@ -65,12 +84,22 @@ ZeroRun longestZeroRun(const Groups &groups) {
     return longest.count < 2 ? ZeroRun{} : longest;
 }
 
-std::string joinGroups(const Groups &groups, std::size_t first, std::size_t end) {
-    std::string text;
+void writeGroups(const Groups &groups, std::size_t first, std::size_t end, TextWriter &text) {
     for (std::size_t group = first; group < end; ++group) {
-        text.append(group == first ? "" : ":").append(numberText(groups[group], hexadecimal));
+        if (group != first) {
+            text.character(':');
+        }
+        text.number(groups[group], hexadecimal);
     }
-    return text;
+}
+
+void writeIpv4(std::uint32_t address, TextWriter &text) {
+    for (std::uint32_t shift = 32; shift != 0; shift -= bitsPerOctet) {
+        text.number(address >> (shift - bitsPerOctet) & 0xff, decimal);
+        if (shift != bitsPerOctet) {
+            text.character('.');
+        }
+    }
 }
 
 // The bits of a field whose ranges follow one another without a gap.
@@ -144,30 +173,44 @@ std::string_view passName(Pass pass) {
     return "";
 }
 
-std::string ipv6Text(const Ipv6Octets &octets) {
+std::string_view ipv6Text(const Ipv6Octets &octets, TextRoom &room) {
     Groups groups = {};
     for (std::size_t group = 0; group < groupCount; ++group) {
         groups[group] = static_cast<std::uint32_t>(octets[2 * group] << bitsPerOctet | octets[2 * group + 1]);
     }
+    TextWriter text(room);
     // RFC 5952, 5: IPv4-mapped addresses (RFC 4291, 2.5.5.2) show their last four octets in dotted form.
     constexpr Ipv6Octets mapped = {0, 0, 0, 0, 0, 0, 0, 0, 0, 0, 0xff, 0xff};
     if (std::equal(mapped.begin(), mapped.begin() + 12, octets.begin())) {
-        return "::ffff:" + ipv4Text(groups[6] << 16 | groups[7]);
+        text.text("::ffff:");
+        writeIpv4(groups[6] << 16 | groups[7], text);
+        return text.written();
     }
     const ZeroRun zeros = longestZeroRun(groups);
     if (zeros.count == 0) {
-        return joinGroups(groups, 0, groupCount);
+        writeGroups(groups, 0, groupCount, text);
+        return text.written();
     }
-    return joinGroups(groups, 0, zeros.first) + "::" + joinGroups(groups, zeros.first + zeros.count, groupCount);
+    writeGroups(groups, 0, zeros.first, text);
+    text.text("::");
+    writeGroups(groups, zeros.first + zeros.count, groupCount, text);
+    return text.written();
+}
+
+std::string_view ipv4Text(std::uint32_t address, TextRoom &room) {
+    TextWriter text(room);
+    writeIpv4(address, text);
+    return text.written();
+}
+
+std::string ipv6Text(const Ipv6Octets &octets) {
+    TextRoom room;
+    return std::string(ipv6Text(octets, room));
 }
 
 std::string ipv4Text(std::uint32_t address) {
-    std::string text;
-    for (std::uint32_t shift = 32; shift != 0; shift -= bitsPerOctet) {
-        text.append(numberText(address >> (shift - bitsPerOctet) & 0xff, decimal));
-        text.append(shift == bitsPerOctet ? "" : ".");
-    }
-    return text;
+    TextRoom room;
+    return std::string(ipv4Text(address, room));
 }
 
 std::optional<Ipv6Octets> ipv6Address(const FieldReport &field, std::span<const std::uint8_t> packet) {
@@ -188,15 +231,24 @@ std::optional<Ipv6Octets> ipv6Address(const KeyView &key) {
     return octets;
 }
 
-std::string keyText(const KeyView &key) {
+std::string_view keyText(const KeyView &key, TextRoom &room) {
     switch (key.type) {
-    case KeyType::ipv4Address: return ipv4Text(key.number);
+    case KeyType::ipv4Address: return ipv4Text(key.number, room);
     case KeyType::ipv6Address: {
         const std::optional<Ipv6Octets> octets = ipv6Address(key);
-        return octets ? ipv6Text(*octets) : std::string();
+        return octets ? ipv6Text(*octets, room) : std::string_view();
     }
-    default: return numberText(key.number, decimal);
+    default: {
+        TextWriter text(room);
+        text.number(key.number, decimal);
+        return text.written();
     }
+    }
+}
+
+std::string keyText(const KeyView &key) {
+    TextRoom room;
+    return std::string(keyText(key, room));
 }
 
 } // namespace netfloor

@@ -85,7 +85,9 @@ TEST_F(Command, shows) {
         {"netfloor detail $T/five.pcap",
          0,
          {"Packet 2  1.000000  42 octets, Ethernet\n  no IP: ARP\n", "      Source Address= 10.0.0.1\n",
-          "Destination Port=Domain Name Server (53)\n", "Data=8 octets"},
+          "Destination Port=Domain Name Server (53)\n",
+          "Data=8 octets\n            [handed on under key 53 of protocol 17]\n  [layer 1, octets 0 to 27]\n"
+          "  [layer 2, octets 28 to 35]\n\n"},
          {},
          {"["
           "97-128]"}},
@@ -237,7 +239,9 @@ TEST_F(Command, tellsFlagsByDesignFromDamage) {
         {ipv4({.protocol = 47, .payload = hex("0000 0800 45*20")}), 0, "good     0x2 every GRE payload", 0},
         {ipv4({.protocol = 132, .payload = init}), 0, "good     0x8 an SCTP INIT", 0},
         {ipv4({.protocol = 17, .payload = hex("0001 0002 00")}), 0,
-         "unread   0x10 bits left over inside a length: 1 octet after 'UDP Destination Port' at octet 23", 0},
+         "unread   0x10 bits left over inside a length: 1 octet after 'UDP Destination Port' at octet 23 (User "
+         "Datagram Protocol)",
+         0},
         {ipv4({.protocol = 6, .payload = tcpHead + hex("f002 0100 0000 0000")}), 0, "DAMAGED  0x2 every TCP header", 1},
         {ipv4({.protocol = 132, .payload = longInit}), 0, "DAMAGED  0x8 length reaches past the bits left", 1},
         {ipv4({.protocol = 132, .payload = sctpHead + hex("09 00 000c 0003 0008 00000005")}), 0,

@@ -12,7 +12,7 @@
 #include <vector>
 
 #include "netfloor-host/field_tables.h"
-#include "netfloor-host/reports.h"
+#include "netfloor-host/sink.h"
 
 namespace netfloor {
 
@@ -51,7 +51,7 @@ struct LengthField {
     std::string_view why;
 
     // The first bit after what the length counts. The field must have a range.
-    [[nodiscard]] std::uint32_t endBit(const FieldReport &report) const;
+    [[nodiscard]] std::uint32_t endBit(const FieldView &view) const;
 };
 
 // The type of a key field whose display hides it. A key field is known by its name alone.

@@ -84,11 +84,14 @@ struct FieldView {
     LazyText text;           // the display line; may be empty
     LazyText reportedName;   // unchanged, leading blanks included
     std::uint32_t value = 0; // as the field record has it
-    std::span<const BitRange> ranges;  // in the order in which they were read; value, firstBit, lastBit count
-    std::uint32_t bitOrder = 0;        // 8 where the bits of each octet were read reversed
-    std::uint32_t flags = 0;           // of the decode state: what was raised before the field was reported
-    std::uint32_t depth = 0;           // blocks that are shown around it
-    std::span<const BlockView> blocks; // all that the plug-in has open, the outermost first, nameless ones included
+    std::span<const BitRange> ranges = {}; // in the order in which they were read; value, firstBit, lastBit count
+    std::uint32_t bitOrder = 0;            // 8 where the bits of each octet were read reversed
+    std::uint32_t flags = 0;               // of the decode state: what was raised before the field was reported
+    std::uint32_t cursor = 0;              // likewise: the first bit that the plug-in has not gone past
+    LazyText blockName = {};               // of the innermost block, also for a sink that wants no blocks
+    std::uint32_t depth = 0;               // blocks that are shown around it
+    std::span<const BlockView> blocks =
+        {}; // all that the plug-in has open, the outermost first, nameless ones included
     // What the plug-in wrote into the head of the host's field record: the layer number, then two octets
     // that are 0, or 0xff where the plug-in did not write them.
     std::array<std::uint8_t, 3> recordHead = {};
@@ -186,6 +189,10 @@ public:
     Sink(const Sink &) = delete;
     Sink &operator=(const Sink &) = delete;
     virtual ~Sink() = default;
+
+    // Asked before each pass. Without blocks there are no calls for them, and a field has the depth 0 and no `blocks`:
+    // to find out which blocks are open takes a good part of the MD pass.
+    [[nodiscard]] virtual bool wantsBlocks() const { return true; }
 
     virtual void begin(Pass /*pass*/, std::span<const std::uint8_t> /*packet*/) {}
 

@@ -26,6 +26,11 @@ using Ipv6Octets = std::array<std::uint8_t, 16>;
 [[nodiscard]] std::string ipv6Text(const Ipv6Octets &octets);
 [[nodiscard]] std::string ipv4Text(std::uint32_t address);
 
+// Room for the text of one address or number, for who writes many of them.
+using TextRoom = std::array<char, 48>;
+[[nodiscard]] std::string_view ipv6Text(const Ipv6Octets &octets, TextRoom &room);
+[[nodiscard]] std::string_view ipv4Text(std::uint32_t address, TextRoom &room);
+
 // The IPv6 address of a field, taken from the packet by the field's bit ranges. None when the field is no IPv6
 // address: it is one if its ranges are 128 bits in one piece, 8 groups of 16 bits or 32 nibbles, follow one another
 // without a gap, and start on an octet border.
@@ -37,5 +42,6 @@ using Ipv6Octets = std::array<std::uint8_t, 16>;
 
 // The value of a key field in its usual form: a decimal number, or an address.
 [[nodiscard]] std::string keyText(const KeyView &key);
+[[nodiscard]] std::string_view keyText(const KeyView &key, TextRoom &room);
 
 } // namespace netfloor

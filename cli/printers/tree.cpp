@@ -1,0 +1,209 @@
+// SPDX-License-Identifier: MIT
+#include "printers/tree.h"
+
+#include <algorithm>
+#include <string>
+
+#include "netfloor-host/value_text.h"
+#include "printers/field_text.h"
+#include "text.h"
+
+namespace netfloor::cli {
+
+namespace {
+
+constexpr std::uint32_t bitsPerOctet = 8;
+constexpr std::uint32_t numberBits = 32; // that a field record holds
+constexpr std::uint32_t addressBits = 128;
+constexpr std::uint32_t leastRun = 5;       // fewer octets of data stand on lines of their own
+constexpr std::uint32_t octetsPerLine = 16; // of data
+constexpr std::uint32_t mostDataLines = 4;  // without --all
+
+std::uint32_t octetOf(std::uint32_t bit) {
+    return (bit - 1) / bitsPerOctet;
+}
+
+bool isOneOctet(const FieldView &field) {
+    return field.ranges.size() == 1 && field.ranges[0].firstBit % bitsPerOctet == 1 &&
+           field.ranges[0].lastBit - field.ranges[0].firstBit + 1 == bitsPerOctet;
+}
+
+} // namespace
+
+void Tree::begin(Pass /*pass*/, std::span<const std::uint8_t> packet) {
+    packet_ = packet;
+    gaps_.reset();
+    run_.octets = 0;
+    depth_ = 0;
+    addressName_ = {};
+}
+
+void Tree::blockOpened(const BlockView &block) {
+    endRun();
+    writeGapsBefore(octetOf(block.firstBit), block.depth);
+    newLine(block.depth);
+    out_.styled(Style::bold, withoutLeadingBlanks(block.name));
+    out_ << '\n';
+}
+
+void Tree::field(const FieldView &field) {
+    if (continuesRun(field)) {
+        return addToRun(field);
+    }
+    endRun();
+    out_.mayFlush();
+    const auto octets = octetsOf(field);
+    const std::uint32_t passed = octetOf(field.cursor);
+    writeGapsBefore(octets ? std::min(octets->first, passed) : passed, field.depth);
+    if (octets) {
+        gaps_.cover(*octets);
+    }
+    const std::string_view text = field.text.view();
+    if (isReadAgain(field, text)) {
+        return;
+    }
+    beginRun(field);
+    writeField(field, text);
+}
+
+bool Tree::continuesRun(const FieldView &field) const {
+    return run_.octets != 0 && field.id == run_.id && isOneOctet(field) &&
+           octetOf(field.ranges[0].firstBit) == run_.first + run_.octets && field.depth == run_.depth &&
+           field.name == run_.name;
+}
+
+void Tree::beginRun(const FieldView &field) {
+    if (!all_ && isOneOctet(field)) {
+        run_ = {field.id, field.name, octetOf(field.ranges[0].firstBit), 1, field.depth, out_.mark()};
+    }
+}
+
+void Tree::addToRun(const FieldView &field) {
+    const std::uint32_t octet = run_.first + run_.octets;
+    gaps_.cover({octet, octet + 1});
+    ++run_.octets;
+    if (run_.octets < leastRun) {
+        writeField(field, field.text.view());
+    } else if (run_.octets == leastRun) {
+        out_.takeBack(run_.start);
+    }
+}
+
+void Tree::endRun() {
+    if (run_.octets >= leastRun) {
+        writeOctets(run_.name, {run_.first, run_.first + run_.octets}, run_.depth);
+    }
+    run_.octets = 0;
+}
+
+bool Tree::isReadAgain(const FieldView &field, std::string_view text) const {
+    return !all_ && text.empty() && !addressName_.empty() && field.name == addressName_ &&
+           ipv6Address(field, packet_) && field.ranges.front().firstBit == addressBit_;
+}
+
+void Tree::writeGaps(std::uint32_t octet, std::uint32_t depth) {
+    while (const auto gap = gaps_.before(octet)) {
+        newLine(depth);
+        out_.start(Style::dim) << "[in no field: ";
+        writeOctetNumbers(out_, {gap->firstOctet, gap->firstOctet + gap->octets});
+        (out_ << ']').stop(Style::dim) << '\n';
+    }
+}
+
+void Tree::writeField(const FieldView &field, std::string_view text) {
+    const std::uint32_t bits = bitCount(field.ranges);
+    const auto address = bits == addressBits ? ipv6Address(field, packet_) : std::nullopt;
+    addressName_ = address ? field.name : std::string_view();
+    addressBit_ = address ? field.ranges.front().firstBit : 0;
+    if (bits > numberBits && !address) {
+        if (const auto octets = unshownOctets(field, bits, text)) {
+            return writeOctets(nameOf(field), *octets, field.depth);
+        }
+    }
+    newLine(field.depth);
+    const std::string_view shown = withoutLeadingBlanks(text);
+    out_.untrusted(shown.empty() ? nameOf(field) : shown);
+    if (address) {
+        TextRoom room;
+        (out_.start(Style::good) << "  (" << ipv6Text(*address, room) << ')').stop(Style::good);
+    } else if ((bits == bitsPerOctet || bits == 2 * bitsPerOctet) && !showsItsNumber(text, field.value)) {
+        (out_.start(Style::dim) << "  (" << field.value << ')').stop(Style::dim); // of types and codes, no single bits
+    }
+    if (bits_ && !field.ranges.empty()) {
+        out_.start(Style::dim) << "  [";
+        writeBits(out_, field.ranges);
+        (out_ << ']').stop(Style::dim);
+    }
+    out_ << '\n';
+}
+
+// Octets as they stand in the packet.
+void Tree::writeOctets(std::string_view name, OctetSpan octets, std::uint32_t depth) {
+    const std::uint32_t size = octets.end - octets.first;
+    newLine(depth);
+    (out_ << name << ": ").count(size, "octet");
+    if (bits_) {
+        out_.start(Style::dim) << "  [" << octets.first * bitsPerOctet + 1 << '-' << octets.end * bitsPerOctet;
+        (out_ << ']').stop(Style::dim);
+    }
+    out_ << '\n';
+    const std::uint32_t end = all_ ? octets.end : std::min(octets.end, octets.first + mostDataLines * octetsPerLine);
+    for (std::uint32_t line = octets.first; line < end; line += octetsPerLine) {
+        out_.mayFlush();
+        newLine(depth, 1);
+        for (std::uint32_t octet = line; octet < std::min(end, line + octetsPerLine); ++octet) {
+            if (octet != line) {
+                out_ << ' ';
+            }
+            out_.octet(packet_[octet]);
+        }
+        out_ << '\n';
+    }
+    if (end < octets.end) {
+        newLine(depth, 1);
+        (out_.start(Style::dim) << "and ").count(octets.end - end, "octet") << " more (--all shows them)";
+        out_.stop(Style::dim) << '\n';
+    }
+}
+
+void Tree::handOff(const HandOff &handOff) {
+    endRun();
+    newLine(depth_);
+    out_.start(Style::dim) << "[handed on under key " << handOff.key;
+    if (handOff.protocol != 0) {
+        out_ << " of protocol " << handOff.protocol;
+    }
+    (out_ << ']').stop(Style::dim) << '\n';
+}
+
+void Tree::layer(const LayerRecord &layer) {
+    endRun();
+    out_.mayFlush();
+    if (layer.lastBit < layer.firstBit) {
+        return;
+    }
+    newLine(0);
+    out_.start(Style::dim) << "[layer " << layer.layerNumber << ", ";
+    writeOctetNumbers(out_, {octetOf(layer.firstBit), octetOf(layer.lastBit) + 1});
+    (out_ << ']').stop(Style::dim) << '\n';
+}
+
+void Tree::end(const PassEnd &end) {
+    endRun();
+    writeGapsBefore(octetOf(end.state.cursor), depth_);
+    if (end.bitsLeft != 0 && end.ending == Ending::complete) {
+        const std::uint32_t total = static_cast<std::uint32_t>(packet_.size()) * bitsPerOctet;
+        out_.start(Style::dim) << "  not decoded: ";
+        writeOctetNumbers(out_, {octetOf(total - end.bitsLeft + 1), octetOf(total) + 1});
+        out_.stop(Style::dim) << '\n';
+    }
+    if (end.ending == Ending::cutOff) {
+        out_.start(Style::bad) << "  the pass was cut off";
+        for (const std::string &name : flagNames(end.state.flags)) {
+            out_ << ", " << name;
+        }
+        out_.stop(Style::bad) << '\n';
+    }
+}
+
+} // namespace netfloor::cli
