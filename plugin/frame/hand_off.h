@@ -34,18 +34,12 @@ NETFLOOR_INLINE inline void handOffTo(Reader<Pass> &reader, const NextLayer &nex
     reader.state->layerHandedOff = 1;
     reader.giveState();
     reader.context->bitsLeft = reader.left;
-    const std::uint32_t payload = reader.cursor;
     if (const Outcome outcome = Pass::transfer(*reader.context); outcome != Outcome::running) {
         reader.end(outcome);
         return;
     }
     reader.takeState();
     reader.variables().copyRestored = false; // the next layer may have changed it
-    // What the next layer leaves before its payload or past the limit is not the grammar's to read on.
-    const std::uint32_t end = reader.state->limits.base[reader.limitDepth] + 1;
-    if (reader.cursor < payload || reader.cursor > end || reader.left > end - reader.cursor) {
-        reader.live = false;
-    }
 }
 
 } // namespace netfloor::plugin

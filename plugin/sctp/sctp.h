@@ -23,6 +23,7 @@
 // A decision made by `test` is seen by the host as the state's `condition`. The list of error causes uses the last one.
 #pragma once
 
+#include <algorithm>
 #include <array>
 #include <cstdint>
 
@@ -149,11 +150,46 @@ NETFLOOR_INLINE inline void chunkBody(Reader<Pass> &reader, std::uint32_t type) 
     }
 }
 
-// Each round reads at least the octet of a Chunk Type, or ends the walk. This holds for all Lengths, and for all values
-// that a next layer which ran this pass again has left in the variables.
+// Keeps a chunk from reading past the packet. The next layer of an earlier chunk may have left more bits than the packet
+// holds, or the cursor outside; those bits count again after the chunk, unless it has set the bits left anew.
+template <class Pass>
+class [[nodiscard]] BitsOfPacket {
+public:
+    NETFLOOR_INLINE explicit BitsOfPacket(Reader<Pass> &reader) : reader_(reader) {
+        const std::uint32_t before = reader.cursor - 1;
+        const std::uint32_t held = reader.state->totalBits - std::min(before, reader.state->totalBits);
+        if (reader.left > held) [[unlikely]] {
+            missing_ = reader.left - held;
+            reader.left = held;
+        }
+        end_ = reader.cursor + reader.left;
+    }
+
+    NETFLOOR_INLINE ~BitsOfPacket() {
+        if (missing_ != 0 && reader_.cursor + reader_.left == end_) {
+            reader_.left += missing_;
+        }
+    }
+
+    BitsOfPacket(const BitsOfPacket &) = delete;
+    BitsOfPacket &operator=(const BitsOfPacket &) = delete;
+
+private:
+    Reader<Pass> &reader_;
+    std::uint32_t missing_ = 0;
+    std::uint32_t end_ = 0;
+};
+
+// The least Length of a chunk that is handed on.
+inline constexpr std::int32_t leastHandedOnOctets = emptyDataOctets + 1;
+
+// A round reads one Chunk Type octet at least, or ends the walk, unless a next layer goes back. Each hand-off takes its
+// chunk off `payloadOctets`, which bounds how often that can be; but an INIT ACK may add to them, and a next layer that
+// leads back into this pass sets them anew. So no walk goes back more often than its first octets allow.
 template <class Pass>
 NETFLOOR_INLINE inline void chunks(Reader<Pass> &reader) {
     auto &variables = reader.variables();
+    std::int32_t returnsLeft = variables.payloadOctets / leastHandedOnOctets + 1;
     BlockChain<Pass> chain{reader};
     while (reader.live) {
         chain.open("Chunk list");
@@ -161,12 +197,19 @@ NETFLOOR_INLINE inline void chunks(Reader<Pass> &reader) {
             return;
         }
         chain.open("Chunk");
-        const std::uint32_t type = readChunkType(reader);
-        if (reader.live) {
-            chunkBody(reader, type);
+        const std::uint32_t start = reader.cursor;
+        {
+            const BitsOfPacket<Pass> bits{reader};
+            const std::uint32_t type = readChunkType(reader);
+            if (reader.live) {
+                chunkBody(reader, type);
+            }
         }
         if (reader.live) {
             variables.payloadOctets -= variables.chunkOctets;
+        }
+        if (reader.cursor <= start && returnsLeft-- == 0) {
+            reader.live = false;
         }
     }
 }
@@ -179,6 +222,7 @@ void packet(Reader<Pass> &reader) {
     auto &variables = reader.variables();
     const LimitedBlock<Pass> body{reader, "SCTP Body", bitsOf(variables.payloadOctets)};
     variables.chunksSeen = 0;
+    reader.check();
     commonHeader(reader);
     chunks(reader);
 }

@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: MIT
 // The hand-off to the next layer: the choice of its key, the records at the hand-off, and the state after it.
+#include <algorithm>
+#include <cstddef>
 #include <limits>
 #include <optional>
 #include <string>
@@ -138,6 +140,75 @@ TEST(HandOff, whatComesBack) {
                 EXPECT_EQ(layer.layerNumber, 5u);
             }
         }
+    }
+}
+
+// The walk over the chunks of SCTP goes on at the cursor and the bits that the next layer leaves, wherever they are.
+// What they tell past the packet is not read.
+struct LeftCase {
+    const char *name;
+    std::uint32_t cursor, bitsLeft;
+    std::size_t handOffs;
+    std::ptrdiff_t chunks;
+    std::uint32_t flagsOfMv;
+};
+
+TEST(HandOff, chunksGoOnWhereTheNextLayerStops) {
+    const Octets packet = ipv4({.protocol = 132, .payload = hex(R"(
+        0b 59 0b 5a 00 00 00 2a 00 00 00 00                     # SCTP
+        00 03 00 14 00 00 00 01 00 00 00 01 00 00 00 03 61*4    # DATA at bit 257, user data at 385
+        08 00 00 04                                             # SHUTDOWN ACK
+    )")}) + hex("08 00 00 04");                                 // at 449, past the datagram; the packet ends at 480
+    const std::vector<LeftCase> cases = {
+        {"after its payload", 417, 32, 1, 2, 0},
+        {"back at the chunk", 257, 192, 2, 2, 0x10},
+        {"back before the chunks", 161, 288, 1, 2, 0x10}, // where the octet of a port is taken for a chunk
+        {"past the datagram", 449, 32, 1, 2, 0x10},
+        {"bits past the packet", 449, 1000, 1, 2, 0x10},
+        {"past the packet", 481, 64, 1, 1, 0x10},
+        {"far past the packet", 0x80000000, 0x80000000, 1, 1, 0x10},
+        {"before the packet", 0, 480, 1, 1, 0x10},
+    };
+    for (const LeftCase &one : cases) {
+        for (const Pass pass : passesThatHandOn) {
+            SCOPED_TRACE(std::string(passName(pass)) + ": " + one.name);
+            BareRun run(packet);
+            run.nextLayer = [&] {
+                run.state().cursor = one.cursor;
+                run.state().bitsLeft = one.bitsLeft;
+                return 0;
+            };
+            EXPECT_EQ(run.enter(pass), 1);
+            EXPECT_EQ(run.modes.size(), one.handOffs);
+            EXPECT_EQ(run.state().cursor, 449u);
+            EXPECT_EQ(run.contextBitsLeft(pass), 32u);
+            EXPECT_EQ(run.state().flags, pass == Pass::mv ? one.flagsOfMv : 0);
+            if (pass == Pass::md) {
+                EXPECT_EQ(std::ranges::count_if(run.seen, [](auto &field) { return field.id == 802 || field.id == 805; }),
+                          one.chunks);
+            }
+        }
+    }
+}
+
+// A chunk that is counted with less than nothing: a next layer that always goes back to it does not hold the walk.
+TEST(HandOff, chunksEndThoughTheNextLayerAlwaysGoesBack) {
+    const Octets packet = ipv4({.protocol = 132, .payload = hex(R"(
+        0b 59 0b 5a 00 00 00 2a 00 00 00 00                     # SCTP
+        02 00 00 18 00 00 00 01 00 00 00 00 00*8 00 0b 01 04    # INIT ACK with a host name of 256 octets
+        61*256
+        00 03 00 14 00 00 00 01 00 00 00 01 00 00 00 03 61*4    # DATA
+    )")});
+    for (const Pass pass : passesThatHandOn) {
+        BareRun run(packet);
+        run.nextLayer = [&] {
+            const std::uint32_t back = run.state().cursor - 257;
+            run.state().cursor -= back;
+            run.state().bitsLeft += back;
+            return run.modes.size() < 1000 ? 0 : -1;
+        };
+        EXPECT_EQ(run.enter(pass), 1);
+        EXPECT_GE(run.modes.size(), 2u);
     }
 }
 
