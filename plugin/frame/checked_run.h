@@ -29,12 +29,15 @@ NETFLOOR_INLINE inline void checkedRun(Reader<Pass> &reader) {
         static_assert(bitCount != 0, "a checked run goes from a field of the catalogue to a later one");
         const DecodeState &state = *reader.state;
         const bool holds = reader.live && reader.left >= bitCount && onOctetBorder(reader.cursor) &&
-                           !reader.unchecked && state.fieldRecord.rangeCapacity > mostFixedElements &&
+                           state.fieldRecord.rangeCapacity > mostFixedElements &&
                            state.blockStarts.capacity > reader.blockDepth + mostRunBlocks;
         if (!holds) [[unlikely]] {
             return runOutOfLine<production>(reader);
         }
-        // The run of a live reader has not ended; said again, so that the tests for it fall away.
+        // The first field would make the verdict check, and no host looks before. The run of a live reader has not
+        // ended. Both are said again, so that the tests for them fall away.
+        reader.check();
+        reader.unchecked = false;
         reader.outcome = Outcome::running;
         reader.writer.startRun(bitCount, mostRunBlocks);
         production(reader);

@@ -65,7 +65,9 @@ public:
         unchecked = true;
     }
 
-    // The verdict check: a flag that is set becomes the verdict, in the pass that gives one.
+    // The verdict check: a flag that is set becomes the verdict, in the pass that gives one. It is made after each
+    // field and each assignment of the grammar that a flag can precede, before a block closes, and when the first is
+    // open.
     NETFLOOR_INLINE void check() {
         if (unchecked) {
             Pass::giveVerdict(*context);
@@ -118,7 +120,6 @@ public:
                 return false;
             }
         }
-        check();
         return true;
     }
 

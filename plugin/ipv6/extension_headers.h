@@ -80,6 +80,7 @@ template <class Pass>
 NETFLOOR_INLINE inline void countOff(Reader<Pass> &reader, std::uint32_t octetCount) {
     if (reader.live) {
         reader.variables().payloadOctets -= static_cast<std::int32_t>(octetCount);
+        reader.check();
     }
 }
 

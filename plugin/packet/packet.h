@@ -32,6 +32,7 @@ template <class Pass>
 NETFLOOR_INLINE inline void packet(Reader<Pass> &reader) {
     auto &variables = reader.variables();
     const Block<Pass> ip{reader, "Ip"};
+    reader.check();
     const Block<Pass> header{reader, "Ip Header"};
     read<version>(reader, &variables.ipVersion);
     if (variables.ipVersion == 4) {

@@ -150,8 +150,8 @@ NETFLOOR_INLINE inline void chunkBody(Reader<Pass> &reader, std::uint32_t type) 
     }
 }
 
-// Keeps a chunk from reading past the packet. The next layer of an earlier chunk may have left more bits than the packet
-// holds, or the cursor outside; those bits count again after the chunk, unless it has set the bits left anew.
+// Keeps a chunk from reading past the packet. The next layer of an earlier chunk may have left more bits than the
+// packet holds, or the cursor outside; those bits count again after the chunk, unless it has set the bits left anew.
 template <class Pass>
 class [[nodiscard]] BitsOfPacket {
 public:

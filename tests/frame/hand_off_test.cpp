@@ -158,15 +158,12 @@ TEST(HandOff, chunksGoOnWhereTheNextLayerStops) {
         0b 59 0b 5a 00 00 00 2a 00 00 00 00                     # SCTP
         00 03 00 14 00 00 00 01 00 00 00 01 00 00 00 03 61*4    # DATA at bit 257, user data at 385
         08 00 00 04                                             # SHUTDOWN ACK
-    )")}) + hex("08 00 00 04");                                 // at 449, past the datagram; the packet ends at 480
+    )")}) + hex("08 00 00 04"); // at 449, past the datagram; the packet ends at 480
     const std::vector<LeftCase> cases = {
-        {"after its payload", 417, 32, 1, 2, 0},
-        {"back at the chunk", 257, 192, 2, 2, 0x10},
+        {"after its payload", 417, 32, 1, 2, 0},          {"back at the chunk", 257, 192, 2, 2, 0x10},
         {"back before the chunks", 161, 288, 1, 2, 0x10}, // where the octet of a port is taken for a chunk
-        {"past the datagram", 449, 32, 1, 2, 0x10},
-        {"bits past the packet", 449, 1000, 1, 2, 0x10},
-        {"past the packet", 481, 64, 1, 1, 0x10},
-        {"far past the packet", 0x80000000, 0x80000000, 1, 1, 0x10},
+        {"past the datagram", 449, 32, 1, 2, 0x10},       {"bits past the packet", 449, 1000, 1, 2, 0x10},
+        {"past the packet", 481, 64, 1, 1, 0x10},         {"far past the packet", 0x80000000, 0x80000000, 1, 1, 0x10},
         {"before the packet", 0, 480, 1, 1, 0x10},
     };
     for (const LeftCase &one : cases) {
@@ -184,8 +181,9 @@ TEST(HandOff, chunksGoOnWhereTheNextLayerStops) {
             EXPECT_EQ(run.contextBitsLeft(pass), 32u);
             EXPECT_EQ(run.state().flags, pass == Pass::mv ? one.flagsOfMv : 0);
             if (pass == Pass::md) {
-                EXPECT_EQ(std::ranges::count_if(run.seen, [](auto &field) { return field.id == 802 || field.id == 805; }),
-                          one.chunks);
+                EXPECT_EQ(
+                    std::ranges::count_if(run.seen, [](auto &field) { return field.id == 802 || field.id == 805; }),
+                    one.chunks);
             }
         }
     }
