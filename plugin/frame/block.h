@@ -140,7 +140,7 @@ template <auto production, class Pass>
     Reader<Pass> reader(context, position);
     production(reader);
     reader.writer.flushRun(*reader.state);
-    position = reader;
+    position = reader.position();
 }
 
 template <auto production, class Pass>
@@ -149,7 +149,7 @@ NETFLOOR_INLINE inline void runOutOfLine(Reader<Pass> &reader) {
         return;
     }
     reader.writer.flushRun(*reader.state);
-    Position position = reader;
+    Position position = reader.position();
     outOfLineBody<production, Pass>(*reader.context, position);
     reader.resumeAt(position);
 }

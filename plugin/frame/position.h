@@ -49,6 +49,12 @@ struct Position {
     BlockName block = {};       // name of the innermost open block
     BlockName fieldBlock = {};  // block of the last field, whose name the state is still to get
 
+    // A copy, member by member: as a whole it would go through memory in pieces that were just written in smaller ones,
+    // which processors wait for.
+    [[nodiscard]] NETFLOOR_INLINE Position position() const {
+        return {cursor, left, blockDepth, limitDepth, live, outcome, unchecked, bitOrder, block, fieldBlock};
+    }
+
     [[nodiscard]] NETFLOOR_INLINE bool ended() const { return outcome != Outcome::running; }
 };
 

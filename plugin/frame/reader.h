@@ -31,7 +31,7 @@ public:
 
     // Goes on where another reader is, after which nothing of a checked run is put off.
     NETFLOOR_INLINE Reader(typename Pass::Context &passContext, const Position &position)
-        : Position(position), context(&passContext), state(passContext.decodeState), data(state->data) {}
+        : Position(position.position()), context(&passContext), state(passContext.decodeState), data(state->data) {}
 
     NETFLOOR_INLINE static typename Pass::Variables &variables() { return Pass::variables; }
 
@@ -104,7 +104,7 @@ public:
 
     // Goes on where a production that ran out of line left off.
     NETFLOOR_INLINE void resumeAt(const Position &position) {
-        static_cast<Position &>(*this) = position;
+        static_cast<Position &>(*this) = position.position();
         data = state->data;
         writer.endRun();
     }

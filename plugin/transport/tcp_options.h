@@ -159,6 +159,7 @@ NETFLOOR_INLINE inline void padding(Reader<Pass> &reader, OptionArea &area) {
 template <class Pass>
 NETFLOOR_INLINE inline void optionRound(Reader<Pass> &reader, OptionArea &area) {
     area.taken = false;
+    reader.check();
     for (std::size_t turn = 0; reader.live && turn < optionKinds.size(); ++turn) {
         std::size_t taker = nextTaker<optionKinds>(reader, turn);
         if (area.octets < 1) {
