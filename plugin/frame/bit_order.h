@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// A stretch of grammar in which the bits of each octet are read in reverse order.
+// A part of the grammar in which the bits of each octet are read in reverse order.
 #pragma once
 
 #include <algorithm>
@@ -41,7 +41,7 @@ public:
         reverseOctets(reader_.data, reader_.cursor, end_ * bitsPerOctet);
     }
 
-    // Behind the stretch the cursor stands on a whole octet, counted from the start of the innermost block.
+    // After it the cursor is on a whole octet, counted from the start of the innermost block.
     ~ReversedBits() {
         if (reader_.ended()) {
             return;

@@ -77,7 +77,7 @@ inline constexpr std::uint32_t bitsPerOctet = 8;
     return bitsAcross(data, first, first + 3);
 }
 
-// Reads the bits `low` to `high` behind `cursor`. On an octet border their octets and shifts are constants.
+// Reads the bits `low` to `high` after `cursor`. On an octet border their octets and shifts are constants.
 template <std::uint32_t low, std::uint32_t high>
 [[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t pieceAt(const std::uint8_t *data, std::uint32_t cursor) {
     if (!onOctetBorder(cursor)) [[unlikely]] {

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// Blocks: named stretches of the grammar. A block is open as long as its object lives.
+// Blocks: named parts of the grammar. A block is open as long as its object lives.
 #pragma once
 
 #include <cstdint>
@@ -55,7 +55,7 @@ public:
         limit(bitCount);
     }
 
-    // Sets the limit. A length that reaches behind the bits left does not narrow anything: the block is read
+    // Sets the limit. A length that reaches past the bits left does not narrow anything: the block is read
     // as far as bits last, and the enclosing production reads no further.
     NETFLOOR_INLINE void limit(std::uint32_t bitCount) {
         if (!reader_.ended() && !reader_.openLimit(bitCount)) {
@@ -99,7 +99,7 @@ public:
         }
     }
 
-    // Opens the next block with a length in bits, as a LimitedBlock does. Nothing is read behind a chain with
+    // Opens the next block with a length in bits, as a LimitedBlock does. Nothing is read after a chain with
     // such a block, so that no outer live flag is kept.
     NETFLOOR_INLINE void openLimited(BlockName name, std::uint32_t bitCount) {
         open(name);
@@ -111,7 +111,7 @@ public:
     }
 
     // Closing a block touches neither cursor nor limit, so that it does not matter which blocks a limit stands
-    // between: the limits are swept first, innermost first.
+    // between: what the limits leave is skipped first, the innermost limit first.
     NETFLOOR_INLINE ~BlockChain() {
         for (; limits_ > 0 && !reader_.ended(); --limits_) {
             reader_.skipRest();

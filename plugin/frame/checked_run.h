@@ -18,7 +18,7 @@ inline constexpr std::uint32_t mostFixedElements = addressGroupCount * nibblesPe
 inline constexpr std::uint32_t mostRunBlocks = 4;
 
 // Runs a production that starts with the fields from `first` to `last`, all of fixed size. A pass that reports nothing
-// asks once whether they all fit, and then writes only what is left to be seen behind them; the rare packet that is cut
+// asks once whether they all fit, and then writes only what can be seen after them; the rare packet that is cut
 // short there is read field by field, out of line.
 template <const Field &first, const Field &last, auto production, class Pass>
 NETFLOOR_INLINE inline void checkedRun(Reader<Pass> &reader) {

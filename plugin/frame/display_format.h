@@ -3,7 +3,7 @@
 //
 //   %u %x %c         the value in decimal, in hexadecimal, as one character
 //   %-S              the name of the value; %-s its short form
-//   %-["%x":"."]     each element by the inner format, joined by the text behind the colon
+//   %-["%x":"."]     each element by the inner format, joined by the text after the colon
 #pragma once
 
 #include <array>
@@ -79,7 +79,7 @@ struct Format {
     }
 }
 
-// What a display line shows behind the field's name: the part behind the last "=" that stands in front of
+// What a display line shows after the field's name: the part after the last "=" before
 // the first conversion, without the blanks that follow it.
 [[nodiscard]] constexpr std::string_view valuePart(std::string_view line) {
     const std::size_t equals = line.substr(0, line.find('%')).rfind('=');

@@ -13,7 +13,7 @@
 
 namespace netfloor::plugin {
 
-// A value with a further piece of so many bits behind it.
+// A value with a further piece of so many bits after it.
 [[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t joined(std::uint32_t value, std::uint32_t piece,
                                                              std::uint32_t width) {
     return width == 32 ? piece : value << width | piece;
@@ -61,7 +61,7 @@ inline void writeGroups(FieldRecord &record, const std::uint8_t *data, std::uint
     record.ranges[0].lastBit = cursor + record.wideBits - 1;
 }
 
-// An address in a stretch of reversed bits. Gives the value, of which the last two groups stay.
+// An address whose bits are read reversed. Gives the value, of which the last two groups stay.
 [[nodiscard]] inline std::uint32_t writeReversedGroups(BitRange *ranges, const std::uint8_t *data, std::uint32_t cursor,
                                                        std::uint32_t groups) {
     std::uint32_t value = 0;

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// Marks what makes up the hot road: it is inlined whatever the compiler thinks of it, so that the reader stays in
+// For what runs for nearly every field: it is inlined whatever the compiler thinks of it, so that the reader stays in
 // registers. Not under AddressSanitizer, which has no use for that and would take minutes to compile it.
 #pragma once
 

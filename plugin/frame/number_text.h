@@ -35,7 +35,7 @@ inline constexpr auto hexadecimalPairs = [] {
 // The most characters of a 32-bit number.
 inline constexpr std::size_t mostDigits = 10;
 
-// Writes a number in hexadecimal without leading zeros, and gives the place behind it. Up to eight
+// Writes a number in hexadecimal without leading zeros, and gives the place after it. Up to eight
 // characters are written, so there must be room for them.
 NETFLOOR_INLINE inline char *writeHexadecimal(char *to, std::uint32_t value) {
     const auto digits = static_cast<std::uint32_t>(value == 0 ? 1 : (35 - std::countl_zero(value)) / 4);
@@ -63,7 +63,7 @@ NETFLOOR_INLINE inline char *writeHexadecimal(char *to, std::uint32_t value) {
     return digits + (value >= 10 ? 1 : 0) + (value >= 100 ? 1 : 0) + (value >= 1000 ? 1 : 0);
 }
 
-// Writes a number in decimal without leading zeros, and gives the place behind it.
+// Writes a number in decimal without leading zeros, and gives the place after it.
 NETFLOOR_INLINE inline char *writeDecimal(char *to, std::uint32_t value) {
     char *const end = to + decimalDigits(value);
     char *place = end;

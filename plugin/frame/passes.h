@@ -72,7 +72,7 @@ struct PreDecodePass {
     }
 
     // Runs the owner of the next layer. A nested run of this pass leaves its own
-    // decoder id behind; that is the one put back.
+    // decoder id; that is the one put back.
     static Outcome transfer(PreDecodeContext &context) {
         if constexpr (reportsFields) {
             closeLayerInfo(context);

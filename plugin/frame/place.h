@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// Where the bits of a field lie, relative to the cursor, and how far the cursor moves behind it.
+// Where the bits of a field lie, relative to the cursor, and how far the cursor moves after it.
 //
 // Bit 0 is the cursor's bit. On an octet border the bits 0 to 3 are the low nibble of the first octet,
 // 4 to 7 its high nibble, 8 to 15 the second octet.
@@ -24,7 +24,7 @@ enum class Shape : std::uint8_t {
     ahead,          // one piece that is shown ahead of its turn and keeps no element
 };
 
-// Bits `low` to `high` behind the cursor.
+// Bits `low` to `high` after the cursor.
 struct Piece {
     std::uint32_t low;
     std::uint32_t high;
@@ -56,7 +56,7 @@ struct Place {
     }
 
     // True where a field is read only when its bits are left. An address in groups and what is shown ahead
-    // are read without that test, also from behind the limit, as far as the packet reaches.
+    // are read without that test, also past the limit, as far as the packet reaches.
     [[nodiscard]] constexpr bool isTested() const { return shape != Shape::groups && shape != Shape::ahead; }
 
     // Bits that must be left for a field of so many units; for one that is not tested, left in the packet.
@@ -71,7 +71,7 @@ struct Place {
         return end;
     }
 
-    // Bits that the cursor moves on behind a field of so many units.
+    // Bits that the cursor moves on after a field of so many units.
     [[nodiscard]] constexpr std::uint32_t moves(std::uint32_t units) const {
         return isRun() ? units * advance : advance;
     }
@@ -110,7 +110,7 @@ struct Place {
         return sum;
     }
 
-    // The same place with another move of the cursor behind it.
+    // The same place with another move of the cursor after it.
     [[nodiscard]] constexpr Place advancing(std::uint32_t bitCount) const {
         Place place = *this;
         place.advance = bitCount;
@@ -156,7 +156,7 @@ constexpr Place pieces(Piece first, Piece second, Piece third, Piece fourth) {
 }
 
 // Two octets in network order, as two pieces. The value is that of octets(2), but the published layout is another, and
-// settles which of the two a field is.
+// decides which of the two a field is.
 constexpr Place octetPair() {
     return pieces({0, 7}, {8, 15}).advancing(16);
 }
@@ -185,7 +185,7 @@ constexpr Place nibbleRun() {
     return {.shape = Shape::nibbles, .count = 0, .advance = nibbleBits};
 }
 
-// An IPv6 address: for the eye, for the key record, and in a stretch of reversed bits.
+// An IPv6 address: for the eye, for the key record, and with reversed bits.
 constexpr Place addressGroups() {
     return {.shape = Shape::groups, .count = addressGroupCount, .advance = addressBits};
 }

@@ -111,7 +111,7 @@ NETFLOOR_INLINE inline void appendConversion(Line &line, std::uint32_t value, co
     }
 }
 
-// The most characters that a conversion writes, those behind the end of the line included.
+// The most characters that a conversion writes, those past the end of the line included.
 template <const Field &field, const Format &format, std::size_t index>
 inline constexpr std::size_t mostWritten = [] {
     constexpr Conversion conversion = format.conversion[index];

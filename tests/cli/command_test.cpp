@@ -71,7 +71,7 @@ protected:
 
 TEST_F(Command, shows) {
     check({
-        // One line a packet, and behind them how many were no IP.
+        // One line a packet, and after them how many were no IP.
         {"netfloor $T/five.pcap",
          0,
          {" 10.0.0.1 | 192.168.0.2 |", "no IP: ARP", "no IP: LLDP", "5 packets: 2 with IP, 3 without (2 ARP, 1 LLDP)"},
