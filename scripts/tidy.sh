@@ -8,6 +8,10 @@ build=${1:-build}
 stamps=$build/tidy
 mkdir -p "$stamps"
 
+# The commands without their precompiled headers, which are in the form of the compiler in use.
+sed -e 's/-Winvalid-pch//' -e 's/-include [^ ]*cmake_pch\.hxx//' "$build/compile_commands.json" \
+    >"$stamps/compile_commands.json"
+
 export stamps build
 shared=$(git ls-files -z --cached --others --exclude-standard -- '*.h' '*.hpp' .clang-tidy |
     xargs -0 cat | sha256sum | cut -c1-16)
@@ -20,4 +24,4 @@ git ls-files --cached --others --exclude-standard -- 'plugin/*.cpp' 'host/*.cpp'
     xargs -P "$(nproc)" -I{} sh -c '
         stamp=$stamps/$(cat "{}" | sha256sum | cut -c1-16)-$shared
         [ -f "$stamp" ] && exit 0
-        clang-tidy --quiet -p "$build" "{}" 2>/dev/null && touch "$stamp"'
+        clang-tidy --quiet -p "$stamps" "{}" 2>/dev/null && touch "$stamp"'
