@@ -64,6 +64,15 @@ void Printer::printOther(const PacketToPrint &packet) const {
     (out_.start(Style::dim) << "no IP: " << packet.other).stop(Style::dim);
 }
 
+void Printer::endLine(const CapturedPacket &packet) const {
+    if (packet.isCut()) {
+        out().start(Style::warning) << "  [";
+        printCut(packet);
+        (out() << ']').stop(Style::warning);
+    }
+    out() << '\n';
+}
+
 void Printer::printCut(const CapturedPacket &packet) const {
     if (packet.isCut()) {
         out_ << "cut by the snap length: " << std::uint64_t{packet.octets.size()} << " of " << packet.wireOctets

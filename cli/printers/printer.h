@@ -75,6 +75,8 @@ protected:
     void printOther(const PacketToPrint &packet) const;
     // "cut by the snap length: 96 of 1514 octets", or nothing.
     void printCut(const CapturedPacket &packet) const;
+    // Ends the line of a packet, with a note where the snap length has cut it.
+    void endLine(const CapturedPacket &packet) const;
     void printTally(const Tally &tally) const;
 
 private:

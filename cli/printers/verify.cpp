@@ -61,12 +61,7 @@ public:
         } else {
             printOther(packet);
         }
-        if (packet.captured.isCut()) {
-            out().start(Style::warning) << "  [";
-            printCut(packet.captured);
-            (out() << ']').stop(Style::warning);
-        }
-        out() << '\n';
+        endLine(packet.captured);
     }
 
     void finish(const Tally &tally) override {
