@@ -6,6 +6,7 @@
 
 #include <gtest/gtest.h>
 
+#include "netfloor-host/layers.h"
 #include "support/corpus.h"
 #include "support/runs.h"
 
@@ -76,6 +77,21 @@ TEST(SteadyState, allocatesNothing) {
     }
     EXPECT_GT(sink.seen, packets.size());
     EXPECT_GT(host.run(Pass::md, packets.front()).fields.size(), 0U);
+}
+
+TEST(SteadyState, ofLayersAllocatesNothing) {
+    const std::vector<Octets> packets = packetsOfAllFields();
+    Host host(PluginLibrary::open(NETFLOOR_PLUGIN));
+    LayerView view(host);
+    const auto readPackets = [&] {
+        const std::size_t before = allocations;
+        for (const Octets &packet : packets) {
+            view.read(packet);
+        }
+        return allocations - before;
+    };
+    EXPECT_NE(readPackets(), 0U);
+    EXPECT_EQ(readPackets(), 0U);
 }
 
 } // namespace

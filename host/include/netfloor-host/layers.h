@@ -1,0 +1,118 @@
+// SPDX-License-Identifier: MIT
+// All layers of a packet with the values of their fields, also those of the packets inside it. No layer overwrites
+// another one.
+//
+//     netfloor::LayerView view(host);
+//     view.read(packet);                                  // from the IP header on
+//     for (const netfloor::Layer &layer : view.layers()) {
+//         if (layer.kind == netfloor::LayerKind::tcp) {
+//             std::cout << view.number(layer, netfloor::layerField("tcp.window")).value_or(0) << '\n';
+//         }
+//     }
+//
+// A view keeps its storage from packet to packet, and what it gives is valid until the next read. Octets are counted
+// from the start of the packet that was read.
+#pragma once
+
+#include <array>
+#include <cstdint>
+#include <optional>
+#include <span>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "netfloor-host/inner_packets.h"
+#include "netfloor-host/layer_fields.h"
+#include "netfloor-host/plugin_host.h"
+
+namespace netfloor {
+
+struct Layer {
+    LayerKind kind = LayerKind::ip;
+    std::uint16_t ipLayer = 0;    // the number of the IP header that it belongs to, from 1; 0 before the first one
+    std::uint16_t packet = 0;     // index of the packet, from 0: each packet inside another one is decoded by itself
+    std::uint32_t firstOctet = 0; // of the field that opens it
+    std::uint32_t endOctet = 0;   // after its last field so far
+    std::uint32_t present = 0;    // a bit for each field, by place
+    std::uint32_t values = 0;     // where its values begin
+    std::uint32_t nameEnd = 0;    // payload: the owner's name and line in the texts
+    std::uint32_t name = 0;
+    std::uint32_t textEnd = 0;
+};
+
+class LayerView final : private Sink {
+public:
+    static constexpr std::uint16_t mostIpLayers = 16;
+
+    explicit LayerView(Host &host);
+
+    // Reads the packet and the packets inside it by the MD pass. Throws as Host::run does.
+    void read(std::span<const std::uint8_t> packet);
+
+    [[nodiscard]] std::span<const Layer> layers() const { return layers_; } // as they begin
+    [[nodiscard]] std::span<const std::uint8_t> packet() const { return packet_; }
+    [[nodiscard]] std::uint16_t ipLayers() const { return ipLayers_; }
+
+    // The packets, the outermost one first, and how each was found.
+    [[nodiscard]] std::span<const InnerPacket> packets() const { return packets_; }
+
+    [[nodiscard]] bool has(const Layer &layer, LayerField field) const {
+        return layer.kind == field.kind && (layer.present >> field.place & 1U) != 0;
+    }
+    // A number, or an IPv4 address with its first octet on top.
+    [[nodiscard]] std::optional<std::uint32_t> number(const Layer &layer, LayerField field) const {
+        return has(layer, field) ? std::optional(values_[layer.values + field.place].number) : std::nullopt;
+    }
+    // Where the octets of a field begin.
+    [[nodiscard]] std::uint32_t octet(const Layer &layer, LayerField field) const {
+        return values_[layer.values + field.place].octet;
+    }
+    [[nodiscard]] LayerValue valueKind(const Layer &layer, LayerField field) const {
+        return values_[layer.values + field.place].kind;
+    }
+    // The address of a field, in the form of RFC 5952 or in dotted form. Empty if the layer does not have it.
+    [[nodiscard]] std::string_view address(const Layer &layer, LayerField field, TextRoom &room) const;
+
+    // LayerKind::payload: what the owner reported.
+    [[nodiscard]] std::string_view name(const Layer &layer) const {
+        return std::string_view(texts_).substr(layer.name, layer.nameEnd - layer.name);
+    }
+    [[nodiscard]] std::string_view text(const Layer &layer) const {
+        return std::string_view(texts_).substr(layer.nameEnd, layer.textEnd - layer.nameEnd);
+    }
+
+    [[nodiscard]] std::string_view limit() const { return limit_; } // why layers are missing, or nothing
+    [[nodiscard]] bool isCutOff() const { return isCutOff_; }       // a pass was
+
+private:
+    struct Value {
+        std::uint32_t number;
+        std::uint32_t octet;
+        LayerValue kind;
+    };
+
+    [[nodiscard]] bool wantsBlocks() const override { return false; }
+    void field(const FieldView &field) override;
+    void end(const PassEnd &end) override;
+
+    [[nodiscard]] bool openLayer(LayerKind kind, std::uint32_t octet);
+    void keepVersion(Layer &layer, std::uint32_t octet, LayerField opener);
+    void keepPayload(const FieldView &field, std::uint32_t octet);
+
+    Host &host_;
+    LayerFieldMap map_;
+    std::span<const std::uint8_t> packet_;
+    std::vector<Layer> layers_;
+    std::vector<Value> values_;
+    std::vector<InnerPacket> packets_;
+    std::string texts_;
+    std::string_view limit_;
+    std::array<std::int32_t, layerKinds> open_ = {}; // the current layer of each kind, or -1
+    std::uint32_t offset_ = 0;                       // of the current packet
+    std::uint16_t ipLayers_ = 0;
+    bool isCutOff_ = false;
+    bool isFull_ = false;
+};
+
+} // namespace netfloor

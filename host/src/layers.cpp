@@ -1,0 +1,160 @@
+// SPDX-License-Identifier: MIT
+#include "netfloor-host/layers.h"
+
+#include <algorithm>
+
+#include "octets.h"
+
+namespace netfloor {
+namespace {
+
+constexpr std::uint32_t bitsPerOctet = 8;
+constexpr std::uint8_t textOctets = 120; // of what an owner says
+
+constexpr auto fieldCounts = [] {
+    std::array<std::uint32_t, layerKinds> counts = {};
+    for (std::size_t kind = 0; kind < layerKinds; ++kind) {
+        counts[kind] = layerFieldCount(static_cast<LayerKind>(kind));
+    }
+    return counts;
+}();
+static_assert(std::ranges::max(fieldCounts) <= 32, "the fields of a layer are bits of one word");
+
+// The octets of a field from the lowest to the highest. Some fields are read from their last octet on.
+struct Place {
+    std::uint32_t first;
+    std::uint32_t end;
+};
+Place placeOf(std::span<const BitRange> ranges) {
+    const BitRange &front = ranges.front();
+    const BitRange &back = ranges.back();
+    return {(std::min(front.firstBit, back.firstBit) - 1) / bitsPerOctet,
+            (std::max(front.lastBit, back.lastBit) - 1) / bitsPerOctet + 1};
+}
+
+} // namespace
+
+LayerView::LayerView(Host &host) : host_(host), map_(FieldTables(host.library()).fields()) {}
+
+void LayerView::read(std::span<const std::uint8_t> packet) {
+    packet_ = packet;
+    layers_.clear();
+    values_.clear();
+    packets_.clear();
+    texts_.clear();
+    limit_ = {};
+    ipLayers_ = 0;
+    isCutOff_ = false;
+    isFull_ = false;
+    InnerPackets at(packet);
+    for (; !at.ended(); at.next()) {
+        open_.fill(-1);
+        packets_.push_back(at.opened());
+        packets_.back().firstOctet = at.firstOctet();
+        packets_.back().octets = static_cast<std::uint32_t>(at.octets().size());
+        offset_ = at.firstOctet();
+        host_.run(Pass::md, at.octets(), *this);
+    }
+    if (limit_.empty()) {
+        limit_ = at.limit();
+    }
+}
+
+bool LayerView::openLayer(LayerKind kind, std::uint32_t octet) {
+    if (kind == LayerKind::ip) {
+        if (ipLayers_ == mostIpLayers) {
+            limit_ = "more than 16 IP layers: the rest is left out";
+            isFull_ = true;
+            return false;
+        }
+        ++ipLayers_;
+        open_.fill(-1);
+    }
+    open_[static_cast<std::size_t>(kind)] = static_cast<std::int32_t>(layers_.size());
+    Layer &layer = layers_.emplace_back();
+    layer.kind = kind;
+    layer.ipLayer = ipLayers_;
+    layer.packet = static_cast<std::uint16_t>(packets_.size() - 1);
+    layer.firstOctet = layer.endOctet = octet;
+    layer.values = static_cast<std::uint32_t>(values_.size());
+    values_.resize(values_.size() + fieldCounts[static_cast<std::size_t>(kind)]);
+    return true;
+}
+
+void LayerView::field(const FieldView &field) {
+    if (isFull_ || field.ranges.empty()) {
+        return;
+    }
+    if (field.id == 0) {
+        keepPayload(field, placeOf(field.ranges).first + offset_);
+        return;
+    }
+    const LayerFieldMap::Entry &entry = map_.find(field.id);
+    if (!entry.isKnown) {
+        return;
+    }
+    Place place = placeOf(field.ranges);
+    place.first += offset_;
+    place.end += offset_;
+    std::int32_t &open = open_[static_cast<std::size_t>(entry.field.kind)];
+    if (entry.opensLayer && !openLayer(entry.field.kind, place.first)) {
+        return;
+    }
+    if (open < 0) {
+        return;
+    }
+    Layer &layer = layers_[static_cast<std::size_t>(open)];
+    layer.present |= 1U << entry.field.place;
+    layer.endOctet = std::max(layer.endOctet, place.end);
+    Value &value = values_[layer.values + entry.field.place];
+    value = {field.value, place.first, entry.value};
+    if (entry.value == LayerValue::packetNumber) {
+        value.number = be32(packet_, place.first);
+    }
+    if (entry.opensLayer && entry.field.kind == LayerKind::ip) {
+        keepVersion(layer, place.first, entry.field);
+    }
+}
+
+// The plug-in reads the version ahead of the first header only, and not at all in IPv6 inside IPv6.
+void LayerView::keepVersion(Layer &layer, std::uint32_t octet, LayerField opener) {
+    constexpr LayerField version = layerField("ip.version");
+    if (opener == layerField("ip.protocol")) { // minimal encapsulation has none
+        return;
+    }
+    layer.present |= 1U << version.place;
+    values_[layer.values + version.place] = {std::uint32_t{packet_[octet]} >> 4U, octet, LayerValue::number};
+}
+
+// A text longer than that is cut: who needs all of it has the octets.
+void LayerView::keepPayload(const FieldView &field, std::uint32_t octet) {
+    if (!openLayer(LayerKind::payload, octet)) {
+        return;
+    }
+    Layer &layer = layers_.back();
+    layer.endOctet = placeOf(field.ranges).end + offset_;
+    layer.name = static_cast<std::uint32_t>(texts_.size());
+    texts_.append(field.name.substr(0, textOctets));
+    layer.nameEnd = static_cast<std::uint32_t>(texts_.size());
+    texts_.append(field.text.view().substr(0, textOctets));
+    layer.textEnd = static_cast<std::uint32_t>(texts_.size());
+}
+
+void LayerView::end(const PassEnd &end) {
+    isCutOff_ |= end.ending == Ending::cutOff;
+}
+
+std::string_view LayerView::address(const Layer &layer, LayerField field, TextRoom &room) const {
+    if (!has(layer, field)) {
+        return {};
+    }
+    const Value &value = values_[layer.values + field.place];
+    if (value.kind != LayerValue::ipv6Address) {
+        return ipv4Text(value.number, room);
+    }
+    Ipv6Octets octets = {};
+    std::copy_n(packet_.begin() + value.octet, octets.size(), octets.begin());
+    return ipv6Text(octets, room);
+}
+
+} // namespace netfloor

@@ -1,0 +1,140 @@
+// SPDX-License-Identifier: MIT
+// The layers of a packet, and the packets inside it.
+#include <map>
+#include <string>
+
+#include <gtest/gtest.h>
+
+#include "netfloor-host/layers.h"
+#include "support/packets.h"
+
+namespace netfloor::test {
+namespace {
+
+constexpr std::uint8_t udpProtocol = 17;
+constexpr std::uint8_t greProtocol = 47;
+
+const Octets inner = ipv4({.protocol = udpProtocol, .payload = udp(5000, 53, hex("61*12")), .source = 0x0a090909});
+const Octets inner6 = ipv6({.nextHeader = udpProtocol, .payload = udp(5000, 53, hex("61*12"))});
+const Octets ethernet = hex("02*12 0800");
+
+Octets gtpU(const std::string &flags, const Octets &rest, const std::string &type = "ff") {
+    return hex(flags + type) + be16(static_cast<std::uint32_t>(rest.size())) + hex("00000007") + rest;
+}
+Octets overUdp(const Octets &payload, std::uint16_t port = 2152) {
+    return ipv4({.protocol = udpProtocol, .payload = udp(port, 53, payload)});
+}
+Octets overGre(const std::string &header, const Octets &payload) {
+    return ipv4({.protocol = greProtocol, .payload = hex(header) + payload});
+}
+
+// "2152>53 5000>53": the ports of each layer of UDP.
+std::string portsOf(const LayerView &view) {
+    std::string text;
+    for (const Layer &layer : view.layers()) {
+        if (layer.kind == LayerKind::udp) {
+            text += (text.empty() ? "" : " ") + std::to_string(*view.number(layer, layerField("udp.source_port"))) +
+                    ">" + std::to_string(*view.number(layer, layerField("udp.destination_port")));
+        }
+    }
+    return text;
+}
+
+TEST(LayerFields, holdForEveryRow) {
+    const FieldTables tables(PluginLibrary::open(NETFLOOR_PLUGIN));
+    const LayerFieldMap map(tables.fields());
+    for (const std::string &mismatch : map.mismatches()) {
+        ADD_FAILURE() << mismatch;
+    }
+    // A name is in one kind and one place alone.
+    std::map<std::string_view, std::size_t> lastRow;
+    const auto rows = layerFieldSources();
+    for (std::size_t row = 0; row < rows.size(); ++row) {
+        const auto [known, isNew] = lastRow.try_emplace(rows[row].name, row);
+        EXPECT_TRUE(isNew || (known->second == row - 1 && rows[row].kind == rows[row - 1].kind)) << rows[row].name;
+        known->second = row;
+    }
+}
+
+TEST(Layers, openPacketsInsideAPacket) {
+    Host host(PluginLibrary::open(NETFLOOR_PLUGIN));
+    LayerView view(host);
+    const struct {
+        const char *what;
+        Octets packet;
+        const char *ports;
+        std::uint16_t ipLayers;
+    } cases[] = {
+        {"GTP-U", overUdp(gtpU("30", inner)), "2152>53 5000>53", 2},
+        {"sequence number", overUdp(gtpU("32", hex("0001 00 00") + inner)), "2152>53 5000>53", 2},
+        {"two extension headers", overUdp(gtpU("34", hex("0000 00 85  01 0000 c0  02 00000000 0000 00") + inner)),
+         "2152>53 5000>53", 2},
+        {"an extension header of length 0", overUdp(gtpU("34", hex("0000 00 85  00 0000 00") + inner)), "2152>53", 1},
+        {"an extension header past the end", overUdp(gtpU("34", hex("0000 00 85  ff 0000 00") + inner)), "2152>53", 1},
+        {"another message", overUdp(gtpU("32", inner, "01")), "2152>53", 1},
+        {"a message that is cut", overUdp(hex("30 ff ffff 00000007") + inner), "2152>53", 1},
+        {"neither IPv4 nor IPv6", overUdp(gtpU("30", hex("75*40"))), "2152>53", 1},
+        {"IPv6 in GTP-U", overUdp(gtpU("30", inner6)), "2152>53 5000>53", 2},
+        {"VXLAN", overUdp(hex("08 000000 000102 00") + ethernet + inner, 4789), "4789>53 5000>53", 2},
+        {"GRE", overGre("0000 0800", inner), "5000>53", 2},
+        {"GRE with key and sequence", overGre("3000 86dd 00000001 00000002", inner6), "5000>53", 2},
+        {"Ethernet in GRE", overGre("0000 6558", ethernet + inner), "5000>53", 2},
+        {"MPLS in GRE", overGre("0000 8847 00001040 00002140", inner), "5000>53", 2},
+        {"PPP in GRE", overGre("3081 880b 00140001 00000001 00000002 ff03 0021", inner), "5000>53", 2},
+        {"IPv6 in IPv4", ipv4({.protocol = 41, .payload = inner6}), "5000>53", 2},
+        {"IPv4 in IPv6", ipv6({.nextHeader = 4, .payload = inner}), "5000>53", 2},
+        {"IP in IP", ipv4({.protocol = 4, .payload = inner}), "5000>53", 2},
+        {"a later fragment", ipv4({.protocol = 41, .payload = inner6, .fragment = 1}), "", 1},
+    };
+    for (const auto &[what, packet, ports, ipLayers] : cases) {
+        view.read(packet);
+        EXPECT_EQ(portsOf(view), ports) << what;
+        EXPECT_EQ(view.ipLayers(), ipLayers) << what;
+    }
+}
+
+TEST(Layers, keepTheValuesOfEachLayer) {
+    Host host(PluginLibrary::open(NETFLOOR_PLUGIN));
+    LayerView view(host);
+    const Octets packet = overUdp(gtpU("30", ipv4({.protocol = 41, .payload = inner6, .timeToLive = 9})));
+    view.read(packet);
+    std::string text;
+    TextRoom room;
+    for (const Layer &layer : view.layers()) {
+        if (layer.kind == LayerKind::ip) {
+            text += std::to_string(layer.firstOctet) + " " +
+                    std::string(tunnelName(view.packets()[layer.packet].tunnel)) + " " +
+                    std::to_string(*view.number(layer, layerField("ip.ttl"))) + " " +
+                    std::string(view.address(layer, layerField("ip.source"), room)) + "\n";
+        }
+    }
+    EXPECT_EQ(text, "0  64 10.0.0.1\n36 GTP-U 9 10.0.0.1\n56 IP 64 2001:db8::1\n");
+    EXPECT_EQ(view.packets()[1].id, 7U);
+}
+
+// Neither a chain of tunnels that the plug-in reads nor one that the host opens ends in silence.
+TEST(Layers, nameTheLimits) {
+    Host host(PluginLibrary::open(NETFLOOR_PLUGIN));
+    LayerView view(host);
+    Octets chain = inner;
+    Octets gre = inner;
+    for (int i = 0; i < 20; ++i) {
+        chain = ipv4({.protocol = 4, .payload = chain});
+        gre = overGre("0000 0800", gre);
+    }
+    view.read(chain);
+    EXPECT_EQ(view.ipLayers(), 16);
+    EXPECT_NE(view.limit().find("16 IP layers"), std::string_view::npos);
+    view.read(gre);
+    EXPECT_EQ(view.ipLayers(), 16);
+    EXPECT_NE(view.limit().find("16 packets"), std::string_view::npos);
+    Octets large = ipv4({.payload = Octets(60000)});
+    for (int i = 0; i < 5; ++i) {
+        large = overGre("0000 0800", large);
+    }
+    view.read(large);
+    EXPECT_NE(view.limit().find("262144 octets"), std::string_view::npos);
+}
+
+} // namespace
+} // namespace netfloor::test
