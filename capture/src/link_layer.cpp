@@ -104,7 +104,7 @@ public:
         }
         const std::uint32_t asWritten = std::uint32_t{u16(0)} << 16U | u16(2);
         const std::uint32_t reversed = __builtin_bswap32(asWritten);
-        if (asWritten >= 0x10000 && reversed >= 0x10000) {
+        if (!networkOrder && asWritten >= 0x10000 && reversed >= 0x10000) {
             return serialLine();
         }
         skip(4);
@@ -115,7 +115,7 @@ public:
         if (family == 2 || std::find(ipv6Families.begin(), ipv6Families.end(), family) != ipv6Families.end()) {
             return found();
         }
-        if (family >= leastEtherType && family <= 0xffff) { // some systems write an EtherType instead
+        if (!networkOrder && family >= leastEtherType) { // some systems write an EtherType instead
             return afterEtherType(static_cast<std::uint16_t>(family));
         }
         return other(NotIp(NotIp::Kind::addressFamily, family));
