@@ -49,7 +49,7 @@ public:
 
     // One finding for each flag, valid until the next call.
     [[nodiscard]] std::span<const Finding> explain(std::uint32_t flags, Host &host,
-                                                   std::span<const std::uint8_t> packet);
+                                                   std::span<const std::uint8_t> packet, const RunOptions &options);
 
     // What a finding says, and where it was raised.
     void write(Output &out, const Finding &finding) const;

@@ -91,6 +91,10 @@ const std::string &CaptureFile::name() const {
     return parts_->stream.file().name();
 }
 
+std::string CaptureFile::note() const {
+    return parts_->reader->note();
+}
+
 bool CaptureFile::isLive() const {
     return parts_->stream.file().isLive();
 }

@@ -7,6 +7,7 @@ namespace netfloor {
 
 namespace {
 
+constexpr std::uint16_t optionName = 2;
 constexpr std::uint16_t optionTimeResolution = 9;
 constexpr std::uint16_t optionTimeOffset = 14;
 
@@ -79,20 +80,16 @@ Interface readInterface(const NumberView &body) {
     Interface result;
     result.linkType = body.u16(0);
     result.snapOctets = body.u32(4);
-    for (std::size_t at = 8; at + 4 <= body.size();) {
-        const std::uint16_t code = body.u16(at);
-        const std::uint16_t size = body.u16(at + 2);
-        at += 4;
-        if (code == 0 || at + size > body.size()) {
-            break;
-        }
-        if (code == optionTimeResolution && size >= 1) {
-            result.timeResolution = body.u8(at);
+    const NumberView options = body.from(8);
+    forEachOption(options, [&](std::uint16_t code, std::size_t at, std::size_t size) {
+        if (code == optionName) {
+            result.name = options.text(at, std::min(size, Interface::mostNameOctets));
+        } else if (code == optionTimeResolution && size >= 1) {
+            result.timeResolution = options.u8(at);
         } else if (code == optionTimeOffset && size >= 8) {
-            result.timeOffset = static_cast<std::int64_t>(body.u64(at));
+            result.timeOffset = static_cast<std::int64_t>(options.u64(at));
         }
-        at += (size + 3U) & ~std::size_t{3};
-    }
+    });
     return result;
 }
 

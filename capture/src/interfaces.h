@@ -4,6 +4,8 @@
 
 #include <cstdint>
 #include <optional>
+#include <string>
+#include <string_view>
 #include <vector>
 
 #include "netfloor-capture/packet.h"
@@ -11,8 +13,10 @@
 
 namespace netfloor {
 
-// Only what a packet needs is kept; names and comments are not.
 struct Interface {
+    static constexpr std::size_t mostNameOctets = 64;
+
+    std::string_view name;       // in the block
     std::int64_t timeOffset = 0; // seconds
     std::uint32_t snapOctets = 0;
     std::uint16_t linkType = 0;
@@ -24,6 +28,21 @@ struct Interface {
     [[nodiscard]] std::uint8_t timeDigits() const;
 };
 
+// Calls `see(code, at, size)` for each option, with the place of its value.
+template <typename See>
+void forEachOption(const NumberView &options, See see) {
+    for (std::size_t at = 0; at + 4 <= options.size();) {
+        const std::uint16_t code = options.u16(at);
+        const std::size_t size = options.u16(at + 2);
+        at += 4;
+        if (code == 0 || at + size > options.size()) {
+            return;
+        }
+        see(code, at, size);
+        at += (size + 3) & ~std::size_t{3};
+    }
+}
+
 // From the body of an interface description block, of at least 8 octets.
 [[nodiscard]] Interface readInterface(const NumberView &body);
 
@@ -31,16 +50,26 @@ class InterfaceTable {
 public:
     // Further interfaces are counted and not kept, so that a small packed file cannot take all memory.
     static constexpr std::uint32_t mostKept = std::uint32_t{256} * 1024;
+    static constexpr std::size_t mostNamed = 1024;
 
     void add(const Interface &interface) {
+        if (names_.size() < mostNamed) {
+            names_.emplace_back(interface.name);
+        }
         if (kept_.size() < mostKept) {
             kept_.push_back(interface);
+            kept_.back().name = {};
         }
         ++count_;
     }
     void clear() {
         kept_.clear();
+        names_.clear();
         count_ = 0;
+    }
+    // Empty where it has none, or none that is kept.
+    [[nodiscard]] std::string_view nameOf(std::uint32_t number) const {
+        return number < names_.size() ? std::string_view(names_[number]) : std::string_view();
     }
     [[nodiscard]] std::uint64_t count() const { return count_; }
     // None where the number is unknown or not kept.
@@ -50,6 +79,7 @@ public:
 
 private:
     std::vector<Interface> kept_;
+    std::vector<std::string> names_;
     std::uint64_t count_ = 0;
 };
 

@@ -75,6 +75,8 @@ public:
         packet.linkType = linkType_;
         packet.wireOctets = onWire;
         packet.octets = record.subspan(headOctets_);
+        packet.interfaceName = {};
+        packet.comments = {};
         return true;
     }
 

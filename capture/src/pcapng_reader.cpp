@@ -1,6 +1,9 @@
 // SPDX-License-Identifier: MIT
 // pcapng files (draft-ietf-opsawg-pcapng). libpcap does not read them here: it refuses a file whose interfaces differ
 // in link type or snap length, as in captures on "any" and merged captures, even before the first packet.
+#include <string_view>
+#include <vector>
+
 #include "interfaces.h"
 #include "records.h"
 
@@ -54,6 +57,15 @@ public:
         return true;
     }
 
+    [[nodiscard]] std::string note() const override {
+        if (oddBlocks_ == 0) {
+            return {};
+        }
+        return stream_.file().name() + ": the lengths of " + std::to_string(oddBlocks_) +
+               " blocks are no multiple of four, the first at octet " + std::to_string(firstOddBlock_) +
+               ". They were read all the same; a program that is strict about it will refuse the file.";
+    }
+
 private:
     [[nodiscard]] CaptureDamage damage(const std::string &reason) const {
         return damageAt(stream_, number_ + 1, block_.position, reason);
@@ -69,11 +81,13 @@ private:
             }
             if (block_.type == interfaceDescription) {
                 takeInterface();
-            } else if (!stream_.skip(block_.octets - 4)) {
-                throw cut();
-            } else {
-                takeSecondLength();
+                continue;
             }
+            if (!stream_.skip(block_.octets - 4)) {
+                throw cut();
+            }
+            const auto octets = stream_.peek(4 + paddingOctets());
+            stream_.take(secondLengthAt(octets) + 4);
         }
         return false;
     }
@@ -100,34 +114,40 @@ private:
         const NumberView head(octets, bigEndian_);
         block_.type = head.u32(0);
         block_.octets = head.u32(4);
-        if (block_.octets < frameOctets || block_.octets % 4 != 0 || block_.octets > mostBlockOctets) {
+        if (block_.octets < frameOctets || block_.octets > mostBlockOctets) {
             throw damage("a block of " + std::to_string(block_.octets) + " octets");
+        }
+        if (paddingOctets() != 0 && oddBlocks_++ == 0) {
+            firstOddBlock_ = block_.position;
         }
         return true;
     }
 
-    // The whole block, which is in the buffer then, without type and lengths.
-    [[nodiscard]] std::span<const std::uint8_t> takeBlock() {
-        const auto octets = stream_.peek(block_.octets);
-        if (octets.size() < block_.octets) {
-            throw cut();
-        }
-        if (NumberView(octets, bigEndian_).u32(block_.octets - 4) != block_.octets) {
-            throw damage("a block whose two lengths differ");
-        }
-        stream_.take(block_.octets);
-        return octets.subspan(8, block_.octets - frameOctets);
-    }
+    // What the block lacks to a multiple of four.
+    [[nodiscard]] std::uint32_t paddingOctets() const { return -block_.octets % 4; }
 
-    void takeSecondLength() {
-        const auto octets = stream_.peek(4);
+    // Where the second length is in the octets from its usual place on. Of a block whose length is no multiple of
+    // four, some programs write the padding and do not count it.
+    [[nodiscard]] std::uint32_t secondLengthAt(std::span<const std::uint8_t> octets) const {
         if (octets.size() < 4) {
             throw cut();
         }
-        if (NumberView(octets, bigEndian_).u32(0) != block_.octets) {
-            throw damage("a block whose two lengths differ");
+        for (const std::uint32_t at : {std::uint32_t{0}, paddingOctets()}) {
+            if (octets.size() >= at + 4 && NumberView(octets, bigEndian_).u32(at) == block_.octets) {
+                return at;
+            }
         }
-        stream_.take(4);
+        throw damage("a block whose two lengths differ");
+    }
+
+    // The whole block, which is in the buffer then, without type and lengths.
+    [[nodiscard]] std::span<const std::uint8_t> takeBlock() {
+        const auto octets = stream_.peek(block_.octets + paddingOctets());
+        if (octets.size() < block_.octets) {
+            throw cut();
+        }
+        stream_.take(block_.octets + secondLengthAt(octets.subspan(block_.octets - 4)));
+        return octets.subspan(8, block_.octets - frameOctets);
     }
 
     void takeInterface() {
@@ -173,7 +193,26 @@ private:
         packet.interfaceNumber = number;
         packet.linkType = from.linkType;
         packet.wireOctets = head.u32(isSimple ? 0 : 16);
-        packet.octets = takeBlock().subspan(headOctets, captured);
+        packet.interfaceName = interfaces_.nameOf(number);
+        const auto body = takeBlock();
+        packet.octets = body.subspan(headOctets, captured);
+        packet.comments = {};
+        const std::size_t optionsAt = headOctets + captured + -captured % 4;
+        if (!isSimple && optionsAt < body.size()) {
+            findComments(body.subspan(optionsAt));
+            packet.comments = comments_;
+        }
+    }
+
+    void findComments(std::span<const std::uint8_t> options) {
+        constexpr std::uint16_t optionComment = 1;
+        constexpr std::size_t mostComments = 64;
+        comments_.clear();
+        forEachOption({options, bigEndian_}, [&](std::uint16_t code, std::size_t at, std::size_t size) {
+            if (code == optionComment && comments_.size() < mostComments) {
+                comments_.emplace_back(reinterpret_cast<const char *>(options.data() + at), size);
+            }
+        });
     }
 
     // A simple packet block has the length on the wire, and not the captured length.
@@ -198,9 +237,12 @@ private:
     }
 
     OctetStream &stream_;
-    InterfaceTable interfaces_; // of the section
-    Block block_;               // the one that is read
+    InterfaceTable interfaces_;              // of the section
+    Block block_;                            // the one that is read
+    std::vector<std::string_view> comments_; // of the packet
     std::uint64_t number_ = 0;
+    std::uint64_t oddBlocks_ = 0; // whose length is no multiple of four
+    std::uint64_t firstOddBlock_ = 0;
     bool bigEndian_ = false;
     bool atPacket_ = false; // the block is a packet, and not yet given out
 };

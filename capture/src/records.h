@@ -9,6 +9,7 @@
 #include <memory>
 #include <span>
 #include <string>
+#include <string_view>
 
 #include "netfloor-capture/errors.h"
 #include "netfloor-capture/packet.h"
@@ -26,6 +27,9 @@ public:
     virtual ~RecordReader() = default;
 
     [[nodiscard]] virtual bool next(CapturedPacket &packet) = 0;
+
+    // See CaptureFile::note.
+    [[nodiscard]] virtual std::string note() const { return {}; }
 };
 
 // The formats. The stream is borrowed.
@@ -47,6 +51,14 @@ public:
     [[nodiscard]] std::uint32_t u32(std::size_t offset) const {
         const auto number = raw<std::uint32_t>(offset);
         return swaps_ ? __builtin_bswap32(number) : number;
+    }
+    [[nodiscard]] NumberView from(std::size_t offset) const {
+        NumberView rest = *this;
+        rest.octets_ = octets_.subspan(offset);
+        return rest;
+    }
+    [[nodiscard]] std::string_view text(std::size_t offset, std::size_t size) const {
+        return {reinterpret_cast<const char *>(octets_.data() + offset), size};
     }
     [[nodiscard]] std::uint64_t u64(std::size_t offset) const {
         const auto number = raw<std::uint64_t>(offset);

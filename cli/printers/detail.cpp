@@ -17,7 +17,7 @@ public:
     void print(const PacketToPrint &packet) override {
         printHeading(packet);
         if (packet.network.isIp()) {
-            host().run(Pass::md, packet.network.octets, tree_);
+            run(Pass::md, packet, tree_);
         } else {
             out() << "  ";
             printOther(packet);

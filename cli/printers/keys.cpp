@@ -133,7 +133,7 @@ public:
         values_.clear();
         Ending ending = Ending::complete;
         if (packet.network.isIp()) {
-            ending = host().run(Pass::xtr, packet.network.octets, values_);
+            ending = run(Pass::xtr, packet, values_);
         }
         writeNote(packet, ending);
         values_.write(out());

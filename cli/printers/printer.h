@@ -48,6 +48,12 @@ struct PacketToPrint {
     const NetworkPart &network;
     std::string_view other; // what it is if it is no IP
     std::string_view time;  // in the form that the options ask for
+
+    [[nodiscard]] RunOptions runOptions() const {
+        RunOptions options;
+        options.wireOctets = captured.isCut() ? captured.wireOctets - network.offset : 0;
+        return options;
+    }
 };
 
 class Printer {
@@ -68,6 +74,10 @@ protected:
     [[nodiscard]] const Options &options() const { return options_; }
     [[nodiscard]] Output &out() const { return out_; }
     [[nodiscard]] Host &host() const { return host_; }
+    // Runs a pass over the packet, which has IP, with its length on the wire.
+    Ending run(Pass pass, const PacketToPrint &packet, Sink &sink) const {
+        return host_.run(pass, packet.network.octets, sink, packet.runOptions());
+    }
 
     // The columns that start a line: number, time, octets.
     void printHead(const PacketToPrint &packet);

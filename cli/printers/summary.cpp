@@ -64,6 +64,13 @@ public:
         }
     }
 
+    void notCaptured(const NotCaptured &first) override {
+        endRun();
+        isRunShown_ = false;
+        out_.styled(Style::dim, " | ");
+        (out_.start(Style::warning) << first.name << " not captured").stop(Style::warning);
+    }
+
     void end(const PassEnd &end) override {
         endRun();
         if (end.ending == Ending::cutOff) {
@@ -145,7 +152,7 @@ public:
     void print(const PacketToPrint &packet) override {
         printHead(packet);
         if (packet.network.isIp()) {
-            host().run(Pass::to, packet.network.octets, line_);
+            run(Pass::to, packet, line_);
         } else {
             printOther(packet);
         }

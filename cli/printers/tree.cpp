@@ -35,6 +35,7 @@ void Tree::begin(Pass /*pass*/, std::span<const std::uint8_t> packet) {
     gaps_.reset();
     run_.octets = 0;
     depth_ = 0;
+    isReadToCut_ = false;
     addressName_ = {};
 }
 
@@ -166,6 +167,13 @@ void Tree::writeOctets(std::string_view name, OctetSpan octets, std::uint32_t de
     }
 }
 
+void Tree::notCaptured(const NotCaptured &first) {
+    endRun();
+    isReadToCut_ = true;
+    newLine(depth_);
+    (out_.start(Style::warning) << "[not captured: from '" << first.name << "' on]").stop(Style::warning) << '\n';
+}
+
 void Tree::handOff(const HandOff &handOff) {
     endRun();
     newLine(depth_);
@@ -190,7 +198,9 @@ void Tree::layer(const LayerRecord &layer) {
 
 void Tree::end(const PassEnd &end) {
     endRun();
-    writeGapsBefore(octetOf(end.state.cursor), depth_);
+    if (!isReadToCut_) {
+        writeGapsBefore(octetOf(end.state.cursor), depth_);
+    }
     if (end.bitsLeft != 0 && end.ending == Ending::complete) {
         const std::uint32_t total = static_cast<std::uint32_t>(packet_.size()) * bitsPerOctet;
         out_.start(Style::dim) << "  not decoded: ";

@@ -21,6 +21,7 @@ public:
     void begin(Pass pass, std::span<const std::uint8_t> packet) override;
     void blockOpened(const BlockView &block) override;
     void field(const FieldView &field) override;
+    void notCaptured(const NotCaptured &first) override;
     void handOff(const HandOff &handOff) override;
     void layer(const LayerRecord &layer) override;
     void end(const PassEnd &end) override;
@@ -65,7 +66,8 @@ private:
     std::span<const std::uint8_t> packet_;
     GapFinder gaps_;
     Run run_;
-    std::uint32_t depth_ = 0;      // of the last line
+    std::uint32_t depth_ = 0; // of the last line
+    bool isReadToCut_ = false;
     std::string_view addressName_; // of the field before, if it is an IPv6 address
     std::uint32_t addressBit_ = 0;
 };

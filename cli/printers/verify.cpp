@@ -57,7 +57,7 @@ public:
     void print(const PacketToPrint &packet) override {
         printHead(packet);
         if (packet.network.isIp()) {
-            printVerdict(packet.captured, packet.network.octets);
+            printVerdict(packet);
         } else {
             printOther(packet);
         }
@@ -87,13 +87,13 @@ public:
     }
 
 private:
-    void printVerdict(const CapturedPacket &packet, std::span<const std::uint8_t> octets) {
-        host().run(Pass::mv, octets, outcome_);
+    void printVerdict(const PacketToPrint &packet) {
+        run(Pass::mv, packet, outcome_);
         std::span<const Finding> findings;
         if (outcome_.verdict.fault()) {
-            findings = explainer_.explain(outcome_.verdict.flags, host(), octets);
+            findings = explainer_.explain(outcome_.verdict.flags, host(), packet.network.octets, packet.runOptions());
         }
-        const auto verdict = static_cast<std::size_t>(verdictOf(outcome_, findings, packet.isCut()));
+        const auto verdict = static_cast<std::size_t>(verdictOf(outcome_, findings, packet.captured.isCut()));
         ++counts_[verdict];
 
         const VerdictWords &shown = words[verdict];

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: MIT
 #include "key_record.h"
 
+#include <algorithm>
 #include <bit>
 #include <cstring>
 
@@ -30,8 +31,7 @@ std::uint32_t loadAs(KeyType type, const std::uint8_t *place) {
     }
 }
 
-// The octets of an address. None where it did not fit, or where later addresses have overwritten it: an address
-// that is complete ends at or before the offset at which the pass ended.
+// The octets of an address. None where it did not fit, or where later addresses have overwritten it.
 std::span<const std::uint8_t> loadOctets(const std::uint8_t *record, const std::uint8_t *place,
                                          std::uint16_t byteAreaOffset) {
     const std::uint32_t bits = loadNumber<std::uint16_t>(place);
@@ -41,6 +41,12 @@ std::span<const std::uint8_t> loadOctets(const std::uint8_t *record, const std::
         return {};
     }
     return {record + from, octets};
+}
+
+// The number of an address is where its octets are.
+bool isSame(const KeyView &left, const KeyView &right) {
+    return left.type == KeyType::ipv6Address ? std::ranges::equal(left.octets, right.octets)
+                                             : left.number == right.number;
 }
 
 } // namespace
@@ -61,21 +67,31 @@ void KeyRecord::reset() {
     std::memset(octets_.get() + presenceStart, 0, presenceOctets);
 }
 
-void KeyRecord::report(std::span<const KeyColumn> columns, std::uint16_t byteAreaOffset, Sink &sink) const {
+bool KeyRecord::has(std::size_t row) const {
+    return (octets_[presenceStart + row / bitsPerOctet] >> row % bitsPerOctet & 1U) != 0;
+}
+
+KeyView KeyRecord::view(std::size_t row, const KeyColumn &column) const {
+    const std::uint8_t *const place = octets_.get() + valueStart + row * valueOctets;
+    const bool isAddress = column.type == KeyType::ipv6Address;
+    return {
+        .name = column.name,
+        .row = static_cast<std::uint32_t>(row),
+        .type = column.type,
+        .number = loadAs(column.type, place),
+        .octets = isAddress ? loadOctets(octets_.get(), place, end_) : std::span<const std::uint8_t>(),
+    };
+}
+
+void KeyRecord::report(std::span<const KeyColumn> columns, const KeyRecord *other, Sink &sink) const {
     const std::uint8_t *const record = octets_.get();
     for (std::size_t octet = 0; octet * bitsPerOctet < columns.size(); ++octet) {
         for (std::uint32_t present = record[presenceStart + octet]; present != 0; present &= present - 1) {
             const std::size_t row = octet * bitsPerOctet + static_cast<std::size_t>(std::countr_zero(present));
-            const std::uint8_t *const place = record + valueStart + row * valueOctets;
-            const auto &[name, type] = columns[row];
-            const bool isAddress = type == KeyType::ipv6Address;
-            sink.key({
-                .name = name,
-                .row = static_cast<std::uint32_t>(row),
-                .type = type,
-                .number = loadAs(type, place),
-                .octets = isAddress ? loadOctets(record, place, byteAreaOffset) : std::span<const std::uint8_t>(),
-            });
+            const KeyView key = view(row, columns[row]);
+            if (other == nullptr || (other->has(row) && isSame(key, other->view(row, columns[row])))) {
+                sink.key(key);
+            }
         }
     }
 }

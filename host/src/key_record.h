@@ -38,12 +38,19 @@ public:
 
     [[nodiscard]] std::uint8_t *octets() { return octets_.get(); }
 
-    // Reports the rows whose presence bit is set, of a table with these columns. `byteAreaOffset` is that of the
-    // context after the pass.
-    void report(std::span<const KeyColumn> columns, std::uint16_t byteAreaOffset, Sink &sink) const;
+    // The context's offset after the pass. An address that is complete ends at or before it.
+    void setEnd(std::uint16_t byteAreaOffset) { end_ = byteAreaOffset; }
+
+    // Reports the rows whose presence bit is set, of a table with these columns; with `other`, those that are the same
+    // there.
+    void report(std::span<const KeyColumn> columns, const KeyRecord *other, Sink &sink) const;
 
 private:
+    [[nodiscard]] bool has(std::size_t row) const;
+    [[nodiscard]] KeyView view(std::size_t row, const KeyColumn &column) const;
+
     std::unique_ptr<std::uint8_t[]> octets_;
+    std::uint16_t end_ = 0;
 };
 
 } // namespace netfloor

@@ -48,10 +48,14 @@ void takeBitsAsData(NextLayer &next, std::uint32_t bits) {
     if (bits == 0) {
         return;
     }
+    const std::uint32_t shown = std::min(bits, next.capturedBits());
     switch (next.pass()) {
-    case Pass::md: return next.take(bits, "data", DataText("Data=", bits).view(), {});
-    case Pass::to: return next.take(bits, "data", {}, DataText("Data - ", bits).view());
+    case Pass::md: next.take(shown, "data", DataText("Data=", shown).view(), {}); break;
+    case Pass::to: next.take(shown, "data", {}, DataText("Data - ", shown).view()); break;
     default: return next.consume(bits);
+    }
+    if (shown < bits) {
+        next.take(bits - shown, "data", {}, {});
     }
 }
 
@@ -108,14 +112,18 @@ std::span<const std::uint8_t> NextLayer::payload() const {
     const DecodeState &state = run_.state();
     const std::size_t first = (state.cursor - 1 + bitsPerOctet - 1) / bitsPerOctet;
     const std::size_t skippedBits = first * bitsPerOctet - (state.cursor - 1);
-    if (first >= packet().size() || skippedBits > state.bitsLeft) {
+    if (first >= packet().size() || skippedBits > capturedBits()) {
         return {};
     }
-    return packet().subspan(first, std::min(packet().size() - first, (state.bitsLeft - skippedBits) / bitsPerOctet));
+    return packet().subspan(first, std::min(packet().size() - first, (capturedBits() - skippedBits) / bitsPerOctet));
 }
 
 std::uint32_t NextLayer::bitsLeft() const {
     return run_.state().bitsLeft;
+}
+
+std::uint32_t NextLayer::capturedBits() const {
+    return run_.capturedBitsLeft();
 }
 
 DecodeState &NextLayer::state() {

@@ -27,6 +27,14 @@ Ending endingOf(std::int32_t result) {
     return result > 0 ? Ending::complete : Ending::keysDenied;
 }
 
+// The flags that were raised before the first field that was not captured.
+class SoundFlags final : public Sink {
+public:
+    [[nodiscard]] bool wantsBlocks() const override { return false; }
+    void notCaptured(const NotCaptured &first) override { flags = first.flags; }
+    std::uint32_t flags = ~std::uint32_t{0};
+};
+
 std::string_view withoutLeadingBlanks(std::string_view name) {
     name.remove_prefix(std::min(name.find_first_not_of(' '), name.size()));
     return name;
@@ -41,31 +49,68 @@ PacketRun::PacketRun(LoadedPlugin &plugin, FieldNames &names)
 
 Ending PacketRun::run(Pass pass, std::span<const std::uint8_t> packet, const OwnerRegistry &owners, Sink &sink,
                       const RunOptions &options, const TestRunOptions *test) {
-    pass_ = pass;
     owners_ = &owners;
+    options_ = options;
+    soundFlags_ = ~std::uint32_t{0};
+    cut_.take(packet, options.wireOctets);
+    return cut_.isCut() ? runCut(pass, sink, test) : finish(runPass(pass, sink, test));
+}
+
+// A grammar looks ahead, and so a captured octet may be read as another field because of one that was not captured.
+// What two runs with other values in the place of those octets have in common comes from captured octets.
+Ending PacketRun::runCut(Pass pass, Sink &sink, const TestRunOptions *test) {
+    if (pass == Pass::mv) { // it does not report where it is; the MD pass does, and raises flags in the same places
+        SoundFlags flags;
+        runCut(Pass::md, flags, test);
+        soundFlags_ = flags.flags;
+        return finish(runPass(pass, sink, test));
+    }
+    Sink nothing;
+    cut_.fill(0xff);
+    reading_.clear();
+    isFirstReading_ = true;
+    (void)runPass(pass, nothing, test);
+    isFirstReading_ = false;
+    cut_.fill(0);
+    if (pass != Pass::xtr) {
+        return finish(runPass(pass, sink, test));
+    }
+    if (!otherKeys_) {
+        otherKeys_.emplace();
+    }
+    std::swap(keyRecord_, *otherKeys_);
+    return finish(runPass(pass, sink, test), &*otherKeys_);
+}
+
+std::int32_t PacketRun::runPass(Pass pass, Sink &sink, const TestRunOptions *test) {
+    pass_ = pass;
     sink_ = &sink;
     withBlocks_ = pass == Pass::md && sink.wantsBlocks();
-    options_ = options;
-    prepare(packet, test);
-    sink.begin(pass, packet);
+    prepare(test);
+    sink.begin(pass, packet_);
     const std::int32_t result = enter();
     if (exception_) {
         std::rethrow_exception(exception_);
     }
-    return finish(result);
+    if (pass == Pass::xtr) {
+        keyRecord_.setEnd(xtr_.byteAreaOffset);
+    }
+    return result;
 }
 
-void PacketRun::prepare(std::span<const std::uint8_t> packet, const TestRunOptions *test) {
-    packet_ = packet;
+void PacketRun::prepare(const TestRunOptions *test) {
+    packet_ = cut_.octets();
+    isReadToCut_ = false;
+    fieldsRead_ = 0;
     exception_ = nullptr;
     handOffDepth_ = 0;
     reentries_ = 0;
     followStop_ = test == nullptr || test->followStop;
     if (test == nullptr) {
-        reused_.reset(packet);
+        reused_.reset(packet_);
         state_ = &reused_.state();
     } else {
-        state_ = &exact_.emplace(packet, test->state).state();
+        state_ = &exact_.emplace(packet_, test->state).state();
     }
     if (pass_ == Pass::xtr) {
         prepareKeyContext(test);
@@ -162,7 +207,7 @@ Handled PacketRun::handOff() {
     --handOffDepth_;
     record.consumedBits = state().cursor - record.cursor;
     record.refused = handled == Handled::refused;
-    if (!exception_) {
+    if (!exception_ && !isReadToCut_) {
         sink_->handOff(record);
     }
     return handled;
@@ -205,7 +250,9 @@ void PacketRun::addField(std::uint32_t outputRangeCount, const BitRange *ranges,
         view_.ranges = {ranges, outputRangeCount};
         view_.bitOrder = bitOrder;
         view_.recordHead = {head[0], head[1], head[2]};
-        reportField(field);
+        if (!cut_.isCut() || isCaptured(view_.name, view_.ranges)) {
+            reportField(field);
+        }
         preDecode_.context.fieldRecordCount = (preDecode_.context.fieldRecordCount + 1) % fieldRecordCount;
         fillFieldRecordHead();
     } catch (...) {
@@ -219,6 +266,10 @@ void PacketRun::addDisplay(const char *display, std::uint32_t displayId) noexcep
     }
     try {
         const NamedField &field = names_.find(displayId);
+        const FieldRecord &record = state().fieldRecord;
+        if (cut_.isCut() && !isCaptured(field.name, {record.ranges, record.outputRangeCount})) {
+            return;
+        }
         sink_->text({displayId, field.name, field.isKey, LazyText(display), preDecode_.context.layerNumber});
     } catch (...) {
         keepException();
@@ -252,8 +303,11 @@ void PacketRun::addOwnEntry(std::uint32_t bits, std::string_view name, std::stri
     if (exception_) {
         return;
     }
+    const BitRange range = {0, state().cursor, state().cursor + bits - 1, 0, {}};
+    if (cut_.isCut() && !isCaptured(name, {&range, 1})) {
+        return;
+    }
     if (pass_ == Pass::md) {
-        const BitRange range = {0, state().cursor, state().cursor + bits - 1, 0, {}};
         view_.id = 0;
         view_.name = name;
         view_.isKey = false;
@@ -267,6 +321,25 @@ void PacketRun::addOwnEntry(std::uint32_t bits, std::string_view name, std::stri
     } else if (pass_ == Pass::to) {
         sink_->text({0, name, false, LazyText(shortText), preDecode_.context.layerNumber});
     }
+}
+
+bool PacketRun::isCaptured(std::string_view name, std::span<const BitRange> ranges) {
+    if (isReadToCut_) {
+        return false;
+    }
+    const FieldRead field = {name, state().cursor};
+    bool isSame = true;
+    if (isFirstReading_) {
+        reading_.push_back(field);
+    } else {
+        isSame = fieldsRead_ < reading_.size() && reading_[fieldsRead_] == field;
+        ++fieldsRead_;
+    }
+    if (!isSame || !cut_.holds(ranges, state().cursor)) {
+        isReadToCut_ = true;
+        sink_->notCaptured({name, state().flags});
+    }
+    return !isReadToCut_;
 }
 
 // Completes the view by what the decode state tells.
@@ -292,17 +365,18 @@ void PacketRun::keepException() noexcept {
     }
 }
 
-Ending PacketRun::finish(std::int32_t result) {
+Ending PacketRun::finish(std::int32_t result, const KeyRecord *otherKeys) {
     const PreDecodeContext &context = preDecode_.context;
     const Ending ending = endingOf(result);
     if (pass_ == Pass::xtr) {
-        keyRecord_.report(plugin_.keyColumns(), xtr_.byteAreaOffset, *sink_);
+        keyRecord_.report(plugin_.keyColumns(), otherKeys, *sink_);
         sink_->end({pass_, ending, result, xtr_.bitsLeft, {}, 0, 0, state()});
         return ending;
     }
     Verdict verdict;
     if (pass_ == Pass::mv) {
-        verdict = {context.verdict, state().flags};
+        const std::uint32_t flags = state().flags & soundFlags_;
+        verdict = {flags == 0 ? 0 : context.verdict, flags};
     } else {
         blocks_.closeAll(*sink_);
         for (const LayerInfoRecord &layer : std::span(context.layerInfo, context.layerInfoCount)) {

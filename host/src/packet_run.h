@@ -2,6 +2,7 @@
 // Runs one pass over one packet at a time, and answers the plug-in's calls. The storage is kept from packet to packet.
 #pragma once
 
+#include <algorithm>
 #include <array>
 #include <cstdint>
 #include <cstring>
@@ -14,6 +15,7 @@
 #include <vector>
 
 #include "block_tracker.h"
+#include "cut_packet.h"
 #include "field_names.h"
 #include "key_record.h"
 #include "links.h"
@@ -49,7 +51,10 @@ private:
     static constexpr std::size_t headOctets = std::tuple_size_v<decltype(FieldView::recordHead)>;
     static constexpr std::uint8_t untouchedOctet = 0xff;
 
-    void prepare(std::span<const std::uint8_t> packet, const TestRunOptions *test);
+    // One pass over the packet in `cut_`.
+    std::int32_t runPass(Pass pass, Sink &sink, const TestRunOptions *test);
+    Ending runCut(Pass pass, Sink &sink, const TestRunOptions *test);
+    void prepare(const TestRunOptions *test);
     void prepareContext(const TestRunOptions *test);
     void prepareKeyContext(const TestRunOptions *test);
     [[nodiscard]] std::int32_t enter();
@@ -69,14 +74,29 @@ private:
     // Fills the head of the current field record, so that the host sees what the plug-in did not write.
     void fillFieldRecordHead() { std::memset(fieldRecordHead(), untouchedOctet, headOctets); }
     void reportField(NamedField &field);
+    // Whether a field is there to be reported; the first that is not is told to the sink.
+    [[nodiscard]] bool isCaptured(std::string_view name, std::span<const BitRange> ranges);
+    [[nodiscard]] std::uint32_t capturedBitsLeft() const {
+        return cut_.isCut() ? std::min(state().bitsLeft, cut_.bitsFrom(state().cursor)) : state().bitsLeft;
+    }
     void keepException() noexcept;
-    Ending finish(std::int32_t result);
+    Ending finish(std::int32_t result, const KeyRecord *otherKeys = nullptr);
 
     LoadedPlugin &plugin_;
     FieldNames &names_;
     PacketState reused_;
     std::optional<PacketState> exact_; // of a test
     KeyRecord keyRecord_;
+    std::optional<KeyRecord> otherKeys_; // of a packet that is cut, whose other octets had another value
+    CutPacket cut_;
+    struct FieldRead {
+        std::string_view name;
+        std::uint32_t cursor;
+        friend bool operator==(const FieldRead &, const FieldRead &) = default;
+    };
+    std::vector<FieldRead> reading_; // of a packet that is cut, up to the first field that was not captured
+    std::size_t fieldsRead_ = 0;
+    bool isFirstReading_ = false;
     std::array<std::uint8_t, fieldRecordCount *fieldRecordOctets> fieldRecords_ = {};
     std::vector<LayerInfoRecord> layerInfo_;
     BlockTracker blocks_;
@@ -89,6 +109,8 @@ private:
     FieldView view_;         // of the field at hand; to clear a new one takes as long as all else that is done for it
     RunOptions options_;
     bool followStop_ = true;
+    bool isReadToCut_ = false;     // a field was not captured
+    std::uint32_t soundFlags_ = 0; // MV: those that were raised before
     std::span<const std::uint8_t> packet_;
     DecodeState *state_ = nullptr;
     standin::PreDecodeRun preDecode_ = {};

@@ -67,6 +67,9 @@ TEST(SteadyState, allocatesNothing) {
             const std::size_t before = allocations;
             for (const Octets &packet : packets) {
                 host.run(pass, packet, sink);
+                RunOptions cut; // as the snap length leaves it
+                cut.wireOctets = packet.size();
+                host.run(pass, std::span(packet).first(packet.size() - packet.size() / 4), sink, cut);
             }
             return allocations - before;
         };

@@ -114,6 +114,46 @@ TEST(Pcapng, timesFollowTheInterface) {
     }
 }
 
+// A length that is no multiple of four: the padding is there and not counted, or it is not there.
+TEST(Pcapng, blocksOfOddLengthAreReadWithANote) {
+    const Octets before = pcapngSection() + pcapngInterface(1, {});
+    const Octets head = hex("00*12") + be32(5) + be32(5) + hex("0102030405");
+    const Octets packet = be32(6) + be32(37) + head;
+    for (const Octets &padding : {Octets(), hex("00*3")}) {
+        SCOPED_TRACE(hexText(padding));
+        const Octets unknown = be32(0x0bad) + be32(15) + hex("010203") + Octets(padding.size() / 3, 0) + be32(15);
+        CaptureFile capture(
+            writeFile("odd", before + packet + padding + be32(37) + unknown + pcapngPacket(0, 1, hex("0607"))));
+        CapturedPacket read;
+        ASSERT_TRUE(capture.next(read));
+        EXPECT_EQ(hexText(read.octets), "01 02 03 04 05");
+        ASSERT_TRUE(capture.next(read));
+        EXPECT_EQ(hexText(read.octets), "06 07");
+        EXPECT_FALSE(capture.next(read));
+        EXPECT_NE(capture.note().find("lengths of 2 blocks"), std::string::npos) << capture.note();
+        EXPECT_NE(capture.note().find("octet " + std::to_string(before.size())), std::string::npos) << capture.note();
+    }
+}
+
+TEST(Pcapng, namesAndCommentsComeWithThePacket) {
+    const Octets named = pcapngInterface(1, hex("0002 0004 65746830"));
+    const Octets body = hex("00*12") + be32(3) + be32(3) + hex("01020300");
+    const Octets comments = hex("0001 0002 68690000 0002 0004 00000000 0001 0003 61626300 0000 0000");
+    CaptureFile capture(writeFile("named", pcapngSection() + named + pcapngBlock(6, body + comments) +
+                                               pcapngBlock(6, body) + pcapngBlock(6, body + hex("0001 0009 6869"))));
+    CapturedPacket packet;
+    ASSERT_TRUE(capture.next(packet));
+    EXPECT_EQ(packet.interfaceName, "eth0");
+    ASSERT_EQ(packet.comments.size(), 2U);
+    EXPECT_EQ(packet.comments[0], "hi");
+    EXPECT_EQ(packet.comments[1], "abc");
+    EXPECT_TRUE(capture.note().empty());
+    for (int i = 0; i < 2; ++i) { // without options, and with one that ends after its block
+        ASSERT_TRUE(capture.next(packet));
+        EXPECT_TRUE(packet.comments.empty());
+    }
+}
+
 TEST(Times, areWrittenWithoutOverflow) {
     constexpr std::int64_t most = INT64_MAX;
     constexpr std::int64_t least = INT64_MIN;

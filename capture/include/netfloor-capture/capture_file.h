@@ -35,6 +35,9 @@ public:
     // The path, or "standard input".
     [[nodiscard]] const std::string &name() const;
 
+    // A sentence on what is wrong with the file although it was read; empty where nothing is so far.
+    [[nodiscard]] std::string note() const;
+
     // Whether the packets come from a program as they are made.
     [[nodiscard]] bool isLive() const;
 

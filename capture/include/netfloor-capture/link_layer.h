@@ -20,6 +20,7 @@ public:
         cutHeader,
         etherType,
         pppProtocol,
+        nlpid, // Frame Relay
         addressFamily,
         linkType,
     };
@@ -50,7 +51,7 @@ struct NetworkPart {
     [[nodiscard]] bool isIp() const { return other.kind() == NotIp::Kind::ip; }
 };
 
-// Goes through the link layer: VLAN tags, PPPoE and SNAP included.
+// Goes through the link layer: VLAN tags, PPPoE, SNAP and MPLS labels included.
 [[nodiscard]] NetworkPart findNetworkPart(int linkType, std::span<const std::uint8_t> packet);
 
 // "Ethernet", "Linux cooked v2", ..., or the number where neither this library nor libpcap has a name.

@@ -6,6 +6,7 @@
 #include <cstdint>
 #include <optional>
 #include <span>
+#include <string_view>
 
 namespace netfloor {
 
@@ -33,11 +34,14 @@ struct CapturedPacket {
     std::uint64_t number = 0;   // from 1
     std::uint64_t position = 0; // octet of the capture, unpacked, at which the packet's record begins
     std::optional<CaptureTime> time = {};
-    std::uint8_t timeDigits = 0;               // of a second, that the capture has: 6 for microseconds
-    std::uint32_t interfaceNumber = 0;         // within its section; 0 where the format has none
-    int linkType = 0;                          // as files number it, see www.tcpdump.org/linktypes.html
-    std::uint32_t wireOctets = 0;              // what the packet had before the snap length cut it
-    std::span<const std::uint8_t> octets = {}; // valid until the next packet is read
+    std::uint8_t timeDigits = 0;       // of a second, that the capture has: 6 for microseconds
+    std::uint32_t interfaceNumber = 0; // within its section; 0 where the format has none
+    int linkType = 0;                  // as files number it, see www.tcpdump.org/linktypes.html
+    std::uint32_t wireOctets = 0;      // what the packet had before the snap length cut it
+    // Valid until the next packet is read. Names and comments are as the file has them: any octets.
+    std::span<const std::uint8_t> octets = {};
+    std::string_view interfaceName = {};
+    std::span<const std::string_view> comments = {};
 
     [[nodiscard]] bool isCut() const { return octets.size() < wireOctets; }
 };

@@ -29,9 +29,10 @@ public:
     // None for the port 3452, whose hand-off names no protocol.
     [[nodiscard]] std::optional<std::uint32_t> ipProtocol() const;
 
-    [[nodiscard]] std::span<const std::uint8_t> packet() const;  // the whole packet
-    [[nodiscard]] std::span<const std::uint8_t> payload() const; // whole octets from the cursor to the limit
+    [[nodiscard]] std::span<const std::uint8_t> packet() const;  // the whole packet; what was not captured is 0 or 0xff
+    [[nodiscard]] std::span<const std::uint8_t> payload() const; // captured octets from the cursor to the limit
     [[nodiscard]] std::uint32_t bitsLeft() const;
+    [[nodiscard]] std::uint32_t capturedBits() const; // of these
 
     [[nodiscard]] DecodeState &state();
     [[nodiscard]] PreDecodeContext *preDecodeContext(); // null in the XTR pass
@@ -40,7 +41,8 @@ public:
     // Moves the cursor over `bits` bits, or over all that are left if they are fewer.
     void consume(std::uint32_t bits);
 
-    // Reports the next `bits` bits to the sink as one entry and consumes them: a field in MD, a text in TO.
+    // Reports the next `bits` bits to the sink as one entry and consumes them: a field in MD, a text in TO. Bits that
+    // were not captured are not reported.
     void take(std::uint32_t bits, std::string_view name, std::string_view longText, std::string_view shortText);
 
     // Opens and closes a record for the bits that `decode` consumes in the list of layers (MD and TO).

@@ -23,6 +23,11 @@
 namespace netfloor {
 
 struct RunOptions {
+    // What the packet had on the wire, from its IP header on, where a capture holds less of it; 0: all of it. The
+    // passes run over a packet of that length, of at most 65,575 octets. A value that was not captured is not reported:
+    // MD and TO end their reports before it, see Sink::notCaptured; MV has no flags that were raised after it; XTR has
+    // no key that depends on it. The plug-in runs several times, and so do the owners.
+    std::size_t wireOctets = 0;
     std::uint8_t layerNumber = 1;   // of the first layer
     std::uint32_t decoderId = 1;    // the host's word for the plug-in
     std::uint32_t mostNesting = 64; // how deep owners may nest calls of NextLayer::runPlugin

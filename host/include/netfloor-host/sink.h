@@ -111,6 +111,12 @@ struct ShortTextView {
 // How the value of a key field is to be shown.
 enum class KeyType : std::uint8_t { number8, number16, number32, ipv4Address, ipv6Address };
 
+// MD and TO: the first field that was not captured as a whole.
+struct NotCaptured {
+    std::string_view name;   // as in FieldView; "data" for what an owner took as such
+    std::uint32_t flags = 0; // of the decode state: what was raised before it
+};
+
 // XTR: one key field that the packet has.
 struct KeyView {
     std::string_view name;
@@ -177,7 +183,7 @@ struct PassEnd {
 // Takes what a pass reports, in this order:
 //
 //   begin                   once
-//   blockOpened, field, blockClosed, text, handOff    as the plug-in goes
+//   blockOpened, field, blockClosed, text, handOff, notCaptured    as the plug-in goes
 //   layer, key              one by one, in the order of the layers and of the rows
 //   end                     once
 //
@@ -204,9 +210,11 @@ public:
     virtual void field(const FieldView & /*field*/) {}
 
     virtual void text(const ShortTextView & /*text*/) {} // TO
-    virtual void key(const KeyView & /*key*/) {}         // XTR
-    virtual void layer(const LayerRecord & /*layer*/) {} // MD and TO
-    virtual void handOff(const HandOff & /*handOff*/) {} // after the owner's work
+    // Neither this field nor anything after it is reported, layers excepted. See RunOptions::wireOctets.
+    virtual void notCaptured(const NotCaptured & /*first*/) {} // MD and TO
+    virtual void key(const KeyView & /*key*/) {}               // XTR
+    virtual void layer(const LayerRecord & /*layer*/) {}       // MD and TO
+    virtual void handOff(const HandOff & /*handOff*/) {}       // after the owner's work
     virtual void end(const PassEnd & /*end*/) {}
 };
 
