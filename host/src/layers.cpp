@@ -49,6 +49,7 @@ void LayerView::read(std::span<const std::uint8_t> packet) {
     InnerPackets at(packet);
     for (; !at.ended(); at.next()) {
         open_.fill(-1);
+        isLaterFragment_ = false;
         packets_.push_back(at.opened());
         packets_.back().firstOctet = at.firstOctet();
         packets_.back().octets = static_cast<std::uint32_t>(at.octets().size());
@@ -90,14 +91,14 @@ void LayerView::field(const FieldView &field) {
         return;
     }
     const LayerFieldMap::Entry &entry = map_.find(field.id);
-    if (!entry.isKnown) {
+    if (!entry.isKnown || (isLaterFragment_ && entry.field.kind != LayerKind::ip)) {
         return;
     }
     Place place = placeOf(field.ranges);
     place.first += offset_;
     place.end += offset_;
     std::int32_t &open = open_[static_cast<std::size_t>(entry.field.kind)];
-    if (entry.opensLayer && !openLayer(entry.field.kind, place.first)) {
+    if (entry.opensLayer && (isLaterFragment_ || !openLayer(entry.field.kind, place.first))) {
         return;
     }
     if (open < 0) {
@@ -111,6 +112,8 @@ void LayerView::field(const FieldView &field) {
     if (entry.value == LayerValue::packetNumber) {
         value.number = be32(packet_, place.first);
     }
+    // The plug-in reads what is in the middle of a segment as a header.
+    isLaterFragment_ |= entry.field == layerField("ip.fragment_offset") && field.value != 0;
     if (entry.opensLayer && entry.field.kind == LayerKind::ip) {
         keepVersion(layer, place.first, entry.field);
     }

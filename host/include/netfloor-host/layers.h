@@ -113,6 +113,7 @@ private:
     std::uint16_t ipLayers_ = 0;
     bool isCutOff_ = false;
     bool isFull_ = false;
+    bool isLaterFragment_ = false;
 };
 
 } // namespace netfloor
