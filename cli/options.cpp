@@ -22,7 +22,7 @@ constexpr std::array commandNames = {
     CommandName{Command::summary, "summary", "One line a packet (what 'netfloor FILE' does)"},
     CommandName{Command::detail, "detail", "Every field of each packet, as a tree of layers and blocks"},
     CommandName{Command::verify, "verify", "A verdict on each packet, and a total"},
-    CommandName{Command::keys, "keys", "The key fields of each packet, as CSV"},
+    CommandName{Command::keys, "keys", "A row for each IP layer of each packet, as CSV"},
     CommandName{Command::fields, "fields", "The fields that the plug-in can report; takes no capture"},
 };
 
@@ -43,7 +43,7 @@ Examples:
   netfloor detail --packet 7 --bits capture.pcap one packet, with the bits of each field
   netfloor fields Protocol                       what a field is, and what its values are called
   netfloor verify --filter 'tcp port 80' c.pcapng
-  netfloor keys --column 'Source Address' --column 'Destination Address' c.pcap
+  netfloor keys --column ip.source --column tcp.window c.pcap
   tcpdump -w - | netfloor -)";
 
 constexpr const char *fieldsFooter = R"(
@@ -121,6 +121,13 @@ Colour colourOf(const std::string &word) {
     return found->second;
 }
 
+bool isChunk(const std::string &word) {
+    if (word != "chunk" && word != "layer") {
+        throw CLI::ValidationError("--per", "'" + word + "' is neither layer nor chunk");
+    }
+    return word == "chunk";
+}
+
 void addOptions(CLI::App &app, Options &options) {
     app.add_option("file", options.file, "Capture file (pcap or pcapng, gzip or not); '-' for standard input")
         ->type_name("FILE")
@@ -150,10 +157,15 @@ void addOwnOptions(CLI::App &app, Command command, Options &options) {
                      "All octets of data, a line for each, and the second reading of addresses");
         break;
     case Command::keys:
-        app.add_option("--column", options.columns, "Only the key field of this name (may be repeated)")
+        app.add_option("--column", options.columns,
+                       "This field in the place of the usual ones (may be repeated); a wrong name lists all")
             ->type_name("NAME")
             ->allow_extra_args(false);
-        app.add_flag("--raw", options.raw, "Addresses as the plug-in stores them, in hexadecimal");
+        app.add_option_function<std::string>(
+               "--per", [&options](const std::string &word) { options.perChunk = isChunk(word); },
+               "A row for each IP layer (layer, the default), or for each SCTP chunk (chunk)")
+            ->type_name("WHAT");
+        app.add_flag("--raw", options.raw, "Addresses as octets, in hexadecimal");
         break;
     case Command::verify:
     case Command::fields: break;

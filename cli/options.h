@@ -30,8 +30,9 @@ struct Options {
     bool utc = false;                 // times of day instead of seconds since the first packet
     bool all = false;                 // summary, detail: nothing left out
     bool bits = false;                // detail: bit ranges
-    bool raw = false;                 // keys: addresses as the plug-in stores them
-    std::vector<std::string> columns; // keys: these key fields only
+    bool raw = false;                 // keys: addresses as octets
+    bool perChunk = false;            // keys: a row for each SCTP chunk instead of each IP layer
+    std::vector<std::string> columns; // keys: these fields in the place of the usual ones
     std::string field;                // fields: those of this name, or of this id; empty: all
     FieldsForm form = FieldsForm::text;
 };

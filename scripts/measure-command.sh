@@ -48,8 +48,8 @@ fi
 # The same fields; their values agree on packets with one IP header.
 peer_fields=(ip.version ip.len ip.id ip.flags.df ip.ttl ip.proto ip.src ip.dst
     tcp.srcport tcp.dstport tcp.flags.syn tcp.flags.fin udp.srcport udp.dstport)
-key_fields=(Version 'Total Length' Identification DF 'Time to Live' Protocol 'Source Address' 'Destination Address'
-    'TCP Source Port' 'TCP Destination Port' SYN FIN 'UDP Source Port' 'UDP Destination Port')
+key_fields=(ip.version ip.total_length ip.identification ip.dont_fragment ip.ttl ip.protocol ip.source ip.destination
+    tcp.source_port tcp.destination_port tcp.syn tcp.fin udp.source_port udp.destination_port)
 
 declare -A best # seconds, by the name of the program
 measure() {     # NAME COMMAND...

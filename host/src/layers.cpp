@@ -36,7 +36,7 @@ Place placeOf(std::span<const BitRange> ranges) {
 
 LayerView::LayerView(Host &host) : host_(host), map_(FieldTables(host.library()).fields()) {}
 
-void LayerView::read(std::span<const std::uint8_t> packet) {
+void LayerView::read(std::span<const std::uint8_t> packet, const RunOptions &options) {
     packet_ = packet;
     layers_.clear();
     values_.clear();
@@ -49,11 +49,16 @@ void LayerView::read(std::span<const std::uint8_t> packet) {
     InnerPackets at(packet);
     for (; !at.ended(); at.next()) {
         open_.fill(-1);
+        isLaterFragment_ = false;
         packets_.push_back(at.opened());
         packets_.back().firstOctet = at.firstOctet();
         packets_.back().octets = static_cast<std::uint32_t>(at.octets().size());
         offset_ = at.firstOctet();
-        host_.run(Pass::md, at.octets(), *this);
+        RunOptions inner = options;
+        // What is cut is the end of the outermost packet, and so of all that reach it.
+        const bool reachesEnd = offset_ + at.octets().size() == packet.size();
+        inner.wireOctets = reachesEnd && options.wireOctets > packet.size() ? options.wireOctets - offset_ : 0;
+        host_.run(Pass::md, at.octets(), *this, inner);
     }
     if (limit_.empty()) {
         limit_ = at.limit();
@@ -90,14 +95,14 @@ void LayerView::field(const FieldView &field) {
         return;
     }
     const LayerFieldMap::Entry &entry = map_.find(field.id);
-    if (!entry.isKnown) {
+    if (!entry.isKnown || (isLaterFragment_ && entry.field.kind != LayerKind::ip)) {
         return;
     }
     Place place = placeOf(field.ranges);
     place.first += offset_;
     place.end += offset_;
     std::int32_t &open = open_[static_cast<std::size_t>(entry.field.kind)];
-    if (entry.opensLayer && !openLayer(entry.field.kind, place.first)) {
+    if (entry.opensLayer && (isLaterFragment_ || !openLayer(entry.field.kind, place.first))) {
         return;
     }
     if (open < 0) {
@@ -111,6 +116,8 @@ void LayerView::field(const FieldView &field) {
     if (entry.value == LayerValue::packetNumber) {
         value.number = be32(packet_, place.first);
     }
+    // The plug-in reads what is in the middle of a segment as a header.
+    isLaterFragment_ |= entry.field == layerField("ip.fragment_offset") && field.value != 0;
     if (entry.opensLayer && entry.field.kind == LayerKind::ip) {
         keepVersion(layer, place.first, entry.field);
     }

@@ -84,6 +84,9 @@ TEST(Layers, openPacketsInsideAPacket) {
         {"IPv6 in IPv4", ipv4({.protocol = 41, .payload = inner6}), "5000>53", 2},
         {"IPv4 in IPv6", ipv6({.nextHeader = 4, .payload = inner}), "5000>53", 2},
         {"IP in IP", ipv4({.protocol = 4, .payload = inner}), "5000>53", 2},
+        {"a later fragment of IPv4 with DF", ipv4({.protocol = 17, .payload = udp(1, 2), .fragment = 0x4001}), "", 1},
+        {"a later fragment of IPv6", ipv6({.nextHeader = 44, .payload = hex("11 00 0008 00000001") + udp(1, 2)}), "",
+         1},
         {"a later fragment", ipv4({.protocol = 41, .payload = inner6, .fragment = 1}), "", 1},
     };
     for (const auto &[what, packet, ports, ipLayers] : cases) {

@@ -47,8 +47,9 @@ public:
 
     explicit LayerView(Host &host);
 
-    // Reads the packet and the packets inside it by the MD pass. Throws as Host::run does.
-    void read(std::span<const std::uint8_t> packet);
+    // Reads the packet and the packets inside it by the MD pass. Of a packet that was cut, RunOptions::wireOctets gives
+    // the length on the wire. Throws as Host::run does.
+    void read(std::span<const std::uint8_t> packet, const RunOptions &options = {});
 
     [[nodiscard]] std::span<const Layer> layers() const { return layers_; } // as they begin
     [[nodiscard]] std::span<const std::uint8_t> packet() const { return packet_; }
@@ -113,6 +114,7 @@ private:
     std::uint16_t ipLayers_ = 0;
     bool isCutOff_ = false;
     bool isFull_ = false;
+    bool isLaterFragment_ = false;
 };
 
 } // namespace netfloor

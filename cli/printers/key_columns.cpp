@@ -1,0 +1,160 @@
+// SPDX-License-Identifier: MIT
+#include "printers/key_columns.h"
+
+#include <algorithm>
+#include <array>
+
+#include "exit_code.h"
+#include "text.h"
+
+namespace netfloor::cli {
+
+namespace {
+
+constexpr std::string_view sourcePort = "source_port";
+constexpr std::string_view destinationPort = "destination_port";
+
+std::optional<KeyColumn> findColumn(std::string_view name) {
+    if (name == sourcePort || name == destinationPort) {
+        const bool isSource = name == sourcePort;
+        return KeyColumn{std::string(name),
+                         {isSource ? layerField("tcp.source_port") : layerField("tcp.destination_port"),
+                          isSource ? layerField("udp.source_port") : layerField("udp.destination_port"),
+                          isSource ? layerField("sctp.source_port") : layerField("sctp.destination_port")}};
+    }
+    const auto field = findLayerField(name);
+    return field ? std::optional(KeyColumn{std::string(name), {*field}}) : std::nullopt;
+}
+
+// Each name with the plug-in's own one.
+std::string allNames() {
+    std::string text = "'source_port', 'destination_port'";
+    std::string_view before;
+    for (const LayerFieldSource &row : layerFieldSources()) {
+        if (row.name != before) {
+            text.append(", '").append(row.name).append("' (").append(row.field.name).append(")");
+        }
+        before = row.name;
+    }
+    return text;
+}
+
+bool needsQuotes(std::string_view text) {
+    return text.find_first_of(",\"\r\n") != std::string_view::npos || text.starts_with(' ') || text.ends_with(' ');
+}
+
+} // namespace
+
+void writeCsv(Output &out, std::string_view text) {
+    if (!needsQuotes(text)) {
+        out << text;
+        return;
+    }
+    out << '"';
+    for (const char character : text) {
+        out << character;
+        if (character == '"') {
+            out << '"';
+        }
+    }
+    out << '"';
+}
+
+std::vector<KeyColumn> keyColumns(const std::vector<std::string> &names, bool perChunk) {
+    static const std::vector<std::string> ofLayer = {"ip.source", "source_port", "ip.destination", "destination_port",
+                                                     "ip.protocol"};
+    static const std::vector<std::string> ofChunk = {"ip.source",        "source_port",          "ip.destination",
+                                                     "destination_port", "sctp.chunk_type",      "sctp.tsn",
+                                                     "sctp.stream",      "sctp.payload_protocol"};
+    std::vector<KeyColumn> columns;
+    for (const std::string &name : names.empty() ? (perChunk ? ofChunk : ofLayer) : names) {
+        auto column = findColumn(name);
+        if (!column) {
+            throw UsageError("--column '" + name +
+                             "': there is no such column. There are (with the plug-in's name): " + allNames() + ".");
+        }
+        columns.push_back(std::move(*column));
+    }
+    return columns;
+}
+
+bool isPlainIpv4(std::span<const std::uint8_t> packet) {
+    constexpr std::size_t leastOctets = 40;
+    constexpr std::uint8_t tcp = 6;
+    constexpr std::uint8_t udp = 17;
+    if (packet.size() < leastOctets || packet[0] != 0x45 || (packet[9] != tcp && packet[9] != udp)) {
+        return false;
+    }
+    const bool isFirst = (packet[6] & 0x1fU) == 0 && packet[7] == 0;
+    return isFirst && (packet[9] == tcp || !findInnerPacket(packet));
+}
+
+std::vector<std::string_view> plainKeyFields(const KeyColumn &column) {
+    constexpr std::array names = {"ip.version",
+                                  "ip.total_length",
+                                  "ip.identification",
+                                  "ip.dont_fragment",
+                                  "ip.more_fragments",
+                                  "ip.fragment_offset",
+                                  "ip.ttl",
+                                  "ip.protocol",
+                                  "ip.source",
+                                  "ip.destination",
+                                  "tcp.source_port",
+                                  "tcp.destination_port",
+                                  "tcp.data_offset",
+                                  "tcp.acknowledgement_number",
+                                  "tcp.rst",
+                                  "tcp.syn",
+                                  "tcp.fin",
+                                  "udp.source_port",
+                                  "udp.destination_port"};
+    std::vector<std::string_view> keys;
+    for (const LayerFieldSource &row : layerFieldSources()) {
+        const bool isWanted =
+            std::ranges::find(column.fields, findLayerField(row.name).value()) != column.fields.end() &&
+            std::ranges::find(names, row.name) != names.end();
+        if (isWanted && std::ranges::find(keys, row.field.name) == keys.end()) {
+            keys.push_back(row.field.name);
+        }
+    }
+    return keys;
+}
+
+void KeyRows::write(const LayerView &view, std::uint16_t ipLayer, const Layer *chunk) const {
+    for (const KeyColumn &column : columns_) {
+        out_ << ',';
+        bool isFirst = true;
+        for (const Layer &layer : view.layers()) {
+            if (layer.ipLayer != ipLayer || (chunk != nullptr && layer.kind == LayerKind::chunk && &layer != chunk)) {
+                continue;
+            }
+            const auto field =
+                std::ranges::find_if(column.fields, [&](LayerField wanted) { return view.has(layer, wanted); });
+            if (field != column.fields.end()) {
+                out_ << (isFirst ? "" : ";");
+                isFirst = false;
+                writeValue(view, layer, *field);
+            }
+        }
+    }
+}
+
+void KeyRows::writeValue(const LayerView &view, const Layer &layer, LayerField field) const {
+    const LayerValue kind = view.valueKind(layer, field);
+    if (kind != LayerValue::ipv4Address && kind != LayerValue::ipv6Address) {
+        out_ << *view.number(layer, field);
+        return;
+    }
+    if (!raw_) {
+        TextRoom room;
+        out_ << view.address(layer, field, room);
+        return;
+    }
+    for (const std::uint8_t octet :
+         view.packet().subspan(view.octet(layer, field), kind == LayerValue::ipv4Address ? 4 : 16)) {
+        out_.octet(octet);
+    }
+}
+
+} // namespace netfloor::cli
