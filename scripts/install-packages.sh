@@ -4,15 +4,20 @@
 #
 #   scripts/install-packages.sh decode    what the build of the command needs
 #   scripts/install-packages.sh all       that, and what the tests, the checks and the benchmarks need
+#   scripts/install-packages.sh hosts     what ./check hosts needs: compilers for other machines, and what runs their programs
 set -eu
 
 decode="g++ cmake ninja-build pkg-config libpcap-dev libcli11-dev zlib1g-dev nlohmann-json3-dev"
 all="$decode libgtest-dev libbenchmark-dev libtins-dev clang clang-format clang-tidy tshark tcpdump"
+# The versioned multilib: the other one excludes all cross compilers.
+hosts="$decode libgtest-dev googletest g++-12-multilib g++-s390x-linux-gnu g++-mingw-w64-i686-posix
+    g++-mingw-w64-x86-64-posix wine64 qemu-user"
 
 case "${1:-all}" in
 decode) wanted=$decode ;;
 all) wanted=$all ;;
-*) echo "usage: $0 [decode|all]" >&2; exit 2 ;;
+hosts) wanted=$hosts ;;
+*) echo "usage: $0 [decode|all|hosts]" >&2; exit 2 ;;
 esac
 
 if ! command -v apt-get >/dev/null 2>&1; then

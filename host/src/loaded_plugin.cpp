@@ -3,9 +3,6 @@
 
 #include <algorithm>
 #include <array>
-#include <cerrno>
-#include <cstring>
-#include <elf.h>
 #include <fstream>
 #include <map>
 #include <memory>
@@ -15,19 +12,13 @@
 #include <system_error>
 #include <utility>
 
-#include <dlfcn.h>
-#include <sys/mman.h>
-#include <unistd.h>
-
 #include "key_types.h"
 
 namespace netfloor {
 namespace {
 
-constexpr std::string_view advice = " Give the path of a netfloor plug-in, such as build/plugin/libnetfloor.so.";
-
-[[noreturn]] void refuse(const std::filesystem::path &path, std::string_view reason, std::string_view whatToDo) {
-    throw PluginError("cannot use " + path.string() + " as a plug-in: " + std::string(reason) + std::string(whatToDo));
+std::string advice() {
+    return " Give the path of a netfloor plug-in, such as " + std::string(Module::usualPath) + '.';
 }
 
 // The loader's own messages for these cases are obscure, so they are checked first.
@@ -35,20 +26,21 @@ void checkFile(const std::filesystem::path &path) {
     std::error_code error;
     const std::filesystem::file_status status = std::filesystem::status(path, error);
     if (!std::filesystem::exists(status)) {
-        refuse(path, error && error != std::errc::no_such_file_or_directory ? error.message() + "." : "no such file.",
-               advice);
+        refusePlugin(path,
+                     error && error != std::errc::no_such_file_or_directory ? error.message() + "." : "no such file.",
+                     advice());
     }
     if (std::filesystem::is_directory(status)) {
-        refuse(path, "it is a directory.", advice);
+        refusePlugin(path, "it is a directory.", advice());
     }
     std::ifstream file(path, std::ios::binary);
     if (!file) {
-        refuse(path, "it cannot be read.", " Check the permissions of the file.");
+        refusePlugin(path, "it cannot be read.", " Check the permissions of the file.");
     }
-    std::array<char, SELFMAG> magic = {};
-    file.read(magic.data(), magic.size());
-    if (std::string_view(magic.data(), magic.size()) != std::string_view(ELFMAG, SELFMAG)) {
-        refuse(path, "it is not a shared library.", advice);
+    std::string magic(Module::magic.size(), '\0');
+    file.read(magic.data(), static_cast<std::streamsize>(magic.size()));
+    if (magic != Module::magic) {
+        refusePlugin(path, "it is not a shared library.", advice());
     }
 }
 
@@ -60,85 +52,32 @@ void checkFile(const std::filesystem::path &path) {
     reinterpret_cast<void (*)()>(&hx_InitialiseOptXTR),
 };
 
-void *load(const std::filesystem::path &path, const std::filesystem::path &loadPath) {
-    void *const handle = ::dlopen(loadPath.c_str(), RTLD_NOW | RTLD_LOCAL);
-    if (handle != nullptr) {
-        return handle;
-    }
-    const std::string message = ::dlerror();
-    const bool unresolved = message.find("undefined symbol") != std::string::npos ||
-                            message.find("cannot open shared object file") != std::string::npos;
-    if (unresolved) {
-        refuse(path, "it needs something that this process does not have (" + message + ").",
-               " A plug-in may import the operations of netfloor/host.h and the C library; build it again for this"
-               " host.");
-    }
-    refuse(path, "the loader refuses it (" + message + ").",
-           " Build the plug-in as a shared library for this machine.");
-}
-
 template <typename Entry>
-void resolve(void *handle, const char *name, Entry &entry, std::string &missing) {
-    entry = reinterpret_cast<Entry>(::dlsym(handle, name));
+void resolve(const Module &module, const char *name, Entry &entry, std::string &missing) {
+    entry = reinterpret_cast<Entry>(module.find(name));
     if (entry == nullptr) {
         missing += (missing.empty() ? "" : ", ") + std::string(name);
     }
 }
 
-// A file in memory with the same content. The loader identifies a library by its file, so that a copy loads as
-// another library.
-int copyToMemory(const std::filesystem::path &path) {
-    const auto fail = [&](int descriptor) {
-        const std::string reason = std::strerror(errno);
-        if (descriptor >= 0) {
-            ::close(descriptor);
-        }
-        refuse(path, "it cannot be copied (" + reason + ").", " Free some memory or file descriptors and try again.");
-    };
-    std::ifstream source(path, std::ios::binary);
-    const std::string content((std::istreambuf_iterator<char>(source)), std::istreambuf_iterator<char>());
-    const int copy = ::memfd_create(path.filename().c_str(), MFD_CLOEXEC);
-    if (copy < 0) {
-        fail(copy);
-    }
-    std::string_view rest = content;
-    while (!rest.empty()) {
-        const ssize_t written = ::write(copy, rest.data(), rest.size());
-        if (written < 0) {
-            fail(copy);
-        }
-        rest.remove_prefix(static_cast<std::size_t>(written));
-    }
-    return copy;
-}
-
 } // namespace
 
-LoadedPlugin::LoadedPlugin(std::filesystem::path path, const std::filesystem::path &loadPath, int descriptor)
-    : path_(std::move(path)), descriptor_(descriptor), handle_(load(path_, loadPath)) {
+void refusePlugin(const std::filesystem::path &path, std::string_view reason, std::string_view whatToDo) {
+    throw PluginError("cannot use " + path.string() + " as a plug-in: " + std::string(reason) + std::string(whatToDo));
+}
+
+LoadedPlugin::LoadedPlugin(std::filesystem::path path, bool isCopy) : path_(std::move(path)), module_(path_, isCopy) {
     std::string missing;
-    resolve(handle_, "vex_PreDecodeMD", preDecodeMD, missing);
-    resolve(handle_, "vex_PreDecodeTO", preDecodeTO, missing);
-    resolve(handle_, "vex_PreDecodeMV", preDecodeMV, missing);
-    resolve(handle_, "XTR_netfloor", extract, missing);
-    resolve(handle_, "date_conv", dateConv, missing);
-    resolve(handle_, "vx_DLLGetPtr", getPtr, missing);
-    resolve(handle_, "vx_DLLGetTable", getTable, missing);
+    resolve(module_, "vex_PreDecodeMD", preDecodeMD, missing);
+    resolve(module_, "vex_PreDecodeTO", preDecodeTO, missing);
+    resolve(module_, "vex_PreDecodeMV", preDecodeMV, missing);
+    resolve(module_, "XTR_netfloor", extract, missing);
+    resolve(module_, "date_conv", dateConv, missing);
+    resolve(module_, "vx_DLLGetPtr", getPtr, missing);
+    resolve(module_, "vx_DLLGetTable", getTable, missing);
     if (!missing.empty()) {
-        ::dlclose(handle_);
-        refuse(path_, "it is a shared library, but does not export " + missing + ".", advice);
+        refusePlugin(path_, "it is a shared library, but does not export " + missing + ".", advice());
     }
-}
-
-LoadedPlugin::~LoadedPlugin() {
-    ::dlclose(handle_);
-    if (descriptor_ >= 0) {
-        ::close(descriptor_);
-    }
-}
-
-void *LoadedPlugin::find(const char *exportName) const {
-    return ::dlsym(handle_, exportName);
 }
 
 std::int32_t LoadedPlugin::initialise(KeyFieldRow *table, std::uint32_t rowCount, std::uint16_t *presenceRow) noexcept {
@@ -205,21 +144,14 @@ PluginLibrary PluginLibrary::open(const std::filesystem::path &path) {
     static std::map<void *, std::shared_ptr<LoadedPlugin>> loads;
 
     checkFile(path);
-    // An absolute path, since the loader searches its own directories for a bare name.
-    auto loaded = std::make_shared<LoadedPlugin>(path, std::filesystem::absolute(path), -1);
+    auto loaded = std::make_shared<LoadedPlugin>(path, false);
     const std::scoped_lock lock(mutex);
     return PluginLibrary(loads.try_emplace(loaded->handle(), loaded).first->second);
 }
 
 PluginLibrary PluginLibrary::openCopy(const std::filesystem::path &path) {
     checkFile(path);
-    const int copy = copyToMemory(path);
-    try {
-        return PluginLibrary(std::make_shared<LoadedPlugin>(path, "/proc/self/fd/" + std::to_string(copy), copy));
-    } catch (...) {
-        ::close(copy);
-        throw;
-    }
+    return PluginLibrary(std::make_shared<LoadedPlugin>(path, true));
 }
 
 const std::filesystem::path &PluginLibrary::path() const {

@@ -9,16 +9,15 @@
 
 #include "key_record.h"
 #include "links.h"
+#include "module.h"
 #include "netfloor-host/plugin_library.h"
 
 namespace netfloor {
 
 class LoadedPlugin final : public standin::KeyOptions {
 public:
-    // The loader gets `loadPath`, which may differ from `path`. `descriptor` is a file descriptor to be closed after
-    // the unloading, or -1.
-    LoadedPlugin(std::filesystem::path path, const std::filesystem::path &loadPath, int descriptor);
-    ~LoadedPlugin();
+    // With `isCopy` the plug-in is loaded once more, with statics of its own.
+    LoadedPlugin(std::filesystem::path path, bool isCopy);
     LoadedPlugin(const LoadedPlugin &) = delete;
     LoadedPlugin &operator=(const LoadedPlugin &) = delete;
 
@@ -27,9 +26,9 @@ public:
     // The XTR entry, with this plug-in named to libhx_KeyOptions as long as it may ask for its set-up.
     [[nodiscard]] std::int32_t enterExtract(XtrContext *context);
 
-    [[nodiscard]] void *handle() const { return handle_; }
+    [[nodiscard]] void *handle() const { return module_.handle(); }
     [[nodiscard]] const std::filesystem::path &path() const { return path_; }
-    [[nodiscard]] void *find(const char *exportName) const;
+    [[nodiscard]] void *find(const char *exportName) const { return module_.find(exportName); }
     [[nodiscard]] std::span<const KeyFieldRow> keyTable() const { return keyTable_; }
     [[nodiscard]] std::span<const KeyColumn> keyColumns() const { return keyColumns_; } // of its rows
 
@@ -46,8 +45,7 @@ public:
 
 private:
     std::filesystem::path path_;
-    int descriptor_;
-    void *handle_;
+    Module module_;
     std::span<const KeyFieldRow> keyTable_;
     std::vector<KeyColumn> keyColumns_;
     bool keySetUpIsFinal_ = false; // the plug-in does not ask again

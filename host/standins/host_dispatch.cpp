@@ -2,6 +2,6 @@
 // libhd_HostDispatch: gives the next layer to its owner.
 #include "links.h"
 
-[[gnu::visibility("default")]] std::int32_t hd_PreDecode(PreDecodeContext *context, std::uint32_t mode) {
+NETFLOOR_STANDIN std::int32_t hd_PreDecode(PreDecodeContext *context, std::uint32_t mode) {
     return netfloor::standin::operationsOf(context).preDecode(mode);
 }

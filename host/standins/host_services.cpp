@@ -7,11 +7,11 @@ using netfloor::standin::BlockHead;
 using netfloor::standin::headOf;
 using netfloor::standin::operationsOf;
 
-[[gnu::visibility("default")]] void *hs_Malloc(std::size_t size) {
+NETFLOOR_STANDIN void *hs_Malloc(std::size_t size) {
     return allocateBlock(nullptr, size);
 }
 
-[[gnu::visibility("default")]] void *hs_Realloc(void *old, std::size_t size) {
+NETFLOOR_STANDIN void *hs_Realloc(void *old, std::size_t size) {
     if (old == nullptr) {
         return allocateBlock(nullptr, size);
     }
@@ -24,21 +24,22 @@ using netfloor::standin::operationsOf;
     return moved == nullptr ? nullptr : moved + 1;
 }
 
-[[gnu::visibility("default")]] std::int32_t hs_CreateNewLayerInfo(PreDecodeContext *context) {
+NETFLOOR_STANDIN std::int32_t hs_CreateNewLayerInfo(PreDecodeContext *context) {
     operationsOf(context).growLayerInfo();
     return 0;
 }
 
-[[gnu::visibility("default")]] std::int32_t
-hs_AddDecodedFieldsData(PreDecodeContext *context, std::uint32_t outputRangeCount, const BitRange *ranges,
-                        const char *display, std::uint32_t /*zero*/, const char *fieldName, std::uint32_t fieldId,
-                        std::uint32_t /*zero*/, std::uint32_t bitOrder) {
+NETFLOOR_STANDIN std::int32_t hs_AddDecodedFieldsData(PreDecodeContext *context, std::uint32_t outputRangeCount,
+                                                      const BitRange *ranges, const char *display,
+                                                      std::uint32_t /*zero*/, const char *fieldName,
+                                                      std::uint32_t fieldId, std::uint32_t /*zero*/,
+                                                      std::uint32_t bitOrder) {
     operationsOf(context).addField(outputRangeCount, ranges, display, fieldName, fieldId, bitOrder);
     return 0;
 }
 
-[[gnu::visibility("default")]] std::int32_t hs_AddFieldsToDisplayData(PreDecodeContext *context, const char *display,
-                                                                      std::uint32_t displayId) {
+NETFLOOR_STANDIN std::int32_t hs_AddFieldsToDisplayData(PreDecodeContext *context, const char *display,
+                                                        std::uint32_t displayId) {
     operationsOf(context).addDisplay(display, displayId);
     return 0;
 }

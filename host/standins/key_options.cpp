@@ -11,11 +11,11 @@ thread_local netfloor::standin::KeyOptions *optionsOfThread = nullptr;
 
 } // namespace
 
-[[gnu::visibility("default")]] void netfloor_setKeyOptions(netfloor::standin::KeyOptions *options) {
+NETFLOOR_STANDIN void netfloor_setKeyOptions(netfloor::standin::KeyOptions *options) {
     optionsOfThread = options;
 }
 
-[[gnu::visibility("default")]] std::int32_t hx_InitialiseOptXTR(KeyFieldRow *table, std::uint32_t rowCount,
-                                                                std::uint16_t *presenceRow) {
+NETFLOOR_STANDIN std::int32_t hx_InitialiseOptXTR(KeyFieldRow *table, std::uint32_t rowCount,
+                                                  std::uint16_t *presenceRow) {
     return optionsOfThread == nullptr ? keysRefused : optionsOfThread->initialise(table, rowCount, presenceRow);
 }

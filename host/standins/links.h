@@ -12,6 +12,13 @@
 
 #include <netfloor/host.h>
 
+// Marks what a stand-in exports; all else is hidden.
+#ifdef _WIN32
+#define NETFLOOR_STANDIN __declspec(dllexport)
+#else
+#define NETFLOOR_STANDIN [[gnu::visibility("default")]]
+#endif
+
 namespace netfloor::standin {
 
 // Decides whether the arrays of one DecodeState may grow.

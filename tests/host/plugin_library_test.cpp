@@ -1,6 +1,5 @@
 // SPDX-License-Identifier: MIT
 // Loading a plug-in: what is refused, and with which message.
-#include <cstdlib>
 #include <filesystem>
 #include <fstream>
 #include <functional>
@@ -11,6 +10,7 @@
 #include <gtest/gtest.h>
 
 #include "netfloor-host/plugin_host.h"
+#include "support/temporary_folder.h"
 
 namespace netfloor::test {
 namespace {
@@ -35,20 +35,14 @@ std::string pluginWith(const std::string &name, const std::string &changed) {
 
 class Refusal : public testing::Test {
 protected:
-    Refusal() : directory_(std::filesystem::temp_directory_path() / "netfloor-refusal-XXXXXX") {
-        std::string pattern = directory_.string();
-        EXPECT_NE(::mkdtemp(pattern.data()), nullptr);
-        directory_ = pattern;
-    }
-    ~Refusal() override { std::filesystem::remove_all(directory_); }
-
     std::filesystem::path file(const std::string &content) {
         const std::filesystem::path path = directory_ / ("plugin" + std::to_string(++files_) + ".so");
         std::ofstream(path, std::ios::binary) << content;
         return path;
     }
 
-    std::filesystem::path directory_;
+    TemporaryFolder folder_;
+    const std::filesystem::path &directory_ = folder_.path();
     int files_ = 0;
 };
 
@@ -92,8 +86,7 @@ TEST_F(Refusal, saysWhatIsWrongWhereAndWhatToDo) {
 
 TEST_F(Refusal, namesEachExportThatIsMissing) {
     // A library that every process loads, and that is no plug-in.
-    const std::filesystem::path stranger =
-        std::filesystem::path(NETFLOOR_PLUGIN).parent_path().parent_path() / "host" / "libhd_HostDispatch.so";
+    const std::filesystem::path stranger = NETFLOOR_STRANGER;
     try {
         static_cast<void>(PluginLibrary::open(stranger));
         ADD_FAILURE() << stranger << " was taken";

@@ -1,24 +1,13 @@
 // SPDX-License-Identifier: MIT
 #include "support/captures.h"
 
-#include <cstdlib>
-#include <filesystem>
 #include <fstream>
+
+#include "support/temporary_folder.h"
 
 namespace netfloor::test {
 
 namespace {
-
-struct Folder {
-    Folder() {
-        std::string name = (std::filesystem::temp_directory_path() / "netfloor-test-XXXXXX").string();
-        path = mkdtemp(name.data());
-    }
-    ~Folder() { std::filesystem::remove_all(path); }
-    Folder(const Folder &) = delete;
-    Folder &operator=(const Folder &) = delete;
-    std::string path;
-};
 
 Octets le32(std::uint32_t number) {
     Octets octets = be32(number);
@@ -28,8 +17,9 @@ Octets le32(std::uint32_t number) {
 } // namespace
 
 const std::string &folder() {
-    static const Folder own;
-    return own.path;
+    static const TemporaryFolder own;
+    static const std::string path = own.path().string();
+    return path;
 }
 
 std::string writeFile(const std::string &name, const Octets &octets) {

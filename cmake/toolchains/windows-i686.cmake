@@ -1,0 +1,3 @@
+# SPDX-License-Identifier: MIT
+set(CMAKE_SYSTEM_PROCESSOR i686)
+include(${CMAKE_CURRENT_LIST_DIR}/windows.cmake)

@@ -1,0 +1,3 @@
+# SPDX-License-Identifier: MIT
+set(CMAKE_SYSTEM_PROCESSOR x86_64)
+include(${CMAKE_CURRENT_LIST_DIR}/windows.cmake)
