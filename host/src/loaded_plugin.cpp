@@ -5,7 +5,6 @@
 #include <array>
 #include <cerrno>
 #include <cstring>
-#include <elf.h>
 #include <fstream>
 #include <map>
 #include <memory>
@@ -20,37 +19,10 @@
 #include <unistd.h>
 
 #include "key_types.h"
+#include "plugin_file.h"
 
 namespace netfloor {
 namespace {
-
-constexpr std::string_view advice = " Give the path of a netfloor plug-in, such as build/plugin/libnetfloor.so.";
-
-[[noreturn]] void refuse(const std::filesystem::path &path, std::string_view reason, std::string_view whatToDo) {
-    throw PluginError("cannot use " + path.string() + " as a plug-in: " + std::string(reason) + std::string(whatToDo));
-}
-
-// The loader's own messages for these cases are obscure, so they are checked first.
-void checkFile(const std::filesystem::path &path) {
-    std::error_code error;
-    const std::filesystem::file_status status = std::filesystem::status(path, error);
-    if (!std::filesystem::exists(status)) {
-        refuse(path, error && error != std::errc::no_such_file_or_directory ? error.message() + "." : "no such file.",
-               advice);
-    }
-    if (std::filesystem::is_directory(status)) {
-        refuse(path, "it is a directory.", advice);
-    }
-    std::ifstream file(path, std::ios::binary);
-    if (!file) {
-        refuse(path, "it cannot be read.", " Check the permissions of the file.");
-    }
-    std::array<char, SELFMAG> magic = {};
-    file.read(magic.data(), magic.size());
-    if (std::string_view(magic.data(), magic.size()) != std::string_view(ELFMAG, SELFMAG)) {
-        refuse(path, "it is not a shared library.", advice);
-    }
-}
 
 // The plug-in finds the three libraries by their names among those that the process has loaded. Using their
 // operations here keeps them linked into every program that uses this library.
@@ -69,12 +41,13 @@ void *load(const std::filesystem::path &path, const std::filesystem::path &loadP
     const bool unresolved = message.find("undefined symbol") != std::string::npos ||
                             message.find("cannot open shared object file") != std::string::npos;
     if (unresolved) {
-        refuse(path, "it needs something that this process does not have (" + message + ").",
-               " A plug-in may import the operations of netfloor/host.h and the C library; build it again for this"
-               " host.");
+        refusePlugin(
+            path, "it needs something that this process does not have (" + message + ").",
+            " A plug-in may import the operations of netfloor/host.h and the C library; build it again for this"
+            " host.");
     }
-    refuse(path, "the loader refuses it (" + message + ").",
-           " Build the plug-in as a shared library for this machine.");
+    refusePlugin(path, "the loader refuses it (" + message + ").",
+                 " Build the plug-in as a shared library for this machine.");
 }
 
 template <typename Entry>
@@ -93,7 +66,8 @@ int copyToMemory(const std::filesystem::path &path) {
         if (descriptor >= 0) {
             ::close(descriptor);
         }
-        refuse(path, "it cannot be copied (" + reason + ").", " Free some memory or file descriptors and try again.");
+        refusePlugin(path, "it cannot be copied (" + reason + ").",
+                     " Free some memory or file descriptors and try again.");
     };
     std::ifstream source(path, std::ios::binary);
     const std::string content((std::istreambuf_iterator<char>(source)), std::istreambuf_iterator<char>());
@@ -126,7 +100,7 @@ LoadedPlugin::LoadedPlugin(std::filesystem::path path, const std::filesystem::pa
     resolve(handle_, "vx_DLLGetTable", getTable, missing);
     if (!missing.empty()) {
         ::dlclose(handle_);
-        refuse(path_, "it is a shared library, but does not export " + missing + ".", advice);
+        refusePlugin(path_, "it is a shared library, but does not export " + missing + ".", pluginAdvice);
     }
 }
 
@@ -204,7 +178,7 @@ PluginLibrary PluginLibrary::open(const std::filesystem::path &path) {
     static std::mutex mutex;
     static std::map<void *, std::shared_ptr<LoadedPlugin>> loads;
 
-    checkFile(path);
+    checkPluginFile(path);
     // An absolute path, since the loader searches its own directories for a bare name.
     auto loaded = std::make_shared<LoadedPlugin>(path, std::filesystem::absolute(path), -1);
     const std::scoped_lock lock(mutex);
@@ -212,7 +186,7 @@ PluginLibrary PluginLibrary::open(const std::filesystem::path &path) {
 }
 
 PluginLibrary PluginLibrary::openCopy(const std::filesystem::path &path) {
-    checkFile(path);
+    checkPluginFile(path);
     const int copy = copyToMemory(path);
     try {
         return PluginLibrary(std::make_shared<LoadedPlugin>(path, "/proc/self/fd/" + std::to_string(copy), copy));
