@@ -10,6 +10,7 @@
 
 #include <unistd.h>
 
+#include "interrupt.h"
 #include "netfloor-capture/capture_file.h"
 #include "netfloor-capture/filter.h"
 #include "netfloor-capture/link_layer.h"
@@ -69,8 +70,10 @@ public:
         try {
             readPackets();
         } catch (const CaptureDamage &found) {
-            damage = found.what();
-            code = ExitCode::cutCapture;
+            if (!isInterrupted()) { // which cuts the input anywhere
+                damage = found.what();
+                code = ExitCode::cutCapture;
+            }
         }
         progress_.reset(); // what follows stands on a clean line
         if (filter_ && filter_->refusedAll()) {
@@ -84,6 +87,10 @@ public:
         if (!damage.empty()) {
             std::cerr << "netfloor: " << damage << '\n';
             return code;
+        }
+        if (isInterrupted()) {
+            std::cerr << "netfloor: interrupted after " << countText(read_, "packet") << ".\n";
+            return printer_->exitCode();
         }
         if (options_.packet && tally_.packets == 0) {
             throw UsageError(read_ < *options_.packet
@@ -100,7 +107,7 @@ public:
 private:
     void readPackets() {
         CapturedPacket packet;
-        while ((!options_.count || tally_.packets < *options_.count) && capture_.next(packet)) {
+        while (!isInterrupted() && (!options_.count || tally_.packets < *options_.count) && capture_.next(packet)) {
             read_ = packet.number;
             times_.see(packet);
             if (options_.packet && packet.number < *options_.packet) {

@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: MIT
 // netfloor: decodes the packets of a capture file, and lists what it can tell of them.
+#include <cerrno>
 #include <csignal>
+#include <cstring>
 #include <exception>
 #include <iostream>
 #include <new>
@@ -8,9 +10,14 @@
 #include <string_view>
 #include <variant>
 
+#include <fcntl.h>
+#include <unistd.h>
+
 #include "decode.h"
 #include "exit_code.h"
 #include "fields/fields.h"
+#include "interrupt.h"
+#include "messages.h"
 #include "netfloor-capture/errors.h"
 #include "netfloor-host/plugin_host.h"
 #include "options.h"
@@ -29,12 +36,34 @@ int fail(ExitCode code, std::string_view sentence) {
     return number(code);
 }
 
+// The next file that is opened would become the standard output.
+void refuseClosedOutput() {
+    if (::fcntl(STDOUT_FILENO, F_GETFD) < 0) {
+        throw OutputError("standard output is closed.");
+    }
+}
+
+// Help and version are written by the parser of options.
+void endAnswer() {
+    errno = 0;
+    if (std::cout.flush()) {
+        return;
+    }
+    if (errno == EPIPE) {
+        throw OutputClosed();
+    }
+    throw OutputError(std::string("the output cannot be written: ") + std::strerror(errno) + ".");
+}
+
 int runCommand(int argumentCount, char **arguments) {
     // A closed pipe is told by write(), not by a signal.
     (void)std::signal(SIGPIPE, SIG_IGN);
+    const PrintableErrors printable;
     try {
+        refuseClosedOutput();
         const auto parsed = parseOptions(argumentCount, arguments);
         if (const auto *const answered = std::get_if<ExitCode>(&parsed)) {
+            endAnswer();
             return number(*answered);
         }
         const auto &options = std::get<Options>(parsed);
@@ -42,7 +71,10 @@ int runCommand(int argumentCount, char **arguments) {
             showFields(options);
             return number(ExitCode::good);
         }
-        return number(decodeCapture(options));
+        watchForInterrupt();
+        const ExitCode code = decodeCapture(options);
+        endIfInterrupted();
+        return number(code);
     } catch (const OutputClosed &) {
         return number(ExitCode::good);
     } catch (const UsageError &error) {

@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: MIT
 #include "plugin_path.h"
 
-#include <array>
 #include <system_error>
 
 #include "netfloor-host/plugin_library.h"
@@ -14,15 +13,12 @@ std::filesystem::path findPlugin(const std::filesystem::path &asked) {
     }
     std::error_code ignored;
     const auto folder = std::filesystem::read_symlink("/proc/self/exe", ignored).parent_path();
-    const std::array<std::filesystem::path, 2> places = {folder / NETFLOOR_BUILT_PLUGIN,
-                                                         folder / NETFLOOR_INSTALLED_PLUGIN};
-    for (const auto &place : places) {
-        if (std::filesystem::exists(place, ignored)) {
-            return place.lexically_normal();
-        }
+    const auto place = (folder / NETFLOOR_OWN_PLUGIN).lexically_normal();
+    if (!std::filesystem::exists(place, ignored)) {
+        throw PluginError("the plug-in was not found at " + place.string() +
+                          ". Build it, or name it with --plugin PATH.");
     }
-    throw PluginError("the plug-in was found neither at " + places[0].lexically_normal().string() + " nor at " +
-                      places[1].lexically_normal().string() + ". Build it, or name it with --plugin PATH.");
+    return place;
 }
 
 } // namespace netfloor::cli

@@ -6,8 +6,7 @@
 
 namespace netfloor::cli {
 
-// The plug-in that was asked for, or else the one that belongs to this command: in the build tree beside it, or where
-// it is installed. Throws PluginError.
+// The plug-in that was asked for, or else the one that belongs to this command. Throws PluginError.
 [[nodiscard]] std::filesystem::path findPlugin(const std::filesystem::path &asked);
 
 } // namespace netfloor::cli

@@ -28,6 +28,21 @@ set(CMAKE_POSITION_INDEPENDENT_CODE ON)
 add_library(netfloor_warnings INTERFACE)
 target_compile_options(netfloor_warnings INTERFACE -Wall -Wextra -Wpedantic -Wshadow -Wconversion)
 
+# Against faults that are not known yet: what is written past an array ends the process, imports and return addresses
+# cannot be changed. Sanitizers have checks of their own.
+if(CMAKE_SYSTEM_NAME STREQUAL "Linux" AND NOT NETFLOOR_SANITIZE AND NOT NETFLOOR_COVERAGE)
+    include(CheckCXXCompilerFlag)
+    check_cxx_compiler_flag(-fcf-protection=full NETFLOOR_HAS_CF_PROTECTION)
+    target_compile_options(netfloor_warnings INTERFACE -fstack-protector-strong
+        # The plug-in has only the marks that cost no instructions.
+        $<$<BOOL:${NETFLOOR_HAS_CF_PROTECTION}>:-fcf-protection=$<IF:$<STREQUAL:$<TARGET_PROPERTY:NAME>,netfloor>,return,full>>
+        $<$<CONFIG:Release,RelWithDebInfo,MinSizeRel>:-U_FORTIFY_SOURCE$<SEMICOLON>-D_FORTIFY_SOURCE=2>)
+    # The start files of some systems lack the mark for a shadow stack, though they keep to it.
+    target_link_options(netfloor_warnings INTERFACE -Wl,-z,relro -Wl,-z,now
+        $<$<BOOL:${NETFLOOR_HAS_CF_PROTECTION}>:-Wl,-z,shstk>
+        $<$<STREQUAL:$<TARGET_PROPERTY:TYPE>,EXECUTABLE>:-pie>)
+endif()
+
 if(NETFLOOR_SANITIZE)
     add_compile_options(-fsanitize=address,undefined -fno-sanitize-recover=all -fno-omit-frame-pointer)
     add_link_options(-fsanitize=address,undefined)

@@ -13,36 +13,10 @@
 #include <utility>
 
 #include "key_types.h"
+#include "plugin_file.h"
 
 namespace netfloor {
 namespace {
-
-std::string advice() {
-    return " Give the path of a netfloor plug-in, such as " + std::string(Module::usualPath) + '.';
-}
-
-// The loader's own messages for these cases are obscure, so they are checked first.
-void checkFile(const std::filesystem::path &path) {
-    std::error_code error;
-    const std::filesystem::file_status status = std::filesystem::status(path, error);
-    if (!std::filesystem::exists(status)) {
-        refusePlugin(path,
-                     error && error != std::errc::no_such_file_or_directory ? error.message() + "." : "no such file.",
-                     advice());
-    }
-    if (std::filesystem::is_directory(status)) {
-        refusePlugin(path, "it is a directory.", advice());
-    }
-    std::ifstream file(path, std::ios::binary);
-    if (!file) {
-        refusePlugin(path, "it cannot be read.", " Check the permissions of the file.");
-    }
-    std::string magic(Module::magic.size(), '\0');
-    file.read(magic.data(), static_cast<std::streamsize>(magic.size()));
-    if (magic != Module::magic) {
-        refusePlugin(path, "it is not a shared library.", advice());
-    }
-}
 
 // The plug-in finds the three libraries by their names among those that the process has loaded. Using their
 // operations here keeps them linked into every program that uses this library.
@@ -62,10 +36,6 @@ void resolve(const Module &module, const char *name, Entry &entry, std::string &
 
 } // namespace
 
-void refusePlugin(const std::filesystem::path &path, std::string_view reason, std::string_view whatToDo) {
-    throw PluginError("cannot use " + path.string() + " as a plug-in: " + std::string(reason) + std::string(whatToDo));
-}
-
 LoadedPlugin::LoadedPlugin(std::filesystem::path path, bool isCopy) : path_(std::move(path)), module_(path_, isCopy) {
     std::string missing;
     resolve(module_, "vex_PreDecodeMD", preDecodeMD, missing);
@@ -76,7 +46,7 @@ LoadedPlugin::LoadedPlugin(std::filesystem::path path, bool isCopy) : path_(std:
     resolve(module_, "vx_DLLGetPtr", getPtr, missing);
     resolve(module_, "vx_DLLGetTable", getTable, missing);
     if (!missing.empty()) {
-        refusePlugin(path_, "it is a shared library, but does not export " + missing + ".", advice());
+        refusePlugin(path_, "it is a shared library, but does not export " + missing + ".", pluginAdvice());
     }
 }
 
@@ -143,14 +113,14 @@ PluginLibrary PluginLibrary::open(const std::filesystem::path &path) {
     static std::mutex mutex;
     static std::map<void *, std::shared_ptr<LoadedPlugin>> loads;
 
-    checkFile(path);
+    checkPluginFile(path);
     auto loaded = std::make_shared<LoadedPlugin>(path, false);
     const std::scoped_lock lock(mutex);
     return PluginLibrary(loads.try_emplace(loaded->handle(), loaded).first->second);
 }
 
 PluginLibrary PluginLibrary::openCopy(const std::filesystem::path &path) {
-    checkFile(path);
+    checkPluginFile(path);
     return PluginLibrary(std::make_shared<LoadedPlugin>(path, true));
 }
 

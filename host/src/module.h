@@ -2,18 +2,20 @@
 // A shared library that the system's loader has loaded: what differs from system to system.
 #pragma once
 
+#include <cstdint>
 #include <filesystem>
+#include <istream>
 #include <string_view>
 
 namespace netfloor {
-
-// Throws PluginError: what is wrong with a file, and what to do.
-[[noreturn]] void refusePlugin(const std::filesystem::path &path, std::string_view reason, std::string_view whatToDo);
 
 class Module {
 public:
     // The octets at the start of a shared library, and where a build leaves the plug-in.
     static const std::string_view magic, usualPath;
+
+    // Whether the file has all octets that the loader maps, where the loader itself does not ask.
+    [[nodiscard]] static bool isWhole(std::istream &file, std::uint64_t fileOctets);
 
     // Loads the file, or with `isCopy` a copy of it that shares nothing with other loads. Throws PluginError.
     Module(const std::filesystem::path &path, bool isCopy);

@@ -2,15 +2,18 @@
 #include "module.h"
 
 #include <cerrno>
+#include <cstdint>
 #include <cstring>
-#include <elf.h>
 #include <fstream>
 #include <iterator>
 #include <string>
 
 #include <dlfcn.h>
+#include <link.h>
 #include <sys/mman.h>
 #include <unistd.h>
+
+#include "plugin_file.h"
 
 namespace netfloor {
 namespace {
@@ -60,10 +63,40 @@ int copyToMemory(const std::filesystem::path &path) {
     return copy;
 }
 
+template <typename Record>
+bool readAt(std::istream &file, std::uint64_t position, Record &record) {
+    file.seekg(static_cast<std::streamoff>(position));
+    file.read(reinterpret_cast<char *>(&record), sizeof record);
+    return static_cast<bool>(file);
+}
+
 } // namespace
 
 const std::string_view Module::magic(ELFMAG, SELFMAG);
 const std::string_view Module::usualPath = "build/plugin/libnetfloor.so";
+
+// The loader accesses pages past the end of a file that is cut short, and the process ends with a signal. A library for
+// another machine is left to the loader.
+bool Module::isWhole(std::istream &file, std::uint64_t fileOctets) {
+    ElfW(Ehdr) header = {};
+    if (!readAt(file, 0, header)) {
+        return false;
+    }
+    constexpr unsigned char ownClass = sizeof(void *) == 8 ? ELFCLASS64 : ELFCLASS32;
+    if (header.e_ident[EI_CLASS] != ownClass || header.e_phentsize != sizeof(ElfW(Phdr))) {
+        return true;
+    }
+    for (std::uint64_t i = 0; i < header.e_phnum; ++i) {
+        ElfW(Phdr) part = {};
+        if (!readAt(file, header.e_phoff + i * sizeof part, part)) {
+            return false;
+        }
+        if (part.p_offset > fileOctets || part.p_filesz > fileOctets - part.p_offset) {
+            return false;
+        }
+    }
+    return true;
+}
 
 // An absolute path, since the loader searches its own directories for a bare name.
 Module::Module(const std::filesystem::path &path, bool isCopy) : copy_(isCopy ? copyToMemory(path) : -1) {

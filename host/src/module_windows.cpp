@@ -8,6 +8,8 @@
 #define WIN32_LEAN_AND_MEAN
 #include <windows.h>
 
+#include "plugin_file.h"
+
 namespace netfloor {
 namespace {
 
@@ -48,6 +50,11 @@ std::filesystem::path copyToFile(const std::filesystem::path &path) {
 
 const std::string_view Module::magic = "MZ";
 const std::string_view Module::usualPath = "build/plugin/netfloor.dll";
+
+// The loader asks by itself.
+bool Module::isWhole(std::istream & /*file*/, std::uint64_t /*fileOctets*/) {
+    return true;
+}
 
 Module::Module(const std::filesystem::path &path, bool isCopy)
     : copy_(isCopy ? copyToFile(path) : std::filesystem::path()) {

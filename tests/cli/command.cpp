@@ -22,7 +22,7 @@ std::string contents(const std::string &path) {
 Outcome shell(const std::string &line) {
     const std::string script = folder() + "/script";
     std::ofstream(script) << "C='" NETFLOOR_CAPTURES "'\nP='" NETFLOOR_PLUGIN "'\nT='" << folder()
-                          << "'\nnetfloor() { '" NETFLOOR_COMMAND "' \"$@\"; }\n"
+                          << "'\nN='" NETFLOOR_COMMAND "'\nnetfloor() { \"$N\" \"$@\"; }\n"
                           << line << '\n';
     const int status = std::system(("bash " + script + " >" + script + ".out 2>" + script + ".err").c_str());
     return {WEXITSTATUS(status), contents(script + ".out"), contents(script + ".err")};

@@ -14,8 +14,8 @@ struct Outcome {
     std::string err;
 };
 
-// A shell line in which `netfloor` is the command, $C the folder of the test captures, $P the plug-in and
-// $T folder().
+// A shell line in which `netfloor` is the command, $C the folder of the test captures, $P the plug-in,
+// $T folder() and $N the command's file.
 [[nodiscard]] Outcome shell(const std::string &line);
 
 } // namespace netfloor::test

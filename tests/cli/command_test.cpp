@@ -219,6 +219,34 @@ TEST_F(Command, tellsWhenMemoryRunsOut) {
 }
 #endif
 
+// What is found out only when the output is written; and what must not reach a terminal.
+TEST_F(Command, tellsWhatBecameOfItsAnswer) {
+    check({
+        {"netfloor --help > /dev/full", 6, {}, {"No space left"}, {}},
+        {"netfloor --version >&-", 6, {}, {"standard output is closed"}, {}},
+        {"netfloor $T/five.pcap >&-", 6, {}, {"standard output is closed"}, {}},
+        {"netfloor --help | true; exit ${PIPESTATUS[0]}", 0, {}, {}, {}},
+        {"netfloor $'bad\\e]0;name\\x9b\\xc2\\x9b'", 3, {}, {"bad\\x1b]0;name\\x9b\\xc2\\x9b:"}, {"\x1b"}},
+        {"netfloor --plugin $'\\e.so' $T/five.pcap", 5, {}, {"\\x1b.so"}, {"\x1b"}},
+        {"netfloor --count $'\\e' $T/five.pcap", 2, {}, {"'\\x1b'"}, {"\x1b"}},
+        {"netfloor 'caf\xc3\xa9'", 3, {}, {"caf\xc3\xa9:"}, {}},
+    });
+}
+
+// Ctrl-C: the totals of what was read, and then the end that the shell expects.
+TEST_F(Command, endsWithTotalsWhenInterrupted) {
+    const std::string start = "mkfifo $T/live; $N verify - < $T/live > $T/out & pid=$!; exec 3> $T/live; "
+                              "cat $T/five.pcap ";
+    const std::string end = " >&3; for i in {1..100}; do [ \"$(wc -l < $T/out)\" = 5 ] && break; sleep 0.05; done; "
+                            "kill -TERM $pid; wait $pid; code=$?; cat $T/out; rm $T/live; exit $code";
+    const std::string whole = start + end;
+    const std::string inPacket = start + "<(head -c 7 $T/five.pcap)" + end;
+    check({
+        {whole.c_str(), 143, {"5 packets: 2 with IP", "verdicts: 2 good"}, {"interrupted after 5 packets"}, {"cut"}},
+        {inPacket.c_str(), 143, {"5 packets: 2 with IP"}, {"interrupted after 5 packets"}, {"cut"}},
+    });
+}
+
 // What every packet of a kind leaves by design is told apart from damage, and only damage makes the exit code.
 TEST_F(Command, tellsFlagsByDesignFromDamage) {
     const Octets tcpHead = hex("0050 9c40 00000001 00000000");

@@ -8,6 +8,7 @@
 #include <vector>
 
 #include <gtest/gtest.h>
+#include <sys/stat.h>
 
 #include "netfloor-host/plugin_host.h"
 #include "support/temporary_folder.h"
@@ -49,8 +50,9 @@ protected:
 TEST_F(Refusal, saysWhatIsWrongWhereAndWhatToDo) {
     std::string otherMachine = contentOfPlugin();
     otherMachine.at(4) = 1; // 32 bits
-    std::string cut = contentOfPlugin();
-    cut.resize(200);
+    const auto cutAfter = [](std::size_t octets) { return contentOfPlugin().substr(0, octets); };
+    const std::filesystem::path fifo = directory_ / "fifo";
+    ASSERT_EQ(::mkfifo(fifo.c_str(), 0600), 0);
     const struct {
         std::filesystem::path path;
         std::vector<std::string> words;
@@ -60,7 +62,11 @@ TEST_F(Refusal, saysWhatIsWrongWhereAndWhatToDo) {
         {file(""), {"it is not a shared library", "Give the path"}},
         {file("#!/bin/sh\n"), {"it is not a shared library"}},
         {file(otherMachine), {"the loader refuses it", "for this machine"}},
-        {file(cut), {"the loader refuses it"}},
+        {file(cutAfter(20)), {"it is cut short, after 20 octets", "Copy or build"}},
+        {file(cutAfter(200)), {"it is cut short"}},
+        {file(cutAfter(4096)), {"it is cut short"}},
+        {file(cutAfter(contentOfPlugin().size() / 2)), {"it is cut short"}},
+        {fifo, {"it is a pipe or a device", "Give the path"}},
         {file(pluginWith("vex_PreDecodeTO", "vex_PreDecodeXX")), {"does not export vex_PreDecodeTO."}},
         {file(pluginWith("XTR_netfloor", "XTR_otherone")), {"does not export XTR_netfloor."}},
         {file(pluginWith("date_conv", "date_Conv")), {"does not export date_conv."}},
