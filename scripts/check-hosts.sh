@@ -11,6 +11,7 @@ presets=${*:-linux-i686 windows-x86_64 windows-i686 linux-s390x}
 passed=0
 failed=0
 skipped=0
+wine32_is_missing=
 work=$(mktemp -d)
 trap 'rm -rf "$work"' EXIT
 
@@ -53,6 +54,7 @@ build() {
 fetch_wine32() {
     local to=build/hosts/wine32 state=$work/apt options
     [ -d "$to/i386-windows" ] && return 0
+    say "fetching the 32-bit half of wine"
     mkdir -p "$state/lists/partial" "$state/cache/archives/partial"
     options="-o APT::Architecture=i386 -o APT::Architectures::=i386 -o Dir::State=$state -o Dir::State::lists=$state/lists
         -o Dir::Cache=$state/cache -o Dir::State::status=/dev/null -o APT::Sandbox::User=root"
@@ -62,7 +64,7 @@ fetch_wine32() {
         cd "$work" && apt-get $options download libwine && dpkg-deb -x libwine_*_i386.deb wine32
     ) >"$work/log" 2>&1
     [ -d "$work/wine32/usr/lib/i386-linux-gnu/wine/i386-windows" ] || return 1
-    rm -rf "$to" && mkdir -p "$to" && mv "$work/wine32/usr/lib/i386-linux-gnu/wine/i386-windows" "$to/"
+    rm -rf "$to" build/hosts/wine && mkdir -p "$to" && mv "$work/wine32/usr/lib/i386-linux-gnu/wine/i386-windows" "$to/"
 }
 
 # The names of tests that ended in one state, from ctest's JUnit file.
@@ -107,12 +109,16 @@ build/tests/golden/write_packets "$work/packets" tests/captures/*.pcap* &&
     build/tests/golden/golden "$work/packets" >"$work/release.txt"
 verdict "golden release" $?
 
+# Before wine's own files are made, which depend on it.
+case $presets in
+*windows*) fetch_wine32 || wine32_is_missing=1 ;;
+esac
 for preset in $presets; do
     run=()
     targets=(all golden)
     case $preset in
     windows-i686)
-        if ! fetch_wine32; then
+        if [ -n "$wine32_is_missing" ]; then
             echo "SKIPPED: $preset: the 32-bit half of wine cannot be fetched"
             skipped=$((skipped + 1))
             continue

@@ -63,8 +63,9 @@ protected:
     ~KeyOptions() = default;
 };
 
-// The octets in front of each block of the heap.
-struct alignas(std::max_align_t) BlockHead {
+// The octets in front of each block of the heap. Two pointers are what Windows aligns its blocks to; max_align_t is not
+// the same in all of mingw's headers, and the stand-ins and the host library have to agree.
+struct alignas(2 * sizeof(void *)) BlockHead {
     HeapKeeper *keeper;
 };
 

@@ -89,7 +89,9 @@ std::string restOf(BareRun &run, Pass pass) {
 
 // All calls and the result of one pass.
 std::string textOf(const Octets &packet, Pass pass) {
-    BareRun run(packet);
+    StateOptions options;
+    options.rangeCapacity = 4096; // octets leave flag words as they were, which fresh storage does not define
+    BareRun run(packet, options);
     run.xtr.byteAreaOffset = offsetof(KeyRoom, addresses);
     run.xtr.byteAreaSize = 64;
     std::string text;
