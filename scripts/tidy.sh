@@ -17,9 +17,9 @@ shared=$(git ls-files -z --cached --others --exclude-standard -- '*.h' '*.hpp' .
     xargs -0 cat | sha256sum | cut -c1-16)
 export shared
 
-# entries/descriptors.cpp is left out: it needs limits of constant evaluation that are spelled for the compiler in use.
+# What is for Windows needs headers of Windows. entries/descriptors.cpp is left out: it needs limits of constant evaluation that are spelled for the compiler in use.
 git ls-files --cached --others --exclude-standard -- 'plugin/*.cpp' 'host/*.cpp' 'capture/*.cpp' 'cli/*.cpp' |
-    grep -v '^plugin/entries/descriptors.cpp$' |
+    grep -vE '^plugin/entries/descriptors.cpp$|windows' |
     while read -r file; do [ ! -f "$file" ] || echo "$file"; done |
     xargs -P "$(nproc)" -I{} sh -c '
         stamp=$stamps/$(cat "{}" | sha256sum | cut -c1-16)-$shared
