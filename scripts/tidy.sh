@@ -17,7 +17,8 @@ shared=$(git ls-files -z --cached --others --exclude-standard -- '*.h' '*.hpp' .
     xargs -0 cat | sha256sum | cut -c1-16)
 export shared
 
-# What is for Windows needs headers of Windows. entries/descriptors.cpp is left out: it needs limits of constant evaluation that are spelled for the compiler in use.
+# Left out: entries/descriptors.cpp, which needs limits of constant evaluation that are spelled for the compiler in use,
+# and what is for Windows, which needs headers of Windows.
 git ls-files --cached --others --exclude-standard -- 'plugin/*.cpp' 'host/*.cpp' 'capture/*.cpp' 'cli/*.cpp' |
     grep -vE '^plugin/entries/descriptors.cpp$|windows' |
     while read -r file; do [ ! -f "$file" ] || echo "$file"; done |
