@@ -45,6 +45,7 @@ Ending PacketRun::run(Pass pass, std::span<const std::uint8_t> packet, const Own
     owners_ = &owners;
     sink_ = &sink;
     withBlocks_ = pass == Pass::md && sink.wantsBlocks();
+    withBlockNames_ = sink.wantsBlockNames();
     options_ = options;
     prepare(packet, test);
     sink.begin(pass, packet);
@@ -281,7 +282,7 @@ void PacketRun::reportField(NamedField &field) {
     } else {
         view_.depth = 0;
         view_.blocks = {};
-        view_.blockName = LazyText(names_.blockName(field, state().blockName));
+        view_.blockName = withBlockNames_ ? LazyText(names_.blockName(field, state().blockName)) : LazyText();
     }
     sink_->field(view_);
 }
