@@ -21,7 +21,7 @@ struct CommandName {
 constexpr std::array commandNames = {
     CommandName{Command::summary, "summary", "One line a packet (what 'netfloor FILE' does)"},
     CommandName{Command::detail, "detail", "Every field of each packet, as a tree of layers and blocks"},
-    CommandName{Command::verify, "verify", "A verdict on each packet, and a total"},
+    CommandName{Command::verify, "verify", "Two verdicts on each packet, of the plug-in and of checks, and totals"},
     CommandName{Command::keys, "keys", "A row for each IP layer of each packet, as CSV"},
     CommandName{Command::fields, "fields", "The fields that the plug-in can report; takes no capture"},
 };
@@ -168,6 +168,9 @@ void addOwnOptions(CLI::App &app, Command command, Options &options) {
         app.add_flag("--raw", options.raw, "Addresses as octets, in hexadecimal");
         break;
     case Command::verify:
+        app.add_flag("--bad", options.bad, "Only damaged packets");
+        app.add_flag("-a,--all", options.all, "Also the flags of the plug-in that are by design");
+        break;
     case Command::fields: break;
     }
 }

@@ -30,6 +30,7 @@ struct Options {
     bool utc = false;                 // times of day instead of seconds since the first packet
     bool all = false;                 // summary, detail: nothing left out
     bool bits = false;                // detail: bit ranges
+    bool bad = false;                 // verify: damaged packets only
     bool raw = false;                 // keys: addresses as octets
     bool perChunk = false;            // keys: a row for each SCTP chunk instead of each IP layer
     std::vector<std::string> columns; // keys: these fields in the place of the usual ones

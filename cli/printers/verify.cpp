@@ -1,22 +1,24 @@
 // SPDX-License-Identifier: MIT
-// A verdict on each packet, out of the MV pass, and a total.
+// Two verdicts on each packet, out of the MV pass and of the checks, and totals.
 #include <algorithm>
 #include <array>
 #include <span>
 #include <string_view>
 
 #include "findings.h"
+#include "netfloor-host/checks.h"
 #include "printers/printer.h"
 
 namespace netfloor::cli {
 
 namespace {
 
-// The verdict on a packet. The verdict of the pass tells the first from all others.
+// A verdict on a packet. That of the plug-in is one of all, that of the checks is good or damaged.
 enum class PacketVerdict : std::uint8_t {
     good,
     byDesign, // flags that say nothing against the packet
     unread,   // octets that no field covers
+    misread,  // the plug-in reads on from a wrong place, and its flags say nothing
     cut,      // damage in a packet that the capture has cut: it says nothing about the packet on the wire
     damaged,
 };
@@ -27,13 +29,18 @@ struct VerdictWords {
     Style style;
 };
 
-constexpr std::array<VerdictWords, 5> words = {{
+constexpr std::array<VerdictWords, 6> words = {{
     {"good", "good", Style::good},
     {"good", "good with flags by design", Style::good},
     {"unread", "with octets unread", Style::warning},
+    {"misread", "misread", Style::warning},
     {"cut", "with flags, but cut by the snap length", Style::warning},
     {"DAMAGED", "damaged", Style::bad},
 }};
+
+constexpr const VerdictWords &wordsOf(PacketVerdict verdict) {
+    return words[static_cast<std::size_t>(verdict)];
+}
 
 // How the MV pass ended.
 class Outcome final : public Sink {
@@ -55,13 +62,22 @@ public:
         : Printer(options, out, host), explainer_(FieldTables(host.library())) {}
 
     void print(const PacketToPrint &packet) override {
-        printHead(packet);
-        if (packet.network.isIp()) {
-            printVerdict(packet);
-        } else {
-            printOther(packet);
+        if (!packet.network.isIp()) {
+            if (!options().bad) {
+                printHead(packet);
+                printOther(packet);
+                endLine(packet.captured);
+            }
+            return;
         }
-        endLine(packet.captured);
+        judge(packet);
+        const bool isDamaged = plugin_ == PacketVerdict::damaged || checked_ == PacketVerdict::damaged;
+        damaged_ += isDamaged ? 1 : 0;
+        if (isDamaged || !options().bad) {
+            printHead(packet);
+            printVerdicts();
+            endLine(packet.captured);
+        }
     }
 
     void finish(const Tally &tally) override {
@@ -69,52 +85,82 @@ public:
         if (tally.withIp == 0) {
             return;
         }
-        out() << "verdicts: ";
-        bool first = true;
-        for (std::size_t i = 0; i < words.size(); ++i) {
-            if (counts_[i] != 0) {
-                out() << (first ? "" : ", ");
-                (out().start(words[i].style) << counts_[i] << ' ' << words[i].total).stop(words[i].style);
-                first = false;
-            }
-        }
-        out() << '\n';
+        printCounts("plug-in: ", pluginCounts_);
+        printCounts("checks:  ", checkedCounts_);
     }
 
     [[nodiscard]] ExitCode exitCode() const override {
-        return counts_[static_cast<std::size_t>(PacketVerdict::damaged)] == 0 ? ExitCode::good
-                                                                              : ExitCode::damagedPackets;
+        return damaged_ == 0 ? ExitCode::good : ExitCode::damagedPackets;
     }
 
 private:
-    void printVerdict(const PacketToPrint &packet) {
-        run(Pass::mv, packet, outcome_);
-        std::span<const Finding> findings;
-        if (outcome_.verdict.fault()) {
-            findings = explainer_.explain(outcome_.verdict.flags, host(), packet.network.octets, packet.runOptions());
-        }
-        const auto verdict = static_cast<std::size_t>(verdictOf(outcome_, findings, packet.captured.isCut()));
-        ++counts_[verdict];
+    using Counts = std::array<std::uint64_t, words.size()>;
 
-        const VerdictWords &shown = words[verdict];
-        out().styled(shown.style, shown.verdict);
-        if (!findings.empty()) {
-            out().blanks(words.back().verdict.size() - shown.verdict.size());
+    void judge(const PacketToPrint &packet) {
+        run(Pass::mv, packet, outcome_);
+        findings_ = {};
+        if (outcome_.verdict.fault()) {
+            findings_ = explainer_.explain(outcome_.verdict.flags, host(), packet.network.octets, packet.runOptions());
+        }
+        faults_ = checks_.check(packet.network.octets, packet.runOptions().wireOctets);
+        const auto has = [this](FaultKind kind) {
+            return std::ranges::find(faults_, kind, &Fault::kind) != faults_.end();
+        };
+        checked_ = has(FaultKind::damage) ? PacketVerdict::damaged : PacketVerdict::good;
+        plugin_ = verdictOf(outcome_, findings_, packet.captured.isCut());
+        if (plugin_ >= PacketVerdict::unread && has(FaultKind::misread)) {
+            plugin_ = PacketVerdict::misread;
+        }
+        ++pluginCounts_[static_cast<std::size_t>(plugin_)];
+        ++checkedCounts_[static_cast<std::size_t>(checked_)];
+    }
+
+    void printVerdicts() {
+        for (const PacketVerdict verdict : {plugin_, checked_}) {
+            const VerdictWords &shown = wordsOf(verdict);
+            out().styled(shown.style, shown.verdict);
+            out().blanks(words.back().verdict.size() + 2 - shown.verdict.size());
+        }
+        for (const Fault &fault : faults_) {
+            printFault(fault);
         }
         if (outcome_.ending == Ending::cutOff) {
-            out() << "  the pass was cut off";
+            out() << "the pass was cut off  ";
         }
-        for (const Finding &finding : findings) {
-            out() << "  0x" << Hex{finding.flag} << ' ';
+        for (const Finding &finding : findings_) {
+            if (finding.kind == FindingKind::byDesign && !options().all) {
+                continue;
+            }
+            out() << "plug-in: 0x" << Hex{finding.flag} << ' ';
             explainer_.write(out(), finding);
             if (finding.kind == FindingKind::byDesign) {
                 out().styled(Style::dim, " (by design)");
             }
+            out() << "  ";
         }
         if (outcome_.bitsLeft != 0) {
-            (out().start(Style::dim) << "  ").count(outcome_.bitsLeft / 8, "octet") << " not decoded";
+            (out().start(Style::dim) << "plug-in: ").count(outcome_.bitsLeft / 8, "octet") << " not decoded";
             out().stop(Style::dim);
         }
+    }
+
+    void printFault(const Fault &fault) {
+        const Style style = fault.kind == FaultKind::damage ? Style::bad : Style::dim;
+        (out().start(style) << faultText(fault)).stop(style);
+        out() << "  ";
+    }
+
+    void printCounts(std::string_view column, const Counts &counts) {
+        out() << column;
+        bool first = true;
+        for (std::size_t i = 0; i < words.size(); ++i) {
+            if (counts[i] != 0) {
+                out() << (first ? "" : ", ");
+                (out().start(words[i].style) << counts[i] << ' ' << words[i].total).stop(words[i].style);
+                first = false;
+            }
+        }
+        out() << '\n';
     }
 
     [[nodiscard]] static PacketVerdict verdictOf(const Outcome &outcome, std::span<const Finding> findings,
@@ -138,8 +184,17 @@ private:
     }
 
     FlagExplainer explainer_;
+    PacketChecks checks_;
+    Counts pluginCounts_ = {};
+    Counts checkedCounts_ = {};
+    std::uint64_t damaged_ = 0;
+
+    // Of the packet.
     Outcome outcome_;
-    std::array<std::uint64_t, words.size()> counts_ = {};
+    std::span<const Finding> findings_;
+    std::span<const Fault> faults_;
+    PacketVerdict plugin_ = PacketVerdict::good;
+    PacketVerdict checked_ = PacketVerdict::good;
 };
 
 } // namespace

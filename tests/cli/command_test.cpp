@@ -103,7 +103,13 @@ TEST_F(Command, shows) {
           "  cut by the snap length: 24 of 36"},
          {},
          {}},
-        {"netfloor verify $T/five.pcap", 0, {"  good\n", "verdicts: 2 good\n", "3 without"}, {}, {"DAMAGED"}, 7},
+        {"netfloor verify $T/five.pcap",
+         0,
+         {"  good     good     IPv4: the header checksum is 0", "plug-in: 2 good\nchecks:  2 good\n", "3 without"},
+         {},
+         {"DAMAGED"},
+         8},
+        {"netfloor verify --bad $T/five.pcap", 0, {"5 packets"}, {}, {"no IP: ARP"}, 3},
         {"netfloor keys --column ip.source --column udp.destination_port $T/five.pcap",
          0,
          {"packet,time,length,layer,tunnel,note,ip.source,udp.destination_port\n"
@@ -243,7 +249,7 @@ TEST_F(Command, endsWithTotalsWhenInterrupted) {
     const std::string whole = start + end;
     const std::string inPacket = start + "<(head -c 7 $T/five.pcap)" + end;
     check({
-        {whole.c_str(), 143, {"5 packets: 2 with IP", "verdicts: 2 good"}, {"interrupted after 5 packets"}, {"cut"}},
+        {whole.c_str(), 143, {"5 packets: 2 with IP", "checks:  2 good"}, {"interrupted after 5 packets"}, {"cut"}},
         {inPacket.c_str(), 143, {"5 packets: 2 with IP"}, {"interrupted after 5 packets"}, {"cut"}},
     });
 }
@@ -258,45 +264,48 @@ TEST_F(Command, tellsFlagsByDesignFromDamage) {
     struct Row {
         Octets packet;
         std::uint32_t wireOctets;
+        const char *verdict; // of the plug-in
         const char *expected;
-        int exitCode;
+        int exitCode; // with the verdict of the checks
     };
     const std::vector<Row> rows = {
-        {udpPacket, 0, "good\n", 0},
-        {ipv4({.protocol = 6, .payload = tcpHead + hex("5002 0100 0000 0000")}), 0, "good     0x2 every TCP header", 0},
-        {ipv4({.protocol = 6, .payload = tcpHead + hex("5002 0100 0000 0000 61*4")}), 0, "at most 4 octets", 0},
-        {ipv4({.protocol = 17, .payload = udp(1, 2, hex("61*4"))}), 0, "good     0x10 a UDP payload", 0},
-        {ipv4({.protocol = 47, .payload = hex("0000 0800 45*20")}), 0, "good     0x2 every GRE payload", 0},
-        {ipv4({.protocol = 132, .payload = init}), 0, "good     0x8 an SCTP INIT", 0},
-        {ipv4({.protocol = 17, .payload = hex("0001 0002 00")}), 0,
-         "unread   0x10 bits left over inside a length: 1 octet after 'UDP Destination Port' at octet 23 (User "
+        {udpPacket, 0, "good", "", 0},
+        {ipv4({.protocol = 6, .payload = tcpHead + hex("5002 0100 0000 0000")}), 0, "good", "0x2 every TCP header", 0},
+        {ipv4({.protocol = 6, .payload = tcpHead + hex("5002 0100 0000 0000 61*4")}), 0, "good", "at most 4 octets", 0},
+        {ipv4({.protocol = 17, .payload = udp(1, 2, hex("61*4"))}), 0, "good", "0x10 a UDP payload", 0},
+        {ipv4({.protocol = 47, .payload = hex("0000 0800 45*20")}), 0, "good", "0x2 every GRE payload", 1},
+        {ipv4({.protocol = 132, .payload = init}), 0, "good", "0x8 an SCTP INIT", 0},
+        {ipv4({.protocol = 17, .payload = hex("0001 0002 00")}), 0, "unread",
+         "0x10 bits left over inside a length: 1 octet after 'UDP Destination Port' at octet 23 (User "
          "Datagram Protocol)",
-         0},
-        {ipv4({.protocol = 6, .payload = tcpHead + hex("f002 0100 0000 0000")}), 0, "DAMAGED  0x2 every TCP header", 1},
-        {ipv4({.protocol = 132, .payload = longInit}), 0, "DAMAGED  0x8 length reaches past the bits left", 1},
-        {ipv4({.protocol = 132, .payload = sctpHead + hex("09 00 000c 0003 0008 00000005")}), 0,
-         "good     0x8 a list of SCTP error causes", 0},
-        {ipv4({.protocol = 132, .payload = sctpHead + hex("06 00 000c 0005 0008 00000005")}), 0,
-         "good     0x8 a list of SCTP error causes", 0},
-        {ipv4({.protocol = 132, .payload = sctpHead + hex("06 00 000c 0003 0010 00000005")}), 0, "DAMAGED  0x8", 1},
-        {ipv4({.protocol = 132, .payload = sctpHead + hex("09 00 0010 0003 0008 00000005")}), 0, "DAMAGED  0x8", 1},
-        {ipv4({.protocol = 47, .payload = hex("0000")}), 0, "DAMAGED  0x2 expectation not met: something is shorter",
+         1},
+        {ipv4({.protocol = 6, .payload = tcpHead + hex("f002 0100 0000 0000")}), 0, "DAMAGED", "0x2 every TCP header",
+         1},
+        {ipv4({.protocol = 132, .payload = longInit}), 0, "DAMAGED", "0x8 length reaches past the bits left", 1},
+        {ipv4({.protocol = 132, .payload = sctpHead + hex("09 00 000c 0003 0008 00000005")}), 0, "good",
+         "0x8 a list of SCTP error causes", 0},
+        {ipv4({.protocol = 132, .payload = sctpHead + hex("06 00 000c 0005 0008 00000005")}), 0, "good",
+         "0x8 a list of SCTP error causes", 0},
+        {ipv4({.protocol = 132, .payload = sctpHead + hex("06 00 000c 0003 0010 00000005")}), 0, "DAMAGED", "0x8", 1},
+        {ipv4({.protocol = 132, .payload = sctpHead + hex("09 00 0010 0003 0008 00000005")}), 0, "DAMAGED", "0x8", 1},
+        {ipv4({.protocol = 47, .payload = hex("0000")}), 0, "DAMAGED", "0x2 expectation not met: something is shorter",
          1},
         // The octets of the identification are read from the last one on, which is no gap in front of them.
-        {ipv6({.nextHeader = 44, .payload = hex("3a 00 0001 00000007  87*9")}), 0,
-         "8 octets after 'ICMP Message Type' at octet 48", 0},
-        {ipv4({.protocol = 1, .payload = hex("08 01 0000 0001 0001")}), 0,
-         "DAMAGED  0x2 expectation not met after 'ICMP Message Type' at octet 20", 1},
+        {ipv6({.nextHeader = 44, .payload = hex("3a 00 0001 00000007  87*9")}), 0, "unread",
+         "8 octets after 'ICMP Message Type' at octet 48", 1},
+        {ipv4({.protocol = 1, .payload = hex("08 01 0000 0001 0001")}), 0, "misread",
+         "0x2 expectation not met after 'ICMP Message Type' at octet 20", 1},
         // The capture, not the sender, has cut the first.
-        {ipv4({.protocol = 132, .payload = longInit}), 60, "cut      0x8", 0},
-        {shortened(udpPacket, 11), 0, "unread", 0},
+        {ipv4({.protocol = 132, .payload = longInit}), 60, "cut", "0x8", 1},
+        {shortened(udpPacket, 11), 0, "unread", "", 1},
     };
     for (const Row &row : rows) {
-        SCOPED_TRACE(row.expected);
+        SCOPED_TRACE(std::string(row.verdict) + " " + row.expected);
         writeFile("one.pcap", pcapFile(228, {{row.packet, row.wireOctets}}));
-        const Outcome outcome = shell("netfloor verify $T/one.pcap");
+        const Outcome outcome = shell("netfloor verify --all $T/one.pcap");
         EXPECT_NE(outcome.out.find(row.expected), std::string::npos) << outcome.out;
-        EXPECT_EQ(outcome.exitCode, row.exitCode);
+        EXPECT_NE(outcome.out.find("  " + std::string(row.verdict) + " "), std::string::npos) << outcome.out;
+        EXPECT_EQ(outcome.exitCode, row.exitCode) << outcome.out;
         EXPECT_EQ(outcome.err, "");
     }
 }

@@ -1,0 +1,324 @@
+// SPDX-License-Identifier: MIT
+// The checks of IPv4 and IPv6, and of what leads from one IP header to the next.
+#include "netfloor-host/checks.h"
+
+#include <algorithm>
+#include <array>
+
+#include "checksum.h"
+#include "packet_walk.h"
+
+namespace netfloor {
+
+namespace {
+
+constexpr std::uint8_t protocolHopByHop = 0;
+constexpr std::uint8_t protocolIcmp = 1;
+constexpr std::uint8_t protocolIpv4 = 4;
+constexpr std::uint8_t protocolTcp = 6;
+constexpr std::uint8_t protocolUdp = 17;
+constexpr std::uint8_t protocolIpv6 = 41;
+constexpr std::uint8_t protocolRouting = 43;
+constexpr std::uint8_t protocolFragment = 44;
+constexpr std::uint8_t protocolGre = 47;
+constexpr std::uint8_t protocolAuthentication = 51;
+constexpr std::uint8_t protocolIcmpv6 = 58;
+constexpr std::uint8_t protocolDestination = 60;
+constexpr std::uint8_t protocolSctp = 132;
+constexpr std::uint8_t protocolMobility = 135;
+
+constexpr std::size_t ipv4Octets = 20;
+constexpr std::size_t ipv6Octets = 40;
+constexpr std::size_t addressOctets = 16;
+constexpr std::size_t mostDatagram = 65535;
+
+} // namespace
+
+std::span<const Fault> PacketChecks::check(std::span<const std::uint8_t> packet, std::size_t wireOctets) {
+    faults_.clear();
+    PacketWalk(packet, faults_).ip(0, std::max(packet.size(), wireOctets));
+    return faults_;
+}
+
+std::string faultText(const Fault &fault) {
+    std::string text = (fault.isQuoted ? "quoted " : "") + std::string(fault.protocol) + ": ";
+    std::uint32_t number = fault.first;
+    for (const char character : fault.text) {
+        if (character != '#') {
+            text += character;
+            continue;
+        }
+        text += std::to_string(number);
+        number = fault.second;
+    }
+    return text + ", at octet " + std::to_string(fault.octet);
+}
+
+bool PacketWalk::hasHeader(std::string_view protocol, std::size_t at, std::size_t end, std::size_t count) {
+    if (at + count > end) {
+        damage(protocol, "the header ends # octets short of #", at, at + count - end, count);
+        return false;
+    }
+    return has(at, count);
+}
+
+void PacketWalk::ip(std::size_t at, std::size_t end) {
+    if (!hasHeader("IP", at, end, 1)) {
+        return;
+    }
+    if (++layers_ > mostLayers) {
+        note("IP", "more than # IP headers are not checked", at, mostLayers);
+        return;
+    }
+    switch (u8(at) >> 4U) {
+    case 4: return ipv4(at, end);
+    case 6: return ipv6(at, end);
+    default: damage("IP", "the version is #", at, u8(at) >> 4U);
+    }
+}
+
+void PacketWalk::ipv4(std::size_t at, std::size_t end) {
+    const std::size_t headerOctets = (u8(at) & 0xfU) * 4;
+    if (headerOctets < ipv4Octets) {
+        return damage("IPv4", "the header length is # octets, and # is the least", at, headerOctets, ipv4Octets);
+    }
+    if (!hasHeader("IPv4", at, end, ipv4Octets)) {
+        return;
+    }
+    std::size_t total = u16(at + 2);
+    if (total == 0) {
+        note("IPv4", "the total length is 0, as where the network card fills it in", at + 2);
+        total = end - at;
+    }
+    if (total < headerOctets) {
+        return damage("IPv4", "the total length is # octets, and the header alone has #", at + 2, total, headerOctets);
+    }
+    if (at + total > end) {
+        damage("IPv4", "the total length is # octets, and the packet has #", at + 2, total, end - at);
+        total = end - at;
+    }
+    if (!hasHeader("IPv4", at, at + total, headerOctets)) {
+        return;
+    }
+    if (!isSoundSum(addOctets(0, part(at, at + headerOctets)))) {
+        if (u16(at + 10) == 0) {
+            note("IPv4", "the header checksum is 0, as where the network card fills it in", at + 10);
+        } else {
+            damage("IPv4", "the header checksum is wrong", at + 10);
+        }
+    }
+    ipv4Options(at + ipv4Octets, at + headerOctets);
+
+    const std::uint32_t fragment = u16(at + 6);
+    const std::size_t offset = std::size_t{fragment & 0x1fffU} * 8;
+    if (offset + total - headerOctets > mostDatagram) {
+        damage("IPv4", "the fragment ends at octet # of its datagram, and # is the most", at + 6,
+               offset + total - headerOctets, mostDatagram);
+    }
+    if (offset != 0) {
+        return; // no header of what it carries
+    }
+    Payload carried;
+    carried.at = at + headerOctets;
+    carried.end = at + total;
+    carried.protocol = static_cast<std::uint8_t>(u8(at + 9));
+    carried.isFragment = (fragment & 0x2000U) != 0;
+    carried.addresses = addOctets(0, part(at + 12, at + 20));
+    payload(carried);
+}
+
+void PacketWalk::ipv4Options(std::size_t at, std::size_t end) {
+    while (at < end) {
+        const std::uint32_t type = u8(at);
+        if (type == 0) {
+            return;
+        }
+        if (type == 1) {
+            ++at;
+            continue;
+        }
+        if (at + 2 > end) {
+            return damage("IPv4", "option # has no length, as the header ends", at, type);
+        }
+        const std::size_t octets = u8(at + 1);
+        const bool hasPointer = type == 7 || type == 131 || type == 137 || type == 68;
+        const bool isFixed = type == 136 || type == 148;
+        const std::size_t least = hasPointer ? 3 : isFixed ? 4 : 2;
+        if (octets < least || (isFixed && octets != least)) {
+            return damage("IPv4", "option # has a length of #", at, type, octets);
+        }
+        if (at + octets > end) {
+            return damage("IPv4", "option # ends # octets after the header", at, type, at + octets - end);
+        }
+        if (hasPointer && u8(at + 2) < 4) {
+            damage("IPv4", "option # has a pointer of #", at, type, u8(at + 2));
+        }
+        at += octets;
+        constexpr std::array<std::uint32_t, 8> read = {0, 1, 7, 68, 130, 131, 136, 137};
+        if (at == end && has(at, 1) && std::ranges::find(read, u8(at)) != read.end()) {
+            add(FaultKind::misread, "IPv4", "the plug-in reads the octet after the options as one more", at);
+        }
+    }
+}
+
+void PacketWalk::ipv6(std::size_t at, std::size_t end) {
+    if (!hasHeader("IPv6", at, end, ipv6Octets)) {
+        return;
+    }
+    const std::size_t length = u16(at + 4);
+    std::size_t last = at + ipv6Octets + length;
+    if (last > end) {
+        damage("IPv6", "the payload length is # octets, and the packet has #", at + 4, length, end - at - ipv6Octets);
+    }
+    if (length == 0 && u8(at + 6) != 59) {
+        note("IPv6", "the payload length is 0, as of a jumbogram or where the network card fills it in", at + 4);
+        last = end;
+    }
+    Payload carried;
+    carried.at = at + ipv6Octets;
+    carried.end = std::min(last, end);
+    carried.protocol = static_cast<std::uint8_t>(u8(at + 6));
+    carried.isIpv6 = true;
+    carried.addresses = addOctets(0, part(at + 8, at + ipv6Octets));
+    extensionHeaders(carried, at);
+}
+
+void PacketWalk::extensionHeaders(Payload payload, std::size_t first) {
+    for (;;) {
+        const std::size_t at = payload.at;
+        const std::uint8_t type = payload.protocol;
+        const bool isOptions = type == protocolHopByHop || type == protocolDestination;
+        const bool isExtension = isOptions || type == protocolRouting || type == protocolFragment ||
+                                 type == protocolAuthentication || type == protocolMobility;
+        if (!isExtension) {
+            return this->payload(payload);
+        }
+        if (!hasHeader("IPv6 extension", at, payload.end, 8)) {
+            return;
+        }
+        if (type == protocolHopByHop && at != first + ipv6Octets) {
+            damage("IPv6", "a hop-by-hop header is not the first one", at);
+        }
+        std::size_t octets = (u8(at + 1) + 1) * 8;
+        if (type == protocolFragment) {
+            octets = 8;
+        } else if (type == protocolAuthentication) {
+            octets = (u8(at + 1) + 2) * 4;
+            if (octets < 12) {
+                return damage("IPv6", "the authentication header has # octets, and # is the least", at + 1, octets, 12);
+            }
+        }
+        if (!hasHeader("IPv6 extension", at, payload.end, octets)) {
+            return;
+        }
+        if (isOptions) {
+            ipv6Options(at + 2, at + octets, payload, first);
+        } else if (type == protocolRouting) {
+            routingHeader(at, at + octets, payload, first);
+        } else if (type == protocolFragment) {
+            const std::uint32_t word = u16(at + 2);
+            payload.isFragment = payload.isFragment || (word & 0xfff9U) != 0;
+            if ((word & 1U) != 0 && (payload.end - at - octets) % 8 != 0) {
+                damage("IPv6", "a fragment with others after it has # octets, which is no multiple of #", at,
+                       payload.end - at - octets, 8);
+            }
+            if ((word & 0xfff8U) != 0) {
+                return; // no header of what it carries
+            }
+        }
+        payload.protocol = static_cast<std::uint8_t>(u8(at));
+        payload.at = at + octets;
+        if (type == protocolMobility) {
+            return;
+        }
+    }
+}
+
+void PacketWalk::ipv6Options(std::size_t at, std::size_t end, Payload &payload, std::size_t header) {
+    constexpr std::uint32_t homeAddress = 201;
+    const std::size_t start = at;
+    while (at < end) {
+        if (at != start && at == start + (u8(start) == 0 ? 1 : 2 + u8(start + 1))) {
+            add(FaultKind::misread, "IPv6", "the plug-in reads the options after the first as the next header", at);
+        }
+        if (u8(at) == 0) {
+            ++at;
+            continue;
+        }
+        if (at + 2 > end) {
+            return damage("IPv6", "option # has no length, as the header ends", at, u8(at));
+        }
+        const std::size_t next = at + 2 + u8(at + 1);
+        if (next > end) {
+            return damage("IPv6", "option # ends # octets after the header", at, u8(at), next - end);
+        }
+        if (u8(at) == homeAddress && u8(at + 1) == addressOctets) {
+            payload.otherSource = addOctets(addOctets(0, part(at + 2, next)), part(header + 24, header + ipv6Octets));
+        }
+        at = next;
+    }
+}
+
+void PacketWalk::routingHeader(std::size_t at, std::size_t end, Payload &payload, std::size_t header) {
+    const std::size_t addresses = (end - at - 8) / addressOctets;
+    const std::uint32_t type = u8(at + 2);
+    const std::uint32_t left = u8(at + 3);
+    const bool isList = type == 0 || type == 2;
+    if (isList && (end - at - 8) % addressOctets != 0) {
+        damage("IPv6", "the routing header has # octets, which hold no whole addresses", at + 1, end - at);
+    }
+    if (isList && left > addresses) {
+        return damage("IPv6", "the routing header has # segments left and # addresses", at + 3, left, addresses);
+    }
+    if (left == 0) {
+        return;
+    }
+    const bool isSegmentList = type == 4; // its first entry is the last segment
+    payload.hasAddresses = (isList || isSegmentList) && addresses != 0;
+    if (payload.hasAddresses) {
+        const std::size_t target = isSegmentList ? at + 8 : at + 8 + (addresses - 1) * addressOctets;
+        payload.addresses =
+            addOctets(addOctets(0, part(header + 8, header + 24)), part(target, target + addressOctets));
+    }
+}
+
+void PacketWalk::payload(const Payload &payload) {
+    switch (payload.protocol) {
+    case protocolIpv4:
+    case protocolIpv6: return payload.isFragment ? void() : ip(payload.at, payload.end);
+    case protocolTcp: return tcp(payload);
+    case protocolUdp: return udp(payload);
+    case protocolIcmp: return payload.isIpv6 ? void() : icmp(payload);
+    case protocolIcmpv6: return payload.isIpv6 ? icmpv6(payload) : void();
+    case protocolSctp: return sctp(payload);
+    case protocolGre: return payload.isFragment ? void() : gre(payload);
+    default: return;
+    }
+}
+
+void PacketWalk::gre(const Payload &payload) {
+    if (!hasHeader("GRE", payload.at, payload.end, 4)) {
+        return;
+    }
+    const std::uint32_t flags = u16(payload.at);
+    const std::uint32_t version = flags & 7U;
+    const auto part4 = [flags](std::uint32_t mask) { return (flags & mask) != 0 ? std::size_t{4} : 0; };
+    std::size_t octets = 4 + part4(0xc000) + part4(0x2000) + part4(0x1000);
+    octets += version == 1 ? part4(0x0080) : 0;
+    if (version > 1 || (flags & 0x4000U) != 0) {
+        return; // another form, or one with a list of routes
+    }
+    if (!hasHeader("GRE", payload.at, payload.end, octets)) {
+        return;
+    }
+    if ((flags & 0x8000U) != 0 && has(payload.at, payload.end - payload.at) &&
+        !isSoundSum(addOctets(0, part(payload.at, payload.end)))) {
+        damage("GRE", "the checksum is wrong", payload.at + 4);
+    }
+    const std::uint32_t type = u16(payload.at + 2);
+    if ((type == 0x0800 || type == 0x86dd) && payload.at + octets < payload.end) {
+        ip(payload.at + octets, payload.end);
+    }
+}
+
+} // namespace netfloor
