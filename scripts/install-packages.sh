@@ -5,19 +5,22 @@
 #   scripts/install-packages.sh decode    what the build of the command needs
 #   scripts/install-packages.sh all       that, and what the tests, the checks and the benchmarks need
 #   scripts/install-packages.sh hosts     what ./check hosts needs: compilers for other machines, and what runs their programs
+#   scripts/install-packages.sh packages  what packaging/try-packages.sh needs: it builds Debian packages and a bare Debian
 set -eu
 
 decode="g++ cmake ninja-build pkg-config libpcap-dev libcli11-dev zlib1g-dev libisal-dev nlohmann-json3-dev"
-all="$decode libgtest-dev libbenchmark-dev libtins-dev clang clang-format clang-tidy tshark tcpdump"
+all="$decode libgtest-dev libbenchmark-dev libtins-dev clang clang-format clang-tidy tshark tcpdump help2man abigail-tools"
 # The versioned multilib: the other one excludes all cross compilers.
 hosts="$decode libgtest-dev googletest g++-12-multilib g++-s390x-linux-gnu g++-mingw-w64-i686-posix
     g++-mingw-w64-x86-64-posix wine64 qemu-user"
+packages="$decode help2man dpkg-dev file debootstrap"
 
 case "${1:-all}" in
 decode) wanted=$decode ;;
 all) wanted=$all ;;
 hosts) wanted=$hosts ;;
-*) echo "usage: $0 [decode|all|hosts]" >&2; exit 2 ;;
+packages) wanted=$packages ;;
+*) echo "usage: $0 [decode|all|hosts|packages]" >&2; exit 2 ;;
 esac
 
 if ! command -v apt-get >/dev/null 2>&1; then
