@@ -242,5 +242,19 @@ TEST(Reading, followsAFileThatGrowsOrShrinks) {
     EXPECT_EQ(readTo(24 + 1016 * 400), 400U);
 }
 
+TEST(Reading, tellsItsProgress) {
+    CaptureFile capture(writeFile("long", pcapFile(1, std::vector<PcapPacket>(2000, {hex("61*1000")}))));
+    CapturedPacket packet;
+    ASSERT_TRUE(capture.next(packet));
+    double last = capture.progress().value();
+    EXPECT_GT(last, 0.0);
+    EXPECT_LT(last, 0.5);
+    while (capture.next(packet)) {
+        EXPECT_GE(capture.progress().value(), last);
+        last = capture.progress().value();
+    }
+    EXPECT_EQ(last, 1.0);
+}
+
 } // namespace
 } // namespace netfloor::test

@@ -209,6 +209,7 @@ TEST(Owners, takeTheUserDataOfAnSctpChunk) {
         {"00 03 0011  00*12  aa 000000  05 00 0004", 4, "Data=1 octet"}, // with its padding
         {"00 03 0013  00*12  aaaaaa", 3, "Data=3 octets"},               // the padding is missing
         {"00 03 0100  00*12  aaaaaaaa", 4, "Data=4 octets"},             // cut short
+        {"00 03 0010  00*12  aaaaaaaa aa", 0, ""},                       // no user data
         {"00 03 000f  00*12  aaaaaaaa aa", 5, "Data=5 octets"},          // no length of a DATA chunk
         {"06 03 0014  00*12  aaaaaaaa aa", 5, "Data=5 octets"},          // an ABORT chunk
     };
@@ -222,8 +223,31 @@ TEST(Owners, takeTheUserDataOfAnSctpChunk) {
             const Report report = host.run(pass, udpPacket(7000, hex(chunk)));
             EXPECT_EQ(report.handOffs.front().consumedBits, (16 + taken) * 8) << chunk;
             if (pass == Pass::md) {
-                EXPECT_EQ(report.field("data")->text, text);
+                const auto *const data = report.field("data");
+                EXPECT_EQ(data == nullptr ? "" : data->text, text) << chunk;
             }
+        }
+    }
+}
+
+// An owner that runs the plug-in learns how that ended.
+TEST(Owners, learnThatANestedRunWasRefused) {
+    const Octets packet = udpPacket(7000, udpPacket(7001, twelveOctets));
+    for (const Handled answer : {Handled::yes, Handled::refused}) {
+        Host host = newHost();
+        bool ran = false;
+        host.owners().add(7000, [&](NextLayer &next) {
+            ran = next.runPlugin();
+            return Handled::yes;
+        });
+        host.owners().add(7001, [&](NextLayer &next) { return answer == Handled::yes ? takeAsData(next) : answer; });
+        for (const Pass pass : allPasses) {
+            EXPECT_EQ(host.run(pass, packet).ending, Ending::complete);
+            EXPECT_EQ(ran, answer == Handled::yes);
+            RunOptions flat;
+            flat.mostNesting = 0;
+            EXPECT_EQ(host.run(pass, packet, flat).handOffs.size(), 1U);
+            EXPECT_FALSE(ran);
         }
     }
 }

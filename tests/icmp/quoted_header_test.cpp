@@ -100,6 +100,7 @@ TEST(QuotedHeader, protocolAndOuterProtocol) {
             const auto check = [&](const Octets &packet, bool tunnel) {
                 const Runs runs = runAll(packet);
                 EXPECT_EQ(runs.md.field("Embedded IP Protocols")->id, tunnel ? one.idInTunnel : one.id);
+                EXPECT_EQ(runs.xtr.key("Embedded IP Protocols")->number, static_cast<std::uint32_t>(protocol));
                 EXPECT_EQ(runs.md.field("Embedded IP Protocols")->text, std::string("Embedded IP Protocols=") + name);
                 EXPECT_EQ(linesWith(lines(runs.to), "663"),
                           std::string("663 \"") + (tunnel ? one.textInTunnel : one.text) + name + "\"\n");
