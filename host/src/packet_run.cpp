@@ -2,6 +2,7 @@
 #include "packet_run.h"
 
 #include <algorithm>
+#include <limits>
 #include <string>
 #include <utility>
 
@@ -11,6 +12,13 @@ namespace {
 constexpr std::int32_t refusal = -1;
 constexpr std::size_t usualLayers = 8;
 constexpr std::uint16_t addressRoom = 64; // for one address, which takes 17 octets
+
+// The most octets that the length in an IP header can reach: an IPv6 header and its payload. A jumbo payload, which
+// tells a length of 0 there (RFC 2675), is not read at all. The plug-in works on all that it is given: a capture file
+// may hold megabytes after a packet.
+constexpr std::size_t mostIpOctets = 40 + 65535;
+constexpr std::uint32_t bitsPerOctet = 8;
+constexpr std::size_t mostPacketOctets = std::numeric_limits<std::uint32_t>::max() / bitsPerOctet;
 
 std::uint32_t modeOf(Pass pass) {
     switch (pass) {
@@ -56,13 +64,18 @@ Ending PacketRun::run(Pass pass, std::span<const std::uint8_t> packet, const Own
 }
 
 void PacketRun::prepare(std::span<const std::uint8_t> packet, const TestRunOptions *test) {
-    packet_ = packet;
     exception_ = nullptr;
     handOffDepth_ = 0;
     reentries_ = 0;
     followStop_ = test == nullptr || test->followStop;
+    packet_ = packet;
+    bitsBeyond_ = 0;
     if (test == nullptr) {
-        reused_.reset(packet);
+        if (packet.size() > mostIpOctets && packet.size() <= mostPacketOctets) {
+            bitsBeyond_ = static_cast<std::uint32_t>((packet.size() - mostIpOctets) * bitsPerOctet);
+            packet_ = packet.first(mostIpOctets);
+        }
+        reused_.reset(packet_); // refuses what is longer
         state_ = &reused_.state();
     } else {
         state_ = &exact_.emplace(packet, test->state).state();
@@ -295,9 +308,12 @@ void PacketRun::keepException() noexcept {
 Ending PacketRun::finish(std::int32_t result) {
     const PreDecodeContext &context = preDecode_.context;
     const Ending ending = endingOf(result);
+    // The XTR pass stops inside the packet at a hand-off, and tells what its limit leaves.
+    const bool atEnd = ending == Ending::complete && (pass_ != Pass::xtr || state().layerHandedOff == 0);
+    const std::uint32_t bitsBeyond = atEnd ? bitsBeyond_ : 0;
     if (pass_ == Pass::xtr) {
         keyRecord_.report(plugin_.keyColumns(), xtr_.byteAreaOffset, *sink_);
-        sink_->end({pass_, ending, result, xtr_.bitsLeft, {}, 0, 0, state()});
+        sink_->end({pass_, ending, result, xtr_.bitsLeft + bitsBeyond, {}, 0, 0, state()});
         return ending;
     }
     Verdict verdict;
@@ -309,7 +325,8 @@ Ending PacketRun::finish(std::int32_t result) {
             sink_->layer({layer.firstBit, layer.lastBit, layer.decoderId, layer.layerNumber});
         }
     }
-    sink_->end({pass_, ending, result, context.bitsLeft, verdict, context.layerNumber, context.decoderId, state()});
+    sink_->end({pass_, ending, result, context.bitsLeft + bitsBeyond, verdict, context.layerNumber, context.decoderId,
+                state()});
     return ending;
 }
 
