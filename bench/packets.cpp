@@ -88,6 +88,30 @@ Octets initWithFourParameters() {
     )");
 }
 
+Octets repeated(const Octets &part, std::size_t times) {
+    Octets all;
+    for (std::size_t i = 0; i < times; ++i) {
+        all.insert(all.end(), part.begin(), part.end());
+    }
+    return all;
+}
+
+// An SCTP INIT that fills an IPv4 datagram with one parameter again and again.
+Octets initFullOf(const Octets &parameter) {
+    constexpr std::size_t octetsBefore = 20 + 12 + 20; // headers of IPv4, SCTP and INIT
+    const Octets parameters = repeated(parameter, (65535 - octetsBefore) / parameter.size());
+    const std::size_t chunkOctets = 20 + parameters.size();
+    const Octets length = {static_cast<std::uint8_t>(chunkOctets >> 8), static_cast<std::uint8_t>(chunkOctets)};
+    return ipv4({.protocol = sctpNumber,
+                 .payload = hex("0b 59 0b 59 00*8 01 00") + length +
+                            hex("12 34 56 78 00 00 ff ff 00 0a 00 0a 00 00 10 00") + parameters});
+}
+
+Octets followedBy(Octets packet, std::size_t octets) {
+    packet.resize(packet.size() + octets);
+    return packet;
+}
+
 } // namespace
 
 const Octets &plainUdp() {
@@ -108,6 +132,20 @@ std::span<const PacketSet> packetSets() {
          true},
         {"SCTP SACK + DATA", {ipv4({.protocol = sctpNumber, .payload = sackAndData()})}, false},
         {"SCTP INIT, 4 parameters", {ipv4({.protocol = sctpNumber, .payload = initWithFourParameters()})}, false},
+    };
+    return sets;
+}
+
+std::span<const PacketSet> worstPackets() {
+    static const Octets emptyAddresses = initFullOf(hex("00 06 00 04"));
+    static const std::vector<PacketSet> sets = {
+        {"3,274 IPv6 addresses in an INIT", {initFullOf(hex("00 06 00 14 20 01 0d b8 12*12"))}, false},
+        {"16,370 addresses without octets", {emptyAddresses}, false},
+        {"the same in 30 MB", {followedBy(emptyAddresses, 30'000'000)}, false},
+        {"8,190 extension headers",
+         {ipv6({.nextHeader = 60, .payload = repeated(hex("3c 00 01 04 00*4"), 8190)})},
+         false},
+        {"65,515 octets of unknown data", {ipv4({.protocol = 253, .payload = Octets(65515, 0x61)})}, false},
     };
     return sets;
 }

@@ -25,4 +25,7 @@ struct PacketSet {
 
 [[nodiscard]] std::span<const PacketSet> packetSets();
 
+// One packet each, of those that take longest: full of what is small and costs much.
+[[nodiscard]] std::span<const PacketSet> worstPackets();
+
 } // namespace netfloor::bench

@@ -16,7 +16,9 @@ namespace netfloor {
 
 class CutPacket {
 public:
-    // An IPv6 header and the most octets that its length field counts.
+    // The most octets that the length in an IP header can reach: an IPv6 header and its payload. A jumbo payload, which
+    // tells a length of 0 there (RFC 2675), is not read at all. The plug-in works on all that it is given: a capture
+    // file may hold megabytes after a packet.
     static constexpr std::size_t mostOctets = 40 + 65535;
 
     // Takes a packet with its length on the wire; 0 says that it is whole.

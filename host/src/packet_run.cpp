@@ -2,6 +2,7 @@
 #include "packet_run.h"
 
 #include <algorithm>
+#include <limits>
 #include <string>
 #include <utility>
 
@@ -11,6 +12,9 @@ namespace {
 constexpr std::int32_t refusal = -1;
 constexpr std::size_t usualLayers = 8;
 constexpr std::uint16_t addressRoom = 64; // for one address, which takes 17 octets
+
+constexpr std::uint32_t bitsPerOctet = 8;
+constexpr std::size_t mostPacketOctets = std::numeric_limits<std::uint32_t>::max() / bitsPerOctet;
 
 std::uint32_t modeOf(Pass pass) {
     switch (pass) {
@@ -101,6 +105,7 @@ std::int32_t PacketRun::runPass(Pass pass, Sink &sink, const TestRunOptions *tes
 
 void PacketRun::prepare(const TestRunOptions *test) {
     packet_ = cut_.octets();
+    bitsBeyond_ = 0;
     isReadToCut_ = false;
     fieldsRead_ = 0;
     exception_ = nullptr;
@@ -108,7 +113,11 @@ void PacketRun::prepare(const TestRunOptions *test) {
     reentries_ = 0;
     followStop_ = test == nullptr || test->followStop;
     if (test == nullptr) {
-        reused_.reset(packet_);
+        if (packet_.size() > CutPacket::mostOctets && packet_.size() <= mostPacketOctets) {
+            bitsBeyond_ = static_cast<std::uint32_t>((packet_.size() - CutPacket::mostOctets) * bitsPerOctet);
+            packet_ = packet_.first(CutPacket::mostOctets);
+        }
+        reused_.reset(packet_); // refuses what is longer
         state_ = &reused_.state();
     } else {
         state_ = &exact_.emplace(packet_, test->state).state();
@@ -369,9 +378,12 @@ void PacketRun::keepException() noexcept {
 Ending PacketRun::finish(std::int32_t result, const KeyRecord *otherKeys) {
     const PreDecodeContext &context = preDecode_.context;
     const Ending ending = endingOf(result);
+    // The XTR pass stops inside the packet at a hand-off, and tells what its limit leaves.
+    const bool atEnd = ending == Ending::complete && (pass_ != Pass::xtr || state().layerHandedOff == 0);
+    const std::uint32_t bitsBeyond = atEnd ? bitsBeyond_ : 0;
     if (pass_ == Pass::xtr) {
         keyRecord_.report(plugin_.keyColumns(), otherKeys, *sink_);
-        sink_->end({pass_, ending, result, xtr_.bitsLeft, {}, 0, 0, state()});
+        sink_->end({pass_, ending, result, xtr_.bitsLeft + bitsBeyond, {}, 0, 0, state()});
         return ending;
     }
     Verdict verdict;
@@ -384,7 +396,8 @@ Ending PacketRun::finish(std::int32_t result, const KeyRecord *otherKeys) {
             sink_->layer({layer.firstBit, layer.lastBit, layer.decoderId, layer.layerNumber});
         }
     }
-    sink_->end({pass_, ending, result, context.bitsLeft, verdict, context.layerNumber, context.decoderId, state()});
+    sink_->end({pass_, ending, result, context.bitsLeft + bitsBeyond, verdict, context.layerNumber, context.decoderId,
+                state()});
     return ending;
 }
 

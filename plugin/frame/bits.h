@@ -19,8 +19,8 @@ namespace netfloor::plugin {
 inline constexpr std::uint32_t bitsPerOctet = 8;
 
 // Reads the bits `first` to `last`, at most 32, where first is not above last.
-[[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t bitsAscending(const std::uint8_t *data, std::uint32_t first,
-                                                                    std::uint32_t last) {
+[[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t bits(const std::uint8_t *data, std::uint32_t first,
+                                                           std::uint32_t last) {
     const std::uint32_t low = first - 1;
     const std::uint32_t high = last - 1;
     std::uint64_t gathered = 0;
@@ -40,15 +40,6 @@ inline constexpr std::uint32_t bitsPerOctet = 8;
     return result;
 }
 
-// Reads the bits between `first` and `last`; where first is above last, in reverse order.
-[[nodiscard]] NETFLOOR_INLINE constexpr std::uint32_t bits(const std::uint8_t *data, std::uint32_t first,
-                                                           std::uint32_t last) {
-    if (static_cast<std::int32_t>(first) <= static_cast<std::int32_t>(last)) {
-        return bitsAscending(data, first, last);
-    }
-    return reversed(bitsAscending(data, last, first), first - last + 1);
-}
-
 // True where a bit number is the first of an octet.
 [[nodiscard]] NETFLOOR_INLINE constexpr bool onOctetBorder(std::uint32_t bit) {
     return (bit - 1) % bitsPerOctet == 0;
@@ -57,7 +48,7 @@ inline constexpr std::uint32_t bitsPerOctet = 8;
 // Reads the bits `first` to `last` out of line: the form that need not be fast.
 [[nodiscard, gnu::cold, gnu::noinline]] constexpr std::uint32_t bitsAcross(const std::uint8_t *data,
                                                                            std::uint32_t first, std::uint32_t last) {
-    return bitsAscending(data, first, last);
+    return bits(data, first, last);
 }
 
 // Reads the 8 bits from bit number `first` on, wherever they lie.
@@ -99,7 +90,7 @@ template <std::uint32_t low, std::uint32_t high>
     std::uint32_t value = 0;
     for (std::uint32_t octet = 0; octet < count; ++octet) {
         value = value << bitsPerOctet |
-                bitsAscending(data, first + octet * bitsPerOctet, first + octet * bitsPerOctet + bitsPerOctet - 1);
+                bits(data, first + octet * bitsPerOctet, first + octet * bitsPerOctet + bitsPerOctet - 1);
     }
     return value;
 }
@@ -160,29 +151,66 @@ inline constexpr auto reversedOctets = [] {
     return (octets >> 4 & 0x0f0f0f0f0f0f0f0f) | (octets & 0x0f0f0f0f0f0f0f0f) << 4;
 }
 
-// Reverses the bits of each octet of `data` from bit number `from` on, up to the last whole octet of a
-// packet of `totalBits`. Off an octet border the octets are those counted from `from` on.
-inline void reverseOctets(std::uint8_t *data, std::uint32_t from, std::uint32_t totalBits) {
-    const std::uint32_t shift = (from - 1) % bitsPerOctet;
-    const std::uint32_t end = totalBits / bitsPerOctet;
-    std::uint32_t octet = (from - 1) / bitsPerOctet;
-    if (shift == 0) {
-        for (std::uint64_t octets = 0; octet + sizeof octets <= end; octet += sizeof octets) {
-            std::memcpy(&octets, data + octet, sizeof octets);
-            octets = eachReversed(octets);
-            std::memcpy(data + octet, &octets, sizeof octets);
-        }
-        for (; octet < end; ++octet) {
-            data[octet] = reversedOctets[data[octet]];
-        }
-        return;
+// Eight octets as a number, the first the least significant.
+[[nodiscard]] inline std::uint64_t load64(const std::uint8_t *octets) {
+    std::uint64_t value = 0;
+    for (std::uint32_t i = 0; i < sizeof value; ++i) {
+        value |= std::uint64_t{octets[i]} << i * bitsPerOctet;
     }
-    for (++octet; octet < end; ++octet) {
-        const auto pair = static_cast<std::uint32_t>(data[octet - 1] | data[octet] << bitsPerOctet);
+    return value;
+}
+
+inline void store64(std::uint8_t *octets, std::uint64_t value) {
+    for (std::uint32_t i = 0; i < sizeof value; ++i) {
+        octets[i] = static_cast<std::uint8_t>(value >> i * bitsPerOctet);
+    }
+}
+
+// Copies octets with the bits of each reversed. The two may be the same octets.
+inline void copyWithBitsReversed(std::uint8_t *to, const std::uint8_t *from, std::uint32_t count) {
+    std::uint32_t octet = 0;
+    for (; octet + sizeof(std::uint64_t) <= count; octet += sizeof(std::uint64_t)) {
+        store64(to + octet, eachReversed(load64(from + octet)));
+    }
+    for (; octet < count; ++octet) {
+        to[octet] = reversedOctets[from[octet]];
+    }
+}
+
+// The same in place off an octet border: of `count` windows of 8 bits, each of which starts `shift` bits above the
+// lowest bit of its octet and ends in the next one.
+inline void reverseShifted(std::uint8_t *data, std::uint32_t count, std::uint32_t shift) {
+    const std::uint32_t below = (1u << shift) - 1;
+    std::uint32_t octet = 0;
+    for (; octet + sizeof(std::uint64_t) <= count; octet += sizeof(std::uint64_t)) {
+        const std::uint64_t low = load64(data + octet);
+        const std::uint64_t high = data[octet + sizeof low];
+        const std::uint64_t windows = eachReversed(low >> shift | high << (64 - shift));
+        store64(data + octet, (low & below) | windows << shift);
+        data[octet + sizeof low] = static_cast<std::uint8_t>((high & ~std::uint64_t{below}) | windows >> (64 - shift));
+    }
+    for (; octet < count; ++octet) {
+        const auto pair = static_cast<std::uint32_t>(data[octet] | data[octet + 1] << bitsPerOctet);
         const std::uint32_t window = reversedOctets[pair >> shift & 0xff];
         const std::uint32_t mixed = (pair & ~(0xffu << shift)) | window << shift;
-        data[octet - 1] = static_cast<std::uint8_t>(mixed);
-        data[octet] = static_cast<std::uint8_t>(mixed >> bitsPerOctet);
+        data[octet] = static_cast<std::uint8_t>(mixed);
+        data[octet + 1] = static_cast<std::uint8_t>(mixed >> bitsPerOctet);
+    }
+}
+
+// Reverses the bits of each octet of a packet of `totalBits` in place, from bit number `from` on up to the packet's
+// last whole octet. Off an octet border the octets are those counted from `from` on.
+inline void reverseOctets(std::uint8_t *data, std::uint32_t from, std::uint32_t totalBits) {
+    const std::uint32_t shift = (from - 1) % bitsPerOctet;
+    const std::uint32_t start = (from - 1) / bitsPerOctet;
+    const std::uint32_t end = totalBits / bitsPerOctet;
+    if (start >= end) {
+        return;
+    }
+    if (shift == 0) {
+        copyWithBitsReversed(data + start, data + start, end - start);
+    } else {
+        reverseShifted(data + start, end - start - 1, shift);
     }
 }
 

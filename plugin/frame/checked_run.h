@@ -10,9 +10,6 @@
 
 namespace netfloor::plugin {
 
-// The most elements of a field of fixed size.
-inline constexpr std::uint32_t mostFixedElements = addressGroupCount * nibblesPerGroup;
-
 // So many blocks a run opens without a test of its own, as many as UDP and its hand-off have; more are tested one by
 // one.
 inline constexpr std::uint32_t mostRunBlocks = 4;
@@ -40,6 +37,8 @@ NETFLOOR_INLINE inline void checkedRun(Reader<Pass> &reader) {
         reader.unchecked = false;
         reader.outcome = Outcome::running;
         reader.writer.startRun(bitCount, mostRunBlocks);
+        // For all fields of the run at once: no host looks before the last of them is read.
+        reader.writer.clearFlagWords(reader.state->fieldRecord, clearedFromTo<typename Pass::Fields>(first, last));
         production(reader);
         reader.writer.flushRun(*reader.state);
         reader.writer.endRun();

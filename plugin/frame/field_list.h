@@ -2,6 +2,7 @@
 // Lists of fields. Each protocol's file ends with its rows in the published tables, and the catalogue joins them.
 #pragma once
 
+#include <algorithm>
 #include <array>
 #include <cstddef>
 #include <cstdint>
@@ -87,6 +88,21 @@ template <class List>
         }
     }
     return 0;
+}
+
+// How many elements' flag words the fields from `first` to `last` clear.
+template <class List>
+[[nodiscard]] consteval std::uint32_t clearedFromTo(const Field &first, const Field &last) {
+    std::uint32_t most = 0;
+    bool counts = false;
+    for (const Field *const field : List::pointers) {
+        counts = counts || field == &first;
+        most = counts ? std::max(most, field->place.clearedFlagWords()) : most;
+        if (field == &last) {
+            break;
+        }
+    }
+    return most;
 }
 
 // Fails to compile where two fields share an id. The two stand in the compiler's message.

@@ -46,14 +46,17 @@ template <Place place>
     return value;
 }
 
-// An address for the eye. Only the values of the later groups are kept: the first element stands for the whole address.
+// One group of an address, as it is shown: each octet with its low nibble first.
+[[nodiscard]] NETFLOOR_INLINE inline std::uint32_t groupAt(const std::uint8_t *data, std::uint32_t first) {
+    const std::uint32_t octets = octetsAt<2>(data, first);
+    return (octets & 0x0f0f) << nibbleBits | (octets >> nibbleBits & 0x0f0f);
+}
+
+// An address as it is shown. The first element stands for the whole address. Of the others only the values are written:
+// their other words stay as the fields before have left them.
 inline void writeGroups(FieldRecord &record, const std::uint8_t *data, std::uint32_t cursor, std::uint32_t groups) {
     for (std::uint32_t group = 0; group < groups; ++group) {
-        std::uint32_t digits = 0;
-        for (std::uint32_t digit = 0; digit < nibblesPerGroup; ++digit) {
-            digits = digits << nibbleBits | nibbleAt(data, cursor + group * groupBits + digit * nibbleBits);
-        }
-        record.ranges[group].value = digits;
+        record.ranges[group].value = groupAt(data, cursor + group * groupBits);
     }
     record.wideStart = 0;
     record.wideBits = groups * groupBits;
@@ -61,16 +64,16 @@ inline void writeGroups(FieldRecord &record, const std::uint8_t *data, std::uint
     record.ranges[0].lastBit = cursor + record.wideBits - 1;
 }
 
-// An address whose bits are read reversed. Gives the value, of which the last two groups stay.
+// An address that is read with the bits of each octet reversed, twice over: its groups are those of the octets as they
+// are in the packet. Gives the value, of which the last two groups stay.
 [[nodiscard]] inline std::uint32_t writeReversedGroups(BitRange *ranges, const std::uint8_t *data, std::uint32_t cursor,
                                                        std::uint32_t groups) {
     std::uint32_t value = 0;
     for (std::uint32_t group = 0; group < groups; ++group) {
         const std::uint32_t first = cursor + group * groupBits;
-        const std::uint32_t last = first + groupBits - 1;
         ranges[group].firstBit = first;
-        ranges[group].lastBit = last;
-        ranges[group].value = bits(data, last, first);
+        ranges[group].lastBit = first + groupBits - 1;
+        ranges[group].value = octetsAt<2>(data, first);
         value = value << groupBits | ranges[group].value;
     }
     return value;

@@ -6,6 +6,7 @@
 #include <optional>
 #include <type_traits>
 
+#include "frame/bit_order.h"
 #include "frame/field_list.h"
 #include "frame/reader.h"
 
@@ -91,7 +92,11 @@ NETFLOOR_INLINE inline void step(Reader<Pass> &reader, std::uint32_t units, Stor
     const std::uint32_t moves = place.isRun() ? place.moves(units) : place.advance;
     reader.writer.nameBlock(reader, *reader.state);
     reader.writer.template beginField<field>(reader.state->fieldRecord);
-    if (!reader.roomFor(place.elements(units), field.name.data())) {
+    if constexpr (place.shape == Shape::groups) {
+        if (!reader.roomForGroups(field.name)) {
+            return;
+        }
+    } else if (!reader.roomFor(place.elements(units), field.name.data())) {
         return;
     }
     const std::uint32_t start = reader.cursor;
@@ -102,6 +107,9 @@ NETFLOOR_INLINE inline void step(Reader<Pass> &reader, std::uint32_t units, Stor
     reader.left -= moves;
     reader.cursor += moves;
     reader.writer.template writeField<field>(reader, *reader.state, reader.data, start, units);
+    if constexpr (place.shape == Shape::reversedGroups) {
+        finishReversedAddress(reader, start);
+    }
     Pass::template output<field>(reader, start, units);
 }
 

@@ -38,13 +38,19 @@ inline constexpr std::uint32_t nibbleBits = 4;
 inline constexpr std::uint32_t nibblesPerGroup = groupBits / nibbleBits;
 inline constexpr std::uint32_t addressBits = addressGroupCount * groupBits;
 
+// The most elements of a field of fixed size.
+inline constexpr std::uint32_t mostFixedElements = addressGroupCount * nibblesPerGroup;
+
+// The most pieces of a field.
+inline constexpr std::uint32_t mostPieces = 4;
+
 struct Place {
     Shape shape;
-    std::uint32_t count;              // pieces or units (octets, groups, nibbles); 0: told by the packet
-    std::array<Piece, 4> pieces = {}; // of `pieces` and `ahead`
-    std::uint32_t advance = 0;        // bits that the cursor moves on; for a run: bits for each unit
-    std::uint32_t scale = 1;          // the value is shown and stored multiplied by this
-    std::uint32_t mostUnits = 0;      // of a run: the most units that are taken; 0: no bound
+    std::uint32_t count;                       // pieces or units (octets, groups, nibbles); 0: told by the packet
+    std::array<Piece, mostPieces> pieces = {}; // of `pieces` and `ahead`
+    std::uint32_t advance = 0;                 // bits that the cursor moves on; for a run: bits for each unit
+    std::uint32_t scale = 1;                   // the value is shown and stored multiplied by this
+    std::uint32_t mostUnits = 0;               // of a run: the most units that are taken; 0: no bound
 
     [[nodiscard]] constexpr bool isRun() const { return count == 0; }
 
@@ -96,6 +102,12 @@ struct Place {
             most = std::max(most, pieces[i].width());
         }
         return most;
+    }
+
+    // How many elements' flag words the field clears: those of pieces and of a single octet. An octet or nibble among
+    // others leaves the flag word of its element.
+    [[nodiscard]] constexpr std::uint32_t clearedFlagWords() const {
+        return shape == Shape::pieces || (shape == Shape::octets && count == 1) ? count : 0;
     }
 
     // The bits of the field's value, without the gaps between its pieces; 0 for a run.

@@ -8,6 +8,7 @@
 #pragma once
 
 #include <cstdint>
+#include <string_view>
 
 #include "frame/growth.h"
 #include "frame/pass.h"
@@ -162,7 +163,7 @@ public:
     // Makes room for so many elements of a field of this name, whose elements are still to be read; without a name the
     // record stays that of the field before. False when the ranges cannot grow.
     NETFLOOR_INLINE bool roomFor(std::uint32_t elements, const char *name) {
-        if (elements < state->fieldRecord.rangeCapacity) [[likely]] {
+        if (hasRoom(elements)) [[likely]] {
             return true;
         }
         // Growth works on a copy, so that the reader itself can stay in registers.
@@ -174,7 +175,30 @@ public:
         return true;
     }
 
+    // The same for an address in groups, which come one by one.
+    NETFLOOR_INLINE bool roomForGroups(std::string_view name) {
+        if (hasRoom(addressGroupCount)) [[likely]] {
+            return true;
+        }
+        Reader copy = *this;
+        if (!copy.makeRoomForGroups(name.data())) {
+            end(Outcome::cutOff);
+            return false;
+        }
+        return true;
+    }
+
 private:
+    // A pass that puts off what it writes says no also where the ranges are so few that they may grow for a field of
+    // fixed size: then each field is written, as the host sees its elements while a later field grows.
+    [[nodiscard]] NETFLOOR_INLINE bool hasRoom(std::uint32_t elements) const {
+        const std::uint32_t capacity = state->fieldRecord.rangeCapacity;
+        if constexpr (Pass::Writer::hasCheckedRuns) {
+            return (elements < mostFixedElements ? mostFixedElements : elements) < capacity;
+        }
+        return elements < capacity;
+    }
+
     NETFLOOR_INLINE bool push(BitStack &stack, std::uint32_t &depth, std::uint32_t bit) {
         ++depth;
         stack.count = depth;
@@ -190,9 +214,12 @@ private:
         return true;
     }
 
+    // What these do after giveState has a function of its own, without the reader: the copy for which they are called
+    // would otherwise keep the original out of the registers.
+
     [[gnu::cold, gnu::noinline]] bool makeRoom(BitStack &stack) {
         giveState();
-        return growStack(*state, stack);
+        return growStack(*state, stack, variables().reversedFrom);
     }
 
     [[gnu::cold, gnu::noinline]] bool makeRoom(std::uint32_t elements, const char *name) {
@@ -200,7 +227,13 @@ private:
         if (name != nullptr) {
             beginRecord(state->fieldRecord, name);
         }
-        return growRanges(*state, elements);
+        return growRanges(*state, elements, variables().reversedFrom);
+    }
+
+    [[gnu::cold, gnu::noinline]] bool makeRoomForGroups(const char *name) {
+        giveState();
+        beginRecord(state->fieldRecord, name);
+        return growRangesForGroups(*state);
     }
 };
 

@@ -4,12 +4,14 @@
 // sees the last field, the last peek and the last block alone.
 #pragma once
 
+#include <algorithm>
 #include <cstdint>
 #include <string_view>
 
 #include "frame/bits.h"
 #include "frame/field.h"
 #include "frame/field_record.h"
+#include "frame/for_each.h"
 #include "frame/inline.h"
 #include "frame/position.h"
 #include "netfloor/records.h"
@@ -82,20 +84,44 @@ struct DeferredField {
     std::uint32_t id;
 };
 
-template <Place place>
-void writeDeferredElements(FieldRecord &record, const std::uint8_t *data, std::uint32_t cursor, std::uint32_t units) {
-    writeElements<place>(record, data, cursor, place.isRun() ? units : place.count);
-}
-
-template <const Field &field>
-inline constexpr DeferredField deferred{writeDeferredElements<field.place>, field.name, field.id};
-
-// What was read last.
-struct LastRead {
-    const DeferredField *field = nullptr; // null: the record is up to date
-    std::uint32_t cursor = 0;             // where that field lies
+// A field that was read, and is still to be written.
+struct FieldRead {
+    const DeferredField *field = nullptr; // null: there is none
+    std::uint32_t cursor = 0;             // where it lies
     std::uint32_t units = 0;              // of a run of octets or nibbles
-    Peek peek = {};                       // after that field
+
+    void writeElements(FieldRecord &record, const std::uint8_t *data) const {
+        field->writeElements(record, data, cursor, units);
+    }
+};
+
+// An address in groups writes only the values of its second to eighth element. Their other words are those of the
+// fields before: of the last field, which has filled the first four, and of the last ones that have filled more.
+inline constexpr std::uint32_t fewElements = 4;
+
+// Where the elements of a field of octets or nibbles lie.
+struct Elements {
+    std::uint32_t cursor = 0; // 0: there was no such field
+    std::uint32_t width = 0;
+    std::uint32_t count = 0;
+
+    // Writes what this field has left in the elements of an address.
+    void write(BitRange *ranges) const {
+        for (std::uint32_t i = fewElements; i < std::min(count, addressGroupCount); ++i) {
+            ranges[i].firstBit = cursor + i * width;
+            ranges[i].lastBit = ranges[i].firstBit + width - 1;
+        }
+    }
+};
+
+// What was read last, and what else of the fields before shows in the elements.
+struct LastRead {
+    FieldRead field; // none: the record is up to date
+    Peek peek;       // after that field
+
+    FieldRead before; // the field before an address in groups
+    Elements wide;    // the last field that filled all the elements that an address has
+    Elements medium;  // the last one that filled only some of those after the first four
 };
 
 // Puts off what the host cannot see yet. In a checked run (see checked_run.h) it puts off more: what is known there
@@ -120,8 +146,10 @@ public:
 
     // Nothing is put off: the state is as the host left it.
     NETFLOOR_INLINE void reset() {
-        last_.field = nullptr;
+        last_.field.field = nullptr;
         last_.peek.pieces = 0;
+        last_.wide.count = 0;
+        last_.medium.count = 0;
         endRun();
     }
 
@@ -142,8 +170,8 @@ public:
         if (field_.field != nullptr) {
             state.condition = 1;
             state.advance = field_.advance;
-            last_.field = field_.field;
-            last_.cursor = field_.cursor;
+            last_.field.field = field_.field;
+            last_.field.cursor = field_.cursor;
             last_.peek.pieces = 0;
         }
         if (blocks_ != 0) {
@@ -163,15 +191,17 @@ public:
     }
 
     NETFLOOR_INLINE void flushRecord(FieldRecord &record, const std::uint8_t *data) {
-        if (last_.field != nullptr) {
-            beginRecord(record, last_.field->name);
-            last_.field->writeElements(record, data, last_.cursor, last_.units);
-            record.fieldId = last_.field->id;
+        if (last_.field.field != nullptr) {
+            beginRecord(record, last_.field.field->name);
+            last_.field.writeElements(record, data);
+            record.fieldId = last_.field.field->id;
+            // The first field of each entry, and of each return from a next layer, has cleared it.
+            record.ranges[0].flagWord = 0;
         }
         if (last_.peek.pieces != 0) {
             writePeek(record, data, last_.peek);
         }
-        last_.field = nullptr;
+        last_.field.field = nullptr;
         last_.peek.pieces = 0;
     }
 
@@ -198,11 +228,19 @@ public:
     template <const Field &field>
     NETFLOOR_INLINE void writeField(const Position &, DecodeState &state, const std::uint8_t *, std::uint32_t start,
                                     std::uint32_t units) {
-        last_.field = &deferred<field>;
-        last_.cursor = start;
-        if constexpr (field.place.isRun()) {
-            last_.units = units;
+        constexpr const Place &place = field.place;
+        if constexpr (place.shape == Shape::groups) {
+            last_.before = last_.field;
         }
+        last_.field.field = &deferred<field>;
+        last_.field.cursor = start;
+        if constexpr (place.isRun()) {
+            last_.field.units = units;
+        }
+        if constexpr (place.isRun() || place.shape == Shape::addressNibbles) {
+            remember(start, place.elementBits(), place.elements(units));
+        }
+        clearFlagWords(state.fieldRecord, place.clearedFlagWords());
         writeWide<field>(state.fieldRecord);
         last_.peek.pieces = 0;
     }
@@ -214,13 +252,27 @@ public:
         field_.field = &deferred<field>;
         field_.cursor = start;
         field_.advance = static_cast<std::int32_t>(field.place.advance);
+        if constexpr (field.place.shape == Shape::addressNibbles) {
+            remember(start, nibbleBits, mostFixedElements);
+        }
         writeWide<field>(state.fieldRecord);
     }
 
-    NETFLOOR_INLINE std::uint32_t peek(FieldRecord &, const std::uint8_t *data, const Peek &peek) {
+    NETFLOOR_INLINE std::uint32_t peek(FieldRecord &record, const std::uint8_t *data, const Peek &peek) {
         last_.peek = peek;
+        clearFlagWords(record, peek.pieces);
         return peek.width == bitsPerOctet ? octetsAt(data, peek.first, peek.pieces)
                                           : bits(data, peek.first, peek.first + peek.width - 1);
+    }
+
+    // Clears the flag words of so many elements. The plug-in writes nothing else to them, so that it need not be put
+    // off. That of the first element is cleared with the record.
+    NETFLOOR_INLINE static void clearFlagWords(FieldRecord &record, std::uint32_t elements) {
+        forEach<mostPieces>([&]<std::size_t i>() NETFLOOR_INLINE {
+            if (i > 0 && i < elements) {
+                record.ranges[i].flagWord = 0;
+            }
+        });
     }
 
     // Moves back over an address that the run has just read: inside a run its bits are there. False elsewhere, where
@@ -235,6 +287,39 @@ public:
     }
 
 private:
+    // Remembers a field with many elements.
+    NETFLOOR_INLINE static void remember(std::uint32_t cursor, std::uint32_t width, std::uint32_t count) {
+        if (count >= addressGroupCount) {
+            last_.wide = {.cursor = cursor, .width = width, .count = count};
+        } else if (count > fewElements) {
+            last_.medium = {.cursor = cursor, .width = width, .count = count};
+        }
+    }
+
+    // Writes what the fields before an address in groups have left in its elements, the older first.
+    static void writeOlderElements(FieldRecord &record, const std::uint8_t *data) {
+        if (last_.before.field != nullptr) {
+            last_.before.writeElements(record, data);
+        }
+        last_.wide.write(record.ranges);
+        if (last_.medium.cursor > last_.wide.cursor) {
+            last_.medium.write(record.ranges);
+        }
+    }
+
+    // In a run the nibbles of an address follow its groups, so that groups are the last field only outside of one.
+    template <Place place>
+    static void writeDeferred(FieldRecord &record, const std::uint8_t *data, std::uint32_t cursor,
+                              std::uint32_t units) {
+        if constexpr (place.shape == Shape::groups) {
+            writeOlderElements(record, data);
+        }
+        writeElements<place>(record, data, cursor, place.isRun() ? units : place.count);
+    }
+
+    template <const Field &field>
+    static constexpr DeferredField deferred{writeDeferred<field.place>, field.name, field.id};
+
     template <const Field &field>
     NETFLOOR_INLINE static void writeWide(FieldRecord &record) {
         if constexpr (field.place.shape == Shape::groups) {

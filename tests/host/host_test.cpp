@@ -53,6 +53,43 @@ TEST(Host, reportsTheBlocksOfFields) {
     EXPECT_EQ(report.blocks[blockOf("Checksum")].parent, blockOf("UDP Source Port"));
 }
 
+struct EndOfRun final : Sink {
+    void end(const PassEnd &end) override {
+        octets = end.state.totalBits / 8;
+        bitsLeft = end.bitsLeft;
+    }
+    std::uint32_t octets = 0;
+    std::uint32_t bitsLeft = 0;
+};
+
+// A capture file may hold megabytes after a packet. The plug-in gets what an IP header can reach, and they count as
+// left.
+TEST(Host, handsOverWhatAnIpHeaderCanReach) {
+    struct Case {
+        Octets packet;
+        std::uint32_t read; // octets
+    };
+    const std::vector<Case> cases = {
+        {udpPacket(40001, twelveOctets), 40},
+        {ipv6({.nextHeader = 59, .payload = Octets(65535, 0x61)}), 40 + 65535},
+        // a jumbo payload (RFC 2675)
+        {ipv6({.nextHeader = 0, .payload = hex("3b 00 c2 04 00 02 00 08") + Octets(0x20000, 0), .payloadLength = 0}),
+         40},
+    };
+    Host host = newHost();
+    for (const Case &one : cases) {
+        for (const Pass pass : allPasses) {
+            Octets packet = one.packet;
+            packet.resize(1'000'000);
+            EndOfRun seen;
+            EXPECT_EQ(host.run(pass, packet, seen), Ending::complete);
+            EXPECT_EQ(seen.octets, 40u + 65535u);
+            const bool stops = pass == Pass::xtr && one.packet[0] >> 4 == 4; // at the hand-off
+            EXPECT_EQ(seen.bitsLeft, stops ? 0 : (packet.size() - one.read) * 8);
+        }
+    }
+}
+
 TEST(Host, listsLayersAndHandOffs) {
     Host host = newHost();
     const Octets packet = udpPacket(40001, twelveOctets);
