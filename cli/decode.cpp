@@ -84,6 +84,9 @@ public:
         if (filter_ && !filter_->refused().empty()) {
             std::cerr << "netfloor: " << refusedText(options_.filter, *filter_) << '\n';
         }
+        if (const std::string note = capture_.note(); !note.empty()) {
+            std::cerr << "netfloor: " << note << '\n';
+        }
         if (!damage.empty()) {
             std::cerr << "netfloor: " << damage << '\n';
             return code;
@@ -92,11 +95,11 @@ public:
             std::cerr << "netfloor: interrupted after " << countText(read_, "packet") << ".\n";
             return printer_->exitCode();
         }
-        if (options_.packet && tally_.packets == 0) {
-            throw UsageError(read_ < *options_.packet
-                                 ? "--packet " + std::to_string(*options_.packet) + ": the capture has only " +
-                                       countText(read_, "packet") + "."
-                                 : "--packet " + std::to_string(*options_.packet) + " does not match the filter.");
+        if (!options_.packets.areAll() && tally_.packets == 0) {
+            throw UsageError("--packet " + options_.packets.text +
+                             (read_ < options_.packets.last
+                                  ? ": the capture has only " + countText(read_, "packet") + "."
+                                  : " does not match the filter."));
         }
         if (read_ == 0 && options_.count != std::uint64_t{0}) {
             std::cerr << "netfloor: " << capture_.name() << " holds no packets.\n";
@@ -110,15 +113,12 @@ private:
         while (!isInterrupted() && (!options_.count || tally_.packets < *options_.count) && capture_.next(packet)) {
             read_ = packet.number;
             times_.see(packet);
-            if (options_.packet && packet.number < *options_.packet) {
-                continue;
-            }
-            if (!filter_ || filter_->passes(packet)) {
+            if (options_.packets.hold(packet.number) && (!filter_ || filter_->passes(packet))) {
                 const NetworkPart network = findNetworkPart(packet.linkType, packet.octets);
                 printer_->print({packet, network, tally_.add(network), times_.text(packet)});
                 out_.endPacket();
             }
-            if (options_.packet) {
+            if (packet.number == options_.packets.last) {
                 return;
             }
             progress_->packetDone(packet.number);

@@ -3,6 +3,7 @@
 
 #include <algorithm>
 #include <array>
+#include <charconv>
 #include <map>
 #include <string_view>
 
@@ -44,7 +45,7 @@ Examples:
   netfloor fields Protocol                       what a field is, and what its values are called
   netfloor verify --filter 'tcp port 80' c.pcapng
   netfloor keys --column ip.source --column tcp.window c.pcap
-  tcpdump -w - | netfloor -)";
+  tcpdump -U -w - | netfloor -)";
 
 constexpr const char *fieldsFooter = R"(
 In a display line, %u is the value in decimal, %x in hexadecimal, %c as a character, %-S its name, and %-["%u":"."] a
@@ -111,6 +112,38 @@ CLI::Validator wholeNumber(std::uint64_t least) {
     return {check, ""};
 }
 
+// "7", "3-7,9".
+PacketNumbers packetNumbersOf(const std::string &text) {
+    PacketNumbers numbers;
+    numbers.text = text;
+    const char *at = text.data();
+    const char *const end = at + text.size();
+    const auto number = [&](std::uint64_t &into) {
+        const auto [next, error] = std::from_chars(at, end, into);
+        const bool isNumber = error == std::errc() && into != 0;
+        at = next;
+        return isNumber;
+    };
+    for (;;) {
+        PacketNumbers::Range range;
+        bool isSound = number(range.first);
+        range.last = range.first;
+        if (isSound && at != end && *at == '-') {
+            ++at;
+            isSound = number(range.last) && range.last >= range.first;
+        }
+        if (!isSound || (at != end && *at != ',')) {
+            throw CLI::ValidationError("--packet", "'" + text + "' is no list of packet numbers, such as 7 or 3-7,9");
+        }
+        numbers.ranges.push_back(range);
+        numbers.last = std::max(numbers.last, range.last);
+        if (at == end) {
+            return numbers;
+        }
+        ++at;
+    }
+}
+
 Colour colourOf(const std::string &word) {
     static const std::map<std::string, Colour> colours = {
         {"auto", Colour::automatic}, {"always", Colour::always}, {"never", Colour::never}};
@@ -129,15 +162,15 @@ bool isChunk(const std::string &word) {
 }
 
 void addOptions(CLI::App &app, Options &options) {
-    app.add_option("file", options.file, "Capture file (pcap or pcapng, gzip or not); '-' for standard input")
-        ->type_name("FILE")
-        ->required();
+    app.add_option("file,-r,--read", options.file, "Capture file (pcap or pcapng, gzip or not); '-' for standard input")
+        ->type_name("FILE");
     app.add_option("-f,--filter", options.filter, "Only packets that match, in libpcap's language (man pcap-filter)")
         ->type_name("EXPRESSION");
     app.add_option("-c,--count", options.count, "Stop after N packets")->type_name("N")->check(wholeNumber(0));
-    app.add_option("-p,--packet", options.packet, "Only packet number N of the file")
-        ->type_name("N")
-        ->check(wholeNumber(1));
+    app.add_option_function<std::string>(
+           "-p,--packet", [&options](const std::string &text) { options.packets = packetNumbersOf(text); },
+           "Only these packets of the file: 7, or 3-7,9")
+        ->type_name("NUMBERS");
     app.add_flag("--utc", options.utc, "Date and time of day (UTC) instead of seconds since the first packet");
     addPluginOption(app, options);
     app.add_option_function<std::string>(
@@ -212,10 +245,19 @@ std::variant<Options, ExitCode> parseOptions(int argumentCount, char **arguments
             addOptions(*sub, options);
             addOwnOptions(*sub, row.command, options);
         }
-        sub->callback([&options, &row] { options.command = row.command; });
+        sub->callback([&options, &row] {
+            options.command = row.command;
+            if (row.command != Command::fields && options.file.empty()) {
+                throw CLI::RequiredError("file"); // CLI11 would name the option
+            }
+        });
     }
 
     std::vector<std::string> words(arguments + 1, arguments + argumentCount);
+    if (!words.empty() && words.front() == "help") { // as many programs have it
+        std::rotate(words.begin(), words.begin() + 1, words.end());
+        words.back() = "--help";
+    }
     constexpr std::array<std::string_view, 3> forAll = {"--help", "-h", "--version"};
     if (words.empty()) {
         words.emplace_back("--help");

@@ -2,6 +2,7 @@
 // The command line.
 #pragma once
 
+#include <algorithm>
 #include <cstdint>
 #include <filesystem>
 #include <optional>
@@ -19,13 +20,31 @@ enum class FieldsForm : std::uint8_t { text, json, markdown };
 
 enum class Colour : std::uint8_t { automatic, always, never };
 
+// Packets by their numbers, as "3-7,9".
+struct PacketNumbers {
+    struct Range {
+        std::uint64_t first = 0;
+        std::uint64_t last = 0;
+    };
+    std::string text; // empty: all packets
+    std::vector<Range> ranges;
+    std::uint64_t last = 0;
+
+    [[nodiscard]] bool areAll() const { return ranges.empty(); }
+    [[nodiscard]] bool hold(std::uint64_t number) const {
+        return areAll() || std::ranges::any_of(ranges, [number](const Range &range) {
+                   return number >= range.first && number <= range.last;
+               });
+    }
+};
+
 struct Options {
     Command command = Command::summary;
     std::string file;
     std::filesystem::path plugin; // empty: where the command is installed
     std::string filter;
-    std::optional<std::uint64_t> count;  // packets to show at most
-    std::optional<std::uint64_t> packet; // the one packet to show
+    std::optional<std::uint64_t> count; // packets to show at most
+    PacketNumbers packets;              // to show
     Colour colour = Colour::automatic;
     bool utc = false;                 // times of day instead of seconds since the first packet
     bool all = false;                 // summary, detail: nothing left out

@@ -52,7 +52,16 @@ private:
         if (packet.network.isIp() && packet.network.offset != 0) {
             out() << ", IP header at octet " << std::uint64_t{packet.network.offset};
         }
+        if (!captured.interfaceName.empty()) {
+            out() << ", interface ";
+            out().untrusted(captured.interfaceName);
+        }
         out() << '\n';
+        for (const std::string_view comment : captured.comments) {
+            out().start(Style::bold) << "  Comment: ";
+            out().untrusted(comment);
+            out().stop(Style::bold) << '\n';
+        }
     }
 
     Tree tree_;
