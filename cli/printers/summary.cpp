@@ -1,10 +1,16 @@
 // SPDX-License-Identifier: MIT
-// One line a packet, out of the short texts of the TO pass.
+// One line a packet: what matters of it, or with --all the short texts of the TO pass.
+#include <algorithm>
 #include <array>
+#include <optional>
 #include <string_view>
+
+#include <sys/ioctl.h>
+#include <unistd.h>
 
 #include "printers/field_names.h"
 #include "printers/printer.h"
+#include "printers/summary_line.h"
 
 namespace netfloor::cli {
 
@@ -37,65 +43,39 @@ bool isBareNumber(std::string_view text) {
 // also without a text, and data come octet by octet.
 class TextLine final : public Sink {
 public:
-    TextLine(const Options &options, Output &out, const PluginLibrary &library)
-        : showsAll_(options.all), out_(out), names_(library) {}
+    TextLine(Output &out, const PluginLibrary &library) : out_(out), names_(library) {}
 
     void begin(Pass /*pass*/, std::span<const std::uint8_t> /*packet*/) override {
         isFirst_ = true;
-        count_ = 0;
+        isRun_ = false;
     }
 
     void text(const ShortTextView &text) override {
-        if (count_ == 0 || text.displayId != runId_) {
-            endRun();
-            beginRun(text);
-            return;
-        }
-        ++count_;
-        if (!isRunShown_) {
-            return;
-        }
-        if (showsAll_) {
+        if (isRun_ && text.displayId == runId_) {
             out_ << ' ';
             out_.untrusted(text.text.view());
             out_.mayFlush();
-        } else if (count_ <= mostShown) {
-            addOther(text.text.view());
+            return;
         }
+        isRun_ = true;
+        runId_ = text.displayId;
+        writeFirst(names_.find(runId_), text.text.view());
     }
 
     void notCaptured(const NotCaptured &first) override {
-        endRun();
-        isRunShown_ = false;
+        isRun_ = false;
         out_.styled(Style::dim, " | ");
         (out_.start(Style::warning) << first.name << " not captured").stop(Style::warning);
     }
 
     void end(const PassEnd &end) override {
-        endRun();
         if (end.ending == Ending::cutOff) {
             out_.styled(Style::bad, "  [the pass was cut off]");
         }
     }
 
 private:
-    static constexpr std::uint64_t mostShown = 4;
-
-    void beginRun(const ShortTextView &text) {
-        runId_ = text.displayId;
-        count_ = 1;
-        const DisplayName &field = names_.find(runId_);
-        isRunShown_ = showsAll_ || field.isKey;
-        if (isRunShown_) {
-            writeFirst(field, text.text.view());
-        }
-    }
-
     void writeFirst(const DisplayName &field, std::string_view text) {
-        isRunShown_ = showsAll_ || !text.empty();
-        if (!isRunShown_) {
-            return;
-        }
         out_.mayFlush();
         if (!isFirst_) {
             out_.styled(Style::dim, " | ");
@@ -104,57 +84,47 @@ private:
         if (isBareNumber(text)) {
             out_ << field.name << '=';
         }
-        lastText_ = out_.mark();
         out_.untrusted(text);
-        lastSize_ = out_.mark() - lastText_;
     }
 
-    // Another text of the run, unless it repeats the one before.
-    void addOther(std::string_view text) {
-        if (text.empty()) {
-            return;
-        }
-        const Output::Mark before = out_.mark();
-        out_ << ' ';
-        const Output::Mark start = out_.mark();
-        out_.untrusted(text);
-        if (out_.since(start) == out_.since(lastText_).substr(0, lastSize_)) {
-            out_.takeBack(before);
-            return;
-        }
-        lastText_ = start;
-        lastSize_ = out_.mark() - start;
-    }
-
-    void endRun() {
-        if (count_ > mostShown && isRunShown_ && !showsAll_) {
-            (out_.start(Style::dim) << " ... (" << count_ << ')').stop(Style::dim);
-        }
-    }
-
-    bool showsAll_;
     Output &out_;
     FieldNames names_;
     bool isFirst_ = true;
-
+    bool isRun_ = false;
     std::uint32_t runId_ = 0;
-    std::uint64_t count_ = 0; // of the texts of the run; 0 in front of the first run
-    bool isRunShown_ = false;
-    Output::Mark lastText_ = 0; // that was written
-    std::size_t lastSize_ = 0;
 };
+
+// The columns of the terminal, or what a wide one has.
+std::size_t lineWidth() {
+    constexpr std::size_t usual = 160;
+    constexpr std::size_t least = 60;
+    winsize size = {};
+    if (::isatty(STDOUT_FILENO) != 1 || ::ioctl(STDOUT_FILENO, TIOCGWINSZ, &size) != 0 || size.ws_col == 0) {
+        return usual;
+    }
+    return std::max<std::size_t>(size.ws_col, least);
+}
 
 class SummaryPrinter final : public Printer {
 public:
-    SummaryPrinter(const Options &options, Output &out, Host &host)
-        : Printer(options, out, host), line_(options, out, host.library()) {}
+    SummaryPrinter(const Options &options, Output &out, Host &host) : Printer(options, out, host), width_(lineWidth()) {
+        if (options.all) {
+            texts_.emplace(out, host.library());
+        } else {
+            line_.emplace(out, host);
+        }
+    }
 
     void print(const PacketToPrint &packet) override {
+        const Output::Mark start = out().mark();
         printHead(packet);
-        if (packet.network.isIp()) {
-            run(Pass::to, packet, line_);
-        } else {
+        if (!packet.network.isIp()) {
             printOther(packet);
+        } else if (texts_) {
+            run(Pass::to, packet, *texts_);
+        } else {
+            line_->write(packet.network.octets, packet.runOptions());
+            cutLine(start, packet.captured.isCut());
         }
         endLine(packet.captured);
     }
@@ -167,7 +137,23 @@ public:
     }
 
 private:
-    TextLine line_;
+    // With room for the note of the snap length.
+    void cutLine(Output::Mark start, bool hasNote) const {
+        constexpr std::size_t noteWidth = 52;
+        constexpr std::string_view mark = "...";
+        const std::size_t width = width_ - (hasNote ? std::min(noteWidth, width_ / 2) : 0);
+        while (out().since(start).ends_with(' ')) {
+            out().takeBack(out().mark() - 1);
+        }
+        if (out().mark() - start > width) {
+            out().takeBack(start + width - mark.size());
+            out() << mark;
+        }
+    }
+
+    std::size_t width_;
+    std::optional<SummaryLine> line_;
+    std::optional<TextLine> texts_; // --all
 };
 
 } // namespace

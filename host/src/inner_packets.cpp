@@ -302,6 +302,19 @@ std::optional<InnerPacket> findInnerPacket(std::span<const std::uint8_t> packet)
     return std::nullopt;
 }
 
+std::optional<std::uint32_t> upperLayerOctet(std::span<const std::uint8_t> packet) {
+    std::size_t at = 0;
+    Step step = ipv6Step(packet);
+    while (step.octets != 0) {
+        at += step.octets;
+        if (!isExtension(step.next)) {
+            return static_cast<std::uint32_t>(at);
+        }
+        step = extensionStep(step.next, packet.subspan(at));
+    }
+    return std::nullopt;
+}
+
 InnerPackets::InnerPackets(std::span<const std::uint8_t> packet) : octets_(packet), allOctets_(packet.size()) {}
 
 void InnerPackets::next() {

@@ -86,6 +86,7 @@ std::int32_t PacketRun::runPass(Pass pass, Sink &sink, const TestRunOptions *tes
     pass_ = pass;
     sink_ = &sink;
     withBlocks_ = pass == Pass::md && sink.wantsBlocks();
+    withBlockNames_ = sink.wantsBlockNames();
     prepare(test);
     sink.begin(pass, packet_);
     const std::int32_t result = enter();
@@ -354,7 +355,7 @@ void PacketRun::reportField(NamedField &field) {
     } else {
         view_.depth = 0;
         view_.blocks = {};
-        view_.blockName = LazyText(names_.blockName(field, state().blockName));
+        view_.blockName = withBlockNames_ ? LazyText(names_.blockName(field, state().blockName)) : LazyText();
     }
     sink_->field(view_);
 }

@@ -106,7 +106,8 @@ private:
     const OwnerRegistry *owners_ = nullptr;
     Sink *sink_ = nullptr;
     bool withBlocks_ = true; // the sink wants them
-    FieldView view_;         // of the field at hand; to clear a new one takes as long as all else that is done for it
+    bool withBlockNames_ = true;
+    FieldView view_; // of the field at hand; to clear a new one takes as long as all else that is done for it
     RunOptions options_;
     bool followStop_ = true;
     bool isReadToCut_ = false;     // a field was not captured

@@ -74,7 +74,8 @@ TEST_F(Command, shows) {
         // One line a packet, and after them how many were no IP.
         {"netfloor $T/five.pcap",
          0,
-         {" 10.0.0.1 | 192.168.0.2 |", "no IP: ARP", "no IP: LLDP", "5 packets: 2 with IP, 3 without (2 ARP, 1 LLDP)"},
+         {" 10.0.0.1:40000 > 192.168.0.2:53 ", "no IP: ARP", "no IP: LLDP",
+          "5 packets: 2 with IP, 3 without (2 ARP, 1 LLDP)"},
          {},
          {"\x1b"},
          6},
@@ -331,12 +332,7 @@ TEST_F(Command, showsIpv6AddressesInTheirUsualForm) {
         {"netfloor detail $T/ipv6.pcap", 0, {"Source IP Address=210.d08b.0.0.0.0.0.10  (2001:db8::1)\n"}, {}, {}},
         {"netfloor keys --column ip.source $T/ipv6.pcap", 0, {",2001:db8::1\n"}, {}, {}, 2},
         {"netfloor keys --raw --column ip.source $T/ipv6.pcap", 0, {",20010db8000000000000000000000001\n"}, {}, {}, 2},
-        {"netfloor $T/ipv6.pcap",
-         0,
-         {"Version=6 | Payload Length=16 octets | UDP | 210.d08b.0.0.0.0.0.10 | "},
-         {},
-         {},
-         1},
+        {"netfloor $T/ipv6.pcap", 0, {"  UDP       [2001:db8::1]:40000 > [2001:db8::2]:53       len 8\n"}, {}, {}, 1},
     });
 }
 
@@ -393,7 +389,7 @@ TEST_F(Command, findsIpBehindEachLinkLayer) {
         const Outcome outcome = shell("netfloor $T/link.pcap");
         EXPECT_EQ(outcome.exitCode, 0);
         const std::string expected =
-            *link.other == '\0' ? "| 10.0.0.1 | 192.168.0.2 |" : std::string("no IP: ") + link.other;
+            *link.other == '\0' ? " 10.0.0.1:40000 > 192.168.0.2:53 " : std::string("no IP: ") + link.other;
         EXPECT_NE(outcome.out.find(expected), std::string::npos) << outcome.out << outcome.err;
 
         // Cut anywhere, the header is told to be cut, or what is there is decoded: nothing is read beyond.
@@ -509,6 +505,56 @@ TEST_F(Command, decodesRealCaptures) {
         EXPECT_EQ(keys.err + verify.err + detail.err, "");
     }
     EXPECT_GT(seen, 10U);
+}
+
+// What matters of each protocol is in its line, no line of real traffic is longer than a wide terminal, and --all has
+// the texts of the plug-in.
+TEST_F(Command, summaryTellsWhatMatters) {
+    writeFile(
+        "wide.pcap",
+        pcapFile(228,
+                 {{ipv4({.protocol = 6, .payload = hex("1000 0050 00000001 00000002 5018 0200 0000 0000 61*8")})}}));
+    check({
+        {"netfloor $T/wide.pcap",
+         0,
+         {" TCP             10.0.0.1:4096 > 192.168.0.2:80         [P.] seq 1 ack 2 win 512 len 8\n"},
+         {},
+         {},
+         1},
+        {"netfloor --all $T/wide.pcap", 0, {" | TCP | ", " | 10.0.0.1 | 192.168.0.2 | "}, {}, {}, 1},
+        {"netfloor -c 1 $C/tcp-md5-bgp.pcap", 0, {"[S] seq 2672392074 win 16384 len 0 <mss 1440,md5>\n"}, {}, {}, 1},
+        {"netfloor -c 2 $C/tunnel-gre-sample.pcap",
+         0,
+         {"66.59.111.190 > 172.28.2.3 ", " in GRE 172.27.1.66 > 66.59.109.137: Echo id 52072 seq 256\n"},
+         {},
+         {},
+         2},
+        {"netfloor $C/tunnel-ipip-udp.pcap",
+         0,
+         {"10.0.0.1:30000 > 10.0.0.2:13000 ", " in IP 1.2.3.4 > 5.6.7.8: len 4\n"},
+         {},
+         {},
+         1},
+        {"netfloor $C/icmp6-mixed.pcap", 0, {"neighbor solicitation who has fe80::260:97ff:fe07:69ea\n"}, {}, {}},
+        {"netfloor $C/icmp-mpls-ext-ppp.pcap",
+         0,
+         {"Time Exceeded, quotes UDP 12.4.4.4:42315 > 12.1.1.1:33435"},
+         {},
+         {}},
+        {"netfloor $C/sctp-s1ap-sll.pcapng",
+         0,
+         {" DATA tsn 3479891247 stream 0 seq 0 S1AP", " SACK ack 3479891247"},
+         {},
+         {}},
+        {"netfloor $C/ip4-fragments-tcp.pcap", 0, {"  fragment at 144 id 0x425f\n"}, {}, {}},
+        {"netfloor $C/ip6-hop-by-hop-pad1.pcap",
+         0,
+         {"several IPv6 options: what follows them is not read\n"},
+         {},
+         {},
+         1},
+    });
+    EXPECT_EQ(shell("for f in $C/*.pcap*; do netfloor $f; done | awk 'length($0) > 160' | wc -l").out, "0\n");
 }
 
 // No layer and no chunk overwrites another one.

@@ -34,6 +34,10 @@ struct InnerPacket {
 // The IP packet that a GTP-U message carries (TS 29.281), as octets of `message`. None where it carries no packet.
 [[nodiscard]] std::optional<InnerPacket> findInGtpU(std::span<const std::uint8_t> message);
 
+// Where the header after the extension headers of an IPv6 packet starts, by their lengths. The plug-in reads on at
+// another place after an options header with several options. None where a header is cut or a later fragment.
+[[nodiscard]] std::optional<std::uint32_t> upperLayerOctet(std::span<const std::uint8_t> packet);
+
 // The packet itself and then each packet inside the one before.
 class InnerPackets {
 public:

@@ -94,6 +94,7 @@ private:
     };
 
     [[nodiscard]] bool wantsBlocks() const override { return false; }
+    [[nodiscard]] bool wantsBlockNames() const override { return false; }
     void field(const FieldView &field) override;
     void end(const PassEnd &end) override;
 

@@ -200,6 +200,9 @@ public:
     // to find out which blocks are open takes a good part of the MD pass.
     [[nodiscard]] virtual bool wantsBlocks() const { return true; }
 
+    // Asked likewise. Without them, and without blocks, FieldView::blockName is empty.
+    [[nodiscard]] virtual bool wantsBlockNames() const { return true; }
+
     virtual void begin(Pass /*pass*/, std::span<const std::uint8_t> /*packet*/) {}
 
     // MD. Each block that is opened is closed, the last one first, and `depth` blocks are open when one opens. Each
