@@ -84,10 +84,12 @@ std::array<std::string, 256> namesOf(const FieldTables &tables, std::uint32_t id
 SummaryLine::SummaryLine(Output &out, Host &host) : out_(out), view_(host) {
     const FieldTables tables(host.library());
     constexpr std::uint32_t protocolId = 295;
+    constexpr std::uint32_t icmpv6Protocol = 58;
     constexpr std::uint32_t icmpTypeId = 531;
     constexpr std::uint32_t unreachableCodeId = 548;
     constexpr std::uint32_t icmpv6TypeId = 247;
     protocols_ = namesOf(tables, protocolId);
+    protocols_[icmpv6Protocol] = "ICMPv6";
     icmpTypes_ = namesOf(tables, icmpTypeId);
     icmpUnreachable_ = namesOf(tables, unreachableCodeId);
     icmpv6Types_ = namesOf(tables, icmpv6TypeId);
