@@ -167,14 +167,39 @@ typedef struct ValueMapRow {
  */
 
 #if UINTPTR_MAX == 0xffffffffu
-NETFLOOR_RECORD_SIZE(FieldDescriptor, 76);
 NETFLOOR_RECORD_SIZE(ProtocolIdentity, 116);
+NETFLOOR_FIELD_OFFSET(ProtocolIdentity, head, 0);
+NETFLOOR_FIELD_OFFSET(ProtocolIdentity, slots, 16);
+
+NETFLOOR_RECORD_SIZE(FieldDescriptor, 76);
+NETFLOOR_FIELD_OFFSET(FieldDescriptor, flags, 0);
+NETFLOOR_FIELD_OFFSET(FieldDescriptor, fieldId, 4);
+NETFLOOR_FIELD_OFFSET(FieldDescriptor, keyIndex, 8);
+NETFLOOR_FIELD_OFFSET(FieldDescriptor, name, 12);
+NETFLOOR_FIELD_OFFSET(FieldDescriptor, shortName, 16);
+NETFLOOR_FIELD_OFFSET(FieldDescriptor, valueCount, 20);
+NETFLOOR_FIELD_OFFSET(FieldDescriptor, valueStart, 24);
+NETFLOOR_FIELD_OFFSET(FieldDescriptor, width, 28);
+NETFLOOR_FIELD_OFFSET(FieldDescriptor, displayIndex, 32);
+NETFLOOR_FIELD_OFFSET(FieldDescriptor, unused1, 36);
+NETFLOOR_FIELD_OFFSET(FieldDescriptor, templateOffset, 60);
+NETFLOOR_FIELD_OFFSET(FieldDescriptor, unused2, 64);
+
+NETFLOOR_RECORD_SIZE(FieldTableEnd, 76);
+NETFLOOR_FIELD_OFFSET(FieldTableEnd, flags, 0);
+NETFLOOR_FIELD_OFFSET(FieldTableEnd, fieldId, 4);
+NETFLOOR_FIELD_OFFSET(FieldTableEnd, marker, 8);
+NETFLOOR_FIELD_OFFSET(FieldTableEnd, words, 12);
+NETFLOOR_FIELD_OFFSET(FieldTableEnd, counts, 20);
+NETFLOOR_FIELD_OFFSET(FieldTableEnd, width, 28);
+NETFLOOR_FIELD_OFFSET(FieldTableEnd, zero, 32);
+
+NETFLOOR_RECORD_SIZE(ValueMapRow, 12);
+NETFLOOR_FIELD_OFFSET(ValueMapRow, kind, 0);
+NETFLOOR_FIELD_OFFSET(ValueMapRow, poolIndex, 4);
+NETFLOOR_FIELD_OFFSET(ValueMapRow, displayIndex, 8);
 #endif
-#ifdef __cplusplus
-static_assert(sizeof(FieldTableEnd) == sizeof(FieldDescriptor), "the last row is as long as the others");
-#else
-_Static_assert(sizeof(FieldTableEnd) == sizeof(FieldDescriptor), "the last row is as long as the others");
-#endif
+NETFLOOR_ASSERT(sizeof(FieldTableEnd) == sizeof(FieldDescriptor), "the last row is as long as the others");
 
 /*
  * Store the address of a table at `out`, which must not be null, and return NETFLOOR_TABLE_FOUND; or store null and

@@ -12,11 +12,12 @@
  * where a name says "bits" and in octets where it says "octets".
  *
  * The header compiles alone as C11 and as C++20. With 32-bit pointers each record has the size
- * asserted at the end of this page; with 64-bit pointers it widens with its pointers.
+ * and each field the offset asserted at the end of this page; with 64-bit pointers it widens with its pointers.
  */
 #ifndef NETFLOOR_RECORDS_H
 #define NETFLOOR_RECORDS_H
 
+#include <stddef.h>
 #include <stdint.h>
 
 #ifdef __cplusplus
@@ -169,22 +170,105 @@ typedef struct KeyFieldRow {
     uint32_t zero[3];         /* 0, not used */
 } KeyFieldRow;
 
-#if UINTPTR_MAX == 0xffffffffu
 #ifdef __cplusplus
-#define NETFLOOR_RECORD_SIZE(record, octets) static_assert(sizeof(record) == (octets), "a 32-bit host expects " #octets)
+#define NETFLOOR_ASSERT(condition, text) static_assert(condition, text)
 #else
-#define NETFLOOR_RECORD_SIZE(record, octets)                                                                           \
-    _Static_assert(sizeof(record) == (octets), "a 32-bit host expects " #octets)
+#define NETFLOOR_ASSERT(condition, text) _Static_assert(condition, text)
 #endif
+#define NETFLOOR_RECORD_SIZE(record, octets)                                                                           \
+    NETFLOOR_ASSERT(sizeof(record) == (octets), "a 32-bit host expects that " #record " has " #octets " octets")
+#define NETFLOOR_FIELD_OFFSET(record, field, octets)                                                                   \
+    NETFLOOR_ASSERT(offsetof(record, field) == (octets), "a 32-bit host expects " #record "." #field " at " #octets)
+
+#if UINTPTR_MAX == 0xffffffffu
 NETFLOOR_RECORD_SIZE(BitRange, 24);
+NETFLOOR_FIELD_OFFSET(BitRange, value, 0);
+NETFLOOR_FIELD_OFFSET(BitRange, firstBit, 4);
+NETFLOOR_FIELD_OFFSET(BitRange, lastBit, 8);
+NETFLOOR_FIELD_OFFSET(BitRange, flagWord, 12);
+NETFLOOR_FIELD_OFFSET(BitRange, untouched, 16);
+
 NETFLOOR_RECORD_SIZE(FieldRecord, 60);
+NETFLOOR_FIELD_OFFSET(FieldRecord, fieldId, 0);
+NETFLOOR_FIELD_OFFSET(FieldRecord, fieldName, 4);
+NETFLOOR_FIELD_OFFSET(FieldRecord, value, 8);
+NETFLOOR_FIELD_OFFSET(FieldRecord, valueText, 12);
+NETFLOOR_FIELD_OFFSET(FieldRecord, rangeCount, 16);
+NETFLOOR_FIELD_OFFSET(FieldRecord, outputRangeCount, 20);
+NETFLOOR_FIELD_OFFSET(FieldRecord, ranges, 24);
+NETFLOOR_FIELD_OFFSET(FieldRecord, rangeCapacity, 28);
+NETFLOOR_FIELD_OFFSET(FieldRecord, wideStart, 32);
+NETFLOOR_FIELD_OFFSET(FieldRecord, wideBits, 36);
+NETFLOOR_FIELD_OFFSET(FieldRecord, untouched1, 40);
+NETFLOOR_FIELD_OFFSET(FieldRecord, rawFlag, 48);
+NETFLOOR_FIELD_OFFSET(FieldRecord, untouched2, 52);
+
 NETFLOOR_RECORD_SIZE(BitStack, 16);
+NETFLOOR_FIELD_OFFSET(BitStack, base, 0);
+NETFLOOR_FIELD_OFFSET(BitStack, top, 4);
+NETFLOOR_FIELD_OFFSET(BitStack, count, 8);
+NETFLOOR_FIELD_OFFSET(BitStack, capacity, 12);
+
 NETFLOOR_RECORD_SIZE(LayerFrame, 56);
+NETFLOOR_FIELD_OFFSET(LayerFrame, firstBit, 0);
+NETFLOOR_FIELD_OFFSET(LayerFrame, cleared1, 4);
+NETFLOOR_FIELD_OFFSET(LayerFrame, nextLayerKey, 44);
+NETFLOOR_FIELD_OFFSET(LayerFrame, nextLayerProtocol, 48);
+NETFLOOR_FIELD_OFFSET(LayerFrame, cleared2, 52);
+
 NETFLOOR_RECORD_SIZE(LayerInfoRecord, 16);
+NETFLOOR_FIELD_OFFSET(LayerInfoRecord, firstBit, 0);
+NETFLOOR_FIELD_OFFSET(LayerInfoRecord, lastBit, 4);
+NETFLOOR_FIELD_OFFSET(LayerInfoRecord, decoderId, 8);
+NETFLOOR_FIELD_OFFSET(LayerInfoRecord, layerNumber, 12);
+
 NETFLOOR_RECORD_SIZE(DecodeState, 280);
+NETFLOOR_FIELD_OFFSET(DecodeState, data, 0);
+NETFLOOR_FIELD_OFFSET(DecodeState, sourceData, 4);
+NETFLOOR_FIELD_OFFSET(DecodeState, totalBits, 8);
+NETFLOOR_FIELD_OFFSET(DecodeState, cursor, 12);
+NETFLOOR_FIELD_OFFSET(DecodeState, reserved1, 16);
+NETFLOOR_FIELD_OFFSET(DecodeState, bitsLeft, 20);
+NETFLOOR_FIELD_OFFSET(DecodeState, flags, 24);
+NETFLOOR_FIELD_OFFSET(DecodeState, blockStarts, 28);
+NETFLOOR_FIELD_OFFSET(DecodeState, limits, 44);
+NETFLOOR_FIELD_OFFSET(DecodeState, condition, 60);
+NETFLOOR_FIELD_OFFSET(DecodeState, advance, 64);
+NETFLOOR_FIELD_OFFSET(DecodeState, reserved2, 68);
+NETFLOOR_FIELD_OFFSET(DecodeState, blockName, 72);
+NETFLOOR_FIELD_OFFSET(DecodeState, scratch, 76);
+NETFLOOR_FIELD_OFFSET(DecodeState, fieldRecord, 204);
+NETFLOOR_FIELD_OFFSET(DecodeState, layerFrames, 264);
+NETFLOOR_FIELD_OFFSET(DecodeState, layerHandedOff, 268);
+NETFLOOR_FIELD_OFFSET(DecodeState, layerIndex, 272);
+NETFLOOR_FIELD_OFFSET(DecodeState, layerCapacity, 276);
+
 NETFLOOR_RECORD_SIZE(PreDecodeContext, 40);
+NETFLOOR_FIELD_OFFSET(PreDecodeContext, bitsLeft, 0);
+NETFLOOR_FIELD_OFFSET(PreDecodeContext, layerNumber, 4);
+NETFLOOR_FIELD_OFFSET(PreDecodeContext, decoderId, 8);
+NETFLOOR_FIELD_OFFSET(PreDecodeContext, verdict, 12);
+NETFLOOR_FIELD_OFFSET(PreDecodeContext, fieldRecords, 16);
+NETFLOOR_FIELD_OFFSET(PreDecodeContext, fieldRecordCount, 20);
+NETFLOOR_FIELD_OFFSET(PreDecodeContext, layerInfo, 24);
+NETFLOOR_FIELD_OFFSET(PreDecodeContext, layerInfoCount, 28);
+NETFLOOR_FIELD_OFFSET(PreDecodeContext, layerInfoCapacity, 32);
+NETFLOOR_FIELD_OFFSET(PreDecodeContext, decodeState, 36);
+
 NETFLOOR_RECORD_SIZE(XtrContext, 16);
+NETFLOOR_FIELD_OFFSET(XtrContext, bitsLeft, 0);
+NETFLOOR_FIELD_OFFSET(XtrContext, keyRecord, 4);
+NETFLOOR_FIELD_OFFSET(XtrContext, byteAreaOffset, 8);
+NETFLOOR_FIELD_OFFSET(XtrContext, byteAreaSize, 10);
+NETFLOOR_FIELD_OFFSET(XtrContext, decodeState, 12);
+
 NETFLOOR_RECORD_SIZE(KeyFieldRow, 32);
+NETFLOOR_FIELD_OFFSET(KeyFieldRow, presenceOffset, 0);
+NETFLOOR_FIELD_OFFSET(KeyFieldRow, valueOffset, 4);
+NETFLOOR_FIELD_OFFSET(KeyFieldRow, presenceMask, 8);
+NETFLOOR_FIELD_OFFSET(KeyFieldRow, protocolName, 12);
+NETFLOOR_FIELD_OFFSET(KeyFieldRow, fieldName, 16);
+NETFLOOR_FIELD_OFFSET(KeyFieldRow, zero, 20);
 #endif
 
 #ifdef __cplusplus
