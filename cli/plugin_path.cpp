@@ -13,7 +13,7 @@ std::filesystem::path findPlugin(const std::filesystem::path &asked) {
     }
     std::error_code ignored;
     const auto folder = std::filesystem::read_symlink("/proc/self/exe", ignored).parent_path();
-    const auto place = (folder / NETFLOOR_OWN_PLUGIN).lexically_normal();
+    auto place = (folder / NETFLOOR_OWN_PLUGIN).lexically_normal();
     if (!std::filesystem::exists(place, ignored)) {
         throw PluginError("the plug-in was not found at " + place.string() +
                           ". Build it, or name it with --plugin PATH.");
