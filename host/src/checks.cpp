@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <array>
+#include <charconv>
 
 #include "checksum.h"
 #include "packet_walk.h"
@@ -40,18 +41,35 @@ std::span<const Fault> PacketChecks::check(std::span<const std::uint8_t> packet,
     return faults_;
 }
 
-std::string faultText(const Fault &fault) {
-    std::string text = (fault.isQuoted ? "quoted " : "") + std::string(fault.protocol) + ": ";
-    std::uint32_t number = fault.first;
-    for (const char character : fault.text) {
-        if (character != '#') {
-            text += character;
-            continue;
+namespace {
+
+void appendNumber(std::string &text, std::uint32_t number) {
+    std::array<char, 10> digits;
+    text.append(digits.data(), std::to_chars(digits.data(), digits.data() + digits.size(), number).ptr);
+}
+
+} // namespace
+
+void appendFaultText(std::string &text, const Fault &fault) {
+    text.append(fault.isQuoted ? "quoted " : "").append(fault.protocol).append(": ");
+    std::string_view rest = fault.text;
+    for (const std::uint32_t number : {fault.first, fault.second}) {
+        const std::size_t place = rest.find('#');
+        if (place == std::string_view::npos) {
+            break;
         }
-        text += std::to_string(number);
-        number = fault.second;
+        text += rest.substr(0, place);
+        appendNumber(text, number);
+        rest.remove_prefix(place + 1);
     }
-    return text + ", at octet " + std::to_string(fault.octet);
+    text.append(rest).append(", at octet ");
+    appendNumber(text, fault.octet);
+}
+
+std::string faultText(const Fault &fault) {
+    std::string text;
+    appendFaultText(text, fault);
+    return text;
 }
 
 bool PacketWalk::hasHeader(std::string_view protocol, std::size_t at, std::size_t end, std::size_t count) {
