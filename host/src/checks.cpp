@@ -96,7 +96,7 @@ void PacketWalk::ip(std::size_t at, std::size_t end) {
 }
 
 void PacketWalk::ipv4(std::size_t at, std::size_t end) {
-    const std::size_t headerOctets = (u8(at) & 0xfU) * 4;
+    const std::size_t headerOctets = std::size_t{u8(at) & 0xfU} * 4;
     if (headerOctets < ipv4Octets) {
         return damage("IPv4", "the header length is # octets, and # is the least", at, headerOctets, ipv4Octets);
     }
@@ -217,11 +217,11 @@ void PacketWalk::extensionHeaders(Payload payload, std::size_t first) {
         if (type == protocolHopByHop && at != first + ipv6Octets) {
             damage("IPv6", "a hop-by-hop header is not the first one", at);
         }
-        std::size_t octets = (u8(at + 1) + 1) * 8;
+        std::size_t octets = (std::size_t{u8(at + 1)} + 1) * 8;
         if (type == protocolFragment) {
             octets = 8;
         } else if (type == protocolAuthentication) {
-            octets = (u8(at + 1) + 2) * 4;
+            octets = (std::size_t{u8(at + 1)} + 2) * 4;
             if (octets < 12) {
                 return damage("IPv6", "the authentication header has # octets, and # is the least", at + 1, octets, 12);
             }
