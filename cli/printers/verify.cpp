@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <array>
 #include <span>
+#include <string>
 #include <string_view>
 
 #include "findings.h"
@@ -98,19 +99,19 @@ private:
 
     void judge(const PacketToPrint &packet) {
         run(Pass::mv, packet, outcome_);
-        findings_ = {};
-        if (outcome_.verdict.fault()) {
-            findings_ = explainer_.explain(outcome_.verdict.flags, host(), packet.network.octets, packet.runOptions());
-        }
         faults_ = checks_.check(packet.network.octets, packet.runOptions().wireOctets);
         const auto has = [this](FaultKind kind) {
             return std::ranges::find(faults_, kind, &Fault::kind) != faults_.end();
         };
-        checked_ = has(FaultKind::damage) ? PacketVerdict::damaged : PacketVerdict::good;
-        plugin_ = verdictOf(outcome_, findings_, packet.captured.isCut());
-        if (plugin_ >= PacketVerdict::unread && has(FaultKind::misread)) {
-            plugin_ = PacketVerdict::misread;
+        // Flags that come from a wrong place need no explanation, which takes a pass of its own.
+        const bool isMisread =
+            outcome_.ending == Ending::complete && outcome_.verdict.fault() && has(FaultKind::misread);
+        findings_ = {};
+        if (outcome_.verdict.fault() && (!isMisread || options().all)) {
+            findings_ = explainer_.explain(outcome_.verdict.flags, host(), packet.network.octets, packet.runOptions());
         }
+        checked_ = has(FaultKind::damage) ? PacketVerdict::damaged : PacketVerdict::good;
+        plugin_ = isMisread ? PacketVerdict::misread : verdictOf(outcome_, findings_, packet.captured.isCut());
         ++pluginCounts_[static_cast<std::size_t>(plugin_)];
         ++checkedCounts_[static_cast<std::size_t>(checked_)];
     }
@@ -146,7 +147,9 @@ private:
 
     void printFault(const Fault &fault) {
         const Style style = fault.kind == FaultKind::damage ? Style::bad : Style::dim;
-        (out().start(style) << faultText(fault)).stop(style);
+        text_.clear();
+        appendFaultText(text_, fault);
+        (out().start(style) << text_).stop(style);
         out() << "  ";
     }
 
@@ -190,6 +193,7 @@ private:
     std::uint64_t damaged_ = 0;
 
     // Of the packet.
+    std::string text_;
     Outcome outcome_;
     std::span<const Finding> findings_;
     std::span<const Fault> faults_;

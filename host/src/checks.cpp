@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <array>
+#include <charconv>
 
 #include "checksum.h"
 #include "packet_walk.h"
@@ -40,18 +41,35 @@ std::span<const Fault> PacketChecks::check(std::span<const std::uint8_t> packet,
     return faults_;
 }
 
-std::string faultText(const Fault &fault) {
-    std::string text = (fault.isQuoted ? "quoted " : "") + std::string(fault.protocol) + ": ";
-    std::uint32_t number = fault.first;
-    for (const char character : fault.text) {
-        if (character != '#') {
-            text += character;
-            continue;
+namespace {
+
+void appendNumber(std::string &text, std::uint32_t number) {
+    std::array<char, 10> digits;
+    text.append(digits.data(), std::to_chars(digits.data(), digits.data() + digits.size(), number).ptr);
+}
+
+} // namespace
+
+void appendFaultText(std::string &text, const Fault &fault) {
+    text.append(fault.isQuoted ? "quoted " : "").append(fault.protocol).append(": ");
+    std::string_view rest = fault.text;
+    for (const std::uint32_t number : {fault.first, fault.second}) {
+        const std::size_t place = rest.find('#');
+        if (place == std::string_view::npos) {
+            break;
         }
-        text += std::to_string(number);
-        number = fault.second;
+        text += rest.substr(0, place);
+        appendNumber(text, number);
+        rest.remove_prefix(place + 1);
     }
-    return text + ", at octet " + std::to_string(fault.octet);
+    text.append(rest).append(", at octet ");
+    appendNumber(text, fault.octet);
+}
+
+std::string faultText(const Fault &fault) {
+    std::string text;
+    appendFaultText(text, fault);
+    return text;
 }
 
 bool PacketWalk::hasHeader(std::string_view protocol, std::size_t at, std::size_t end, std::size_t count) {
@@ -78,7 +96,7 @@ void PacketWalk::ip(std::size_t at, std::size_t end) {
 }
 
 void PacketWalk::ipv4(std::size_t at, std::size_t end) {
-    const std::size_t headerOctets = (u8(at) & 0xfU) * 4;
+    const std::size_t headerOctets = std::size_t{u8(at) & 0xfU} * 4;
     if (headerOctets < ipv4Octets) {
         return damage("IPv4", "the header length is # octets, and # is the least", at, headerOctets, ipv4Octets);
     }
@@ -199,11 +217,11 @@ void PacketWalk::extensionHeaders(Payload payload, std::size_t first) {
         if (type == protocolHopByHop && at != first + ipv6Octets) {
             damage("IPv6", "a hop-by-hop header is not the first one", at);
         }
-        std::size_t octets = (u8(at + 1) + 1) * 8;
+        std::size_t octets = (std::size_t{u8(at + 1)} + 1) * 8;
         if (type == protocolFragment) {
             octets = 8;
         } else if (type == protocolAuthentication) {
-            octets = (u8(at + 1) + 2) * 4;
+            octets = (std::size_t{u8(at + 1)} + 2) * 4;
             if (octets < 12) {
                 return damage("IPv6", "the authentication header has # octets, and # is the least", at + 1, octets, 12);
             }

@@ -110,8 +110,8 @@ private:
     FieldView view_; // of the field at hand; to clear a new one takes as long as all else that is done for it
     RunOptions options_;
     bool followStop_ = true;
-    bool isReadToCut_ = false;     // a field was not captured
-    std::uint32_t soundFlags_ = 0; // MV: those that were raised before
+    bool isReadToCut_ = false;             // a field was not captured
+    std::uint32_t soundFlags_ = 0;         // MV: those that were raised before
     std::span<const std::uint8_t> packet_; // as far as an IP header can reach
     std::uint32_t bitsBeyond_ = 0;         // what the packet holds after that
     DecodeState *state_ = nullptr;

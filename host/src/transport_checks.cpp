@@ -208,9 +208,9 @@ void PacketWalk::multicastRecords(std::size_t at, std::size_t end) {
     constexpr std::size_t recordHead = 20;
     std::size_t record = at + 8;
     for (std::uint32_t left = u16(at + 6); left != 0; --left) {
-        const std::size_t octets = record + recordHead <= end
-                                       ? recordHead + 16 * u16(record + 2) + std::size_t{4} * u8(record + 1)
-                                       : recordHead;
+        const std::size_t octets = record + recordHead <= end ? recordHead + std::size_t{16} * u16(record + 2) +
+                                                                    std::size_t{4} * u8(record + 1)
+                                                              : recordHead;
         if (record + octets > end) {
             return damage("ICMPv6", "a multicast record ends # octets after the packet", record, record + octets - end);
         }

@@ -34,6 +34,8 @@ struct Fault {
 
 // "TCP: the data offset is 16 octets, and 20 is the least, at octet 32"
 [[nodiscard]] std::string faultText(const Fault &fault);
+// The same into a text whose room is kept.
+void appendFaultText(std::string &text, const Fault &fault);
 
 class PacketChecks {
 public:
