@@ -2,6 +2,7 @@
 // The field step: how a field is read, stored and reported. And the peek, which does neither.
 #pragma once
 
+#include <algorithm>
 #include <cstdint>
 #include <optional>
 #include <type_traits>
@@ -129,11 +130,28 @@ NETFLOOR_INLINE inline void readRun(Reader<Pass> &reader, std::int32_t units) {
     step<field>(reader, static_cast<std::uint32_t>(units), Unstored{});
 }
 
+// Goes over up to `most` fields of one declaration that no host can see: where the host is not called for each field,
+// it sees the last one alone, and so does the key record. Gives how many they were. The last one that fits is left.
+template <const Field &field, class Pass>
+[[nodiscard]] NETFLOOR_INLINE inline std::int32_t skipUnseen(Reader<Pass> &reader, std::int32_t most) {
+    constexpr std::uint32_t bitCount = neededBits<field>;
+    static_assert(field.place.isTested() && bitCount == field.place.advance, "these fields must follow one another");
+    const bool callsHost = Pass::reportsFields || reader.state->fieldRecord.rangeCapacity <= mostFixedElements;
+    if (callsHost || most < 2 || reader.left < 2 * bitCount) {
+        return 0;
+    }
+    const std::uint32_t skipped = std::min(static_cast<std::uint32_t>(most), reader.left / bitCount) - 1;
+    reader.cursor += skipped * bitCount;
+    reader.left -= skipped * bitCount;
+    return static_cast<std::int32_t>(skipped);
+}
+
 // Reads a field again and again, up to `count` times, as long as its bits are left. Gives how often it was read.
 template <const Field &field, class Pass>
 NETFLOOR_INLINE inline std::int32_t readRepeated(Reader<Pass> &reader, std::int32_t count) {
     std::int32_t seen = 0;
     while (reader.live && seen < count) {
+        seen += skipUnseen<field>(reader, count - seen);
         read<field>(reader);
         seen += reader.live ? 1 : 0;
     }
