@@ -19,6 +19,7 @@
 #include "plugin_path.h"
 #include "printers/printer.h"
 #include "progress.h"
+#include "where.h"
 
 namespace netfloor::cli {
 
@@ -62,6 +63,10 @@ public:
         if (!options.filter.empty()) {
             filter_.emplace(options.filter);
         }
+        if (!options.where.empty()) {
+            condition_.emplace(parseWhere(options.where));
+            layers_.emplace(host_);
+        }
     }
 
     ExitCode run() {
@@ -99,7 +104,7 @@ public:
             throw UsageError("--packet " + options_.packets.text +
                              (read_ < options_.packets.last
                                   ? ": the capture has only " + countText(read_, "packet") + "."
-                                  : " does not match the filter."));
+                                  : " does not match the filter or the condition."));
         }
         if (read_ == 0 && options_.count != std::uint64_t{0}) {
             std::cerr << "netfloor: " << capture_.name() << " holds no packets.\n";
@@ -114,9 +119,7 @@ private:
             read_ = packet.number;
             times_.see(packet);
             if (options_.packets.hold(packet.number) && (!filter_ || filter_->passes(packet))) {
-                const NetworkPart network = findNetworkPart(packet.linkType, packet.octets);
-                printer_->print({packet, network, tally_.add(network), times_.text(packet)});
-                out_.endPacket();
+                print(packet);
             }
             if (packet.number == options_.packets.last) {
                 return;
@@ -125,10 +128,29 @@ private:
         }
     }
 
+    void print(const CapturedPacket &packet) {
+        const NetworkPart network = findNetworkPart(packet.linkType, packet.octets);
+        if (condition_ && !meetsCondition({packet, network, {}, {}})) {
+            return;
+        }
+        printer_->print({packet, network, tally_.add(network), times_.text(packet)});
+        out_.endPacket();
+    }
+
+    [[nodiscard]] bool meetsCondition(const PacketToPrint &packet) {
+        if (!packet.network.isIp()) {
+            return false;
+        }
+        layers_->read(packet.network.octets, packet.runOptions());
+        return condition_->holdsFor(*layers_);
+    }
+
     const Options &options_;
     CaptureFile capture_;
     std::optional<PacketFilter> filter_;
     Host host_;
+    std::optional<Condition> condition_;
+    std::optional<LayerView> layers_; // for the condition
     Output out_;
     std::unique_ptr<Printer> printer_;
     TimeText times_;

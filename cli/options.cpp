@@ -166,6 +166,9 @@ void addOptions(CLI::App &app, Options &options) {
         ->type_name("FILE");
     app.add_option("-f,--filter", options.filter, "Only packets that match, in libpcap's language (man pcap-filter)")
         ->type_name("EXPRESSION");
+    app.add_option("--where", options.where,
+                   "Only packets with a layer for which this holds: 'sctp.chunk_type == 6 and ip.ttl < 5'")
+        ->type_name("CONDITION");
     app.add_option("-c,--count", options.count, "Stop after N packets")->type_name("N")->check(wholeNumber(0));
     app.add_option_function<std::string>(
            "-p,--packet", [&options](const std::string &text) { options.packets = packetNumbersOf(text); },

@@ -3,12 +3,14 @@
 // one IPv4 header and TCP or UDP: these are read by XTR, where all columns are key fields, which takes half the time.
 #include <algorithm>
 #include <array>
+#include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
 
 #include "printers/key_columns.h"
 #include "printers/printer.h"
+#include "where.h"
 
 namespace netfloor::cli {
 
@@ -109,6 +111,9 @@ public:
           rows_(out, columns_, options.raw),
           plain_(keyFieldNames(host), columns_),
           view_(host) {
+        if (!options.where.empty()) {
+            condition_.emplace(parseWhere(options.where));
+        }
         out << "packet,time,length,layer,tunnel,note";
         for (const KeyColumn &column : columns_) {
             out << ',' << column.name;
@@ -156,10 +161,18 @@ private:
             if (layer.kind != (options().perChunk ? LayerKind::chunk : LayerKind::ip)) {
                 continue;
             }
+            if (condition_ && !meetsCondition(layer)) {
+                continue;
+            }
             startRow(packet, layer.ipLayer, tunnelOf(layer), note);
             rows_.write(view_, layer.ipLayer, options().perChunk ? &layer : nullptr);
             out() << '\n';
         }
+    }
+
+    [[nodiscard]] bool meetsCondition(const Layer &layer) const {
+        return layer.kind == LayerKind::chunk ? condition_->holdsFor(view_, layer.ipLayer, &layer)
+                                              : condition_->holdsFor(view_, layer.ipLayer);
     }
 
     // How the IP layer came into the one before.
@@ -203,6 +216,7 @@ private:
     KeyRows rows_;
     PlainKeys plain_;
     LayerView view_;
+    std::optional<Condition> condition_; // of the rows
     std::string note_;
 };
 
