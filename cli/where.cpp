@@ -16,7 +16,7 @@ Condition parseWhere(const std::string &text) {
         std::string line = text;
         std::ranges::replace_if(
             line, [](unsigned char c) { return c < ' ' || c == 0x7f; }, ' ');
-        throw UsageError(std::string("--where: ") + error.what() + ".\n    " + line + "\n    " +
+        throw UsageError(std::string("--where: ") + error.what() + "\n    " + line + "\n    " +
                          std::string(error.place(), ' ') + std::string(error.length(), '^'));
     }
 }

@@ -54,6 +54,12 @@ constexpr bool isTransport(LayerKind kind) {
            kind == LayerKind::icmpv6 || kind == LayerKind::gre || kind == LayerKind::security;
 }
 
+// Whether the plug-in reads the header of an IP protocol: ICMP, TCP, UDP, GRE, ICMPv6 or SCTP.
+constexpr bool isCarried(std::uint32_t protocol) {
+    constexpr std::array<std::uint32_t, 6> protocols = {1, 6, 17, 47, 58, 132};
+    return std::ranges::find(protocols, protocol) != protocols.end();
+}
+
 // "ICMP Router Solicitation Message" without what all have.
 std::string withoutMessage(std::string name) {
     constexpr std::string_view front = "ICMP ";
@@ -122,6 +128,9 @@ void SummaryLine::write(std::span<const std::uint8_t> packet, const RunOptions &
         writeCarried(*ip, *carried);
     } else if (isWrong) {
         out_ << " several IPv6 options: what follows them is not read";
+    } else if (const auto protocol = view_.number(*ip, layerField("ip.protocol")); protocol && isCarried(*protocol)) {
+        out_ << (view_.number(*ip, layerField("ip.fragment_offset")).value_or(0) == 0 ? " its header is cut short"
+                                                                                      : "");
     }
     if (!view_.limit().empty()) {
         out_ << "  [" << view_.limit() << ']';

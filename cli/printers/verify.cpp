@@ -117,6 +117,8 @@ private:
     }
 
     void printVerdicts() {
+        const Output::Mark start = out().mark();
+        isFirstNote_ = true;
         for (const PacketVerdict verdict : {plugin_, checked_}) {
             const VerdictWords &shown = wordsOf(verdict);
             out().styled(shown.style, shown.verdict);
@@ -126,31 +128,42 @@ private:
             printFault(fault);
         }
         if (outcome_.ending == Ending::cutOff) {
-            out() << "the pass was cut off  ";
+            startNote();
+            out() << "the pass was cut off";
         }
         for (const Finding &finding : findings_) {
             if (finding.kind == FindingKind::byDesign && !options().all) {
                 continue;
             }
+            startNote();
             out() << "plug-in: 0x" << Hex{finding.flag} << ' ';
             explainer_.write(out(), finding);
             if (finding.kind == FindingKind::byDesign) {
                 out().styled(Style::dim, " (by design)");
             }
-            out() << "  ";
         }
         if (outcome_.bitsLeft != 0) {
+            startNote();
             (out().start(Style::dim) << "plug-in: ").count(outcome_.bitsLeft / 8, "octet") << " not decoded";
             out().stop(Style::dim);
         }
+        // The column of the second verdict is the last one where there is no note.
+        while (out().since(start).ends_with(' ')) {
+            out().takeBack(out().mark() - 1);
+        }
+    }
+
+    void startNote() {
+        out() << (isFirstNote_ ? "" : "; ");
+        isFirstNote_ = false;
     }
 
     void printFault(const Fault &fault) {
         const Style style = fault.kind == FaultKind::damage ? Style::bad : Style::dim;
         text_.clear();
         appendFaultText(text_, fault);
+        startNote();
         (out().start(style) << text_).stop(style);
-        out() << "  ";
     }
 
     void printCounts(std::string_view column, const Counts &counts) {
@@ -199,6 +212,7 @@ private:
     std::span<const Fault> faults_;
     PacketVerdict plugin_ = PacketVerdict::good;
     PacketVerdict checked_ = PacketVerdict::good;
+    bool isFirstNote_ = true;
 };
 
 } // namespace

@@ -23,7 +23,9 @@ command -v abidiff >/dev/null || { echo "abidiff is missing (abigail-tools)"; ex
     # Each declared function, with a body.
     cat "$include"/netfloor/*.h | tr '\n' ' ' | grep -o '[a-z0-9_]*[ *]*NETFLOOR_CDECL [A-Za-z_]*([^)]*);' | sed 's/;$/ { for (;;) {} }/'
 } >"$work/boundary.c"
-"$cc" -std=c11 -g -w -fPIC -shared -I"$include" -o "$work/libboundary.so" "$work/boundary.c"
+include=$(cd "$include" && pwd)
+# In its own folder, so that the description has no other path.
+(cd "$work" && "$cc" -std=c11 -g -w -fPIC -shared -I"$include" -o libboundary.so boundary.c)
 nm -D --defined-only "$plugin" | awk '{ print $3 }' | while read -r name; do
     nm -D --defined-only "$work/libboundary.so" | grep -q " $name\$" || { echo "$name is exported and not declared"; exit 1; }
 done
