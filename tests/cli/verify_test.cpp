@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: MIT
-// The damaged packets of the captures, as tcpdump and tshark name them too, and no others.
+// The damaged packets of the captures, and no others. tcpdump or tshark name all of them but three, which say why.
 #include <filesystem>
-#include <regex>
 #include <set>
 #include <sstream>
 #include <string>
@@ -16,7 +15,7 @@ namespace {
 TEST(Verify, callsDamagedWhatIsDamaged) {
     const std::set<std::string> known = {
         "ip4-header-length-invalid.pcap 1",
-        "ip6-malformed-fragments.pcap 11", // a fragment of no whole units
+        "ip6-malformed-fragments.pcap 11", // a fragment of no whole units, which tshark lets pass
         "ip6-next-header-malformed.pcap 1",
         "ip6-zero-length-ah.pcap 5", // octets where tshark shows an authentication header without a word on it
         "malformed-too-small.pcap 1",
@@ -28,7 +27,7 @@ TEST(Verify, callsDamagedWhatIsDamaged) {
         "malformed-too-small.pcap 7",
         "malformed-too-small.pcap 8",
         "malformed-truncated-header.pcap 1",
-        "sctp-over-ipv6.pcap 1", // a checksum that a test wrote
+        "sctp-over-ipv6.pcap 1", // a checksum that a test wrote; tshark does not check it unless asked
         "sctp-too-small.pcap 1",
         "tcp-urgent-loopback.pcap 8",
         "tcp-urgent-loopback.pcap 11",
@@ -38,7 +37,6 @@ TEST(Verify, callsDamagedWhatIsDamaged) {
         "tcp-urgent-loopback.pcap 56",
         "tcp-urgent-loopback.pcap 59",
     };
-    const std::regex damaged("^ *([0-9]+) .* DAMAGED ");
     std::set<std::string> found;
     for (const auto &entry : std::filesystem::directory_iterator(NETFLOOR_CAPTURES)) {
         if (entry.path().extension() == ".md") {
@@ -47,10 +45,11 @@ TEST(Verify, callsDamagedWhatIsDamaged) {
         const Outcome outcome = shell("netfloor verify --bad '" + entry.path().string() + "'");
         std::istringstream lines(outcome.out);
         std::string line;
-        std::smatch match;
         while (std::getline(lines, line)) {
-            if (std::regex_search(line, match, damaged)) {
-                found.insert(entry.path().filename().string() + " " + match.str(1));
+            if (line.find(" DAMAGED ") != std::string::npos) {
+                std::string number;
+                std::istringstream(line) >> number;
+                found.insert(entry.path().filename().string() + " " + number);
             }
         }
     }
