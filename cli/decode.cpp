@@ -12,6 +12,7 @@
 
 #include "interrupt.h"
 #include "netfloor-capture/capture_file.h"
+#include "netfloor-capture/capture_writer.h"
 #include "netfloor-capture/filter.h"
 #include "netfloor-capture/link_layer.h"
 #include "netfloor-capture/time_text.h"
@@ -67,6 +68,9 @@ public:
             condition_.emplace(parseWhere(options.where));
             layers_.emplace(host_);
         }
+        if (!options.write.empty()) {
+            openWriter();
+        }
     }
 
     ExitCode run() {
@@ -83,6 +87,9 @@ public:
         progress_.reset(); // what follows stands on a clean line
         if (filter_ && filter_->refusedAll()) {
             throw UsageError(refusedText(options_.filter, *filter_));
+        }
+        if (writer_) {
+            writer_->finish();
         }
         printer_->finish(tally_);
         out_.flush();
@@ -113,6 +120,14 @@ public:
     }
 
 private:
+    void openWriter() {
+        std::error_code error; // one that does not exist is another file
+        if (std::filesystem::equivalent(options_.file, options_.write, error)) {
+            throw UsageError("--write " + options_.write.string() + " is the capture that is read. Name another file.");
+        }
+        writer_.emplace(options_.write);
+    }
+
     void readPackets() {
         CapturedPacket packet;
         while (!isInterrupted() && (!options_.count || tally_.packets < *options_.count) && capture_.next(packet)) {
@@ -133,6 +148,9 @@ private:
         if (condition_ && !meetsCondition({packet, network, {}, {}})) {
             return;
         }
+        if (writer_) {
+            writer_->write(packet);
+        }
         printer_->print({packet, network, tally_.add(network), times_.text(packet)});
         out_.endPacket();
     }
@@ -149,6 +167,7 @@ private:
     CaptureFile capture_;
     std::optional<PacketFilter> filter_;
     Host host_;
+    std::optional<CaptureWriter> writer_;
     std::optional<Condition> condition_;
     std::optional<LayerView> layers_; // for the condition
     Output out_;

@@ -83,6 +83,8 @@ int runCommand(int argumentCount, char **arguments) {
         return fail(ExitCode::usage, error.what());
     } catch (const CaptureError &error) {
         return fail(ExitCode::noCapture, error.what());
+    } catch (const CaptureWriteError &error) {
+        return fail(ExitCode::noOutput, error.what());
     } catch (const PluginError &error) {
         return fail(ExitCode::noPlugin, error.what());
     } catch (const OutputError &error) {

@@ -166,6 +166,8 @@ void addOptions(CLI::App &app, Options &options) {
         ->type_name("FILE");
     app.add_option("-f,--filter", options.filter, "Only packets that match, in libpcap's language (man pcap-filter)")
         ->type_name("EXPRESSION");
+    app.add_option("--write", options.write, "Keep the packets that are shown, unchanged, in this pcapng file")
+        ->type_name("OUT");
     app.add_option("--where", options.where,
                    "Only packets with a layer for which this holds: 'sctp.chunk_type == 6 and ip.ttl < 5'")
         ->type_name("CONDITION");

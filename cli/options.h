@@ -43,6 +43,7 @@ struct Options {
     std::string file;
     std::filesystem::path plugin; // empty: where the command is installed
     std::string filter;
+    std::filesystem::path write;        // the packets that pass, into this file
     std::string where;                  // a condition on the layers
     std::optional<std::uint64_t> count; // packets to show at most
     PacketNumbers packets;              // to show

@@ -28,6 +28,12 @@ private:
     std::uint64_t position_;
 };
 
+// A capture that is being written ends here.
+class CaptureWriteError : public std::runtime_error {
+public:
+    using std::runtime_error::runtime_error;
+};
+
 // A filter expression has no meaning, or there is no libpcap to compile it.
 class FilterError : public std::runtime_error {
 public:
