@@ -73,7 +73,7 @@ tests_in_state() { grep -c "<testcase .*status=\"$1\"" "$work/tests.xml"; }
 run_tests() {
     say "testing: $1"
     rm -f "$work/tests.xml"
-    ctest --preset "$1" --no-tests=error --output-junit "$work/tests.xml" >"$work/log" 2>&1
+    ctest --preset "$1" --timeout 120 --no-tests=error --output-junit "$work/tests.xml" >"$work/log" 2>&1
     local status=$?
     [ $status -eq 0 ] || grep -vE '^ *(Start|[0-9]+/[0-9]+ Test .* Passed)' "$work/log" | tail -n 100
     if [ ! -s "$work/tests.xml" ]; then

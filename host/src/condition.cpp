@@ -8,11 +8,7 @@
 #include <optional>
 #include <utility>
 
-#ifdef _WIN32
-#include <ws2tcpip.h>
-#else
-#include <arpa/inet.h>
-#endif
+#include "address_parser.h"
 
 namespace netfloor {
 namespace {
@@ -322,11 +318,11 @@ private:
     Condition::Prefix parsePrefix() {
         const std::string_view text = word_.text;
         const std::size_t slash = std::min(text.find('/'), text.size());
-        const std::string address(text.substr(0, slash));
+        const std::string_view address = text.substr(0, slash);
         Condition::Prefix prefix;
-        if (::inet_pton(AF_INET, address.c_str(), prefix.octets.data()) == 1) {
+        if (parseIpv4(address, std::span(prefix.octets).first<4>())) {
             prefix.octetCount = 4;
-        } else if (::inet_pton(AF_INET6, address.c_str(), prefix.octets.data()) == 1) {
+        } else if (parseIpv6(address, prefix.octets)) {
             prefix.octetCount = 16;
         } else {
             fail(text.empty() ? "an address is missing here"

@@ -87,11 +87,19 @@ Octets withHeader(Octets packet, std::size_t at, std::uint8_t octet) {
     return packet;
 }
 
+// Not every build has CRC-32c, and says so of each packet with SCTP.
+bool isOfBuild(const Fault &fault) {
+    return fault.text.starts_with("the checksum is not checked: this build");
+}
+
 std::string faultsOf(const Octets &packet, std::size_t wireOctets = 0) {
     constexpr const char *kinds[] = {"note ", "misread ", "damage "};
     std::string text;
     PacketChecks checks;
     for (const Fault &fault : checks.check(packet, wireOctets)) {
+        if (isOfBuild(fault)) {
+            continue;
+        }
         text +=
             (text.empty() ? "" : "; ") + std::string(kinds[static_cast<std::size_t>(fault.kind)]) + faultText(fault);
     }
@@ -164,7 +172,6 @@ TEST(Checks, nameEachFault) {
          "damage ICMPv6: option 1 has a length of 0, at octet 64"},
         {icmp6(hex("8f 00 0000 0000 0001 04 00 0001 ff02 00*13 01")),
          "damage ICMPv6: a multicast record ends 16 octets after the packet, at octet 48"},
-        {with(sctp4(init), 47, 2), "damage SCTP: the checksum is wrong, at octet 28"},
         {sctp4(with(init, 3, 0x18)), "damage SCTP: chunk 1 ends 4 octets after the packet, at octet 32"},
         {sctp4(hex("05 00 0003")), "damage SCTP: chunk 5 has a length of 3, at octet 32"},
         {sctp4(hex("03 00 0010 00000001 00010000 0001 0000")),
@@ -179,6 +186,17 @@ TEST(Checks, nameEachFault) {
     for (const Row &row : rows) {
         EXPECT_EQ(faultsOf(row.packet), row.faults) << hexText(row.packet);
     }
+}
+
+TEST(Checks, findAWrongChecksumOfSctp) {
+    const Octets packet = with(sctp4(init), 47, 2);
+    PacketChecks checks;
+    const auto faults = checks.check(packet);
+    ASSERT_EQ(faults.size(), 1U);
+    if (isOfBuild(faults.front())) {
+        GTEST_SKIP() << "this build has no CRC-32c";
+    }
+    EXPECT_EQ(faultText(faults.front()), "SCTP: the checksum is wrong, at octet 28");
 }
 
 TEST(Checks, knowWhatANetworkCardFillsIn) {

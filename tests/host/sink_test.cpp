@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
 // Reports as they come: what a sink gets, in which order, and how chains of blocks are shown.
 #include <algorithm>
-#include <latch>
+#include <future>
 #include <sstream>
 #include <stdexcept>
 #include <string>
@@ -233,18 +233,18 @@ TEST(Busy, anOwnerMayRunAnotherPacketAndASinkMayNot) {
 TEST(Busy, saysWhatToDoForASecondThread) {
     const PluginLibrary library = PluginLibrary::open(NETFLOOR_PLUGIN);
     const Octets packet = ipv4({.protocol = 17, .payload = udp(40000, 7000, hex("00*12"))});
-    std::latch entered(1);
-    std::latch leave(1);
+    std::promise<void> entered;
+    std::promise<void> leave;
     std::thread worker([&] {
         Host host(library);
         host.owners().add(7000, [&](NextLayer &next) {
-            entered.count_down();
-            leave.wait();
+            entered.set_value();
+            leave.get_future().wait();
             return takeAsData(next);
         });
         EXPECT_EQ(host.run(Pass::md, packet).ending, Ending::complete);
     });
-    entered.wait();
+    entered.get_future().wait();
     Host second(library);
     try {
         static_cast<void>(second.run(Pass::mv, packet));
@@ -253,7 +253,7 @@ TEST(Busy, saysWhatToDoForASecondThread) {
         EXPECT_NE(std::string(busy.what()).find("PluginLibrary::openCopy"), std::string::npos) << busy.what();
     }
     EXPECT_EQ(freshHost().run(Pass::mv, packet).ending, Ending::complete) << "a copy is free";
-    leave.count_down();
+    leave.set_value();
     worker.join();
     EXPECT_EQ(second.run(Pass::mv, packet).ending, Ending::complete);
 }
