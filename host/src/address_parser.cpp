@@ -40,13 +40,14 @@ bool parseIpv6(std::string_view text, std::span<std::uint8_t, 16> octets) {
     std::ranges::fill(octets, std::uint8_t{0});
     std::size_t used = 0;
     std::optional<std::size_t> gap; // where "::" stands
+    std::size_t at = 0;
     if (text.starts_with("::")) {
         gap = 0;
-        text.remove_prefix(2);
+        at = 2;
     }
-    while (!text.empty()) {
-        const std::size_t end = std::min(text.find(':'), text.size());
-        const std::string_view group = text.substr(0, end);
+    while (at < text.size()) {
+        const std::size_t end = std::min(text.find(':', at), text.size());
+        const std::string_view group = text.substr(at, end - at);
         if (end == text.size() && group.find('.') != std::string_view::npos) {
             if (used > 12 || !parseIpv4(group, octets.subspan(used).first<4>())) {
                 return false;
@@ -60,13 +61,11 @@ bool parseIpv6(std::string_view text, std::span<std::uint8_t, 16> octets) {
         }
         octets[used++] = static_cast<std::uint8_t>(*number >> 8U);
         octets[used++] = static_cast<std::uint8_t>(*number);
-        text.remove_prefix(end);
-        if (text.starts_with("::") && !gap) {
+        at = end + 1;
+        if (at < text.size() && text[at] == ':' && !gap) {
             gap = used;
-            text.remove_prefix(2);
-        } else if (text.size() > 1) {
-            text.remove_prefix(1);
-        } else if (!text.empty()) { // a colon at the end
+            ++at;
+        } else if (at == text.size()) { // a colon at the end
             return false;
         }
     }

@@ -40,7 +40,7 @@ private:
         std::int64_t timeOffset = 0; // seconds
         std::string name;
 
-        auto operator<=>(const Interface &) const = default;
+        auto operator<=>(const Interface &) const = default; // NOLINT(modernize-use-nullptr): taken for a null
     };
 
     [[nodiscard]] std::uint32_t numberOf(const Interface &interface);
