@@ -73,10 +73,11 @@ std::string withoutMessage(std::string name) {
     return name;
 }
 
-std::array<std::string, 256> namesOf(const FieldTables &tables, std::uint32_t id) {
+std::array<std::string, 256> namesOf(const FieldTables &tables, const FieldName &name) {
     std::array<std::string, 256> names;
-    const FieldDescription *const field = tables.find(id);
-    for (std::uint32_t value = 0; field != nullptr && value < names.size(); ++value) {
+    const auto fields = tables.fields();
+    const auto field = std::ranges::find_if(fields, [&](const FieldDescription &row) { return name.fits(row); });
+    for (std::uint32_t value = 0; field != fields.end() && value < names.size(); ++value) {
         const NamedValue *const row = field->findValue(value);
         if (row != nullptr && !row->isDefault()) {
             names[value] = withoutMessage(field->valueName(value));
@@ -85,20 +86,23 @@ std::array<std::string, 256> namesOf(const FieldTables &tables, std::uint32_t id
     return names;
 }
 
+// The first field of the plug-in that has this name in the table of layers.
+FieldName fieldOf(std::string_view name) {
+    const auto rows = layerFieldSources();
+    return std::ranges::find(rows, name, &LayerFieldSource::name)->field;
+}
+
 } // namespace
 
 SummaryLine::SummaryLine(Output &out, Host &host) : out_(out), view_(host) {
     const FieldTables tables(host.library());
-    constexpr std::uint32_t protocolId = 295;
     constexpr std::uint32_t icmpv6Protocol = 58;
-    constexpr std::uint32_t icmpTypeId = 531;
-    constexpr std::uint32_t unreachableCodeId = 548;
-    constexpr std::uint32_t icmpv6TypeId = 247;
-    protocols_ = namesOf(tables, protocolId);
+    constexpr FieldName unreachableCode{"Code", 548}; // each message has a code of its own
+    protocols_ = namesOf(tables, fieldOf("ip.protocol"));
     protocols_[icmpv6Protocol] = "ICMPv6";
-    icmpTypes_ = namesOf(tables, icmpTypeId);
-    icmpUnreachable_ = namesOf(tables, unreachableCodeId);
-    icmpv6Types_ = namesOf(tables, icmpv6TypeId);
+    icmpTypes_ = namesOf(tables, fieldOf("icmp.type"));
+    icmpUnreachable_ = namesOf(tables, unreachableCode);
+    icmpv6Types_ = namesOf(tables, fieldOf("icmpv6.type"));
     for (const auto &[type, name] : icmpv6Names) {
         icmpv6Types_[type] = name;
     }
