@@ -75,7 +75,7 @@ std::string withoutMessage(std::string name) {
 
 std::array<std::string, 256> namesOf(const FieldTables &tables, const FieldName &name) {
     std::array<std::string, 256> names;
-    const auto fields = tables.fields();
+    const auto &fields = tables.fields();
     const auto field = std::ranges::find_if(fields, [&](const FieldDescription &row) { return name.fits(row); });
     for (std::uint32_t value = 0; field != fields.end() && value < names.size(); ++value) {
         const NamedValue *const row = field->findValue(value);
