@@ -145,13 +145,13 @@ private:
 
     void print(const CapturedPacket &packet) {
         const NetworkPart network = findNetworkPart(packet.linkType, packet.octets);
-        if (condition_ && !meetsCondition({packet, network, {}, {}})) {
+        if (condition_ && !meetsCondition({packet, network, {}, {}, 0})) {
             return;
         }
         if (writer_) {
             writer_->write(packet);
         }
-        printer_->print({packet, network, tally_.add(network), times_.text(packet)});
+        printer_->print({packet, network, tally_.add(network), times_.text(packet), times_.width()});
         out_.endPacket();
     }
 

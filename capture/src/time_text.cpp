@@ -29,6 +29,12 @@ void TimeText::see(const CapturedPacket &packet) {
     digits_ = packet.timeDigits > 6 ? 9 : 6;
 }
 
+std::size_t TimeText::width() const {
+    constexpr std::size_t toSeconds = std::string_view("2000-01-01T00:00:00.Z").size();
+    constexpr std::size_t fourDigits = std::string_view("1000.").size();
+    return (form_ == TimeForm::utc ? toSeconds : fourDigits) + digits_;
+}
+
 const std::string &TimeText::text(const CapturedPacket &packet) {
     see(packet);
     text_.clear();

@@ -51,10 +51,9 @@ std::string Tally::text() const {
 }
 
 void Printer::printHead(const PacketToPrint &packet) {
-    timeWidth_ = std::max(timeWidth_, packet.time.size()); // a long time must not shift the lines after it back
     out_.rightAligned(packet.captured.number, 5);
     out_ << "  ";
-    out_.rightAligned(packet.time, timeWidth_);
+    out_.rightAligned(packet.time, packet.timeWidth);
     out_ << "  ";
     out_.rightAligned(std::uint64_t{packet.captured.wireOctets}, 5);
     out_ << "  ";

@@ -48,6 +48,7 @@ struct PacketToPrint {
     const NetworkPart &network;
     std::string_view other; // what it is if it is no IP
     std::string_view time;  // in the form that the options ask for
+    std::size_t timeWidth;  // of its column
 
     [[nodiscard]] RunOptions runOptions() const {
         RunOptions options;
@@ -93,7 +94,6 @@ private:
     const Options &options_;
     Output &out_;
     Host &host_;
-    std::size_t timeWidth_ = 11;
 };
 
 [[nodiscard]] std::unique_ptr<Printer> makePrinter(const Options &options, Output &out, Host &host);

@@ -9,7 +9,6 @@ namespace netfloor::cli {
 
 namespace {
 
-constexpr std::size_t mostEndpointWidth = 32;
 constexpr std::size_t protocolWidth = 7;
 
 using Name = std::pair<std::uint32_t, std::string_view>;
@@ -48,6 +47,13 @@ constexpr std::uint32_t neighborSolicitation = 135;
 constexpr std::uint32_t neighborAdvertisement = 136;
 constexpr std::uint32_t mostIcmpv6Error = 127;
 constexpr std::uint32_t icmpUnreachable = 3;
+
+// A width for IPv4 and one for most of IPv6. A line knows no other line: they may be written in parts, each by its own.
+constexpr std::size_t endpointWidth(std::size_t wanted) {
+    constexpr std::size_t ipv4 = 21;
+    constexpr std::size_t ipv6 = 32;
+    return wanted <= ipv4 ? ipv4 : ipv6;
+}
 
 constexpr bool isTransport(LayerKind kind) {
     return kind == LayerKind::tcp || kind == LayerKind::udp || kind == LayerKind::sctp || kind == LayerKind::icmp ||
@@ -228,10 +234,10 @@ void SummaryLine::writeEndpoints(const Layer &ip, const Layer *carried) {
     }
     const Endpoint from = endpoint(ip, layerField("ip.source"), source);
     const Endpoint to = endpoint(ip, layerField("ip.destination"), destination);
-    endpointWidth_ = std::max(endpointWidth_, std::min(std::max(from.size, to.size), mostEndpointWidth));
-    out_.rightAligned(from.view(), endpointWidth_);
+    const std::size_t width = endpointWidth(std::max(from.size, to.size));
+    out_.rightAligned(from.view(), width);
     out_ << " > " << to.view();
-    out_.blanks(to.size < endpointWidth_ ? endpointWidth_ - to.size : 0);
+    out_.blanks(to.size < width ? width - to.size : 0);
     out_ << ' ';
 }
 

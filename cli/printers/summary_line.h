@@ -53,7 +53,6 @@ private:
     Names icmpTypes_;
     Names icmpUnreachable_;
     Names icmpv6Types_;
-    std::size_t endpointWidth_ = 21; // grows with the addresses, so that what follows lines up
 };
 
 } // namespace netfloor::cli

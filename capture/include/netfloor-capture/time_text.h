@@ -20,6 +20,9 @@ public:
     // decides whether all times get 6 digits or 9.
     void see(const CapturedPacket &packet);
 
+    // What most texts take, by the form and the digits. Longer ones are far from the first packet.
+    [[nodiscard]] std::size_t width() const;
+
     // Empty for a packet without a time; valid until the next call.
     [[nodiscard]] const std::string &text(const CapturedPacket &packet);
 
