@@ -3,7 +3,6 @@
 
 #include <cstdlib>
 #include <iostream>
-#include <memory>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -11,16 +10,11 @@
 #include <unistd.h>
 
 #include "interrupt.h"
-#include "netfloor-capture/capture_file.h"
 #include "netfloor-capture/capture_writer.h"
-#include "netfloor-capture/filter.h"
-#include "netfloor-capture/link_layer.h"
-#include "netfloor-capture/time_text.h"
 #include "output.h"
+#include "packet_decoder.h"
+#include "packet_source.h"
 #include "plugin_path.h"
-#include "printers/printer.h"
-#include "progress.h"
-#include "where.h"
 
 namespace netfloor::cli {
 
@@ -36,146 +30,164 @@ bool wantsColour(Colour colour) {
            (terminal == nullptr || std::string_view(terminal) != "dumb");
 }
 
-// What a filter left out because it has no meaning there.
-std::string refusedText(const std::string &expression, const PacketFilter &filter) {
-    constexpr std::size_t mostTold = 3;
-    std::string text = "--filter '" + expression + "' leaves out what libpcap cannot filter with it:";
-    std::size_t told = 0;
-    for (const auto &[linkType, refused] : filter.refused()) {
-        if (told++ == mostTold) {
-            return text + " and packets of " + countText(filter.refused().size() - mostTold, "more link type") + ".";
-        }
-        text += (told == 1 ? " " : "; ") + countText(refused.packets, "packet") + " of link type " +
-                linkTypeName(linkType) + " (" + refused.reason + ")";
-    }
-    return text + ". Filter on what all link types of the capture have, or leave the filter out.";
+void tell(std::string_view sentence) {
+    std::cerr << "netfloor: " << sentence << '\n';
 }
 
 class Decoding {
 public:
     explicit Decoding(const Options &options)
         : options_(options),
-          capture_(options.file),
-          host_(PluginLibrary::open(findPlugin(options.plugin))),
-          out_(wantsColour(options.colour), capture_.isLive() || ::isatty(STDOUT_FILENO) == 1),
-          printer_(makePrinter(options, out_, host_)),
-          times_(options.utc ? TimeForm::utc : TimeForm::sinceFirst),
-          progress_(std::make_unique<ProgressBar>(capture_)) {
-        if (!options.filter.empty()) {
-            filter_.emplace(options.filter);
-        }
-        if (!options.where.empty()) {
-            condition_.emplace(parseWhere(options.where));
-            layers_.emplace(host_);
-        }
+          out_(wantsColour(options.colour), ::isatty(STDOUT_FILENO) == 1),
+          decoder_(options, PluginLibrary::open(findPlugin(options.plugin)), out_) {
         if (!options.write.empty()) {
-            openWriter();
+            refuseToWriteWhatIsRead();
         }
     }
 
     ExitCode run() {
         ExitCode code = ExitCode::good;
-        std::string damage;
-        try {
-            readPackets();
-        } catch (const CaptureDamage &found) {
-            if (!isInterrupted()) { // which cuts the input anywhere
-                damage = found.what();
-                code = ExitCode::cutCapture;
+        for (const std::string &file : options_.files) {
+            code = worse(code, tryFile(file));
+            if (isInterrupted()) {
+                break;
             }
-        }
-        progress_.reset(); // what follows stands on a clean line
-        if (filter_ && filter_->refusedAll()) {
-            throw UsageError(refusedText(options_.filter, *filter_));
         }
         if (writer_) {
             writer_->finish();
         }
-        printer_->finish(tally_);
+        if (hasSeveral()) {
+            startPart("all " + std::to_string(options_.files.size()) + " captures");
+            printer().finishAll(all_);
+        }
         out_.flush();
-        if (filter_ && !filter_->refused().empty()) {
-            std::cerr << "netfloor: " << refusedText(options_.filter, *filter_) << '\n';
-        }
-        if (const std::string note = capture_.note(); !note.empty()) {
-            std::cerr << "netfloor: " << note << '\n';
-        }
-        if (!damage.empty()) {
-            std::cerr << "netfloor: " << damage << '\n';
-            return code;
-        }
-        if (isInterrupted()) {
-            std::cerr << "netfloor: interrupted after " << countText(read_, "packet") << ".\n";
-            return printer_->exitCode();
-        }
-        if (!options_.packets.areAll() && tally_.packets == 0) {
-            throw UsageError("--packet " + options_.packets.text +
-                             (read_ < options_.packets.last
-                                  ? ": the capture has only " + countText(read_, "packet") + "."
-                                  : " does not match the filter or the condition."));
-        }
-        if (read_ == 0 && options_.count != std::uint64_t{0}) {
-            std::cerr << "netfloor: " << capture_.name() << " holds no packets.\n";
-        }
-        return printer_->exitCode();
+        return worse(code, printer().exitCode());
     }
 
 private:
-    void openWriter() {
-        std::error_code error; // one that does not exist is another file
-        if (std::filesystem::equivalent(options_.file, options_.write, error)) {
-            throw UsageError("--write " + options_.write.string() + " is the capture that is read. Name another file.");
-        }
-        writer_.emplace(options_.write);
-    }
+    [[nodiscard]] bool hasSeveral() const { return options_.files.size() > 1; }
+    [[nodiscard]] Printer &printer() { return decoder_.printer(); }
 
-    void readPackets() {
-        CapturedPacket packet;
-        while (!isInterrupted() && (!options_.count || tally_.packets < *options_.count) && capture_.next(packet)) {
-            read_ = packet.number;
-            times_.see(packet);
-            if (options_.packets.hold(packet.number) && (!filter_ || filter_->passes(packet))) {
-                print(packet);
-            }
-            if (packet.number == options_.packets.last) {
-                return;
-            }
-            progress_->packetDone(packet.number);
+    // What is wrong with one capture does not keep the others from being read.
+    ExitCode tryFile(const std::string &file) {
+        try {
+            return decodeFile(file);
+        } catch (const CaptureError &error) {
+            return fail(ExitCode::noCapture, error.what());
+        } catch (const UsageError &error) {
+            return fail(ExitCode::usage, error.what());
         }
     }
 
-    void print(const CapturedPacket &packet) {
-        const NetworkPart network = findNetworkPart(packet.linkType, packet.octets);
-        if (condition_ && !meetsCondition({packet, network, {}, {}, 0})) {
+    ExitCode fail(ExitCode code, std::string_view sentence) {
+        out_.flush(); // on a terminal the two stand in their order
+        tell(sentence);
+        return code;
+    }
+
+    ExitCode decodeFile(const std::string &file) {
+        PacketSource source(options_, file);
+        if (!isStarted_) {
+            start();
+        }
+        startPart(source.capture().name());
+        Tally tally;
+        readPackets(source, tally);
+        source.end();
+        all_.add(tally);
+        printer().finish(tally);
+        out_.flush();
+        return tellEnd(source, tally.packets);
+    }
+
+    // Not before there is a capture.
+    void start() {
+        isStarted_ = true;
+        if (!options_.write.empty()) {
+            writer_.emplace(options_.write);
+        }
+        printer().start();
+    }
+
+    void refuseToWriteWhatIsRead() const {
+        for (const std::string &file : options_.files) {
+            std::error_code error; // one that does not exist is another file
+            if (std::filesystem::equivalent(file, options_.write, error)) {
+                throw UsageError("--write " + options_.write.string() +
+                                 " is a capture that is read. Name another file.");
+            }
+        }
+    }
+
+    // The heading in front of what follows, as programs that show the starts of several files have it.
+    void startPart(std::string_view name) {
+        if (!hasSeveral() || !printer().hasHeadings()) {
             return;
         }
+        out_ << (hasParts_ ? "\n" : "");
+        hasParts_ = true;
+        out_.start(Style::bold) << "==> ";
+        out_.untrusted(name);
+        (out_ << " <==").stop(Style::bold) << '\n';
+    }
+
+    void readPackets(PacketSource &source, Tally &tally) {
+        CapturedPacket packet;
+        const std::string_view file = hasSeveral() ? std::string_view(source.capture().name()) : std::string_view();
+        while ((!options_.count || tally.packets < *options_.count) && source.next(packet)) {
+            if (const auto kind = decoder_.decode(packet, source.timeStart(), file)) {
+                keep(packet, *kind, tally);
+            }
+            if (source.capture().isLive()) {
+                out_.flush();
+            } else {
+                out_.endPacket();
+            }
+        }
+    }
+
+    // A packet that was shown.
+    void keep(const CapturedPacket &packet, const NotIp &kind, Tally &tally) {
+        tally.add(kind);
         if (writer_) {
             writer_->write(packet);
         }
-        printer_->print({packet, network, tally_.add(network), times_.text(packet), times_.width()});
-        out_.endPacket();
     }
 
-    [[nodiscard]] bool meetsCondition(const PacketToPrint &packet) {
-        if (!packet.network.isIp()) {
-            return false;
+    ExitCode tellEnd(const PacketSource &source, std::uint64_t shown) const {
+        if (const std::string refused = source.refusedText(); !refused.empty()) {
+            tell(refused);
         }
-        layers_->read(packet.network.octets, packet.runOptions());
-        return condition_->holdsFor(*layers_);
+        if (const std::string note = source.capture().note(); !note.empty()) {
+            tell(note);
+        }
+        if (!source.damage().empty()) {
+            tell(source.damage());
+            return ExitCode::cutCapture;
+        }
+        if (isInterrupted()) {
+            tell("interrupted after " + countText(source.read(), "packet") + ".");
+            return ExitCode::good;
+        }
+        if (!options_.packets.areAll() && shown == 0) {
+            throw UsageError("--packet " + options_.packets.text +
+                             (source.read() < options_.packets.last
+                                  ? ": the capture has only " + countText(source.read(), "packet") + "."
+                                  : " does not match the filter or the condition."));
+        }
+        if (source.read() == 0 && options_.count != std::uint64_t{0}) {
+            tell(source.capture().name() + " holds no packets.");
+        }
+        return ExitCode::good;
     }
 
     const Options &options_;
-    CaptureFile capture_;
-    std::optional<PacketFilter> filter_;
-    Host host_;
-    std::optional<CaptureWriter> writer_;
-    std::optional<Condition> condition_;
-    std::optional<LayerView> layers_; // for the condition
     Output out_;
-    std::unique_ptr<Printer> printer_;
-    TimeText times_;
-    std::unique_ptr<ProgressBar> progress_;
-    Tally tally_;
-    std::uint64_t read_ = 0; // packets of the capture
+    PacketDecoder decoder_;
+    std::optional<CaptureWriter> writer_;
+    Tally all_; // of all captures
+    bool isStarted_ = false;
+    bool hasParts_ = false;
 };
 
 } // namespace

@@ -19,6 +19,16 @@ enum class ExitCode : std::uint8_t {
     noMemory = 8,       // memory ran out
 };
 
+// The code of a run over several captures is the worst of theirs.
+[[nodiscard]] constexpr ExitCode worse(ExitCode left, ExitCode right) {
+    for (const ExitCode code : {ExitCode::usage, ExitCode::noCapture, ExitCode::cutCapture, ExitCode::damagedPackets}) {
+        if (left == code || right == code) {
+            return code;
+        }
+    }
+    return ExitCode::good;
+}
+
 // What was asked for makes no sense. what() is a sentence for the user.
 class UsageError : public std::runtime_error {
 public:

@@ -67,7 +67,7 @@ public:
         if (app->get_parent() != nullptr) {
             return CLI::Formatter::make_usage(app, name);
         }
-        return "Usage: netfloor [summary|detail|verify|keys] [OPTIONS] FILE\n"
+        return "Usage: netfloor [summary|detail|verify|keys] [OPTIONS] FILE...\n"
                "       netfloor fields [OPTIONS] [NAME|ID]\n"
                "       netfloor detail --help    tells the options of a command\n";
     }
@@ -162,7 +162,8 @@ bool isChunk(const std::string &word) {
 }
 
 void addOptions(CLI::App &app, Options &options) {
-    app.add_option("file,-r,--read", options.file, "Capture file (pcap or pcapng, gzip or not); '-' for standard input")
+    app.add_option("file,-r,--read", options.files,
+                   "Capture files (pcap or pcapng, gzip or not), one after the other; '-' for standard input")
         ->type_name("FILE");
     app.add_option("-f,--filter", options.filter, "Only packets that match, in libpcap's language (man pcap-filter)")
         ->type_name("EXPRESSION");
@@ -233,6 +234,17 @@ bool putCommandFirst(const CLI::App &app, std::vector<std::string> &words) {
     return named;
 }
 
+// A command that is misspelt reads like a file.
+void checkFiles(const std::vector<std::string> &files, bool named) {
+    if (std::ranges::count(files, "-") > 1) {
+        throw CLI::ValidationError("FILE", "standard input (-) can be read once");
+    }
+    std::error_code error;
+    if (!named && files.size() > 1 && files.front() != "-" && !std::filesystem::exists(files.front(), error)) {
+        throw CLI::ValidationError("FILE", "'" + files.front() + "' is neither a command nor a file");
+    }
+}
+
 } // namespace
 
 std::variant<Options, ExitCode> parseOptions(int argumentCount, char **arguments) {
@@ -252,7 +264,7 @@ std::variant<Options, ExitCode> parseOptions(int argumentCount, char **arguments
         }
         sub->callback([&options, &row] {
             options.command = row.command;
-            if (row.command != Command::fields && options.file.empty()) {
+            if (row.command != Command::fields && options.files.empty()) {
                 throw CLI::RequiredError("file"); // CLI11 would name the option
             }
         });
@@ -272,14 +284,12 @@ std::variant<Options, ExitCode> parseOptions(int argumentCount, char **arguments
     std::reverse(words.begin(), words.end()); // as CLI11 takes them
     try {
         app.parse(words);
+        checkFiles(options.files, named);
     } catch (const CLI::Success &answer) {
         app.exit(answer);
         return ExitCode::good;
     } catch (const CLI::ParseError &mistake) {
         std::cerr << "netfloor: " << mistake.what() << '\n';
-        if (!named && dynamic_cast<const CLI::ExtrasError *>(&mistake) != nullptr) {
-            std::cerr << "One FILE is read; a word in front of it must be a command.\n";
-        }
         std::cerr << "netfloor --help tells what can be asked for.\n";
         return ExitCode::usage;
     }

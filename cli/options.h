@@ -40,8 +40,8 @@ struct PacketNumbers {
 
 struct Options {
     Command command = Command::summary;
-    std::string file;
-    std::filesystem::path plugin; // empty: where the command is installed
+    std::vector<std::string> files; // at least one
+    std::filesystem::path plugin;   // empty: where the command is installed
     std::string filter;
     std::filesystem::path write;        // the packets that pass, into this file
     std::string where;                  // a condition on the layers

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: MIT
 #include "output.h"
 
+#include <algorithm>
 #include <array>
 #include <cerrno>
 #include <string>
@@ -59,6 +60,19 @@ bool areAllPrintable(std::string_view text) {
     return found == 0;
 }
 
+void writeOut(std::string_view text) {
+    while (!text.empty()) {
+        const ssize_t written = ::write(STDOUT_FILENO, text.data(), text.size());
+        if (written >= 0) {
+            text.remove_prefix(static_cast<std::size_t>(written));
+        } else if (errno == EPIPE) {
+            throw OutputClosed();
+        } else if (errno != EINTR) {
+            throw OutputError(std::string("the output cannot be written: ") + std::strerror(errno) + ".");
+        }
+    }
+}
+
 } // namespace
 
 void Output::octet(std::uint8_t octet) {
@@ -108,18 +122,21 @@ void Output::rightAligned(std::uint64_t number, std::size_t width) {
 }
 
 void Output::flush() {
-    std::string_view rest = since(0);
-    while (!rest.empty()) {
-        const ssize_t written = ::write(STDOUT_FILENO, rest.data(), rest.size());
-        if (written >= 0) {
-            rest.remove_prefix(static_cast<std::size_t>(written));
-        } else if (errno == EPIPE) {
-            throw OutputClosed();
-        } else if (errno != EINTR) {
-            throw OutputError(std::string("the output cannot be written: ") + std::strerror(errno) + ".");
-        }
-    }
+    writeOut(since(0));
     next_ = buffer_.data();
+}
+
+void Output::writeThrough(std::string_view text) {
+    flush();
+    writeOut(text);
+}
+
+void Output::exchange(Text &text) {
+    text.octets = mark();
+    buffer_.swap(text.room);
+    buffer_.resize(std::max(buffer_.size(), firstRoom));
+    next_ = buffer_.data();
+    limit_ = buffer_.data() + buffer_.size();
 }
 
 } // namespace netfloor::cli

@@ -93,10 +93,23 @@ public:
 
     // The text may leave the buffer, which grows as long as it may not. Throws OutputClosed and OutputError.
     void mayFlush() {
-        if (mark() >= flushOctets) {
+        if (mark() >= flushAt_) {
             flush();
         }
     }
+
+    // Text that is written elsewhere or later.
+    struct Text {
+        std::vector<char> room;
+        std::size_t octets = 0;
+        [[nodiscard]] std::string_view view() const { return {room.data(), octets}; }
+    };
+    // From now on nothing leaves the buffer.
+    void keepAll() { flushAt_ = static_cast<std::size_t>(-1); }
+    // Gives all text, and takes the room of an earlier one for what follows.
+    void exchange(Text &text);
+    // Writes text that stands elsewhere, after the buffer. Throws OutputClosed and OutputError.
+    void writeThrough(std::string_view text);
 
     // A packet, or the whole, is through. Both throw OutputClosed and OutputError.
     void endPacket() { eachPacket_ ? flush() : mayFlush(); }
@@ -123,6 +136,7 @@ private:
 
     bool colour_;
     bool eachPacket_;
+    std::size_t flushAt_ = flushOctets;
     std::vector<char> buffer_;
     char *next_ = nullptr; // the end of the text in it
     char *limit_ = nullptr;

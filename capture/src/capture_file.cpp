@@ -87,6 +87,11 @@ bool CaptureFile::next(CapturedPacket &packet) {
     return parts_->reader->next(packet);
 }
 
+bool CaptureFile::isNextHere() const {
+    const OctetStream &stream = parts_->stream;
+    return !isLive() || parts_->reader->isNextIn(stream.unread()) || !stream.file().isWaiting();
+}
+
 const std::string &CaptureFile::name() const {
     return parts_->stream.file().name();
 }

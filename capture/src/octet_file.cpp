@@ -6,6 +6,7 @@
 #include <cstring>
 
 #include <fcntl.h>
+#include <poll.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -19,10 +20,11 @@ int openFile(const std::string &path) {
     const int file = ::open(path.c_str(), O_RDONLY | O_CLOEXEC);
     if (file < 0) {
         const int reason = errno;
-        std::string sentence = path + ": " + std::strerror(reason) + ".";
-        sentence +=
-            reason == ENOENT ? " Check the path; '-' reads from standard input." : " Check that you may read it.";
-        throw CaptureError(sentence);
+        const bool isPattern = path.find_first_of("*?[") != std::string::npos;
+        throw CaptureError(path + ": " + std::strerror(reason) + "." +
+                           (reason != ENOENT ? " Check that you may read it."
+                            : isPattern ? " The shell puts the files in the place of a pattern, unless none matches."
+                                        : " Check the path; '-' reads from standard input."));
     }
     return file;
 }
@@ -54,7 +56,7 @@ void OctetFile::checkKind() {
         size_ = live_ ? 0 : static_cast<std::uint64_t>(status.st_size);
     }
     if (S_ISDIR(status.st_mode)) {
-        throw CaptureError(name_ + " is a folder. Name one capture file in it.");
+        throw CaptureError(name_ + " is a folder. Name the captures in it: netfloor " + name_ + "/*.pcap");
     }
     if (live_ && ::isatty(file_) == 1) {
         throw CaptureError(name_ + " is a terminal. Name a capture file, or send one: tcpdump -w - | netfloor -");
@@ -72,6 +74,11 @@ std::size_t OctetFile::read(std::span<std::uint8_t> octets) {
     }
     position_ += static_cast<std::uint64_t>(got);
     return static_cast<std::size_t>(got);
+}
+
+bool OctetFile::isWaiting() const {
+    pollfd watched = {file_, POLLIN, 0};
+    return ::poll(&watched, 1, 0) == 0;
 }
 
 std::optional<double> OctetFile::progress() const {

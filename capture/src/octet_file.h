@@ -24,6 +24,9 @@ public:
     // end.
     [[nodiscard]] std::size_t read(std::span<std::uint8_t> octets);
 
+    // Whether `read` would wait for octets.
+    [[nodiscard]] bool isWaiting() const;
+
     [[nodiscard]] const std::string &name() const { return name_; }
     [[nodiscard]] bool isLive() const { return live_; }
     [[nodiscard]] std::optional<double> progress() const;

@@ -34,6 +34,9 @@ public:
         position_ += count;
     }
 
+    // What a peek gives without reading.
+    [[nodiscard]] std::span<const std::uint8_t> unread() const { return {buffer_.get() + begin_, end_ - begin_}; }
+
     // Takes octets without a peek; false when the capture ends before.
     [[nodiscard]] bool skip(std::size_t count);
 

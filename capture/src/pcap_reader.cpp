@@ -52,11 +52,7 @@ public:
         const NumberView head(octets, bigEndian_);
         const std::uint32_t seconds = head.u32(0);
         const std::uint32_t units = head.u32(4);
-        std::uint32_t captured = head.u32(8);
-        std::uint32_t onWire = head.u32(12);
-        if (swaps_ || (maySwap_ && captured > onWire)) { // old versions have these two in the other order
-            std::swap(captured, onWire);
-        }
+        const auto [captured, onWire] = lengthsIn(head);
         if (captured > most_) {
             throw damageAt(stream_, number_ + 1, position,
                            "a length of " + std::to_string(captured) + " octets, where " + std::to_string(most_) +
@@ -80,7 +76,28 @@ public:
         return true;
     }
 
+    [[nodiscard]] bool isNextIn(std::span<const std::uint8_t> octets) const override {
+        if (octets.size() < headOctets_) {
+            return false;
+        }
+        return octets.size() - headOctets_ >= lengthsIn({octets, bigEndian_}).captured;
+    }
+
 private:
+    struct Lengths {
+        std::uint32_t captured;
+        std::uint32_t onWire;
+    };
+
+    // Old versions have the two in the other order.
+    [[nodiscard]] Lengths lengthsIn(const NumberView &head) const {
+        Lengths lengths = {head.u32(8), head.u32(12)};
+        if (swaps_ || (maySwap_ && lengths.captured > lengths.onWire)) {
+            std::swap(lengths.captured, lengths.onWire);
+        }
+        return lengths;
+    }
+
     [[noreturn]] void refuse(const std::string &reason) const {
         throw CaptureError(stream_.file().name() + " has no usable capture header: " + reason +
                            ". Take the capture again, or name another file.");

@@ -57,6 +57,22 @@ public:
         return true;
     }
 
+    // A packet that is found already needs the rest of its own block alone.
+    [[nodiscard]] bool isNextIn(std::span<const std::uint8_t> octets) const override {
+        while (octets.size() >= 8) {
+            const NumberView head(octets, bigEndian_);
+            const std::size_t size = std::max(head.u32(4), frameOctets);
+            if (octets.size() < size) {
+                return false;
+            }
+            if (isPacket(head.u32(0))) {
+                return true;
+            }
+            octets = octets.subspan(size);
+        }
+        return false;
+    }
+
     [[nodiscard]] std::string note() const override {
         if (oddBlocks_ == 0) {
             return {};

@@ -28,6 +28,9 @@ public:
 
     [[nodiscard]] virtual bool next(CapturedPacket &packet) = 0;
 
+    // Whether these octets, which come next, hold a whole packet.
+    [[nodiscard]] virtual bool isNextIn(std::span<const std::uint8_t> octets) const = 0;
+
     // See CaptureFile::note.
     [[nodiscard]] virtual std::string note() const { return {}; }
 };

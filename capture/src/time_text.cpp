@@ -21,18 +21,10 @@ void append(std::string &text, Number number) {
 
 } // namespace
 
-void TimeText::see(const CapturedPacket &packet) {
-    if (first_ || !packet.time) {
-        return;
-    }
-    first_ = packet.time;
-    digits_ = packet.timeDigits > 6 ? 9 : 6;
-}
-
 std::size_t TimeText::width() const {
     constexpr std::size_t toSeconds = std::string_view("2000-01-01T00:00:00.Z").size();
     constexpr std::size_t fourDigits = std::string_view("1000.").size();
-    return (form_ == TimeForm::utc ? toSeconds : fourDigits) + digits_;
+    return (form_ == TimeForm::utc ? toSeconds : fourDigits) + start_.digits;
 }
 
 const std::string &TimeText::text(const CapturedPacket &packet) {
@@ -48,9 +40,9 @@ const std::string &TimeText::text(const CapturedPacket &packet) {
 
 // The larger minus the smaller: a difference of two signed numbers always fits into the unsigned one.
 void TimeText::writeSinceFirst(const CaptureTime &time) {
-    const bool isEarlier = time < *first_;
-    const CaptureTime &later = isEarlier ? *first_ : time;
-    const CaptureTime &earlier = isEarlier ? time : *first_;
+    const bool isEarlier = time < *start_.time;
+    const CaptureTime &later = isEarlier ? *start_.time : time;
+    const CaptureTime &earlier = isEarlier ? time : *start_.time;
     std::uint64_t seconds = static_cast<std::uint64_t>(later.seconds) - static_cast<std::uint64_t>(earlier.seconds);
     std::uint32_t nanoseconds = later.nanoseconds - earlier.nanoseconds;
     if (later.nanoseconds < earlier.nanoseconds) {
@@ -91,7 +83,7 @@ void TimeText::writeFraction(std::uint32_t nanoseconds) {
         digits[--i] = static_cast<char>('0' + nanoseconds % 10);
     }
     text_ += '.';
-    text_.append(digits.data(), digits_);
+    text_.append(digits.data(), start_.digits);
 }
 
 } // namespace netfloor

@@ -37,6 +37,8 @@ public:
         }
     }
 
+    void finishAll(const Tally &tally) override { printTally(tally); }
+
 private:
     void printHeading(const PacketToPrint &packet) {
         const CapturedPacket &captured = packet.captured;

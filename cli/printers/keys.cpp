@@ -114,12 +114,17 @@ public:
         if (!options.where.empty()) {
             condition_.emplace(parseWhere(options.where));
         }
-        out << "packet,time,length,layer,tunnel,note";
-        for (const KeyColumn &column : columns_) {
-            out << ',' << column.name;
-        }
-        out << '\n';
     }
+
+    void start() override {
+        out() << (options().files.size() > 1 ? "file," : "") << "packet,time,length,layer,tunnel,note";
+        for (const KeyColumn &column : columns_) {
+            out() << ',' << column.name;
+        }
+        out() << '\n';
+    }
+
+    [[nodiscard]] bool hasHeadings() const override { return false; }
 
     void print(const PacketToPrint &packet) override {
         if (!packet.network.isIp()) {
@@ -188,6 +193,10 @@ private:
     }
 
     void startRow(const PacketToPrint &packet, std::uint32_t layer, std::string_view tunnel, std::string_view note) {
+        if (!packet.file.empty()) {
+            writeCsv(out(), packet.file);
+            out() << ',';
+        }
         out() << packet.captured.number << ',';
         if (options().utc) {
             out() << packet.time;

@@ -7,24 +7,27 @@
 
 namespace netfloor::cli {
 
-std::string_view Tally::add(const NetworkPart &network) {
-    ++packets;
-    if (network.isIp()) {
-        ++withIp;
-        return {};
+void Tally::add(const NotIp &kind, std::uint64_t count) {
+    packets += count;
+    if (kind.kind() == NotIp::Kind::ip) {
+        withIp += count;
+        return;
     }
     constexpr std::size_t mostKinds = 4096;
-    auto found = others_.find(network.other);
-    if (found == others_.end() && others_.size() == mostKinds) {
-        rest_.text = network.other.text();
-        ++rest_.packets;
-        return rest_.text;
+    if (others_.size() == mostKinds && !others_.contains(kind)) {
+        rest_ += count;
+        return;
     }
-    if (found == others_.end()) {
-        found = others_.emplace(network.other, Other{network.other.text(), 0}).first;
+    others_[kind] += count;
+}
+
+void Tally::add(const Tally &other) {
+    add(NotIp(), other.withIp);
+    for (const auto &[kind, count] : other.others_) {
+        add(kind, count);
     }
-    ++found->second.packets;
-    return found->second.text;
+    packets += other.rest_;
+    rest_ += other.rest_;
 }
 
 std::string Tally::text() const {
@@ -32,15 +35,15 @@ std::string Tally::text() const {
     if (!hasOthers()) {
         return text;
     }
-    std::vector<std::pair<std::string_view, std::uint64_t>> byCount;
-    for (const auto &[kind, other] : others_) {
-        byCount.emplace_back(other.text, other.packets);
+    std::vector<std::pair<std::string, std::uint64_t>> byCount;
+    for (const auto &[kind, count] : others_) {
+        byCount.emplace_back(kind.text(), count);
     }
     std::sort(byCount.begin(), byCount.end(), [](const auto &left, const auto &right) {
         return left.second != right.second ? left.second > right.second : left.first < right.first;
     });
-    if (rest_.packets != 0) {
-        byCount.emplace_back("of other kinds", rest_.packets);
+    if (rest_ != 0) {
+        byCount.emplace_back("of other kinds", rest_);
     }
     text += ", " + std::to_string(packets - withIp) + " without (";
     for (const auto &[name, count] : byCount) {

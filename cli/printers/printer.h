@@ -24,8 +24,9 @@ public:
     std::uint64_t packets = 0;
     std::uint64_t withIp = 0;
 
-    // Gives what the packet is in words, "ARP"; empty for IP.
-    std::string_view add(const NetworkPart &network);
+    // A packet, by what it is if it is no IP.
+    void add(const NotIp &kind, std::uint64_t count = 1);
+    void add(const Tally &other);
 
     [[nodiscard]] bool hasOthers() const { return packets != withIp; }
 
@@ -33,13 +34,8 @@ public:
     [[nodiscard]] std::string text() const;
 
 private:
-    struct Other {
-        std::string text;
-        std::uint64_t packets = 0;
-    };
-
-    std::map<NotIp, Other> others_; // of a bounded number: a capture may have millions of kinds
-    Other rest_;                    // the text of the last one, and the packets of all
+    std::map<NotIp, std::uint64_t> others_; // of a bounded number: a capture may have millions of kinds
+    std::uint64_t rest_ = 0;
 };
 
 // One packet, as the printers get it.
@@ -49,6 +45,7 @@ struct PacketToPrint {
     std::string_view other; // what it is if it is no IP
     std::string_view time;  // in the form that the options ask for
     std::size_t timeWidth;  // of its column
+    std::string_view file;  // empty where there is one
 
     [[nodiscard]] RunOptions runOptions() const {
         RunOptions options;
@@ -57,6 +54,8 @@ struct PacketToPrint {
     }
 };
 
+// A printer keeps of a packet nothing but counts: each thread that decodes has one, and packets of any part of a
+// capture may come to it. What is before and after them, one of these prints.
 class Printer {
 public:
     Printer(const Options &options, Output &out, Host &host) : options_(options), out_(out), host_(host) {}
@@ -64,10 +63,22 @@ public:
     Printer &operator=(const Printer &) = delete;
     virtual ~Printer() = default;
 
+    // Before the first packet of the first capture: the header of rows.
+    virtual void start() {}
+
     virtual void print(const PacketToPrint &packet) = 0;
 
-    // After the last packet.
+    // After the last packet of a capture: what it had. `tally` is that of the capture.
     virtual void finish(const Tally &tally) = 0;
+
+    // After the last one of several captures.
+    virtual void finishAll(const Tally & /*tally*/) {}
+
+    // Takes the counts over from a printer of the same kind, which starts again from 0.
+    virtual void takeCounts(Printer & /*from*/) {}
+
+    // Whether a heading stands in front of each of several captures; rows have a column for it.
+    [[nodiscard]] virtual bool hasHeadings() const { return true; }
 
     [[nodiscard]] virtual ExitCode exitCode() const { return ExitCode::good; }
 

@@ -136,6 +136,8 @@ public:
         }
     }
 
+    void finishAll(const Tally &tally) override { printTally(tally); }
+
 private:
     // With room for the note of the snap length.
     void cutLine(Output::Mark start, bool hasNote) const {

@@ -73,7 +73,7 @@ public:
         }
         judge(packet);
         const bool isDamaged = plugin_ == PacketVerdict::damaged || checked_ == PacketVerdict::damaged;
-        damaged_ += isDamaged ? 1 : 0;
+        counts_.damaged += isDamaged ? 1 : 0;
         if (isDamaged || !options().bad) {
             printHead(packet);
             printVerdicts();
@@ -82,20 +82,49 @@ public:
     }
 
     void finish(const Tally &tally) override {
+        printTotals(tally, counts_);
+        allCounts_.add(counts_);
+        counts_ = {};
+    }
+
+    void finishAll(const Tally &tally) override { printTotals(tally, allCounts_); }
+
+    void takeCounts(Printer &from) override {
+        auto &other = dynamic_cast<VerifyPrinter &>(from);
+        counts_.add(other.counts_);
+        other.counts_ = {};
+    }
+
+    [[nodiscard]] ExitCode exitCode() const override {
+        return counts_.damaged + allCounts_.damaged == 0 ? ExitCode::good : ExitCode::damagedPackets;
+    }
+
+private:
+    using VerdictCounts = std::array<std::uint64_t, words.size()>;
+
+    // Packets by their verdicts.
+    struct Counts {
+        VerdictCounts plugin = {};
+        VerdictCounts checks = {};
+        std::uint64_t damaged = 0;
+
+        void add(const Counts &other) {
+            for (std::size_t i = 0; i < words.size(); ++i) {
+                plugin[i] += other.plugin[i];
+                checks[i] += other.checks[i];
+            }
+            damaged += other.damaged;
+        }
+    };
+
+    void printTotals(const Tally &tally, const Counts &counts) {
         printTally(tally);
         if (tally.withIp == 0) {
             return;
         }
-        printCounts("plug-in: ", pluginCounts_);
-        printCounts("checks:  ", checkedCounts_);
+        printCounts("plug-in: ", counts.plugin);
+        printCounts("checks:  ", counts.checks);
     }
-
-    [[nodiscard]] ExitCode exitCode() const override {
-        return damaged_ == 0 ? ExitCode::good : ExitCode::damagedPackets;
-    }
-
-private:
-    using Counts = std::array<std::uint64_t, words.size()>;
 
     void judge(const PacketToPrint &packet) {
         run(Pass::mv, packet, outcome_);
@@ -112,8 +141,8 @@ private:
         }
         checked_ = has(FaultKind::damage) ? PacketVerdict::damaged : PacketVerdict::good;
         plugin_ = isMisread ? PacketVerdict::misread : verdictOf(outcome_, findings_, packet.captured.isCut());
-        ++pluginCounts_[static_cast<std::size_t>(plugin_)];
-        ++checkedCounts_[static_cast<std::size_t>(checked_)];
+        ++counts_.plugin[static_cast<std::size_t>(plugin_)];
+        ++counts_.checks[static_cast<std::size_t>(checked_)];
     }
 
     void printVerdicts() {
@@ -166,7 +195,7 @@ private:
         (out().start(style) << text_).stop(style);
     }
 
-    void printCounts(std::string_view column, const Counts &counts) {
+    void printCounts(std::string_view column, const VerdictCounts &counts) {
         out() << column;
         bool first = true;
         for (std::size_t i = 0; i < words.size(); ++i) {
@@ -201,9 +230,8 @@ private:
 
     FlagExplainer explainer_;
     PacketChecks checks_;
-    Counts pluginCounts_ = {};
-    Counts checkedCounts_ = {};
-    std::uint64_t damaged_ = 0;
+    Counts counts_;    // of the capture
+    Counts allCounts_; // of the captures before
 
     // Of the packet.
     std::string text_;

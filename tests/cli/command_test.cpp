@@ -138,7 +138,7 @@ TEST_F(Command, chooses) {
         {"netfloor --packet 0 $T/five.pcap", 2, {}, {"'0' is no list of packet numbers", "--help"}, {}},
         {"netfloor --count -1 $T/five.pcap", 2, {}, {"'-1' is no whole number"}, {}},
         {"netfloor --color blue $T/five.pcap", 2, {}, {"'blue' is none of auto, always and never"}, {}},
-        {"netfloor detial $T/five.pcap", 2, {}, {"a word in front of it must be a command"}, {}},
+        {"netfloor detial $T/five.pcap", 2, {}, {"'detial' is neither a command nor a file"}, {}},
         {"netfloor detail", 2, {}, {"file is required"}, {}},
         {"netfloor --help", 0, {"Exit codes:"}, {}, {}},
     });
@@ -162,6 +162,51 @@ TEST_F(Command, readsAnyWay) {
          {},
          {},
          1},
+    });
+}
+
+// Packet numbers are a file's; one that cannot be read does not keep the others from being read.
+TEST_F(Command, readsSeveralFiles) {
+    check({
+        {"netfloor -c 1 $T/five.pcap $T/cut.pcap | sed \"s|$T/||\"",
+         0,
+         {"==> five.pcap <==\n    1  ", "\n\n==> cut.pcap <==\n    1  ",
+          "\n\n==> all 2 captures <==\n2 packets: 2 with IP\n"},
+         {},
+         {},
+         8},
+        {"cd $T; netfloor keys --column ip.source five.pcap - < cut.pcap",
+         0,
+         {"file,packet,time", "\nfive.pcap,1,1000000000.000000000,50,1,,,10.0.0.1\n", "\nstandard input,2,"},
+         {},
+         {"==>"},
+         8},
+        {"netfloor verify --bad $T/five.pcap $C/tcp-urgent-loopback.pcap | tail -n 3",
+         0,
+         {"64 packets: 61 with IP, 3 without (2 ARP, 1 LLDP)\nplug-in: 2 good, 57 good with flags by design, 2 "
+          "damaged\n"
+          "checks:  54 good, 7 damaged\n"},
+         {},
+         {}},
+        {"netfloor verify --bad $C/tcp-urgent-loopback.pcap $T/five.pcap", 1, {"all 2"}, {}, {}},
+        {"netfloor $T/inPacket.pcap $T/missing.pcap $T/five.pcap",
+         3,
+         {"    1  ", "5 packets", "all 3"},
+         {"cut off at octet 116", "No such file"},
+         {"missing.pcap <=="}},
+        {"netfloor $T/inPacket.pcap $T/five.pcap", 4, {"all 2"}, {"cut off at octet 116"}, {}},
+        {"netfloor --packet 3 $T/five.pcap $T/cut.pcap", 2, {"    3  "}, {"has only 2 packets"}, {}},
+        {"netfloor $T $T/five.pcap", 3, {"5 packets"}, {"is a folder. Name the captures in it"}, {}},
+        {"netfloor \"$T/no*.pcap\" $T/five.pcap", 2, {}, {"neither a command nor a file"}, {}},
+        {"netfloor summary \"$T/no*.pcap\"", 3, {}, {"unless none matches"}, {}},
+        {"netfloor - - < $T/five.pcap", 2, {}, {"can be read once"}, {}},
+        {"netfloor -f udp --write $T/both.pcapng $T/five.pcap $T/five.pcap > $T/out; netfloor $T/both.pcapng",
+         0,
+         {"    4  "},
+         {},
+         {},
+         4},
+        {"cd $T; netfloor --write five.pcap cut.pcap five.pcap", 2, {}, {"is a capture that is read"}, {}},
     });
 }
 

@@ -32,6 +32,9 @@ public:
     // The next packet, or false at the end. Throws CaptureDamage.
     [[nodiscard]] bool next(CapturedPacket &packet);
 
+    // Whether `next` answers at once. False where the program that makes the packets is to write first.
+    [[nodiscard]] bool isNextHere() const;
+
     // The path, or "standard input".
     [[nodiscard]] const std::string &name() const;
 

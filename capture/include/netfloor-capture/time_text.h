@@ -12,13 +12,27 @@ namespace netfloor {
 
 enum class TimeForm : std::uint8_t { sinceFirst, utc };
 
+// The first packet with a time is the start of the count, and decides whether all times get 6 digits or 9.
+struct TimeStart {
+    std::optional<CaptureTime> time;
+    unsigned digits = 6;
+
+    // Call it for each packet in the order of the capture.
+    void see(const CapturedPacket &packet) {
+        if (!time && packet.time) {
+            time = packet.time;
+            digits = packet.timeDigits > 6 ? 9 : 6;
+        }
+    }
+};
+
 class TimeText {
 public:
     explicit TimeText(TimeForm form) : form_(form) {}
 
-    // Call it for each packet in the order of the capture. The first packet with a time is the start of the count, and
-    // decides whether all times get 6 digits or 9.
-    void see(const CapturedPacket &packet);
+    // Call one of the two for each packet in the order of the capture.
+    void see(const CapturedPacket &packet) { start_.see(packet); }
+    void startAt(const TimeStart &start) { start_ = start; }
 
     // What most texts take, by the form and the digits. Longer ones are far from the first packet.
     [[nodiscard]] std::size_t width() const;
@@ -32,8 +46,7 @@ private:
     void writeFraction(std::uint32_t nanoseconds);
 
     TimeForm form_;
-    std::optional<CaptureTime> first_;
-    unsigned digits_ = 6;
+    TimeStart start_;
     std::optional<std::int64_t> dateSecond_; // the second of which date_ is the text
     std::string date_;
     std::string text_;
