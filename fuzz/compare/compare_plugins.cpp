@@ -16,10 +16,6 @@
 namespace netfloor::compare {
 namespace {
 
-// What a plug-in keeps from one packet to the next is part of what is compared. So that a difference can be found again
-// soon, both start as loaded after so many packets.
-constexpr std::uint64_t packetsTogether = 64;
-
 constexpr const char *passNames[] = {"TO", "MD", "MV", "XTR"};
 
 struct Options {
@@ -61,8 +57,8 @@ public:
 
 private:
     [[nodiscard]] bool sameExports() const {
-        Trace olds(true);
-        Trace news(true);
+        Trace olds(Trace::Keeps::texts);
+        Trace news(Trace::Keeps::texts);
         traceExports(old_, olds);
         traceExports(new_, news);
         if (!(olds == news)) {
@@ -110,8 +106,8 @@ private:
 
     // Runs both once more, with texts.
     void show(std::uint64_t number, const Input &input, Pass pass) const {
-        Trace olds(true);
-        Trace news(true);
+        Trace olds(Trace::Keeps::texts);
+        Trace news(Trace::Keeps::texts);
         const bool oldGood = netfloor::compare::run(old_, pass, input, options_.strict, olds);
         const bool newGood = netfloor::compare::run(new_, pass, input, options_.strict, news);
         const Plan &plan = input.plan;
@@ -152,6 +148,7 @@ int main(int argumentCount, char **arguments) {
     app.add_option("--captures", options.captures, "folders with captures, in place of those of the tests");
     app.add_flag("--strict", options.strict, "compare also what has no meaning: all storage, used or not");
     CLI11_PARSE(app, argumentCount, arguments);
+    netfloor::compare::catchSignals();
     try {
         return netfloor::compare::Comparison(options).run() ? 0 : 1;
     } catch (const std::exception &error) {

@@ -38,6 +38,7 @@ const Input *input;
 Pass pass;
 bool strict;
 Trace *trace;
+const Observer *observer;
 Arena arena;
 std::span<std::uint8_t> working, source; // both end at an inaccessible page
 DecodeState *state;
@@ -49,24 +50,11 @@ std::bitset<1024> seen;
 
 sigjmp_buf beforeRun;
 constexpr int endless = 1000; // no number of a signal
+bool signalsAreCaught = false;
 
 // Signals come from the plug-in, which keeps nothing that would have to be unwound.
 extern "C" void leaveRun(int signal) {
     siglongjmp(beforeRun, signal);
-}
-
-void catchSignals() {
-    static std::uint8_t ownStack[1 << 16];
-    stack_t stack{};
-    stack.ss_sp = ownStack;
-    stack.ss_size = sizeof ownStack;
-    sigaltstack(&stack, nullptr);
-    struct sigaction action {};
-    action.sa_handler = leaveRun;
-    action.sa_flags = SA_ONSTACK | SA_NODEFER;
-    for (const int signal : {SIGSEGV, SIGBUS, SIGILL, SIGFPE, SIGABRT, SIGALRM}) {
-        sigaction(signal, &action, nullptr);
-    }
 }
 
 // What can be seen, in groups. Pointers are places in the storage, or in the packet.
@@ -155,6 +143,9 @@ void event(const char *name) {
         siglongjmp(beforeRun, endless);
     }
     trace->event(name);
+    if (*observer) {
+        (*observer)({name, *state, context, working});
+    }
     traceState();
     traceContext();
     const bool changed = !std::ranges::equal(working, input->packet);
@@ -346,17 +337,34 @@ std::int32_t unusedResult() {
 
 } // namespace
 
-bool run(const Plugin &thePlugin, Pass thePass, const Input &theInput, bool isStrict, Trace &theTrace) {
-    static const bool caught = (catchSignals(), true);
-    static_cast<void>(caught);
+void catchSignals() {
+    static std::uint8_t ownStack[1 << 16];
+    stack_t stack{};
+    stack.ss_sp = ownStack;
+    stack.ss_size = sizeof ownStack;
+    sigaltstack(&stack, nullptr);
+    struct sigaction action {};
+    action.sa_handler = leaveRun;
+    action.sa_flags = SA_ONSTACK | SA_NODEFER;
+    for (const int signal : {SIGSEGV, SIGBUS, SIGILL, SIGFPE, SIGABRT, SIGALRM}) {
+        sigaction(signal, &action, nullptr);
+    }
+    signalsAreCaught = true;
+}
+
+bool run(const Plugin &thePlugin, Pass thePass, const Input &theInput, bool isStrict, Trace &theTrace,
+         const Observer &theObserver) {
     plugin = &thePlugin, pass = thePass, input = &theInput, strict = isStrict, trace = &theTrace;
+    observer = &theObserver;
     growths = handOffs = depth = 0;
     arena.clear();
     trace->clear();
     setUpPacket();
     setUpState(input->plan);
     pass == Pass::xtr ? setUpKeyContext(input->plan) : setUpContext(input->plan);
-    alarm(mostSeconds);
+    if (signalsAreCaught) {
+        alarm(mostSeconds);
+    }
     const int signal = sigsetjmp(beforeRun, 0);
     if (signal == 0) {
         pass == Pass::xtr ? extractLayers() : enter();
@@ -364,7 +372,9 @@ bool run(const Plugin &thePlugin, Pass thePass, const Input &theInput, bool isSt
         trace->event(signal == endless ? "no end" : "crash"); // what can be seen may be broken
         trace->number("signal", signal);
     }
-    alarm(0);
+    if (signalsAreCaught) {
+        alarm(0);
+    }
     const bool overrun = arena.overrun();
     trace->number("overrun", overrun);
     trace->octets("storage", arena.used().data(), strict ? arena.used().size() : 0);

@@ -5,6 +5,8 @@
 
 #include <bitset>
 #include <cstdint>
+#include <functional>
+#include <span>
 
 #include "plugin.h"
 #include "support/packets.h"
@@ -40,9 +42,22 @@ struct Input {
     const char *origin;
 };
 
+// What a host can look at when it is called, and when an entry has returned.
+struct Moment {
+    const char *event; // the name of the operation, or "result"
+    const DecodeState &state;
+    const PreDecodeContext *context; // null in the XTR pass
+    std::span<const std::uint8_t> workingCopy;
+};
+using Observer = std::function<void(const Moment &)>;
+
+// A plug-in that crashes or does not end makes `run` return false, in place of ending the process. A sanitizer tells
+// more of a crash where this is not asked for.
+void catchSignals();
+
 // One pass over one packet. With `strict` also what has no meaning is traced: elements past the counts, texts past
-// their end. False when the plug-in crashed, did not end or wrote outside its storage.
-bool run(const Plugin &plugin, Pass pass, const Input &input, bool strict, Trace &trace);
+// their end. False when the plug-in did not end or wrote outside its storage.
+bool run(const Plugin &plugin, Pass pass, const Input &input, bool strict, Trace &trace, const Observer &observer = {});
 
 // Ids that the MD pass has reported so far.
 [[nodiscard]] const std::bitset<1024> &fieldsSeen();

@@ -13,6 +13,10 @@ namespace netfloor::compare {
 // A packet that follows the grammar, with lengths that are mostly right.
 [[nodiscard]] test::Octets generatedPacket(Random &random);
 
+// What a plug-in keeps from one packet to the next is part of what is compared. So that a difference can be found again
+// soon, it starts as loaded after so many packets.
+inline constexpr std::uint64_t packetsTogether = 64;
+
 class Inputs {
 public:
     // Captures in all of these folders, and packets that hold every field.

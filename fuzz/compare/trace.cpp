@@ -40,9 +40,12 @@ void Trace::event(const char *name) {
 }
 
 void Trace::words(const char *label, const void *from, std::size_t octets, std::size_t wordOctets) {
+    if (keeps_ == Keeps::nothing) {
+        return;
+    }
     const auto *const first = static_cast<const std::uint8_t *>(from);
     octets_.insert(octets_.end(), first, first + octets);
-    if (!keepsTexts_) {
+    if (keeps_ != Keeps::texts) {
         return;
     }
     std::istringstream names(label);
@@ -55,12 +58,27 @@ void Trace::words(const char *label, const void *from, std::size_t octets, std::
 }
 
 void Trace::text(const char *label, const char *from, std::size_t most) {
+    if (keeps_ == Keeps::nothing) {
+        return;
+    }
     const std::size_t length = strnlen(from, most);
     octets_.insert(octets_.end(), from, from + length);
     octets_.push_back(0);
-    if (keepsTexts_) {
+    if (keeps_ == Keeps::texts) {
         lines_.push_back({events_, label, std::string(from, length)});
     }
+}
+
+// FNV-1a, a word of eight octets at a time.
+std::uint64_t Trace::digest(std::uint64_t before) const {
+    std::uint64_t digest = before ^ octets_.size();
+    for (std::size_t at = 0; at < octets_.size(); at += sizeof digest) {
+        std::uint64_t word = 0;
+        std::memcpy(&word, octets_.data() + at, std::min(sizeof word, octets_.size() - at));
+        digest = (digest ^ word) * 0x100000001b3;
+        digest ^= digest >> 32;
+    }
+    return digest;
 }
 
 std::vector<Trace::Line> Trace::linesOf(std::size_t event) const {

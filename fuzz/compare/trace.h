@@ -12,7 +12,9 @@ namespace netfloor::compare {
 
 class Trace {
 public:
-    explicit Trace(bool keepsTexts = false) : keepsTexts_(keepsTexts) {}
+    enum class Keeps : std::uint8_t { nothing, octets, texts };
+
+    explicit Trace(Keeps keeps = Keeps::octets) : keeps_(keeps) {}
 
     void clear();
 
@@ -29,6 +31,10 @@ public:
     void text(const char *label, const char *from, std::size_t most = SIZE_MAX);
 
     [[nodiscard]] std::size_t events() const { return events_; }
+
+    // A number that follows from all octets, on top of the one of the traces before.
+    [[nodiscard]] std::uint64_t digest(std::uint64_t before) const;
+
     [[nodiscard]] bool operator==(const Trace &other) const { return octets_ == other.octets_; }
 
     // Of two traces that keep texts: the first event that differs, and the events before it.
@@ -44,7 +50,7 @@ private:
     [[nodiscard]] std::string eventText(std::size_t event) const;
     [[nodiscard]] std::vector<Line> linesOf(std::size_t event) const;
 
-    bool keepsTexts_;
+    Keeps keeps_;
     std::vector<std::uint8_t> octets_;
     std::vector<Line> lines_;
     std::size_t events_ = 0;
