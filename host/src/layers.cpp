@@ -3,7 +3,9 @@
 
 #include <algorithm>
 
+#include "data_text.h"
 #include "octets.h"
+#include "plain_packets.h"
 
 namespace netfloor {
 namespace {
@@ -34,7 +36,10 @@ Place placeOf(std::span<const BitRange> ranges) {
 
 } // namespace
 
-LayerView::LayerView(Host &host) : host_(host), map_(FieldTables(host.library()).fields()) {}
+LayerView::LayerView(Host &host, LayerReading reading)
+    : host_(host), map_(FieldTables(host.library()).fields()), reading_(reading) {}
+
+LayerView::~LayerView() = default;
 
 void LayerView::read(std::span<const std::uint8_t> packet, const RunOptions &options) {
     packet_ = packet;
@@ -46,6 +51,9 @@ void LayerView::read(std::span<const std::uint8_t> packet, const RunOptions &opt
     ipLayers_ = 0;
     isCutOff_ = false;
     isFull_ = false;
+    if (!plain_ && reading_ == LayerReading::fast) {
+        plain_ = std::make_unique<PlainPackets>(host_, map_);
+    }
     InnerPackets at(packet);
     for (; !at.ended(); at.next()) {
         open_.fill(-1);
@@ -58,10 +66,49 @@ void LayerView::read(std::span<const std::uint8_t> packet, const RunOptions &opt
         // What is cut is the end of the outermost packet, and so of all that reach it.
         const bool reachesEnd = offset_ + at.octets().size() == packet.size();
         inner.wireOctets = reachesEnd && options.wireOctets > packet.size() ? options.wireOctets - offset_ : 0;
-        host_.run(Pass::md, at.octets(), *this, inner);
+        if (!readPlain(at.octets(), inner.wireOctets)) {
+            ++passes_;
+            host_.run(Pass::md, at.octets(), *this, inner);
+        }
     }
     if (limit_.empty()) {
         limit_ = at.limit();
+    }
+}
+
+bool LayerView::readPlain(std::span<const std::uint8_t> octets, std::size_t wireOctets) {
+    PlainPacket found;
+    if (!plain_ || !host_.owners().isUnchanged() || !plain_->find(octets, wireOctets, found)) {
+        return false;
+    }
+    if (!openLayer(LayerKind::ip, offset_)) {
+        return true;
+    }
+    addHeader(*found.ip, offset_);
+    const std::uint32_t transport = offset_ + found.ip->octets;
+    (void)openLayer(found.transportKind, transport); // only those of IP have a limit
+    addHeader(*found.transport, transport);
+    for (std::uint32_t i = 0; i < found.optionCount; ++i) {
+        addHeader(*found.options[i].header, offset_ + found.options[i].octet);
+    }
+    constexpr std::uint32_t mostUnread = 4; // the plug-in does not hand off so few
+    if (found.endOctet - found.payloadOctet > mostUnread) {
+        const auto end = std::min(found.endOctet, static_cast<std::uint32_t>(octets.size()));
+        keepPayload(dataName, DataText(longDataStart, (end - found.payloadOctet) * bitsPerOctet).view(),
+                    offset_ + found.payloadOctet, offset_ + end);
+    }
+    return true;
+}
+
+// Adds the fields of a header to the layer that was opened last.
+void LayerView::addHeader(const PlainHeader &header, std::uint32_t octet) {
+    Layer &layer = layers_.back();
+    layer.present |= header.present;
+    layer.endOctet = std::max(layer.endOctet, octet + header.endOctet);
+    const std::uint8_t *const octets = packet_.data() + octet;
+    Value *const values = values_.data() + layer.values;
+    for (const PlainField &field : header.fields) {
+        values[field.place] = {field.read(octets), octet + field.octet, field.value};
     }
 }
 
@@ -91,7 +138,8 @@ void LayerView::field(const FieldView &field) {
         return;
     }
     if (field.id == 0) {
-        keepPayload(field, placeOf(field.ranges).first + offset_);
+        const Place place = placeOf(field.ranges);
+        keepPayload(field.name, field.text.view(), place.first + offset_, place.end + offset_);
         return;
     }
     const LayerFieldMap::Entry &entry = map_.find(field.id);
@@ -134,16 +182,16 @@ void LayerView::keepVersion(Layer &layer, std::uint32_t octet, LayerField opener
 }
 
 // A text longer than that is cut: who needs all of it has the octets.
-void LayerView::keepPayload(const FieldView &field, std::uint32_t octet) {
+void LayerView::keepPayload(std::string_view name, std::string_view text, std::uint32_t octet, std::uint32_t endOctet) {
     if (!openLayer(LayerKind::payload, octet)) {
         return;
     }
     Layer &layer = layers_.back();
-    layer.endOctet = placeOf(field.ranges).end + offset_;
+    layer.endOctet = endOctet;
     layer.name = static_cast<std::uint32_t>(texts_.size());
-    texts_.append(field.name.substr(0, textOctets));
+    texts_.append(name.substr(0, textOctets));
     layer.nameEnd = static_cast<std::uint32_t>(texts_.size());
-    texts_.append(field.text.view().substr(0, textOctets));
+    texts_.append(text.substr(0, textOctets));
     layer.textEnd = static_cast<std::uint32_t>(texts_.size());
 }
 

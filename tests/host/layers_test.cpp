@@ -139,5 +139,74 @@ TEST(Layers, nameTheLimits) {
     EXPECT_NE(view.limit().find("262144 octets"), std::string_view::npos);
 }
 
+// All that a view gives of a packet.
+std::string textOf(const LayerView &view) {
+    std::string text;
+    for (const Layer &layer : view.layers()) {
+        text += std::to_string(static_cast<int>(layer.kind)) + " of " + std::to_string(layer.ipLayer) + "/" +
+                std::to_string(layer.packet) + " " + std::to_string(layer.firstOctet) + "-" +
+                std::to_string(layer.endOctet) + " " + std::string(view.name(layer)) + std::string(view.text(layer));
+        for (std::uint8_t place = 0; place < layerFieldCount(layer.kind); ++place) {
+            const LayerField field{layer.kind, place};
+            if (!view.has(layer, field)) {
+                continue;
+            }
+            const LayerValue value = view.valueKind(layer, field);
+            const bool isNumber = value != LayerValue::ipv6Address && value != LayerValue::octets;
+            text += " " + std::to_string(place) + "@" + std::to_string(view.octet(layer, field)) + ":" +
+                    std::to_string(static_cast<int>(value)) +
+                    (isNumber ? "=" + std::to_string(*view.number(layer, field)) : "");
+        }
+        text += "\n";
+    }
+    return text + std::string(view.limit()) + (view.isCutOff() ? "cut off" : "");
+}
+
+// Each octet of each header with values that matter, and each header cut, by both ways.
+TEST(Layers, areTheSameWithoutAPass) {
+    constexpr std::uint8_t tcpProtocol = 6;
+    const Octets values = hex("00 01 02 05 08 0a 12 20 45 50 ff");
+    const Octets tcpHead = hex("d431 0050 01234567 89abcdef");
+    const auto tcp = [&](const std::string &rest) { return tcpHead + hex(rest); };
+    const Octets payloads[] = {
+        udp(5000, 53, hex("61*12")),
+        udp(5000, 2152, hex("30 ff 0028 00000007") + inner),
+        tcp("5018 7f1a 9b2d 0000  61*5"),
+        tcp("8010 7f1a 9b2d 0000  0101 080a 11223344 55667788  61*9"),
+        tcp("a002 7f1a 9b2d 0000  0204 05b4 0402 080a 11223344 00000000 01 030307"),
+        tcp("b010 7f1a 9b2d 0007  0101 0512 91929394 a1a2a3a4 b1b2b3b4 c1c2c3c4 0000 0000  61"),
+        tcp("6010 7f1a 9b2d 0000  fd04 0000"),
+    };
+    Host host(PluginLibrary::open(NETFLOOR_PLUGIN));
+    LayerView fast(host);
+    LayerView slow(host, LayerReading::byPass);
+    const auto expectSame = [&](const Octets &packet, std::size_t wireOctets, std::size_t changed) {
+        const RunOptions options{.wireOctets = wireOctets};
+        fast.read(packet, options);
+        slow.read(packet, options);
+        ASSERT_EQ(textOf(fast), textOf(slow)) << hexText(packet) << ", octet " << changed << ", " << wireOctets;
+    };
+    for (const Octets &payload : payloads) {
+        const std::uint8_t protocol = payload[0] == 0xd4 ? tcpProtocol : udpProtocol;
+        for (const Octets &packet :
+             {ipv4({.protocol = protocol, .payload = payload}), ipv6({.nextHeader = protocol, .payload = payload})}) {
+            for (std::size_t octet = 0; octet < packet.size(); ++octet) {
+                for (const std::uint8_t value : values) {
+                    Octets changed = packet;
+                    changed[octet] = value;
+                    expectSame(changed, 0, octet);
+                }
+                const Octets cut(packet.begin(), packet.begin() + static_cast<std::ptrdiff_t>(octet));
+                expectSame(cut, 0, octet);
+                expectSame(cut, packet.size(), octet);
+                if (HasFatalFailure()) {
+                    return;
+                }
+            }
+        }
+    }
+    EXPECT_LT(fast.passes(), slow.passes() / 2);
+}
+
 } // namespace
 } // namespace netfloor::test

@@ -16,6 +16,7 @@
 
 #include <array>
 #include <cstdint>
+#include <memory>
 #include <optional>
 #include <span>
 #include <string>
@@ -41,14 +42,28 @@ struct Layer {
     std::uint32_t textEnd = 0;
 };
 
+class PlainPackets;
+struct PlainHeader;
+struct PlainPacket;
+
+// How a view reads packets.
+enum class LayerReading : std::uint8_t {
+    // Those with one IP header, TCP or UDP and the usual options out of their octets, in the places that the plug-in
+    // gives for the fields of sample packets; all others by the MD pass. The layers are the same, in a fraction of the
+    // time. Where Host::owners() were changed, all packets are read by the pass.
+    fast,
+    byPass, // all by the MD pass
+};
+
 class LayerView final : private Sink {
 public:
     static constexpr std::uint16_t mostIpLayers = 16;
 
-    explicit LayerView(Host &host);
+    explicit LayerView(Host &host, LayerReading reading = LayerReading::fast);
+    ~LayerView() override;
 
-    // Reads the packet and the packets inside it by the MD pass. Of a packet that was cut, RunOptions::wireOctets gives
-    // the length on the wire. Throws as Host::run does.
+    // Reads the packet and the packets inside it. Of a packet that was cut, RunOptions::wireOctets gives the length on
+    // the wire. Throws as Host::run does.
     void read(std::span<const std::uint8_t> packet, const RunOptions &options = {});
 
     [[nodiscard]] std::span<const Layer> layers() const { return layers_; } // as they begin
@@ -86,6 +101,9 @@ public:
     [[nodiscard]] std::string_view limit() const { return limit_; } // why layers are missing, or nothing
     [[nodiscard]] bool isCutOff() const { return isCutOff_; }       // a pass was
 
+    // Passes that were run for all packets so far. Packets that were read without one are not in it.
+    [[nodiscard]] std::uint64_t passes() const { return passes_; }
+
 private:
     struct Value {
         std::uint32_t number;
@@ -98,12 +116,16 @@ private:
     void field(const FieldView &field) override;
     void end(const PassEnd &end) override;
 
+    [[nodiscard]] bool readPlain(std::span<const std::uint8_t> octets, std::size_t wireOctets);
+    void addHeader(const PlainHeader &header, std::uint32_t octet);
     [[nodiscard]] bool openLayer(LayerKind kind, std::uint32_t octet);
     void keepVersion(Layer &layer, std::uint32_t octet, LayerField opener);
-    void keepPayload(const FieldView &field, std::uint32_t octet);
+    void keepPayload(std::string_view name, std::string_view text, std::uint32_t octet, std::uint32_t endOctet);
 
     Host &host_;
     LayerFieldMap map_;
+    LayerReading reading_;
+    std::unique_ptr<PlainPackets> plain_; // from the first packet on
     std::span<const std::uint8_t> packet_;
     std::vector<Layer> layers_;
     std::vector<Value> values_;
@@ -115,6 +137,7 @@ private:
     std::uint16_t ipLayers_ = 0;
     bool isCutOff_ = false;
     bool isFull_ = false;
+    std::uint64_t passes_ = 0;
     bool isLaterFragment_ = false;
 };
 

@@ -89,7 +89,11 @@ public:
     // The owner: by key and protocol, else by key, else by protocol, else the default.
     [[nodiscard]] const Owner &find(std::uint32_t key, std::optional<std::uint32_t> protocol) const;
 
+    // Nothing was added or set: the payload of TCP and UDP is data.
+    [[nodiscard]] bool isUnchanged() const { return isUnchanged_; }
+
 private:
+    bool isUnchanged_ = true;
     std::map<std::pair<std::uint32_t, std::uint32_t>, Owner> byKeyAndProtocol_;
     std::map<std::uint32_t, Owner> byKey_;
     std::map<std::uint32_t, Owner> byProtocol_;
