@@ -97,6 +97,12 @@ void addFieldsOptions(CLI::App &app, Options &options) {
            "As a page of reference, all fields by protocol")
         ->excludes(json)
         ->excludes("field");
+    app.add_flag_callback(
+           "--tables", [&options] { options.form = FieldsForm::tables; },
+           "Instead of fields, the columns of the tables that json and export write, as a page of reference")
+        ->excludes(json)
+        ->excludes("--markdown")
+        ->excludes("field");
     addPluginOption(app, options);
 }
 

@@ -16,7 +16,7 @@ namespace netfloor::cli {
 
 enum class Command : std::uint8_t { summary, detail, verify, keys, fields };
 
-enum class FieldsForm : std::uint8_t { text, json, markdown };
+enum class FieldsForm : std::uint8_t { text, json, markdown, tables };
 
 enum class Colour : std::uint8_t { automatic, always, never };
 

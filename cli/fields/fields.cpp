@@ -89,12 +89,18 @@ Fields listFields(const FieldTables &tables) {
 } // namespace
 
 void showFields(const Options &options) {
+    Output out(false, false);
+    if (options.form == FieldsForm::tables) {
+        out << tablesText();
+        out.flush();
+        return;
+    }
     const FieldTables tables(PluginLibrary::open(findPlugin(options.plugin)));
     const auto [fields, isList] = choose(listFields(tables), options.field);
-    Output out(false, false);
     switch (options.form) {
     case FieldsForm::json: out << jsonText(fields); break;
     case FieldsForm::markdown: out << referenceText(fields); break;
+    case FieldsForm::tables: break;
     case FieldsForm::text: out << (isList ? listText(fields) : detailsText(fields)); break;
     }
     out.flush();

@@ -27,6 +27,7 @@ using Fields = std::vector<ListedField>;
 [[nodiscard]] std::string detailsText(Fields fields); // those that differ in nothing but id, section and key as one
 [[nodiscard]] std::string jsonText(const Fields &fields);
 [[nodiscard]] std::string referenceText(const Fields &fields);
+[[nodiscard]] std::string tablesText(); // not the fields, but the columns of all tables
 
 // "4", "variable".
 [[nodiscard]] std::string widthText(const FieldDescription &field);

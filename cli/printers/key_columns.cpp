@@ -142,17 +142,16 @@ void KeyRows::write(const LayerView &view, std::uint16_t ipLayer, const Layer *c
 
 void KeyRows::writeValue(const LayerView &view, const Layer &layer, LayerField field) const {
     const LayerValue kind = view.valueKind(layer, field);
-    if (kind != LayerValue::ipv4Address && kind != LayerValue::ipv6Address) {
+    if (kind == LayerValue::number || kind == LayerValue::packetNumber) {
         out_ << *view.number(layer, field);
         return;
     }
-    if (!raw_) {
+    if (!raw_ && kind != LayerValue::octets) {
         TextRoom room;
         out_ << view.address(layer, field, room);
         return;
     }
-    for (const std::uint8_t octet :
-         view.packet().subspan(view.octet(layer, field), kind == LayerValue::ipv4Address ? 4 : 16)) {
+    for (const std::uint8_t octet : view.octets(layer, field)) {
         out_.octet(octet);
     }
 }

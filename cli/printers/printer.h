@@ -9,6 +9,7 @@
 #include <string_view>
 
 #include "exit_code.h"
+#include "netfloor-analysis/rows.h"
 #include "netfloor-capture/link_layer.h"
 #include "netfloor-capture/packet.h"
 #include "netfloor-host/plugin_host.h"
@@ -47,11 +48,8 @@ struct PacketToPrint {
     std::size_t timeWidth;  // of its column
     std::string_view file;  // empty where there is one
 
-    [[nodiscard]] RunOptions runOptions() const {
-        RunOptions options;
-        options.wireOctets = captured.isCut() ? captured.wireOctets - network.offset : 0;
-        return options;
-    }
+    [[nodiscard]] PacketInput input() const { return {captured, network, other}; }
+    [[nodiscard]] RunOptions runOptions() const { return input().runOptions(); }
 };
 
 // A printer keeps of a packet nothing but counts: each thread that decodes has one, and packets of any part of a

@@ -163,6 +163,8 @@ void LayerView::field(const FieldView &field) {
     value = {field.value, place.first, entry.value};
     if (entry.value == LayerValue::packetNumber) {
         value.number = be32(packet_, place.first);
+    } else if (entry.value == LayerValue::octets) {
+        value.number = place.end - place.first;
     }
     // The plug-in reads what is in the middle of a segment as a header.
     isLaterFragment_ |= entry.field == layerField("ip.fragment_offset") && field.value != 0;
@@ -197,6 +199,21 @@ void LayerView::keepPayload(std::string_view name, std::string_view text, std::u
 
 void LayerView::end(const PassEnd &end) {
     isCutOff_ |= end.ending == Ending::cutOff;
+}
+
+std::span<const std::uint8_t> LayerView::octets(const Layer &layer, LayerField field) const {
+    if (!has(layer, field)) {
+        return {};
+    }
+    const Value &value = values_[layer.values + field.place];
+    switch (value.kind) {
+    case LayerValue::octets: return packet_.subspan(value.octet, value.number);
+    case LayerValue::ipv4Address: return packet_.subspan(value.octet, sizeof(std::uint32_t));
+    case LayerValue::ipv6Address: return packet_.subspan(value.octet, Ipv6Octets().size());
+    case LayerValue::number:
+    case LayerValue::packetNumber: break;
+    }
+    return {};
 }
 
 std::string_view LayerView::address(const Layer &layer, LayerField field, TextRoom &room) const {

@@ -80,6 +80,8 @@ public:
     [[nodiscard]] std::optional<std::uint32_t> number(const Layer &layer, LayerField field) const {
         return has(layer, field) ? std::optional(values_[layer.values + field.place].number) : std::nullopt;
     }
+    // The octets of an address or of LayerValue::octets, as the packet has them.
+    [[nodiscard]] std::span<const std::uint8_t> octets(const Layer &layer, LayerField field) const;
     // Where the octets of a field begin.
     [[nodiscard]] std::uint32_t octet(const Layer &layer, LayerField field) const {
         return values_[layer.values + field.place].octet;
@@ -106,7 +108,7 @@ public:
 
 private:
     struct Value {
-        std::uint32_t number;
+        std::uint32_t number; // LayerValue::octets: how many
         std::uint32_t octet;
         LayerValue kind;
     };
