@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: MIT
 #include "decode.h"
 
+#include <algorithm>
 #include <cstdlib>
 #include <iostream>
 #include <optional>
@@ -10,6 +11,7 @@
 #include <unistd.h>
 
 #include "interrupt.h"
+#include "jobs.h"
 #include "netfloor-capture/capture_writer.h"
 #include "output.h"
 #include "packet_decoder.h"
@@ -39,9 +41,13 @@ public:
     explicit Decoding(const Options &options)
         : options_(options),
           out_(wantsColour(options.colour), ::isatty(STDOUT_FILENO) == 1),
-          decoder_(options, PluginLibrary::open(findPlugin(options.plugin)), out_) {
+          library_(PluginLibrary::open(findPlugin(options.plugin))),
+          decoder_(options, library_, out_) {
         if (!options.write.empty()) {
             refuseToWriteWhatIsRead();
+        }
+        if (jobCount(options) > 1) {
+            jobs_.emplace(options, wantsColour(options.colour), library_);
         }
     }
 
@@ -92,7 +98,7 @@ private:
         }
         startPart(source.capture().name());
         Tally tally;
-        readPackets(source, tally);
+        readAll(source, tally);
         source.end();
         all_.add(tally);
         printer().finish(tally);
@@ -131,19 +137,40 @@ private:
         (out_ << " <==").stop(Style::bold) << '\n';
     }
 
-    void readPackets(PacketSource &source, Tally &tally) {
-        CapturedPacket packet;
+    void readAll(PacketSource &source, Tally &tally) {
         const std::string_view file = hasSeveral() ? std::string_view(source.capture().name()) : std::string_view();
-        while ((!options_.count || tally.packets < *options_.count) && source.next(packet)) {
+        const bool isLive = source.capture().isLive();
+        const auto decode = [&](const CapturedPacket &packet) {
             if (const auto kind = decoder_.decode(packet, source.timeStart(), file)) {
                 keep(packet, *kind, tally);
             }
-            if (source.capture().isLive()) {
-                out_.flush();
-            } else {
-                out_.endPacket();
+            isLive ? out_.flush() : out_.endPacket();
+        };
+        if (jobs_) {
+            DecodedBlock first;
+            const bool hasPackets = first.fill(source);
+            if (hasPackets && (first.packets.isFull() || isLive)) {
+                return readInThreads(first, source, file, tally);
             }
+            std::ranges::for_each(first.packets.packets(), decode); // these are all: threads would take longer to start
         }
+        CapturedPacket packet;
+        while ((!options_.count || tally.packets < *options_.count) && source.next(packet)) {
+            decode(packet);
+        }
+    }
+
+    void readInThreads(DecodedBlock &first, PacketSource &source, std::string_view file, Tally &tally) {
+        jobs_->decode(first, source, file, [&](const DecodedBlock &block) {
+            const auto packets = block.packets.packets();
+            for (std::size_t i = 0; i < packets.size(); ++i) {
+                if (block.kinds[i]) {
+                    keep(packets[i], *block.kinds[i], tally);
+                }
+            }
+            out_.writeThrough(block.text.view());
+        });
+        jobs_->giveCounts(printer());
     }
 
     // A packet that was shown.
@@ -183,7 +210,9 @@ private:
 
     const Options &options_;
     Output out_;
-    PacketDecoder decoder_;
+    PluginLibrary library_;
+    PacketDecoder decoder_;    // of the thread that reads, where there are no jobs
+    std::optional<Jobs> jobs_; // none: one thread does all
     std::optional<CaptureWriter> writer_;
     Tally all_; // of all captures
     bool isStarted_ = false;

@@ -2,10 +2,12 @@
 #include "interrupt.h"
 
 #include <array>
+#include <atomic>
 #include <cerrno>
 #include <csignal>
 
 #include <fcntl.h>
+#include <pthread.h>
 #include <unistd.h>
 
 namespace netfloor::cli {
@@ -14,7 +16,11 @@ namespace {
 
 constexpr std::array watched = {SIGINT, SIGTERM};
 
-volatile std::sig_atomic_t signalThatCame = 0;
+constexpr int wakingSignal = SIGURG; // does nothing where nobody waits
+
+std::atomic<int> signalThatCame = 0;
+std::atomic<pthread_t> reader;
+static_assert(decltype(signalThatCame)::is_always_lock_free && decltype(reader)::is_always_lock_free);
 int nothingToRead = -1;
 
 // The reader may wait for standard input, and starts again when a signal wakes it. It finds the end there.
@@ -22,14 +28,20 @@ extern "C" void netfloorInterrupted(int signal) {
     const int before = errno;
     signalThatCame = signal;
     (void)::dup2(nothingToRead, STDIN_FILENO);
+    (void)::pthread_kill(reader, wakingSignal);
     errno = before;
 }
+
+extern "C" void netfloorWoken(int /*signal*/) {}
 
 } // namespace
 
 void watchForInterrupt() {
     nothingToRead = ::open("/dev/null", O_RDONLY | O_CLOEXEC);
+    readsInThisThread();
     struct sigaction action = {};
+    action.sa_handler = netfloorWoken;
+    (void)::sigaction(wakingSignal, &action, nullptr);
     action.sa_handler = netfloorInterrupted;
     action.sa_flags = static_cast<int>(SA_RESETHAND); // and not SA_RESTART
     for (const int signal : watched) {
@@ -43,6 +55,10 @@ void watchForInterrupt() {
 
 bool isInterrupted() {
     return signalThatCame != 0;
+}
+
+void readsInThisThread() {
+    reader = ::pthread_self();
 }
 
 void endIfInterrupted() {

@@ -8,6 +8,9 @@ void watchForInterrupt();
 
 [[nodiscard]] bool isInterrupted();
 
+// An interrupt wakes the thread that called this last, if it waits for standard input.
+void readsInThisThread();
+
 // Ends the process by the signal that interrupted it, which a shell that runs a script looks for. Does nothing where
 // there was none.
 void endIfInterrupted();

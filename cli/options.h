@@ -47,6 +47,7 @@ struct Options {
     std::string where;                  // a condition on the layers
     std::optional<std::uint64_t> count; // packets to show at most
     PacketNumbers packets;              // to show
+    std::optional<unsigned> jobs;       // threads that decode
     Colour colour = Colour::automatic;
     bool utc = false;                 // times of day instead of seconds since the first packet
     bool all = false;                 // summary, detail: nothing left out
@@ -57,6 +58,9 @@ struct Options {
     std::vector<std::string> columns; // keys: these fields in the place of the usual ones
     std::string field;                // fields: those of this name, or of this id; empty: all
     FieldsForm form = FieldsForm::text;
+
+    // Without --jobs: for rows and totals all cores, for what people look at one.
+    [[nodiscard]] bool usesAllCores() const { return command == Command::keys || command == Command::verify; }
 };
 
 // The options, or the code to end with when the command line has been answered: --help, or a mistake.
