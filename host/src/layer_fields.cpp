@@ -24,6 +24,9 @@ LayerFieldMap::LayerFieldMap(std::span<const FieldDescription> fields) : entries
         }
         entry = {findLayerField(row.name).value(), row.value, true, row.opensLayer};
     }
+    for (const Entry &entry : entries_) {
+        known_.push_back(entry.isKnown ? 1 : 0);
+    }
 }
 
 } // namespace netfloor

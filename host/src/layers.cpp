@@ -85,6 +85,9 @@ bool LayerView::readPlain(std::span<const std::uint8_t> octets, std::size_t wire
         return true;
     }
     addHeader(*found.ip, offset_);
+    if (found.transport == nullptr) {
+        return true;
+    }
     const std::uint32_t transport = offset_ + found.ip->octets;
     (void)openLayer(found.transportKind, transport); // only those of IP have a limit
     addHeader(*found.transport, transport);
@@ -92,7 +95,7 @@ bool LayerView::readPlain(std::span<const std::uint8_t> octets, std::size_t wire
         addHeader(*found.options[i].header, offset_ + found.options[i].octet);
     }
     constexpr std::uint32_t mostUnread = 4; // the plug-in does not hand off so few
-    if (found.endOctet - found.payloadOctet > mostUnread) {
+    if (found.isHandedOff && found.endOctet - found.payloadOctet > mostUnread) {
         const auto end = std::min(found.endOctet, static_cast<std::uint32_t>(octets.size()));
         keepPayload(dataName, DataText(longDataStart, (end - found.payloadOctet) * bitsPerOctet).view(),
                     offset_ + found.payloadOctet, offset_ + end);
@@ -138,6 +141,9 @@ void LayerView::field(const FieldView &field) {
         return;
     }
     if (field.id == 0) {
+        if (isLaterFragment_) {
+            return;
+        }
         const Place place = placeOf(field.ranges);
         keepPayload(field.name, field.text.view(), place.first + offset_, place.end + offset_);
         return;

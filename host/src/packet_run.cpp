@@ -91,6 +91,7 @@ std::int32_t PacketRun::runPass(Pass pass, Sink &sink, const TestRunOptions *tes
     sink_ = &sink;
     withBlocks_ = pass == Pass::md && sink.wantsBlocks();
     withBlockNames_ = sink.wantsBlockNames();
+    wantedFields_ = withBlocks_ ? std::span<const std::uint8_t>() : sink.wantedFields();
     prepare(test);
     sink.begin(pass, packet_);
     const std::int32_t result = enter();
@@ -247,6 +248,10 @@ void PacketRun::addField(std::uint32_t outputRangeCount, const BitRange *ranges,
     if (exception_) {
         return;
     }
+    const bool isWanted = this->isWanted(fieldId);
+    if (!isWanted && !cut_.isCut()) { // in a packet that is cut each field is compared between two runs
+        return fillFieldRecordHead();
+    }
     try {
         NamedField &field = names_.find(fieldId);
         const std::uint8_t *const head = fieldRecordHead();
@@ -260,7 +265,7 @@ void PacketRun::addField(std::uint32_t outputRangeCount, const BitRange *ranges,
         view_.ranges = {ranges, outputRangeCount};
         view_.bitOrder = bitOrder;
         view_.recordHead = {head[0], head[1], head[2]};
-        if (!cut_.isCut() || isCaptured(view_.name, view_.ranges)) {
+        if ((!cut_.isCut() || isCaptured(view_.name, view_.ranges)) && isWanted) {
             reportField(field);
         }
         preDecode_.context.fieldRecordCount = (preDecode_.context.fieldRecordCount + 1) % fieldRecordCount;

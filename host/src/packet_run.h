@@ -74,6 +74,9 @@ private:
     // Fills the head of the current field record, so that the host sees what the plug-in did not write.
     void fillFieldRecordHead() { std::memset(fieldRecordHead(), untouchedOctet, headOctets); }
     void reportField(NamedField &field);
+    [[nodiscard]] bool isWanted(std::uint32_t fieldId) const {
+        return wantedFields_.empty() || (fieldId < wantedFields_.size() && wantedFields_[fieldId] != 0);
+    }
     // Whether a field is there to be reported; the first that is not is told to the sink.
     [[nodiscard]] bool isCaptured(std::string_view name, std::span<const BitRange> ranges);
     [[nodiscard]] std::uint32_t capturedBitsLeft() const {
@@ -107,6 +110,7 @@ private:
     Sink *sink_ = nullptr;
     bool withBlocks_ = true; // the sink wants them
     bool withBlockNames_ = true;
+    std::span<const std::uint8_t> wantedFields_; // empty: all
     FieldView view_; // of the field at hand; to clear a new one takes as long as all else that is done for it
     RunOptions options_;
     bool followStop_ = true;

@@ -19,12 +19,15 @@ constexpr std::uint32_t ipv6Octets = 40;
 constexpr std::uint32_t tcpOctets = 20;
 constexpr std::uint32_t udpOctets = 8;
 constexpr std::uint32_t sackBlockOctets = 8;
+constexpr std::uint32_t echoOctets = 8;
+constexpr std::uint8_t icmpProtocol = 1;
 constexpr std::uint8_t tcpProtocol = 6;
 constexpr std::uint8_t udpProtocol = 17;
 
-// The samples. No field has the same value when its octets are read in another order.
+// The samples. No field has the same value when its octets are read in another order. As DF is set, the fragment offset
+// does not matter to the plug-in.
 constexpr std::array<std::uint8_t, 72> tcpSample = {
-    0x45, 0xa9, 0x00, 0x48, 0x12, 0x34, 0x40, 0x00, 0x39, 0x06, 0xab, 0xcd, // IPv4
+    0x45, 0xa9, 0x00, 0x48, 0x12, 0x34, 0x61, 0x23, 0x39, 0x06, 0xab, 0xcd, // IPv4
     0x0a, 0x01, 0x02, 0x03, 0xc0, 0xa8, 0x05, 0x06,                         //
     0x30, 0x39, 0xd4, 0x31, 0x01, 0x23, 0x45, 0x67, 0x89, 0xab, 0xcd, 0xef, // TCP
     0xd0, 0x12, 0x7f, 0x1a, 0x9b, 0x2d, 0x00, 0x07,                         //
@@ -37,6 +40,11 @@ constexpr std::array<std::uint8_t, 28> udpSample = {
     0x45, 0xa9, 0x00, 0x1c, 0x12, 0x34, 0x40, 0x00, 0x39, 0x11, 0xab, 0xcd, // IPv4
     0x0a, 0x01, 0x02, 0x03, 0xc0, 0xa8, 0x05, 0x06,                         //
     0x30, 0x39, 0xd4, 0x31, 0x00, 0x08, 0x9b, 0x2d,                         // UDP
+};
+constexpr std::array<std::uint8_t, 28> echoSample = {
+    0x45, 0xa9, 0x00, 0x1c, 0x12, 0x34, 0x40, 0x00, 0x39, 0x01, 0xab, 0xcd, // IPv4
+    0x0a, 0x01, 0x02, 0x03, 0xc0, 0xa8, 0x05, 0x06,                         //
+    0x08, 0x00, 0x9b, 0x2d, 0x12, 0x34, 0x56, 0x78,                         // ICMP
 };
 constexpr std::array<std::uint8_t, 48> ipv6Sample = {
     0x6a, 0xb1, 0x23, 0x45, 0x00, 0x08, 0x11, 0x39,                                                 // IPv6
@@ -118,7 +126,12 @@ private:
             field.wordOctet = static_cast<std::int8_t>(wordOctet);
             field.shift = static_cast<std::uint8_t>(wordEnd - 1 - seen.lastBit);
             field.mask = ~std::uint32_t{0} >> (wordBits - seen.bits);
-            isUsable_ &= field.value == LayerValue::packetNumber || field.read(packet_.data() + first) == seen.number;
+            const std::uint32_t number = field.read(packet_.data() + first);
+            if (field.value != LayerValue::packetNumber && number != seen.number) {
+                isUsable_ &= number != 0 && seen.number % number == 0;
+                field.unit = static_cast<std::uint8_t>(number == 0 ? 0 : seen.number / number);
+                isUsable_ &= field.read(packet_.data() + first) == seen.number;
+            }
         }
         header.present |= 1U << field.place;
         header.endOctet = std::max(header.endOctet, endOctet);
@@ -144,9 +157,11 @@ PlainPackets::PlainPackets(Host &host, const LayerFieldMap &map) {
     timestamps_ = tcp.header(optionsOctet + 20, 10);
     Sample udp(host, map, udpSample);
     udp_ = udp.header(ipv4Octets, udpOctets);
+    Sample echo(host, map, echoSample);
+    icmpEcho_ = echo.header(ipv4Octets, echoOctets);
     Sample ipv6(host, map, ipv6Sample);
     ipv6_ = ipv6.header(0, ipv6Octets);
-    isUsable_ = tcp.isUsable() && udp.isUsable() && ipv6.isUsable();
+    isUsable_ = tcp.isUsable() && udp.isUsable() && echo.isUsable() && ipv6.isUsable();
 }
 
 bool PlainPackets::find(Octets octets, std::size_t wireOctets, PlainPacket &found) const {
@@ -154,14 +169,12 @@ bool PlainPackets::find(Octets octets, std::size_t wireOctets, PlainPacket &foun
         return false;
     }
     std::uint8_t protocol = 0;
+    bool isLaterFragment = false;
     if (octets[0] == 0x45) {
-        const bool isLaterFragment = (be16(octets, 6) & 0x1fffU) != 0;
-        if (isLaterFragment) {
-            return false;
-        }
         found.ip = &ipv4_;
         found.endOctet = be16(octets, 2);
         protocol = octets[9];
+        isLaterFragment = (be16(octets, 6) & 0x1fffU) != 0;
     } else if (octets[0] >> 4U == 6 && octets.size() >= ipv6Octets + udpOctets) {
         found.ip = &ipv6_;
         found.endOctet = ipv6Octets + be16(octets, 4);
@@ -169,25 +182,46 @@ bool PlainPackets::find(Octets octets, std::size_t wireOctets, PlainPacket &foun
     } else {
         return false;
     }
-    if (found.endOctet > std::max(octets.size(), wireOctets)) {
+    found.optionCount = 0;
+    if (found.endOctet < found.ip->octets || found.endOctet > std::max(octets.size(), wireOctets)) {
         return false;
     }
-    found.optionCount = 0;
-    const bool isFound = protocol == tcpProtocol ? findTcp(octets, found) : protocol == udpProtocol && findUdp(found);
+    if (isLaterFragment) {
+        found.transport = nullptr;
+        return true;
+    }
     // A pass looks up to four octets ahead; what it sees there must have been captured.
-    return isFound && (found.endOctet <= octets.size() || found.payloadOctet + wordOctets <= octets.size());
+    return findTransport(protocol, octets, found) &&
+           (found.endOctet <= octets.size() || found.payloadOctet + wordOctets <= octets.size());
 }
 
-bool PlainPackets::findUdp(PlainPacket &found) const {
-    found.transport = &udp_;
-    found.transportKind = LayerKind::udp;
-    found.payloadOctet = found.transportOctet() + udpOctets;
-    return found.payloadOctet <= found.endOctet;
+bool PlainPackets::findTransport(std::uint8_t protocol, Octets octets, PlainPacket &found) const {
+    const std::uint32_t first = found.ip->octets;
+    found.isHandedOff = true;
+    switch (protocol) {
+    case tcpProtocol: return findTcp(octets, found);
+    case udpProtocol:
+        found.transport = &udp_;
+        found.transportKind = LayerKind::udp;
+        found.payloadOctet = first + udpOctets;
+        return found.payloadOctet <= found.endOctet;
+    case icmpProtocol: {
+        constexpr std::uint32_t echoReply = 0; // type and code
+        constexpr std::uint32_t echo = 0x0800;
+        const std::uint32_t message = be16(octets, first);
+        found.transport = &icmpEcho_;
+        found.transportKind = LayerKind::icmp;
+        found.payloadOctet = first + echoOctets;
+        found.isHandedOff = false;
+        return found.ip == &ipv4_ && (message == echo || message == echoReply) && found.payloadOctet <= found.endOctet;
+    }
+    default: return false;
+    }
 }
 
 bool PlainPackets::findTcp(Octets octets, PlainPacket &found) const {
     constexpr std::uint32_t dataOffset = 12;
-    const std::uint32_t first = found.transportOctet();
+    const std::uint32_t first = found.ip->octets;
     if (first + tcpOctets > std::min<std::size_t>(found.endOctet, octets.size())) {
         return false;
     }

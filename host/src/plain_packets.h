@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: MIT
-// Plain packets: one IP header without options or extension headers, then UDP, or TCP with the usual options. Most
-// traffic is that. The fields of such a packet have fixed places, so that they can be read without a pass.
+// Plain packets: one IP header without options or extension headers, then UDP, TCP with the usual options, an echo of
+// ICMP, or a later fragment. Most traffic is that. The fields of such a packet have fixed places, so that they can be
+// read without a pass.
 //
 // The places are those of the plug-in: it reads a few sample packets, and what it reports of them is what is known
 // here.
@@ -27,9 +28,11 @@ struct PlainField {
     std::uint8_t shift = 0;    // to the right, of these as one number
     std::uint32_t mask = 0;    // after the shift
 
+    std::uint8_t unit = 1; // by which it is multiplied
+
     // `header` is where the header begins.
     [[nodiscard]] std::uint32_t read(const std::uint8_t *header) const {
-        return loadBe32(header + wordOctet) >> shift & mask;
+        return (loadBe32(header + wordOctet) >> shift & mask) * unit;
     }
 };
 
@@ -50,15 +53,13 @@ struct PlainPacket {
     };
 
     const PlainHeader *ip = nullptr;
-    const PlainHeader *transport = nullptr;
+    const PlainHeader *transport = nullptr; // none in a later fragment
     LayerKind transportKind = LayerKind::tcp;
+    bool isHandedOff = false; // the payload, to an owner
     std::uint32_t payloadOctet = 0;
     std::uint32_t endOctet = 0; // of the payload, by the length in the IP header
     std::uint32_t optionCount = 0;
     std::array<Option, mostOptions> options; // those with fields
-
-    [[nodiscard]] std::uint32_t transportOctet() const { return ip->octets; }
-    [[nodiscard]] std::uint32_t payloadOctets() const { return endOctet - payloadOctet; }
 };
 
 class PlainPackets {
@@ -69,7 +70,8 @@ public:
     [[nodiscard]] bool find(std::span<const std::uint8_t> octets, std::size_t wireOctets, PlainPacket &found) const;
 
 private:
-    [[nodiscard]] bool findUdp(PlainPacket &found) const;
+    [[nodiscard]] bool findTransport(std::uint8_t protocol, std::span<const std::uint8_t> octets,
+                                     PlainPacket &found) const;
     [[nodiscard]] bool findTcp(std::span<const std::uint8_t> octets, PlainPacket &found) const;
     [[nodiscard]] bool findOptions(std::span<const std::uint8_t> area, std::uint32_t octet, PlainPacket &found) const;
     [[nodiscard]] const PlainHeader *option(std::uint8_t kind, std::uint32_t length) const;
@@ -79,6 +81,7 @@ private:
     PlainHeader ipv6_;
     PlainHeader tcp_;
     PlainHeader udp_;
+    PlainHeader icmpEcho_;
     PlainHeader maximumSegment_;
     PlainHeader windowScale_;
     PlainHeader sackPermitted_;

@@ -164,6 +164,7 @@ std::string textOf(const LayerView &view) {
 
 // Each octet of each header with values that matter, and each header cut, by both ways.
 TEST(Layers, areTheSameWithoutAPass) {
+    constexpr std::uint8_t icmpProtocol = 1;
     constexpr std::uint8_t tcpProtocol = 6;
     const Octets values = hex("00 01 02 05 08 0a 12 20 45 50 ff");
     const Octets tcpHead = hex("d431 0050 01234567 89abcdef");
@@ -176,6 +177,7 @@ TEST(Layers, areTheSameWithoutAPass) {
         tcp("a002 7f1a 9b2d 0000  0204 05b4 0402 080a 11223344 00000000 01 030307"),
         tcp("b010 7f1a 9b2d 0007  0101 0512 91929394 a1a2a3a4 b1b2b3b4 c1c2c3c4 0000 0000  61"),
         tcp("6010 7f1a 9b2d 0000  fd04 0000"),
+        hex("0800 9b2d 1234 5678 61*9"),
     };
     Host host(PluginLibrary::open(NETFLOOR_PLUGIN));
     LayerView fast(host);
@@ -187,7 +189,9 @@ TEST(Layers, areTheSameWithoutAPass) {
         ASSERT_EQ(textOf(fast), textOf(slow)) << hexText(packet) << ", octet " << changed << ", " << wireOctets;
     };
     for (const Octets &payload : payloads) {
-        const std::uint8_t protocol = payload[0] == 0xd4 ? tcpProtocol : udpProtocol;
+        const std::uint8_t protocol = payload[0] == 0xd4   ? tcpProtocol
+                                      : payload[0] == 0x08 ? icmpProtocol
+                                                           : udpProtocol;
         for (const Octets &packet :
              {ipv4({.protocol = protocol, .payload = payload}), ipv6({.nextHeader = protocol, .payload = payload})}) {
             for (std::size_t octet = 0; octet < packet.size(); ++octet) {

@@ -180,6 +180,49 @@ private:
     int left_;
 };
 
+// The fields of one id, as they come.
+class OneField final : public Sink {
+public:
+    explicit OneField(std::uint32_t id, bool wantsNoOther) : id_(id), wanted_(wantsNoOther ? id + 1 : 0) {
+        if (wantsNoOther) {
+            wanted_[id] = 1;
+        }
+    }
+    [[nodiscard]] bool wantsBlocks() const override { return false; }
+    [[nodiscard]] std::span<const std::uint8_t> wantedFields() const override { return wanted_; }
+    void field(const FieldView &field) override {
+        if (field.id == id_) {
+            text += std::string(field.text.view()) + std::to_string(field.recordHead[0]) +
+                    std::to_string(field.recordHead[1]) + std::to_string(field.cursor) + "\n";
+        } else {
+            others += field.id != 0 ? 1 : 0;
+        }
+    }
+    std::string text;
+    std::size_t others = 0;
+
+private:
+    std::uint32_t id_;
+    std::vector<std::uint8_t> wanted_;
+};
+
+TEST(Sink, getsTheFieldsThatItWants) {
+    Host host(PluginLibrary::open(NETFLOOR_PLUGIN));
+    for (const std::uint32_t id : {150U, 159U, 489U}) {
+        OneField all(id, false);
+        OneField one(id, true);
+        for (const Octets &packet : packetsOfAllFields()) {
+            for (const std::size_t wireOctets : {std::size_t{0}, packet.size() + 100}) {
+                host.run(Pass::md, packet, all, {.wireOctets = wireOctets});
+                host.run(Pass::md, packet, one, {.wireOctets = wireOctets});
+            }
+        }
+        EXPECT_EQ(one.text, all.text);
+        EXPECT_NE(one.text, "");
+        EXPECT_EQ(one.others, 0U);
+    }
+}
+
 TEST(Sink, endsThePassByAnException) {
     Host host(PluginLibrary::open(NETFLOOR_PLUGIN));
     const Octets packet = ipv4({.protocol = 17, .payload = udp(40000, 40001, hex("00*12"))});

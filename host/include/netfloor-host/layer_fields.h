@@ -287,11 +287,15 @@ public:
 
     [[nodiscard]] const Entry &find(std::uint32_t id) const { return entries_[id < entries_.size() ? id : 0]; }
 
+    // An element for each id, 0 for those that are unknown: see Sink::wantedFields.
+    [[nodiscard]] std::span<const std::uint8_t> known() const { return known_; }
+
     // A sentence for each row that does not name one field of the plug-in.
     [[nodiscard]] const std::vector<std::string> &mismatches() const { return mismatches_; }
 
 private:
     std::vector<Entry> entries_; // by id; the first stands for all unknown ones
+    std::vector<std::uint8_t> known_;
     std::vector<std::string> mismatches_;
 };
 

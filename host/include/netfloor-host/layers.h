@@ -115,6 +115,7 @@ private:
 
     [[nodiscard]] bool wantsBlocks() const override { return false; }
     [[nodiscard]] bool wantsBlockNames() const override { return false; }
+    [[nodiscard]] std::span<const std::uint8_t> wantedFields() const override { return map_.known(); }
     void field(const FieldView &field) override;
     void end(const PassEnd &end) override;
 

@@ -203,6 +203,10 @@ public:
     // Asked likewise. Without them, and without blocks, FieldView::blockName is empty.
     [[nodiscard]] virtual bool wantsBlockNames() const { return true; }
 
+    // Asked likewise, for MD: an element for each id of a field, 0 for one that `field` is not to be called for. Ids
+    // past the end are not wanted either. Empty: all are.
+    [[nodiscard]] virtual std::span<const std::uint8_t> wantedFields() const { return {}; }
+
     virtual void begin(Pass /*pass*/, std::span<const std::uint8_t> /*packet*/) {}
 
     // MD. Each block that is opened is closed, the last one first, and `depth` blocks are open when one opens. Each
