@@ -101,7 +101,7 @@ void PacketRows::read(const PacketInput &packet, RowSink &sink) {
     if (isIp) {
         view_.read(packet.network.octets, packet.runOptions());
     }
-    readPacket(packet);
+    readPacket(packet, sink.wantsChecks());
     sink.row(packet_);
     if (!isIp) {
         return;
@@ -117,7 +117,17 @@ void PacketRows::read(const PacketInput &packet, RowSink &sink) {
     }
 }
 
-void PacketRows::readPacket(const PacketInput &packet) {
+bool PacketRows::holds(const Condition &condition, const Row &row) const {
+    switch (row.kind()) {
+    case RowKind::packet: return condition.holdsFor(view_);
+    case RowKind::layer: return condition.holdsFor(view_, currentLayer_->ipLayer);
+    case RowKind::chunk:
+    case RowKind::cause: break;
+    }
+    return condition.holdsFor(view_, currentLayer_->ipLayer, currentChunk_);
+}
+
+void PacketRows::readPacket(const PacketInput &packet, bool withChecks) {
     constexpr RowKind kind = RowKind::packet;
     const CapturedPacket &captured = packet.captured;
     packet_.clear();
@@ -146,7 +156,9 @@ void PacketRows::readPacket(const PacketInput &packet) {
     if (!note.empty()) {
         packet_.set(column(kind, "note"), text(note));
     }
-    writeChecks(checks_.check(packet.network.octets, packet.runOptions().wireOctets));
+    if (withChecks) {
+        writeChecks(checks_.check(packet.network.octets, packet.runOptions().wireOctets));
+    }
 }
 
 void PacketRows::writeChecks(std::span<const Fault> faults) {
@@ -169,6 +181,7 @@ void PacketRows::writeChecks(std::span<const Fault> faults) {
 void PacketRows::readLayer(std::span<const Layer> layers, RowSink &sink) {
     constexpr RowKind kind = RowKind::layer;
     const Layer &ipLayer = layers.front();
+    currentLayer_ = &ipLayer;
     layer_.clear();
     layer_.set(column(kind, "packet"), packet_[column(RowKind::packet, "packet")]);
     if (packet_.has(column(RowKind::packet, "time"))) {
@@ -244,6 +257,7 @@ void PacketRows::readChunks(std::span<const Layer> layers, RowSink &sink) {
                 chunk_.unset(place); // of the chunk before
             }
         }
+        currentChunk_ = &layer;
         chunk_.set(column(kind, "chunk"), number(++chunks));
         chunk_.set(column(kind, "octet"), number(layer.firstOctet));
         fill(chunk_, layer);

@@ -22,6 +22,7 @@
 #include "netfloor-capture/link_layer.h"
 #include "netfloor-capture/packet.h"
 #include "netfloor-host/checks.h"
+#include "netfloor-host/condition.h"
 #include "netfloor-host/layers.h"
 
 namespace netfloor {
@@ -93,6 +94,9 @@ public:
     RowSink &operator=(const RowSink &) = delete;
     virtual ~RowSink() = default;
 
+    // Without them the columns of the group "checks" are left out, and so is their time.
+    [[nodiscard]] virtual bool wantsChecks() const { return true; }
+
     virtual void row(const Row &row) = 0;
 };
 
@@ -110,8 +114,12 @@ public:
     // Of the packet that was read last, if it has IP.
     [[nodiscard]] const LayerView &view() const { return view_; }
 
+    // Whether a condition holds for the row that the sink is given now, which is of a packet with IP: for any IP layer
+    // of a packet, for a layer, or for the layer and the chunk of a chunk or a cause.
+    [[nodiscard]] bool holds(const Condition &condition, const Row &row) const;
+
 private:
-    void readPacket(const PacketInput &packet);
+    void readPacket(const PacketInput &packet, bool withChecks);
     void writeChecks(std::span<const Fault> faults);
     void readLayer(std::span<const Layer> layers, RowSink &sink);
     void readTunnel(const Layer &ipLayer);
@@ -127,7 +135,9 @@ private:
     Row layer_{RowKind::layer};
     Row chunk_{RowKind::chunk};
     Row cause_{RowKind::cause};
-    std::uint16_t packetBefore_ = 0; // of the layer before
+    std::uint16_t packetBefore_ = 0;      // of the layer before
+    const Layer *currentLayer_ = nullptr; // of the row that the sink is given, for the IP layer
+    const Layer *currentChunk_ = nullptr;
     std::string interfaceName_;
     std::string damage_;
     std::string notes_;
