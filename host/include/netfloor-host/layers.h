@@ -93,6 +93,8 @@ private:
         LayerValue kind;
     };
 
+    using Sink::text; // clang warns where the one above hides it
+
     [[nodiscard]] bool wantsBlocks() const override { return false; }
     [[nodiscard]] bool wantsBlockNames() const override { return false; }
     void field(const FieldView &field) override;
