@@ -113,6 +113,8 @@ private:
         LayerValue kind;
     };
 
+    using Sink::text; // clang warns where the one above hides it
+
     [[nodiscard]] bool wantsBlocks() const override { return false; }
     [[nodiscard]] bool wantsBlockNames() const override { return false; }
     [[nodiscard]] std::span<const std::uint8_t> wantedFields() const override { return map_.known(); }
