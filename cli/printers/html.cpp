@@ -32,7 +32,7 @@ std::string_view withoutBlanks(std::string_view text) {
 std::string_view labelOf(FaultKind kind) {
     switch (kind) {
     case FaultKind::note: return "note";
-    case FaultKind::misread: return "read from a wrong place";
+    case FaultKind::misread: return "misread";
     case FaultKind::damage: break;
     }
     return "DAMAGED";
@@ -183,6 +183,12 @@ private:
             columns = line_.write(packet.network.octets, packet.runOptions());
         } else {
             lineText_ << "no IP: " << packet.other;
+        }
+        const auto damage = std::ranges::find(faults_, FaultKind::damage, &Fault::kind);
+        if (damage != faults_.end()) {
+            text_.clear();
+            appendFaultText(text_, *damage);
+            lineText_ << "  [" << text_ << ']';
         }
         const std::string_view line = lineText_.since(0);
         std::string_view source = line.substr(columns.source, columns.destination - columns.source);
