@@ -21,11 +21,11 @@ function readPage(text) {
 }
 
 function packetOf(row, piece) {
-    const [number, time, length, protocol, source, destination, summary, state, ipOctet] = row;
+    const [number, time, length, protocol, source, destination, summary, state, ipOctet, file = ''] = row;
     return {
-        number, time, length, protocol, source, destination, summary, state, ipOctet,
+        number, time, length, protocol, source, destination, summary, state, ipOctet, file,
         tree: piece.t, octetText: piece.o,
-        searched: row.slice(0, 8).join('\n').toLowerCase(),
+        searched: [number, time, source, destination, protocol, length, state, summary, file].join('\n').toLowerCase(),
     };
 }
 

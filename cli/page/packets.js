@@ -1,7 +1,8 @@
 // SPDX-License-Identifier: MIT
 // The list of packets, and its filter.
 
-const columns = [
+const allColumns = [
+    { name: 'File', key: 'file', most: 24 },
     { name: 'No.', key: 'number', right: true, most: 10 },
     { name: 'Time', key: 'time', right: true, most: 30 },
     { name: 'Source', key: 'source', most: 30 },
@@ -20,7 +21,9 @@ class PacketList {
         this.shown = packets;
         this.index = -1;
         this.chosen = chosen;
-        pane.style.setProperty('--columns', columnWidths(packets));
+        const columns = allColumns.filter(({ key }) => key !== 'file' || packets.some(packet => packet.file !== ''));
+        this.columns = columns;
+        pane.style.setProperty('--columns', columnWidths(columns, packets));
         const head = pane.querySelector('.head .row');
         columns.forEach(column => head.append(
             element('span', { role: 'columnheader', class: column.right ? 'right' : '' }, column.name)));
@@ -44,7 +47,7 @@ class PacketList {
             class: `row ${index === this.index ? 'active' : ''} ${packet.state === 'DAMAGED' ? 'damaged' : ''}` +
                 `${packet.source === '' ? 'other' : ''}`,
         });
-        for (const { key, right } of columns) {
+        for (const { key, right } of this.columns) {
             const cell = element('span', { role: 'gridcell', class: `${key} ${right ? 'right' : ''}` }, packet[key]);
             cell.title = packet[key];
             row.append(cell);
@@ -89,7 +92,7 @@ class PacketList {
 }
 
 // As wide as the widest text, so that the rest is left for the last column.
-function columnWidths(packets) {
+function columnWidths(columns, packets) {
     const widths = columns.map(column => column.name.length);
     for (const packet of packets) {
         columns.forEach(({ key }, i) => { widths[i] = Math.max(widths[i], String(packet[key]).length); });

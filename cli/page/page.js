@@ -63,7 +63,8 @@ function filterBy(text) {
 }
 
 function showHeader() {
-    const { file, filter, where } = page.about;
+    const { files, filter, where } = page.about;
+    const file = files?.join(', ');
     document.title = file ? `${file} - netfloor` : 'netfloor';
     byId('file').textContent = file ?? 'netfloor';
     const chosenBy = [filter && `--filter ${filter}`, where && `--where ${where}`].filter(Boolean).join(', ');
@@ -111,7 +112,8 @@ addEventListener('keydown', event => {
     }
 });
 
-makeSplitter(byId('below-packets'), '--list', false);
+const spareLines = 3; // of the head, and for a scroll bar
+makeSplitter(byId('below-packets'), '--list', false, (page.packets.length + spareLines) * list.rows.height);
 makeSplitter(byId('beside-tree'), '--fields', true);
 makeTheme(byId('theme'));
 makePrint(list.rows, [tree.rows, octets.rows]);

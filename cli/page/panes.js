@@ -2,7 +2,7 @@
 // What surrounds the three panes: their sizes, the colours, paper.
 
 // A splitter sets a share of the main part in percent, by pointer and by arrow keys.
-function makeSplitter(splitter, property, isAcross) {
+function makeSplitter(splitter, property, isAcross, mostPixels = Infinity) {
     const root = document.documentElement;
     const main = splitter.parentElement;
     const set = percent => {
@@ -10,7 +10,8 @@ function makeSplitter(splitter, property, isAcross) {
         root.style.setProperty(property, `${share}%`);
         splitter.setAttribute('aria-valuenow', share);
     };
-    set(parseFloat(getComputedStyle(root).getPropertyValue(property)));
+    const start = parseFloat(getComputedStyle(root).getPropertyValue(property));
+    set(Math.min(start, 100 * mostPixels / main.clientHeight));
     splitter.addEventListener('pointerdown', event => splitter.setPointerCapture(event.pointerId));
     splitter.addEventListener('pointermove', event => {
         if (splitter.hasPointerCapture(event.pointerId)) {

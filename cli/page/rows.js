@@ -50,11 +50,14 @@ class Rows {
         this.body.replaceChildren(...rows);
     }
 
-    // Brings a row into sight.
+    // Brings a row into sight; one that is far away, into the middle.
     show(index) {
         const top = index * this.height;
         const below = top + this.height - this.visibleHeight;
-        if (top < this.pane.scrollTop) {
+        const distance = Math.max(this.pane.scrollTop - top, below - this.pane.scrollTop);
+        if (distance > this.visibleHeight) {
+            this.pane.scrollTop = top - this.visibleHeight / 2;
+        } else if (top < this.pane.scrollTop) {
             this.pane.scrollTop = top;
         } else if (below > this.pane.scrollTop) {
             this.pane.scrollTop = below;

@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: MIT
 // A page for a browser: the list of packets, the tree of fields and the octets of each, in one file.
 #include <algorithm>
-#include <filesystem>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -29,6 +28,11 @@ std::string_view withoutBlanks(std::string_view text) {
     return text;
 }
 
+// The heading and the column of captures have little room.
+std::string_view baseName(std::string_view file) {
+    return file == "-" ? "standard input" : file.substr(file.rfind('/') + 1);
+}
+
 std::string_view labelOf(FaultKind kind) {
     switch (kind) {
     case FaultKind::note: return "note";
@@ -41,20 +45,34 @@ std::string_view labelOf(FaultKind kind) {
 class HtmlPrinter final : public Printer {
 public:
     HtmlPrinter(const Options &options, Output &out, Host &host)
-        : Printer(options, out, host), items_(out), tree_(out, items_), line_(lineText_, host) {
-        out << pageStart() << "f{\"file\":";
-        const std::filesystem::path path = options.file;
-        writePageText(out, options.file == "-" ? "standard input" : path.filename().string());
-        out << ",\"filter\":";
-        writePageText(out, options.filter);
-        out << ",\"where\":";
-        writePageText(out, options.where);
-        out << ",\"version\":";
-        writePageText(out, NETFLOOR_VERSION);
-        out << "}\n";
+        : Printer(options, out, host),
+          items_(out),
+          tree_(out, items_),
+          line_(lineText_, host),
+          limitText_("the page has the first " + countText(options.limit, "packet") +
+                     ", and there are more. --limit N takes another number, --where and --filter choose.") {}
+
+    void start() override {
+        out() << pageStart() << "f{\"version\":";
+        writePageText(out(), NETFLOOR_VERSION);
+        out() << ",\"filter\":";
+        writePageText(out(), options().filter);
+        out() << ",\"where\":";
+        writePageText(out(), options().where);
+        out() << ",\"files\":[";
+        for (std::size_t i = 0; i < options().files.size(); ++i) {
+            out() << (i == 0 ? "" : ",");
+            writePageText(out(), baseName(options().files[i]));
+        }
+        out() << "]}\n";
     }
 
     void print(const PacketToPrint &packet) override {
+        if (packets_ == options().limit) {
+            isFull_ = true;
+            return;
+        }
+        ++packets_;
         faults_ = {};
         if (packet.network.isIp()) {
             faults_ = checks_.check(packet.network.octets, packet.runOptions().wireOctets);
@@ -73,11 +91,15 @@ public:
         writeRow(packet);
     }
 
+    [[nodiscard]] bool hasHeadings() const override { return false; }
+    [[nodiscard]] std::string_view limitText() const override { return isFull_ ? limitText_ : std::string_view(); }
     void remark(std::string_view sentence) override { remarks_.emplace_back(sentence); }
+    void finish(const Tally &tally) override { total_ = tally.text(); }
+    void finishAll(const Tally &tally) override { total_ = tally.text(); }
 
-    void finish(const Tally &tally) override {
+    void end() override {
         out() << "e{\"total\":";
-        writePageText(out(), tally.text());
+        writePageText(out(), total_);
         out() << ",\"remarks\":[";
         for (std::size_t i = 0; i < remarks_.size(); ++i) {
             out() << (i == 0 ? "" : ",");
@@ -155,7 +177,9 @@ private:
             if (at.isInner()) {
                 text_.assign(tunnelName(at.opened().tunnel));
                 if (at.opened().id) {
-                    text_.append(" ").append(std::to_string(*at.opened().id));
+                    lineText_.takeBack(0);
+                    lineText_ << " 0x" << Hex{*at.opened().id};
+                    text_.append(lineText_.since(0));
                 }
                 text_.append(", at octet ").append(std::to_string(at.firstOctet()));
                 writeItem(Kind::block, 0, "Packet inside", text_);
@@ -200,7 +224,12 @@ private:
             out() << ',';
         }
         writePageText(out(), stateOf(captured));
-        out() << ',' << std::uint64_t{packet.network.offset} << "]\n";
+        out() << ',' << std::uint64_t{packet.network.offset};
+        if (!packet.file.empty()) {
+            out() << ',';
+            writePageText(out(), baseName(packet.file));
+        }
+        out() << "]\n";
     }
 
     [[nodiscard]] std::string_view stateOf(const CapturedPacket &captured) const {
@@ -218,6 +247,10 @@ private:
     TimeText times_{TimeForm::utc};
     int linkType_ = 0;
     std::string linkName_; // of that type
+    std::string limitText_;
+    std::uint64_t packets_ = 0;
+    bool isFull_ = false;
+    std::string total_;
     std::vector<std::string> remarks_;
 
     // Of the packet.

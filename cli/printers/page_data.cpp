@@ -1,7 +1,10 @@
 // SPDX-License-Identifier: MIT
 #include "printers/page_data.h"
 
+#include <algorithm>
 #include <array>
+
+#include "netfloor-analysis/utf8.h"
 
 namespace netfloor::cli {
 
@@ -15,18 +18,22 @@ constexpr std::uint32_t kinds = 4;
 
 void writePageText(Output &out, std::string_view text) {
     out << '"';
-    for (const char character : text) {
-        const auto octet = static_cast<unsigned char>(character);
-        if (octet < 0x20 || octet >= 0x7f) { // seen as \x1b
+    while (!text.empty()) {
+        const std::size_t octets = utf8Octets(text);
+        const char first = text.front();
+        if (octets > 1) {
+            out << text.substr(0, octets);
+        } else if (octets == 0 || first < 0x20 || first == 0x7f) {
             out << R"(\\x)";
-            out.octet(octet);
-        } else if (character == '<') {
+            out.octet(static_cast<std::uint8_t>(first));
+        } else if (first == '<') {
             out << R"(\u003c)";
-        } else if (character == '"' || character == '\\') {
-            out << '\\' << character;
+        } else if (first == '"' || first == '\\') {
+            out << '\\' << first;
         } else {
-            out << character;
+            out << first;
         }
+        text.remove_prefix(std::max<std::size_t>(octets, 1));
     }
     out << '"';
 }

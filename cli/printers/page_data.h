@@ -2,11 +2,12 @@
 // The data of the page that `netfloor html` makes, as its script reads them (page/data.js). Each line is a letter and
 // a JSON value:
 //
-//   f  {"file":...,"filter":...,"where":...,"version":...}    once, the first line
+//   f  {"version":...,"filter":...,"where":...,"files":[...]}    once, the first line
 //   n  "label"                                    the next label; items name labels by their index, from 0 on
 //   t  [item, ...]                                the tree of a packet
 //   o  "octets in base64"                         of the packet as captured
-//   p  [number, time, octets, protocol, source, destination, text, state, octet of the IP header]    ends a packet
+//   p  [number, time, octets, protocol, source, destination, text, state, octet of the IP header, file]    ends a
+//      packet; without the file where there is one
 //   e  {"total":...,"remarks":[...]}              once, the last line
 //
 //   item: [4 * depth + kind, label, value, first bit, bits, first bit, bits, ...]
@@ -27,7 +28,8 @@
 
 namespace netfloor::cli {
 
-// Text that came from outside as a JSON string. No part of it can end the element of the page in which it stands.
+// Text that came from outside as a JSON string in UTF-8. No part of it can end the element of the page in which it
+// stands. What is no character, or none to be seen, is shown as \x1b.
 void writePageText(Output &out, std::string_view text);
 
 void writeBase64(Output &out, std::span<const std::uint8_t> octets);

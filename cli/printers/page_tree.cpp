@@ -180,7 +180,7 @@ void PageTree::end(const PassEnd &end) {
     if (!isReadToCut_) {
         writeGapsBefore(octetOf(end.state.cursor), lastDepth_);
     }
-    if (end.bitsLeft != 0 && end.ending == Ending::complete) {
+    if (end.bitsLeft != 0 && end.ending == Ending::complete && !isReadToCut_) {
         const auto octets = static_cast<std::uint32_t>(packet_.size());
         const std::uint32_t first = octetOf(octets * bitsPerOctet - end.bitsLeft + 1);
         if (first < octets) {
