@@ -32,10 +32,6 @@ bool wantsColour(Colour colour) {
            (terminal == nullptr || std::string_view(terminal) != "dumb");
 }
 
-void tell(std::string_view sentence) {
-    std::cerr << "netfloor: " << sentence << '\n';
-}
-
 class Decoding {
 public:
     explicit Decoding(const Options &options)
@@ -55,7 +51,7 @@ public:
         ExitCode code = ExitCode::good;
         for (const std::string &file : options_.files) {
             code = worse(code, tryFile(file));
-            if (isInterrupted()) {
+            if (isInterrupted() || isFull()) {
                 break;
             }
         }
@@ -66,6 +62,12 @@ public:
             startPart("all " + std::to_string(options_.files.size()) + " captures");
             printer().finishAll(all_);
         }
+        if (isFull()) {
+            tell(printer().limitText());
+        }
+        if (isStarted_) {
+            printer().end();
+        }
         out_.flush();
         return worse(code, printer().exitCode());
     }
@@ -73,6 +75,12 @@ public:
 private:
     [[nodiscard]] bool hasSeveral() const { return options_.files.size() > 1; }
     [[nodiscard]] Printer &printer() { return decoder_.printer(); }
+    [[nodiscard]] bool isFull() { return !printer().limitText().empty(); }
+
+    void tell(std::string_view sentence) {
+        printer().remark(sentence);
+        std::cerr << "netfloor: " << sentence << '\n';
+    }
 
     // What is wrong with one capture does not keep the others from being read.
     ExitCode tryFile(const std::string &file) {
@@ -141,7 +149,7 @@ private:
         const std::string_view file = hasSeveral() ? std::string_view(source.capture().name()) : std::string_view();
         const bool isLive = source.capture().isLive();
         const auto decode = [&](const CapturedPacket &packet) {
-            if (const auto kind = decoder_.decode(packet, source.timeStart(), file)) {
+            if (const auto kind = decoder_.decode(packet, source.timeStart(), file); kind && !isFull()) {
                 keep(packet, *kind, tally);
             }
             isLive ? out_.flush() : out_.endPacket();
@@ -155,7 +163,7 @@ private:
             std::ranges::for_each(first.packets.packets(), decode); // these are all: threads would take longer to start
         }
         CapturedPacket packet;
-        while ((!options_.count || tally.packets < *options_.count) && source.next(packet)) {
+        while ((!options_.count || tally.packets < *options_.count) && !isFull() && source.next(packet)) {
             decode(packet);
         }
     }
@@ -181,7 +189,7 @@ private:
         }
     }
 
-    ExitCode tellEnd(const PacketSource &source, std::uint64_t shown) const {
+    ExitCode tellEnd(const PacketSource &source, std::uint64_t shown) {
         if (const std::string refused = source.refusedText(); !refused.empty()) {
             tell(refused);
         }

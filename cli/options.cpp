@@ -24,6 +24,7 @@ constexpr std::array commandNames = {
     CommandName{Command::detail, "detail", "Every field of each packet, as a tree of layers and blocks"},
     CommandName{Command::verify, "verify", "Two verdicts on each packet, of the plug-in and of checks, and totals"},
     CommandName{Command::keys, "keys", "A row for each IP layer of each packet, as CSV"},
+    CommandName{Command::html, "html", "A page for a browser: the packets with their fields and octets, in one file"},
     CommandName{Command::fields, "fields", "The fields that the plug-in can report; takes no capture"},
 };
 
@@ -45,6 +46,7 @@ Examples:
   netfloor fields Protocol                       what a field is, and what its values are called
   netfloor verify --filter 'tcp port 80' c.pcapng
   netfloor keys --column ip.source --column tcp.window c.pcap
+  netfloor html capture.pcap > page.html         to look into it with a browser
   tcpdump -U -w - | netfloor -)";
 
 constexpr const char *fieldsFooter = R"(
@@ -67,7 +69,7 @@ public:
         if (app->get_parent() != nullptr) {
             return CLI::Formatter::make_usage(app, name);
         }
-        return "Usage: netfloor [summary|detail|verify|keys] [OPTIONS] FILE...\n"
+        return "Usage: netfloor [summary|detail|verify|keys|html] [OPTIONS] FILE...\n"
                "       netfloor fields [OPTIONS] [NAME|ID]\n"
                "       netfloor detail --help    tells the options of a command\n";
     }
@@ -185,7 +187,7 @@ void addOptions(CLI::App &app, Options &options) {
         ->type_name("NUMBERS");
     app.add_option(
            "-j,--jobs", options.jobs,
-           "Decode in N threads (default: keys and verify one for each core, the others 1); with --count in one")
+           "Decode in N threads (default: keys and verify one for each core, the others 1); html, and with --count, in one")
         ->type_name("N")
         ->check(wholeNumber(1))
         ->check(CLI::Range(1, 1024).description(""));
@@ -221,6 +223,11 @@ void addOwnOptions(CLI::App &app, Command command, Options &options) {
     case Command::verify:
         app.add_flag("--bad", options.bad, "Only damaged packets");
         app.add_flag("-a,--all", options.all, "Also the flags of the plug-in that are by design");
+        break;
+    case Command::html:
+        app.add_option("--limit", options.limit, "Packets of the page at most (default: 10000)")
+            ->type_name("N")
+            ->check(wholeNumber(1));
         break;
     case Command::fields: break;
     }

@@ -72,6 +72,15 @@ public:
     // After the last one of several captures.
     virtual void finishAll(const Tally & /*tally*/) {}
 
+    // A sentence on standard error that belongs to the results.
+    virtual void remark(std::string_view /*sentence*/) {}
+
+    // A sentence, once a packet came that is one too many; none is taken from then on.
+    [[nodiscard]] virtual std::string_view limitText() const { return {}; }
+
+    // After all captures and remarks.
+    virtual void end() {}
+
     // Takes the counts over from a printer of the same kind, which starts again from 0.
     virtual void takeCounts(Printer & /*from*/) {}
 
@@ -111,5 +120,6 @@ private:
 [[nodiscard]] std::unique_ptr<Printer> makeDetailPrinter(const Options &options, Output &out, Host &host);
 [[nodiscard]] std::unique_ptr<Printer> makeVerifyPrinter(const Options &options, Output &out, Host &host);
 [[nodiscard]] std::unique_ptr<Printer> makeKeysPrinter(const Options &options, Output &out, Host &host);
+[[nodiscard]] std::unique_ptr<Printer> makeHtmlPrinter(const Options &options, Output &out, Host &host);
 
 } // namespace netfloor::cli

@@ -114,12 +114,13 @@ SummaryLine::SummaryLine(Output &out, Host &host) : out_(out), view_(host) {
     }
 }
 
-void SummaryLine::write(std::span<const std::uint8_t> packet, const RunOptions &options) {
+SummaryLine::Columns SummaryLine::write(std::span<const std::uint8_t> packet, const RunOptions &options) {
     view_.read(packet, options);
     const Layer *const ip = find(LayerKind::ip);
     if (ip == nullptr) {
+        const Output::Mark start = out_.mark();
         out_.styled(Style::warning, "no whole IP header");
-        return;
+        return {start, start, start};
     }
     const Layer *carried = transport();
     const bool isWrong = carried != nullptr && isMisread(*ip, *carried);
@@ -128,10 +129,11 @@ void SummaryLine::write(std::span<const std::uint8_t> packet, const RunOptions &
     }
     writeProtocol(*ip, carried);
     if (!view_.has(*ip, layerField("ip.destination"))) {
+        const Output::Mark start = out_.mark();
         out_ << "the header ends before the addresses, or its length is wrong";
-        return;
+        return {start, start, start};
     }
-    writeEndpoints(*ip, carried);
+    const Columns columns = writeEndpoints(*ip, carried);
     writeTunnels(*ip);
     writeFragment(*ip);
     if (carried != nullptr) {
@@ -148,6 +150,7 @@ void SummaryLine::write(std::span<const std::uint8_t> packet, const RunOptions &
     if (view_.isCutOff()) {
         out_ << "  [the pass was cut off]";
     }
+    return columns;
 }
 
 const Layer *SummaryLine::find(LayerKind kind) const {
@@ -219,7 +222,7 @@ SummaryLine::Endpoint SummaryLine::endpoint(const Layer &ip, LayerField address,
     return endpoint;
 }
 
-void SummaryLine::writeEndpoints(const Layer &ip, const Layer *carried) {
+SummaryLine::Columns SummaryLine::writeEndpoints(const Layer &ip, const Layer *carried) {
     std::optional<std::uint32_t> source;
     std::optional<std::uint32_t> destination;
     if (carried != nullptr && carried->kind == LayerKind::tcp) {
@@ -235,10 +238,16 @@ void SummaryLine::writeEndpoints(const Layer &ip, const Layer *carried) {
     const Endpoint from = endpoint(ip, layerField("ip.source"), source);
     const Endpoint to = endpoint(ip, layerField("ip.destination"), destination);
     const std::size_t width = endpointWidth(std::max(from.size, to.size));
+    Columns columns = {};
+    columns.source = out_.mark();
     out_.rightAligned(from.view(), width);
-    out_ << " > " << to.view();
+    out_ << " > ";
+    columns.destination = out_.mark();
+    out_ << to.view();
     out_.blanks(to.size < width ? width - to.size : 0);
     out_ << ' ';
+    columns.rest = out_.mark();
+    return columns;
 }
 
 // The outer addresses, the innermost tunnel first.

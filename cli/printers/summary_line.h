@@ -16,7 +16,15 @@ class SummaryLine {
 public:
     SummaryLine(Output &out, Host &host);
 
-    void write(std::span<const std::uint8_t> packet, const RunOptions &options);
+    // Where the columns after the protocol begin in the output, blanks and ">" between them. A line without addresses
+    // has them all at the place where it goes on after the protocol.
+    struct Columns {
+        Output::Mark source;
+        Output::Mark destination;
+        Output::Mark rest;
+    };
+
+    Columns write(std::span<const std::uint8_t> packet, const RunOptions &options);
 
 private:
     // An address with its port.
@@ -32,7 +40,7 @@ private:
     [[nodiscard]] Endpoint endpoint(const Layer &ip, LayerField address, std::optional<std::uint32_t> port) const;
     [[nodiscard]] bool isMisread(const Layer &ip, const Layer &carried) const;
     void writeProtocol(const Layer &ip, const Layer *carried);
-    void writeEndpoints(const Layer &ip, const Layer *carried);
+    Columns writeEndpoints(const Layer &ip, const Layer *carried);
     void writeTunnels(const Layer &innermost);
     void writeFragment(const Layer &ip);
     void writeCarried(const Layer &ip, const Layer &carried);
