@@ -2,6 +2,7 @@
 #include "support/captures.h"
 
 #include <fstream>
+#include <utility>
 
 #include "support/temporary_folder.h"
 
@@ -34,7 +35,7 @@ Octets pcapFile(std::uint32_t linkType, const std::vector<PcapPacket> &packets) 
     std::uint32_t seconds = 1'000'000'000;
     for (const PcapPacket &packet : packets) {
         const auto captured = static_cast<std::uint32_t>(packet.octets.size());
-        file = file + le32(seconds++) + le32(0) + le32(captured) +
+        file = std::move(file) + le32(seconds++) + le32(0) + le32(captured) +
                le32(packet.wireOctets == 0 ? captured : packet.wireOctets) + packet.octets;
     }
     return file;
