@@ -35,7 +35,9 @@ public:
 
     Output &operator<<(std::string_view text) {
         char *const to = room(text.size());
-        std::memcpy(to, text.data(), text.size());
+        if (!text.empty()) { // which may have no address, and memcpy wants one
+            std::memcpy(to, text.data(), text.size());
+        }
         next_ = to + text.size();
         return *this;
     }

@@ -4,6 +4,8 @@
 #include <algorithm>
 #include <cerrno>
 #include <cstring>
+#include <limits>
+#include <string>
 
 #include "netfloor-capture/errors.h"
 
@@ -96,6 +98,10 @@ void CaptureWriter::finish() {
 std::uint32_t CaptureWriter::numberOf(const Interface &interface) {
     const auto [found, isNew] = interfaces_.try_emplace(interface, static_cast<std::uint32_t>(interfaces_.size()));
     if (isNew) {
+        if (interface.linkType > std::numeric_limits<std::uint16_t>::max()) { // pcap has more bits for it
+            throw CaptureWriteError(path_.string() + " cannot hold packets of link type " +
+                                    std::to_string(interface.linkType) + ": pcapng numbers them up to 65535.");
+        }
         constexpr std::uint16_t reserved = 0;
         constexpr std::uint32_t noSnapLength = 0;
         startBlock(interfaceDescription);

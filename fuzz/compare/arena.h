@@ -10,11 +10,19 @@
 #include <span>
 #include <vector>
 
+#if __has_include(<sanitizer/asan_interface.h>)
+#include <sanitizer/asan_interface.h> // nothing without the sanitizer
+#else
+#define ASAN_POISON_MEMORY_REGION(from, octets) ((void)(from), (void)(octets))
+#define ASAN_UNPOISON_MEMORY_REGION(from, octets) ((void)(from), (void)(octets))
+#endif
+
 namespace netfloor::compare {
 
 class Arena {
 public:
     void clear() {
+        ASAN_POISON_MEMORY_REGION(octets_.get(), used_);
         used_ = 0;
         blocks_.clear();
     }
@@ -26,8 +34,10 @@ public:
             return nullptr;
         }
         std::uint8_t *const block = octets_.get() + used_;
+        ASAN_UNPOISON_MEMORY_REGION(block, space);
         std::memset(block, freshPattern, size);
         std::memset(block + size, borderPattern, space - size);
+        ASAN_POISON_MEMORY_REGION(block + size, space - size);
         blocks_.emplace_back(block, size);
         used_ += space;
         return block;
@@ -49,12 +59,14 @@ public:
         if (grown != nullptr) {
             std::memcpy(grown, old, std::min(size, from.size()));
             std::memset(old, spoiltPattern, from.size());
+            ASAN_POISON_MEMORY_REGION(old, from.size());
         }
         return grown;
     }
 
-    // Whether an octet outside the blocks was changed.
+    // Whether an octet outside the blocks was changed. The address sanitizer ends the process where one is touched.
     [[nodiscard]] bool overrun() const {
+        ASAN_UNPOISON_MEMORY_REGION(octets_.get(), used_);
         const std::uint8_t *end = octets_.get() + used_;
         for (auto block = blocks_.rbegin(); block != blocks_.rend(); end = block++->data()) {
             const std::uint8_t *const border = block->data() + block->size();

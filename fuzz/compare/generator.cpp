@@ -90,6 +90,11 @@ public:
         return packet;
     }
 
+    Octets part() {
+        const auto rule = std::next(rules.begin(), random_.below(rules.size()));
+        return form(rule->first, random_.pick<std::uint8_t>({6, 17, 43, 44, 51, 60, 132}));
+    }
+
 private:
     // The length that is right, or one that is not.
     std::uint32_t length(std::size_t right) {
@@ -218,6 +223,10 @@ private:
 
 Octets generatedPacket(Random &random) {
     return Generator(random).packet();
+}
+
+Octets generatedPart(Random &random) {
+    return Generator(random).part();
 }
 
 } // namespace netfloor::compare

@@ -46,6 +46,7 @@ PreDecodeContext *context; // null in the XTR pass
 XtrContext *keyContext;    // null in the others
 std::size_t keyRecordOctets;
 std::uint32_t growths, handOffs, depth;
+std::int32_t lastResult;
 std::bitset<1024> seen;
 
 sigjmp_buf beforeRun;
@@ -144,7 +145,10 @@ void event(const char *name) {
     }
     trace->event(name);
     if (*observer) {
-        (*observer)({name, *state, context, working});
+        (*observer)({name, *state, context, working, lastResult});
+    }
+    if (!trace->keepsAnything()) {
+        return;
     }
     traceState();
     traceContext();
@@ -232,9 +236,9 @@ void setUpKeyContext(const Plan &plan) {
 }
 
 void enter() {
-    const std::uint8_t result = plugin->passes[static_cast<std::size_t>(pass)](context);
+    lastResult = plugin->passes[static_cast<std::size_t>(pass)](context);
     event("result");
-    trace->number("result", result);
+    trace->number("result", lastResult);
 }
 
 // A next layer may have let the arrays grow.
@@ -293,13 +297,13 @@ void leavePacket(Random random) {
 void extractLayers() {
     const Plan &plan = input->plan;
     for (std::uint32_t layer = 0; layer < mostDepth; ++layer) {
-        const std::int32_t result = plugin->extract(keyContext);
+        lastResult = plugin->extract(keyContext);
         event("result");
-        trace->number("result", result);
+        trace->number("result", lastResult);
         if (plan.keyStatus == 0) {
             continue;
         }
-        if (result != 1 || state->layerHandedOff != 1 || !plan.oddOwners) {
+        if (lastResult != 1 || state->layerHandedOff != 1 || !plan.oddOwners) {
             return;
         }
         leavePacket(Random(plan.seed + layer));
@@ -356,7 +360,7 @@ bool run(const Plugin &thePlugin, Pass thePass, const Input &theInput, bool isSt
          const Observer &theObserver) {
     plugin = &thePlugin, pass = thePass, input = &theInput, strict = isStrict, trace = &theTrace;
     observer = &theObserver;
-    growths = handOffs = depth = 0;
+    growths = handOffs = depth = 0, lastResult = 0;
     arena.clear();
     trace->clear();
     setUpPacket();

@@ -48,6 +48,7 @@ struct Moment {
     const DecodeState &state;
     const PreDecodeContext *context; // null in the XTR pass
     std::span<const std::uint8_t> workingCopy;
+    std::int32_t result; // of the entry that returned last
 };
 using Observer = std::function<void(const Moment &)>;
 

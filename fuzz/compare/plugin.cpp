@@ -54,7 +54,7 @@ int findWritable(dl_phdr_info *object, std::size_t, void *argument) {
 } // namespace
 
 // A name without a folder would be looked for among the libraries of the system.
-Plugin::Plugin(const std::string &path)
+Plugin::Plugin(const std::string &path, Start start)
     : handle(dlopen(std::filesystem::absolute(path).c_str(), RTLD_NOW | RTLD_LOCAL)) {
     check(handle != nullptr);
     resolve(handle, "vex_PreDecodeTO", passes[NETFLOOR_MODE_TO]);
@@ -68,7 +68,9 @@ Plugin::Plugin(const std::string &path)
     check(dlinfo(handle, RTLD_DI_LINKMAP, &map) == 0);
     Search search{map->l_addr, writable};
     dl_iterate_phdr(findWritable, &search);
-    asLoaded = variables();
+    if (start == Start::kept) {
+        asLoaded = variables();
+    }
 }
 
 Variables Plugin::variables() const {

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-// One of the two plug-ins, with a copy of its variables to go back to.
+// A plug-in, and where asked for a copy of its variables to go back to.
 #pragma once
 
 #include <array>
@@ -19,8 +19,11 @@ namespace netfloor::compare {
 using Variables = std::vector<std::vector<std::uint8_t>>;
 
 struct Plugin {
+    // Between the variables of one under a sanitizer lies what must not be read.
+    enum class Start : bool { kept, lost };
+
     // It stays loaded. Throws std::runtime_error.
-    explicit Plugin(const std::string &path);
+    explicit Plugin(const std::string &path, Start start = Start::kept);
 
     void *handle;
     std::array<NetfloorPreDecode, 3> passes; // by the modes of the boundary

@@ -40,7 +40,7 @@ void Trace::event(const char *name) {
 }
 
 void Trace::words(const char *label, const void *from, std::size_t octets, std::size_t wordOctets) {
-    if (keeps_ == Keeps::nothing) {
+    if (!keepsAnything()) {
         return;
     }
     const auto *const first = static_cast<const std::uint8_t *>(from);
@@ -58,7 +58,7 @@ void Trace::words(const char *label, const void *from, std::size_t octets, std::
 }
 
 void Trace::text(const char *label, const char *from, std::size_t most) {
-    if (keeps_ == Keeps::nothing) {
+    if (!keepsAnything()) {
         return;
     }
     const std::size_t length = strnlen(from, most);

@@ -16,6 +16,8 @@ public:
 
     explicit Trace(Keeps keeps = Keeps::octets) : keeps_(keeps) {}
 
+    [[nodiscard]] bool keepsAnything() const { return keeps_ != Keeps::nothing; }
+
     void clear();
 
     // A call of the host, or a result; what follows belongs to it.

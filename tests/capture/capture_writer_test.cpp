@@ -98,5 +98,13 @@ TEST(CaptureWriter, saysThatAFileCannotBeWritten) {
         CaptureWriteError);
 }
 
+// A pcap file has more bits for the link type than a pcapng file.
+TEST(CaptureWriter, refusesALinkTypeThatPcapngCannotHold) {
+    const TemporaryFolder folder;
+    CaptureWriter writer(folder.path() / "far.pcapng");
+    writer.write({.linkType = 65535});
+    EXPECT_THROW(writer.write({.linkType = 65536 + 101}), CaptureWriteError);
+}
+
 } // namespace
 } // namespace netfloor::test

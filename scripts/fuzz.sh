@@ -1,0 +1,49 @@
+#!/bin/bash
+# SPDX-License-Identifier: MIT
+# Fuzzes a target and keeps what it learns in build/fuzz-targets/inputs/TARGET, from where the next run goes on.
+#
+#   scripts/fuzz.sh TARGET [SECONDS]    TARGET is passes, capture or command; SECONDS is 600
+#   scripts/fuzz.sh TARGET pack         fuzz/corpus/TARGET becomes the fewest inputs that reach all that was learned
+#
+# The exit code is not 0 when there was a finding. Its input is in build/fuzz-targets/findings; replay_TARGET --input
+# FILE repeats it, in any build.
+set -eu
+cd "$(dirname "$0")/.."
+target=${1:?passes, capture or command}
+build=build/fuzz-targets
+inputs=$build/inputs/$target
+findings=$build/findings
+programs=$build/fuzz/targets
+# Octets of 0 in front of a packet: an ordinary host, or no options.
+case $target in passes) head=12 ;; command) head=4 ;; *) head=0 ;; esac
+
+cmake --preset fuzz -DNETFLOOR_TESTS=ON >/dev/null
+ninja -C $build "fuzz_$target" "replay_$target" write_packets | sed '/no work to do/d'
+mkdir -p "$inputs" "$findings"
+
+# pack: the fewest inputs
+if [ "${2:-}" = pack ]; then
+    fewest=$(mktemp -d)
+    trap 'rm -rf "$fewest"' EXIT
+    "$programs/fuzz_$target" -merge=1 "$fewest" "$inputs" 2>&1 | grep -E 'MERGE-OUTER: .* (new files|inputs)' || true
+    "$programs/replay_$target" --pack "fuzz/corpus/$target" "$fewest"
+    echo "fuzz: fuzz/corpus/$target has $(find "$fewest" -type f | wc -l) inputs, $(stat -c %s "fuzz/corpus/$target") octets"
+    exit
+fi
+
+# seeds: what is known, and the captures
+[ ! -f "fuzz/corpus/$target" ] || "$programs/replay_$target" --unpack "fuzz/corpus/$target" "$inputs"
+if [ "$target" = capture ]; then
+    cp tests/captures/*.pcap* "$inputs"
+else
+    packets=$(mktemp)
+    trap 'rm -f "$packets"' EXIT
+    $build/tests/golden/write_packets "$packets" tests/captures/*.pcap*
+    "$programs/replay_$target" --unpack "$packets" "$inputs" $head
+fi
+
+# -entropic=0: that schedule takes three quarters of the time, for the many edges that a grammar in templates has.
+"$programs/fuzz_$target" -entropic=0 -max_total_time="${2:-600}" -max_len=1500 -timeout=20 -rss_limit_mb=2048 -print_final_stats=1 \
+    -artifact_prefix="$findings/$target-" "$inputs" 2>&1 | tee "$build/$target.log" |
+    grep -vE 'NEW  |REDUCE|pulse|RELOAD' || true
+! grep -qE 'FAULT|ERROR: |SUMMARY: ' "$build/$target.log"
