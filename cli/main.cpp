@@ -22,6 +22,7 @@
 #include "netfloor-host/plugin_host.h"
 #include "options.h"
 #include "output.h"
+#include "printers/json_schema.h"
 
 namespace netfloor::cli {
 
@@ -69,6 +70,10 @@ int runCommand(int argumentCount, char **arguments) {
         const auto &options = std::get<Options>(parsed);
         if (options.command == Command::fields) {
             showFields(options);
+            return number(ExitCode::good);
+        }
+        if (options.schema) {
+            showPacketSchema();
             return number(ExitCode::good);
         }
         watchForInterrupt();

@@ -24,6 +24,7 @@ constexpr std::array commandNames = {
     CommandName{Command::detail, "detail", "Every field of each packet, as a tree of layers and blocks"},
     CommandName{Command::verify, "verify", "Two verdicts on each packet, of the plug-in and of checks, and totals"},
     CommandName{Command::keys, "keys", "A row for each IP layer of each packet, as CSV"},
+    CommandName{Command::json, "json", "A JSON object for each packet, on a line of its own"},
     CommandName{Command::html, "html", "A page for a browser: the packets with their fields and octets, in one file"},
     CommandName{Command::fields, "fields", "The fields that the plug-in can report; takes no capture"},
 };
@@ -69,7 +70,7 @@ public:
         if (app->get_parent() != nullptr) {
             return CLI::Formatter::make_usage(app, name);
         }
-        return "Usage: netfloor [summary|detail|verify|keys|html] [OPTIONS] FILE...\n"
+        return "Usage: netfloor [summary|detail|verify|keys|json|html] [OPTIONS] FILE...\n"
                "       netfloor fields [OPTIONS] [NAME|ID]\n"
                "       netfloor detail --help    tells the options of a command\n";
     }
@@ -220,6 +221,10 @@ void addOwnOptions(CLI::App &app, Command command, Options &options) {
             ->type_name("WHAT");
         app.add_flag("--raw", options.raw, "Addresses as octets, in hexadecimal");
         break;
+    case Command::json:
+        app.add_flag("--fields", options.withFields, "With every field: id, name, value, text, block and bits");
+        app.add_flag("--schema", options.schema, "The JSON schema of these objects; takes no capture");
+        break;
     case Command::verify:
         app.add_flag("--bad", options.bad, "Only damaged packets");
         app.add_flag("-a,--all", options.all, "Also the flags of the plug-in that are by design");
@@ -283,7 +288,7 @@ std::variant<Options, ExitCode> parseOptions(int argumentCount, char **arguments
         }
         sub->callback([&options, &row] {
             options.command = row.command;
-            if (row.command != Command::fields && options.files.empty()) {
+            if (row.command != Command::fields && !options.schema && options.files.empty()) {
                 throw CLI::RequiredError("file"); // CLI11 would name the option
             }
         });

@@ -14,7 +14,7 @@
 
 namespace netfloor::cli {
 
-enum class Command : std::uint8_t { summary, detail, verify, keys, html, fields };
+enum class Command : std::uint8_t { summary, detail, verify, keys, json, html, fields };
 
 enum class FieldsForm : std::uint8_t { text, json, markdown, tables };
 
@@ -55,6 +55,8 @@ struct Options {
     bool bad = false;                 // verify: damaged packets only
     bool raw = false;                 // keys: addresses as octets
     bool perChunk = false;            // keys: a row for each SCTP chunk instead of each IP layer
+    bool withFields = false;          // json: with every field
+    bool schema = false;              // json: the schema of its objects, without a capture
     std::uint64_t limit = 10'000;     // html: packets of the page at most; it says that there are more
     std::vector<std::string> columns; // keys: these fields in the place of the usual ones
     std::string field;                // fields: those of this name, or of this id; empty: all

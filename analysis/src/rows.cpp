@@ -94,6 +94,15 @@ std::string_view tunnelOf(const LayerView &view, const Layer &ipLayer) {
     return view.has(ipLayer, layerField("ip.version")) ? "IP" : "minimal";
 }
 
+std::string_view addressText(std::span<const std::uint8_t> octets, TextRoom &room) {
+    Ipv6Octets address = {};
+    if (octets.size() == address.size()) {
+        std::ranges::copy(octets, address.begin());
+        return ipv6Text(address, room);
+    }
+    return ipv4Text(std::uint32_t{be16(octets, 0)} << 16U | be16(octets, 2), room);
+}
+
 PacketRows::PacketRows(Host &host) : view_(host) {}
 
 void PacketRows::read(const PacketInput &packet, RowSink &sink) {

@@ -50,7 +50,7 @@ std::string_view asUtf8(std::string_view text, std::string &room) {
     room.clear();
     while (!text.empty()) {
         const std::size_t octets = text.front() == 0 ? 0 : utf8Octets(text);
-        room += octets == 0 ? std::string_view("\xef\xbf\xbd") : text.substr(0, octets);
+        room += octets == 0 ? replacementCharacter : text.substr(0, octets);
         text.remove_prefix(std::max<std::size_t>(1, octets));
     }
     return room;

@@ -120,6 +120,7 @@ private:
 [[nodiscard]] std::unique_ptr<Printer> makeDetailPrinter(const Options &options, Output &out, Host &host);
 [[nodiscard]] std::unique_ptr<Printer> makeVerifyPrinter(const Options &options, Output &out, Host &host);
 [[nodiscard]] std::unique_ptr<Printer> makeKeysPrinter(const Options &options, Output &out, Host &host);
+[[nodiscard]] std::unique_ptr<Printer> makeJsonPrinter(const Options &options, Output &out, Host &host);
 [[nodiscard]] std::unique_ptr<Printer> makeHtmlPrinter(const Options &options, Output &out, Host &host);
 
 } // namespace netfloor::cli

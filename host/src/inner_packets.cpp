@@ -315,7 +315,8 @@ std::optional<std::uint32_t> upperLayerOctet(std::span<const std::uint8_t> packe
     return std::nullopt;
 }
 
-InnerPackets::InnerPackets(std::span<const std::uint8_t> packet) : octets_(packet), allOctets_(packet.size()) {}
+InnerPackets::InnerPackets(std::span<const std::uint8_t> packet)
+    : octets_(packet), outermostOctets_(packet.size()), allOctets_(packet.size()) {}
 
 void InnerPackets::next() {
     const Found found = findInnerPacket(octets_);

@@ -63,9 +63,7 @@ void LayerView::read(std::span<const std::uint8_t> packet, const RunOptions &opt
         packets_.back().octets = static_cast<std::uint32_t>(at.octets().size());
         offset_ = at.firstOctet();
         RunOptions inner = options;
-        // What is cut is the end of the outermost packet, and so of all that reach it.
-        const bool reachesEnd = offset_ + at.octets().size() == packet.size();
-        inner.wireOctets = reachesEnd && options.wireOctets > packet.size() ? options.wireOctets - offset_ : 0;
+        inner.wireOctets = at.wireOctets(options.wireOctets);
         if (!readPlain(at.octets(), inner.wireOctets)) {
             ++passes_;
             host_.run(Pass::md, at.octets(), *this, inner);

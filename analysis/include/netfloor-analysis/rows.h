@@ -50,6 +50,9 @@ struct Value {
     [[nodiscard]] std::int64_t time() const { return static_cast<std::int64_t>(number); }
 };
 
+// An address as text: dotted, or in the form of RFC 5952.
+[[nodiscard]] std::string_view addressText(std::span<const std::uint8_t> octets, TextRoom &room);
+
 // The values of a row by the place of their column in columns(kind()).
 class Row {
 public:

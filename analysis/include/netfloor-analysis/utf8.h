@@ -11,6 +11,8 @@ namespace netfloor {
 // The text must not be empty.
 [[nodiscard]] std::size_t utf8Octets(std::string_view text);
 
+inline constexpr std::string_view replacementCharacter = "\xef\xbf\xbd"; // U+FFFD
+
 // The text in UTF-8: what is none, and each zero octet, becomes U+FFFD. `room` is used only for a text that changes.
 [[nodiscard]] std::string_view asUtf8(std::string_view text, std::string &room);
 

@@ -51,7 +51,13 @@ public:
 
     [[nodiscard]] std::span<const std::uint8_t> octets() const { return octets_; }
     [[nodiscard]] std::uint32_t firstOctet() const { return firstOctet_; } // in the outermost packet
-    [[nodiscard]] const InnerPacket &opened() const { return opened_; }    // how this one was found
+    // RunOptions::wireOctets of this packet, out of that of the outermost one. What is cut is the end of the outermost
+    // packet, and so of all that reach it.
+    [[nodiscard]] std::size_t wireOctets(std::size_t ofOutermost) const {
+        const bool reachesEnd = firstOctet_ + octets_.size() == outermostOctets_;
+        return reachesEnd && ofOutermost > outermostOctets_ ? ofOutermost - firstOctet_ : 0;
+    }
+    [[nodiscard]] const InnerPacket &opened() const { return opened_; } // how this one was found
     [[nodiscard]] bool isInner() const { return opened_.tunnel != Tunnel::none; }
 
     // After the end: why a packet inside the last one stays closed, or nothing.
@@ -60,6 +66,7 @@ public:
 private:
     std::span<const std::uint8_t> octets_;
     std::uint32_t firstOctet_ = 0;
+    std::size_t outermostOctets_ = 0;
     std::uint32_t packets_ = 1;
     std::uint64_t allOctets_ = 0;
     InnerPacket opened_;

@@ -1,0 +1,100 @@
+// SPDX-License-Identifier: MIT
+#include "database.h"
+
+#include <sqlite3.h>
+
+#include "output.h"
+
+namespace netfloor::cli {
+
+namespace {
+
+constexpr int patienceMilliseconds = 5000; // where another program has it locked
+
+} // namespace
+
+void Database::Close::operator()(sqlite3 *database) const {
+    sqlite3_close_v2(database);
+}
+
+void Statement::Close::operator()(sqlite3_stmt *statement) const {
+    sqlite3_finalize(statement);
+}
+
+Database::Database(const std::filesystem::path &path) : name_(path.string()) {
+    sqlite3 *opened = nullptr;
+    const int result = sqlite3_open_v2(name_.c_str(), &opened, SQLITE_OPEN_READWRITE | SQLITE_OPEN_CREATE, nullptr);
+    database_.reset(opened);
+    if (opened == nullptr) {
+        throw std::bad_alloc();
+    }
+    if (result != SQLITE_OK) {
+        fail();
+    }
+    sqlite3_busy_timeout(opened, patienceMilliseconds);
+}
+
+void Database::fail() const {
+    if (sqlite3_errcode(database_.get()) == SQLITE_NOMEM) {
+        throw std::bad_alloc();
+    }
+    throw OutputError(name_ + " cannot be written: " + sqlite3_errmsg(database_.get()) + ".");
+}
+
+void Database::run(const std::string &sql) const {
+    if (sqlite3_exec(database_.get(), sql.c_str(), nullptr, nullptr, nullptr) != SQLITE_OK) {
+        fail();
+    }
+}
+
+Statement Database::prepare(const std::string &sql) const {
+    sqlite3_stmt *statement = nullptr;
+    if (sqlite3_prepare_v3(database_.get(), sql.c_str(), -1, SQLITE_PREPARE_PERSISTENT, &statement, nullptr) !=
+        SQLITE_OK) {
+        fail();
+    }
+    return {*this, statement};
+}
+
+std::int64_t Database::number(const std::string &sql) const {
+    const Statement statement = prepare(sql);
+    if (sqlite3_step(statement.statement_.get()) != SQLITE_ROW) {
+        fail();
+    }
+    return sqlite3_column_int64(statement.statement_.get(), 0);
+}
+
+std::int64_t Database::lastRow() const {
+    return sqlite3_last_insert_rowid(database_.get());
+}
+
+void Statement::check(int result) const {
+    if (result != SQLITE_OK) {
+        database_->fail();
+    }
+}
+
+void Statement::bind(int place, std::int64_t number) const {
+    check(sqlite3_bind_int64(statement_.get(), place, number));
+}
+
+void Statement::bind(int place, std::string_view text) const {
+    check(sqlite3_bind_text64(statement_.get(), place, text.data(), text.size(), SQLITE_STATIC, SQLITE_UTF8));
+}
+
+void Statement::bind(int place, std::span<const std::uint8_t> octets) const {
+    // A null pointer would be a null, and no blob without octets.
+    const void *const data = octets.empty() ? "" : static_cast<const void *>(octets.data());
+    check(sqlite3_bind_blob64(statement_.get(), place, data, octets.size(), SQLITE_STATIC));
+}
+
+void Statement::step() const {
+    const int result = sqlite3_step(statement_.get());
+    if (result != SQLITE_DONE) {
+        database_->fail();
+    }
+    check(sqlite3_reset(statement_.get()));
+    check(sqlite3_clear_bindings(statement_.get()));
+}
+
+} // namespace netfloor::cli
