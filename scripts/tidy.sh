@@ -19,7 +19,7 @@ export shared
 
 # Left out: entries/descriptors.cpp, which needs limits of constant evaluation that are spelled for the compiler in use,
 # and what is for Windows, which needs headers of Windows.
-git ls-files --cached --others --exclude-standard -- 'plugin/*.cpp' 'host/*.cpp' 'capture/*.cpp' 'analysis/*.cpp' 'cli/*.cpp' |
+git ls-files --cached --others --exclude-standard -- 'plugin/*.cpp' 'host/*.cpp' 'capture/*.cpp' 'analysis/*.cpp' 'columns/*.cpp' 'cli/*.cpp' |
     grep -vE '^plugin/entries/descriptors.cpp$|windows' |
     while read -r file; do [ ! -f "$file" ] || echo "$file"; done |
     xargs -P "$(nproc)" -I{} sh -c '
