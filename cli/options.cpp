@@ -185,9 +185,9 @@ void addOptions(CLI::App &app, Options &options) {
            "-p,--packet", [&options](const std::string &text) { options.packets = packetNumbersOf(text); },
            "Only these packets of the file: 7, or 3-7,9")
         ->type_name("NUMBERS");
-    app.add_option(
-           "-j,--jobs", options.jobs,
-           "Decode in N threads (default: keys and verify one for each core, the others 1); html, and with --count, in one")
+    app.add_option("-j,--jobs", options.jobs,
+                   "Decode in N threads (default: keys and verify one for each core, the others 1); html, and with "
+                   "--count, in one")
         ->type_name("N")
         ->check(wholeNumber(1))
         ->check(CLI::Range(1, 1024).description(""));
