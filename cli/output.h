@@ -91,6 +91,11 @@ public:
     using Mark = std::size_t;
     [[nodiscard]] Mark mark() const { return static_cast<std::size_t>(next_ - buffer_.data()); }
     void takeBack(Mark mark) { next_ = buffer_.data() + mark; }
+    void erase(Mark from, std::size_t count) {
+        const std::string_view rest = since(from + count);
+        std::memmove(buffer_.data() + from, rest.data(), rest.size());
+        next_ -= count;
+    }
     [[nodiscard]] std::string_view since(Mark mark) const { return {buffer_.data() + mark, next_}; }
 
     // The text may leave the buffer, which grows as long as it may not. Throws OutputClosed and OutputError.

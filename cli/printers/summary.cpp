@@ -140,10 +140,13 @@ public:
 
 private:
     // With room for the note of the snap length.
-    void cutLine(Output::Mark start, bool hasNote) const {
+    void cutLine(Output::Mark start, bool hasNote) {
         constexpr std::size_t noteWidth = 52;
         constexpr std::string_view mark = "...";
         const std::size_t width = width_ - (hasNote ? std::min(noteWidth, width_ / 2) : 0);
+        if (const std::size_t size = out().mark() - start; size > width) {
+            line_->shorten(size - width);
+        }
         while (out().since(start).ends_with(' ')) {
             out().takeBack(out().mark() - 1);
         }

@@ -5,48 +5,17 @@
 #include <charconv>
 #include <utility>
 
+#include "netfloor-host/assigned_names.h"
+
 namespace netfloor::cli {
 
 namespace {
 
 constexpr std::size_t protocolWidth = 7;
 
-using Name = std::pair<std::uint32_t, std::string_view>;
-
-constexpr std::array chunkNames = {Name{0, "DATA"},  Name{1, "INIT"},          Name{2, "INIT ACK"},
-                                   Name{3, "SACK"},  Name{4, "HEARTBEAT"},     Name{5, "HEARTBEAT ACK"},
-                                   Name{6, "ABORT"}, Name{7, "SHUTDOWN"},      Name{8, "SHUTDOWN ACK"},
-                                   Name{9, "ERROR"}, Name{10, "COOKIE ECHO"},  Name{11, "COOKIE ACK"},
-                                   Name{12, "ECNE"}, Name{13, "CWR"},          Name{14, "SHUTDOWN COMPLETE"},
-                                   Name{15, "AUTH"}, Name{128, "ASCONF ACK"},  Name{130, "RE-CONFIG"},
-                                   Name{132, "PAD"}, Name{192, "FORWARD TSN"}, Name{193, "ASCONF"}};
-
-// Payload protocol identifiers, as assigned for SCTP.
-constexpr std::array payloadNames = {Name{1, "IUA"},
-                                     Name{2, "M2UA"},
-                                     Name{3, "M3UA"},
-                                     Name{4, "SUA"},
-                                     Name{5, "M2PA"},
-                                     Name{18, "S1AP"},
-                                     Name{19, "RUA"},
-                                     Name{20, "HNBAP"},
-                                     Name{27, "X2AP"},
-                                     Name{46, "Diameter"},
-                                     Name{50, "WebRTC control"},
-                                     Name{60, "NGAP"},
-                                     Name{61, "XnAP"}};
-
-// The messages that the plug-in has no names for.
-constexpr std::array icmpv6Names = {Name{130, "multicast listener query"},    Name{131, "multicast listener report"},
-                                    Name{132, "multicast listener done"},     Name{133, "router solicitation"},
-                                    Name{134, "router advertisement"},        Name{135, "neighbor solicitation"},
-                                    Name{136, "neighbor advertisement"},      Name{137, "redirect"},
-                                    Name{143, "multicast listener report v2"}};
-
 constexpr std::uint32_t neighborSolicitation = 135;
 constexpr std::uint32_t neighborAdvertisement = 136;
 constexpr std::uint32_t mostIcmpv6Error = 127;
-constexpr std::uint32_t icmpUnreachable = 3;
 
 // A width for IPv4 and one for most of IPv6. A line knows no other line: they may be written in parts, each by its own.
 constexpr std::size_t endpointWidth(std::size_t wanted) {
@@ -76,26 +45,38 @@ std::string withoutMessage(std::string name) {
     if (name.ends_with(back)) {
         name.erase(name.size() - back.size());
     }
+    while (name.ends_with(' ')) {
+        name.pop_back();
+    }
     return name;
 }
 
-std::array<std::string, 256> namesOf(const FieldTables &tables, const FieldName &name) {
-    std::array<std::string, 256> names;
-    const auto &fields = tables.fields();
-    const auto field = std::ranges::find_if(fields, [&](const FieldDescription &row) { return name.fits(row); });
-    for (std::uint32_t value = 0; field != fields.end() && value < names.size(); ++value) {
-        const NamedValue *const row = field->findValue(value);
-        if (row != nullptr && !row->isDefault()) {
-            names[value] = withoutMessage(field->valueName(value));
+// By value, as far as there are names.
+std::vector<std::string> namesOf(const FieldDescription &field) {
+    constexpr std::uint32_t mostValues = 256;
+    std::vector<std::string> names;
+    for (std::uint32_t value = 0; value < mostValues; ++value) {
+        const NamedValue *const row = field.findValue(value);
+        if (row != nullptr && !row->isDefault() && !row->isRange()) {
+            names.resize(value + 1);
+            names[value] = withoutMessage(field.valueName(value));
         }
     }
     return names;
 }
 
-// The first field of the plug-in that has this name in the table of layers.
-FieldName fieldOf(std::string_view name) {
-    const auto rows = layerFieldSources();
-    return std::ranges::find(rows, name, &LayerFieldSource::name)->field;
+// The names of the first field of the plug-in that has this name in the table of layers.
+std::vector<std::string> namesOf(const FieldTables &tables, std::string_view name) {
+    const auto source = std::ranges::find(layerFieldSources(), name, &LayerFieldSource::name);
+    const auto field =
+        std::ranges::find_if(tables.fields(), [&](const FieldDescription &row) { return source->field.fits(row); });
+    return field == tables.fields().end() ? std::vector<std::string>() : namesOf(*field);
+}
+
+// "INIT ACK" of "Initiation Acknowledgement (INIT ACK)".
+std::string inBrackets(const std::string &name) {
+    const std::size_t open = name.rfind('(');
+    return open == std::string::npos || !name.ends_with(')') ? name : name.substr(open + 1, name.size() - open - 2);
 }
 
 } // namespace
@@ -103,18 +84,39 @@ FieldName fieldOf(std::string_view name) {
 SummaryLine::SummaryLine(Output &out, Host &host) : out_(out), view_(host) {
     const FieldTables tables(host.library());
     constexpr std::uint32_t icmpv6Protocol = 58;
-    constexpr FieldName unreachableCode{"Code", 548}; // each message has a code of its own
-    protocols_ = namesOf(tables, fieldOf("ip.protocol"));
+    protocols_ = namesOf(tables, "ip.protocol");
+    protocols_.resize(std::max<std::size_t>(protocols_.size(), icmpv6Protocol + 1));
     protocols_[icmpv6Protocol] = "ICMPv6";
-    icmpTypes_ = namesOf(tables, fieldOf("icmp.type"));
-    icmpUnreachable_ = namesOf(tables, unreachableCode);
-    icmpv6Types_ = namesOf(tables, fieldOf("icmpv6.type"));
-    for (const auto &[type, name] : icmpv6Names) {
-        icmpv6Types_[type] = name;
+    icmpTypes_ = namesOf(tables, "icmp.type");
+    icmpv6Types_ = namesOf(tables, "icmpv6.type");
+    chunks_ = namesOf(tables, "sctp.chunk_type");
+    std::ranges::transform(chunks_, chunks_.begin(), inBrackets);
+    for (const LayerFieldSource &row : layerFieldSources()) { // each message has a field of its own for its code
+        if (row.name == "icmp.code" || row.name == "icmpv6.code") {
+            for (const FieldDescription &field : tables.fields()) {
+                if (row.field.fits(field)) {
+                    codes_[field.id] = namesOf(field);
+                }
+            }
+        }
     }
 }
 
+std::string_view SummaryLine::nameIn(const Names &names, std::uint32_t value) {
+    return value < names.size() ? std::string_view(names[value]) : std::string_view();
+}
+
+void SummaryLine::writeName(std::string_view name, std::string_view otherwise, std::uint32_t number) {
+    name.empty() ? out_ << otherwise << number : out_ << name;
+}
+
+std::string_view SummaryLine::icmpv6Name(std::uint32_t type) const {
+    const std::string_view name = nameIn(icmpv6Types_, type);
+    return name.empty() ? icmpv6MessageName(type) : name;
+}
+
 SummaryLine::Columns SummaryLine::write(std::span<const std::uint8_t> packet, const RunOptions &options) {
+    before_ = after_ = {};
     view_.read(packet, options);
     const Layer *const ip = find(LayerKind::ip);
     if (ip == nullptr) {
@@ -123,11 +125,11 @@ SummaryLine::Columns SummaryLine::write(std::span<const std::uint8_t> packet, co
         return {start, start, start};
     }
     const Layer *carried = transport();
-    const bool isWrong = carried != nullptr && isMisread(*ip, *carried);
-    if (isWrong) {
+    const std::optional<UpperLayer> unread = findUnread(*ip, carried);
+    if (unread) {
         carried = nullptr;
     }
-    writeProtocol(*ip, carried);
+    writeProtocol(unread ? unread->protocol : view_.number(*ip, layerField("ip.protocol")), carried);
     if (!view_.has(*ip, layerField("ip.destination"))) {
         const Output::Mark start = out_.mark();
         out_ << "the header ends before the addresses, or its length is wrong";
@@ -138,8 +140,8 @@ SummaryLine::Columns SummaryLine::write(std::span<const std::uint8_t> packet, co
     writeFragment(*ip);
     if (carried != nullptr) {
         writeCarried(*ip, *carried);
-    } else if (isWrong) {
-        out_ << " several IPv6 options: what follows them is not read";
+    } else if (unread) {
+        writeUnread(ip->firstOctet + unread->octet, unread->protocol);
     } else if (const auto protocol = view_.number(*ip, layerField("ip.protocol")); protocol && isCarried(*protocol)) {
         out_ << (view_.number(*ip, layerField("ip.fragment_offset")).value_or(0) == 0 ? " its header is cut short"
                                                                                       : "");
@@ -172,21 +174,24 @@ const Layer *SummaryLine::transport() const {
     return last;
 }
 
-// After an IPv6 options header of several options the plug-in takes the second one for the next header.
-bool SummaryLine::isMisread(const Layer &ip, const Layer &carried) const {
-    if (view_.number(ip, layerField("ip.version")) != 6U || ip.packet != carried.packet) {
-        return false;
+// After an IPv6 options header of several options the plug-in takes the second one for the next header. Gives what is
+// there instead of that.
+std::optional<UpperLayer> SummaryLine::findUnread(const Layer &ip, const Layer *carried) const {
+    if (carried == nullptr || view_.number(ip, layerField("ip.version")) != 6U || ip.packet != carried->packet ||
+        carried->kind == LayerKind::security) {
+        return std::nullopt;
     }
-    const auto expected = upperLayerOctet(view_.packet().subspan(ip.firstOctet));
-    return expected && carried.kind != LayerKind::security && ip.firstOctet + *expected != carried.firstOctet;
+    const auto upper = findUpperLayer(view_.packet().subspan(ip.firstOctet));
+    return upper && ip.firstOctet + upper->octet != carried->firstOctet ? upper : std::nullopt;
 }
 
-void SummaryLine::writeProtocol(const Layer &ip, const Layer *carried) {
+void SummaryLine::writeProtocol(std::optional<std::uint32_t> protocol, const Layer *carried) {
     std::string_view name = "IP";
     if (carried != nullptr && carried->kind == LayerKind::icmpv6) {
         name = "ICMPv6";
-    } else if (const auto protocol = view_.number(ip, layerField("ip.protocol")); protocol && *protocol < 256) {
-        name = protocols_[*protocol].empty() ? "IP" : std::string_view(protocols_[*protocol]);
+    } else if (protocol) {
+        const std::string_view known = nameIn(protocols_, *protocol);
+        name = known.empty() ? "IP" : known;
     }
     const Layer *const payload = find(LayerKind::payload);
     if (payload != nullptr && view_.name(*payload) != "data") {
@@ -240,14 +245,24 @@ SummaryLine::Columns SummaryLine::writeEndpoints(const Layer &ip, const Layer *c
     const std::size_t width = endpointWidth(std::max(from.size, to.size));
     Columns columns = {};
     columns.source = out_.mark();
-    out_.rightAligned(from.view(), width);
-    out_ << " > ";
+    before_ = {columns.source, from.size < width ? width - from.size : 0};
+    out_.blanks(before_.count);
+    out_ << from.view() << " > ";
     columns.destination = out_.mark();
     out_ << to.view();
-    out_.blanks(to.size < width ? width - to.size : 0);
+    after_ = {out_.mark(), to.size < width ? width - to.size : 0};
+    out_.blanks(after_.count);
     out_ << ' ';
     columns.rest = out_.mark();
     return columns;
+}
+
+void SummaryLine::shorten(std::size_t excess) {
+    for (Blanks *const blanks : {&after_, &before_}) { // the later ones first, so that the marks hold
+        const std::size_t count = std::min(excess, blanks->count);
+        out_.erase(blanks->start, count);
+        excess -= count;
+    }
 }
 
 // The outer addresses, the innermost tunnel first.
@@ -332,12 +347,14 @@ void SummaryLine::writeTcp(const Layer &ip, const Layer &tcp) {
                                   std::pair{layerField("tcp.rst"), 'R'}, std::pair{layerField("tcp.psh"), 'P'},
                                   std::pair{layerField("tcp.urg"), 'U'}, std::pair{layerField("tcp.ack"), '.'}};
     out_ << " [";
+    const Output::Mark noFlags = out_.mark();
     for (const auto &[flag, letter] : flags) {
         if (view_.number(tcp, flag).value_or(0) != 0) {
             out_ << letter;
         }
     }
-    out_ << ']';
+    writeCongestionFlags(tcp);
+    out_ << (out_.mark() == noFlags ? "none]" : "]");
     writeNumber(tcp, " seq ", layerField("tcp.sequence_number"));
     if (view_.number(tcp, layerField("tcp.ack")).value_or(0) != 0) {
         writeNumber(tcp, " ack ", layerField("tcp.acknowledgement_number"));
@@ -356,52 +373,109 @@ void SummaryLine::writeTcp(const Layer &ip, const Layer &tcp) {
     writeTcpOptions(tcp);
 }
 
+// ECE and CWR (RFC 3168), which the plug-in has as reserved bits beside its flags.
+void SummaryLine::writeCongestionFlags(const Layer &tcp) {
+    constexpr LayerField urgent = layerField("tcp.urg");
+    const std::uint32_t octet = view_.has(tcp, urgent) ? view_.packet()[view_.octet(tcp, urgent)] : 0;
+    out_ << ((octet & 0x40U) != 0 ? "E" : "") << ((octet & 0x80U) != 0 ? "W" : "");
+}
+
+// The timestamps come last, as they are what a short line can best do without.
 void SummaryLine::writeTcpOptions(const Layer &tcp) {
     const Output::Mark start = out_.mark();
-    writeNumber(tcp, ",mss ", layerField("tcp.maximum_segment_size"));
-    writeNumber(tcp, ",wscale ", layerField("tcp.window_scale"));
+    const auto separator = [&] { return out_.mark() == start ? std::string_view(" <") : std::string_view(","); };
+    const auto option = [&](std::string_view name, LayerField field) {
+        if (const auto number = view_.number(tcp, field)) {
+            out_ << separator() << name << *number;
+        }
+    };
+    option("mss ", layerField("tcp.maximum_segment_size"));
+    option("wscale ", layerField("tcp.window_scale"));
     if (view_.has(tcp, layerField("tcp.sack_permitted"))) {
-        out_ << ",sackOK";
+        out_ << separator() << "sackOK";
     }
-    writeNumber(tcp, ",TS ", layerField("tcp.timestamp"));
-    writeNumber(tcp, "/", layerField("tcp.timestamp_echo"));
-    writeNumber(tcp, ",sack ", layerField("tcp.sack_left_edge"));
+    option("sack ", layerField("tcp.sack_left_edge"));
     writeNumber(tcp, ":", layerField("tcp.sack_right_edge"));
     if (view_.has(tcp, layerField("tcp.md5"))) {
-        out_ << ",md5";
+        out_ << separator() << "md5";
     }
-    if (out_.mark() == start) {
-        return;
+    option("TS ", layerField("tcp.timestamp"));
+    writeNumber(tcp, "/", layerField("tcp.timestamp_echo"));
+    if (out_.mark() != start) {
+        out_ << '>';
     }
-    out_ << '>';
-    // The comma in front of the first one.
-    const std::size_t size = out_.since(start).size();
-    std::array<char, 128> kept;
-    const std::string_view options = out_.since(start).substr(1, std::min(size - 1, kept.size()));
-    std::copy(options.begin(), options.end(), kept.begin());
-    out_.takeBack(start);
-    out_ << " <" << std::string_view(kept.data(), options.size());
+}
+
+// What follows several IPv6 options, by its first octets.
+void SummaryLine::writeUnread(std::uint32_t at, std::uint32_t protocol) {
+    constexpr std::uint32_t icmpv6 = 58;
+    if (protocol == icmpv6 && at < view_.packet().size()) {
+        const std::uint32_t type = view_.packet()[at];
+        out_ << ' ';
+        writeName(icmpv6Name(type), "type ", type);
+        out_ << ',';
+    } else if (hasPorts(at, protocol)) {
+        out_ << ' ';
+        writePorts(at, protocol, true);
+        out_ << " > ";
+        writePorts(at, protocol, false);
+        out_ << ',';
+    }
+    out_ << " not decoded: it follows several IPv6 options";
+}
+
+// The name of the message, and that of its code. Where the code's starts with the message's, that is enough.
+void SummaryLine::writeMessage(std::string_view message, std::uint32_t type, const Layer &icmp, LayerField codeField) {
+    constexpr std::string_view manyCodes = "Destination Unreachable"; // whose code 0 is one of several reasons
+    const std::uint32_t code = view_.number(icmp, codeField).value_or(0);
+    const auto names = codes_.find(view_.fieldId(icmp, codeField));
+    const std::string_view name =
+        names == codes_.end() || (code == 0 && message != manyCodes) ? std::string_view() : nameIn(names->second, code);
+    out_ << ' ';
+    if (message.empty() || !name.starts_with(message)) {
+        writeName(message, "type ", type);
+        out_ << (name.empty() ? "" : ": ");
+    }
+    out_ << name;
+    if (name.empty() && code != 0) {
+        out_ << " code " << code;
+    }
+}
+
+// RFC 1191 has it in octets that the plug-in knows as unused.
+void SummaryLine::writeNextHopMtu(const Layer &icmp) {
+    constexpr std::uint32_t unreachable = 3;
+    constexpr std::uint32_t fragmentationNeeded = 4;
+    const std::size_t at = icmp.firstOctet + std::size_t{6};
+    if (view_.number(icmp, layerField("icmp.type")) == unreachable &&
+        view_.number(icmp, layerField("icmp.code")) == fragmentationNeeded && at + 2 <= view_.packet().size()) {
+        out_ << " mtu " << be16At(at);
+    }
+}
+
+void SummaryLine::writeQuoted(std::uint32_t protocol) {
+    out_ << ", quotes ";
+    writeName(nameIn(protocols_, protocol), "protocol ", protocol);
+    out_ << ' ';
+}
+
+bool SummaryLine::hasPorts(std::uint32_t at, std::uint32_t protocol) const {
+    constexpr std::uint32_t tcp = 6;
+    constexpr std::uint32_t udp = 17;
+    constexpr std::uint32_t portOctets = 4;
+    return (protocol == tcp || protocol == udp) && at + portOctets <= view_.packet().size();
 }
 
 void SummaryLine::writePorts(std::uint32_t at, std::uint32_t protocol, bool isSource) {
-    constexpr std::uint32_t tcp = 6;
-    constexpr std::uint32_t udp = 17;
-    const std::size_t port = at + (isSource ? 0U : 2U);
-    if ((protocol == tcp || protocol == udp) && port + 2 <= view_.packet().size()) {
-        out_ << ':' << (std::uint32_t{view_.packet()[port]} << 8U | view_.packet()[port + 1]);
+    if (hasPorts(at, protocol)) {
+        out_ << ':' << be16At(at + (isSource ? 0U : 2U));
     }
 }
 
 void SummaryLine::writeIcmp(const Layer &icmp) {
     const std::uint32_t type = view_.number(icmp, layerField("icmp.type")).value_or(0) & 0xffU;
-    const std::uint32_t code = view_.number(icmp, layerField("icmp.code")).value_or(0) & 0xffU;
-    out_ << ' ';
-    icmpTypes_[type].empty() ? out_ << "type " << type : out_ << icmpTypes_[type];
-    if (type == icmpUnreachable && !icmpUnreachable_[code].empty()) {
-        out_ << ": " << icmpUnreachable_[code];
-    } else if (code != 0) {
-        out_ << " code " << code;
-    }
+    writeMessage(nameIn(icmpTypes_, type), type, icmp, layerField("icmp.code"));
+    writeNextHopMtu(icmp);
     writeNumber(icmp, " id ", layerField("icmp.identifier"));
     writeNumber(icmp, " seq ", layerField("icmp.sequence_number"));
     TextRoom room;
@@ -415,7 +489,8 @@ void SummaryLine::writeIcmp(const Layer &icmp) {
     const std::uint32_t protocol = view_.number(*quoted, layerField("quoted.protocol")).value_or(0) & 0xffU;
     const bool hasData = view_.has(*quoted, layerField("quoted.data"));
     const std::uint32_t data = view_.octet(*quoted, layerField("quoted.data"));
-    out_ << ", quotes " << protocols_[protocol] << ' ' << view_.address(*quoted, layerField("quoted.source"), room);
+    writeQuoted(protocol);
+    out_ << view_.address(*quoted, layerField("quoted.source"), room);
     writePorts(data, hasData ? protocol : 0, true);
     out_ << " > " << view_.address(*quoted, layerField("quoted.destination"), room);
     writePorts(data, hasData ? protocol : 0, false);
@@ -433,12 +508,7 @@ std::string_view SummaryLine::ipv6At(std::uint32_t octet, TextRoom &room) const 
 void SummaryLine::writeIcmpv6(const Layer &icmp) {
     constexpr std::uint32_t headOctets = 8;
     const std::uint32_t type = view_.number(icmp, layerField("icmpv6.type")).value_or(0) & 0xffU;
-    const std::uint32_t code = view_.number(icmp, layerField("icmpv6.code")).value_or(0);
-    out_ << ' ';
-    icmpv6Types_[type].empty() ? out_ << "type " << type : out_ << icmpv6Types_[type];
-    if (code != 0) {
-        out_ << " code " << code;
-    }
+    writeMessage(icmpv6Name(type), type, icmp, layerField("icmpv6.code"));
     writeNumber(icmp, " mtu ", layerField("icmpv6.mtu"));
     writeNumber(icmp, " id ", layerField("icmpv6.identifier"));
     writeNumber(icmp, " seq ", layerField("icmpv6.sequence_number"));
@@ -461,7 +531,8 @@ void SummaryLine::writeQuotedIpv6(std::uint32_t at) {
     }
     const std::uint8_t protocol = view_.packet()[at + nextHeader];
     TextRoom room;
-    out_ << ", quotes " << protocols_[protocol] << ' ' << ipv6At(at + source, room);
+    writeQuoted(protocol);
+    out_ << ipv6At(at + source, room);
     writePorts(at + headerOctets, protocol, true);
     out_ << " > " << ipv6At(at + destination, room);
     writePorts(at + headerOctets, protocol, false);
@@ -480,14 +551,14 @@ void SummaryLine::writeChunks() {
 
 void SummaryLine::writeChunk(const Layer &chunk) {
     const std::uint32_t type = view_.number(chunk, layerField("sctp.chunk_type")).value_or(0);
-    const auto *const known = std::ranges::find(chunkNames, type, &Name::first);
-    known == chunkNames.end() ? out_ << "chunk " << type : out_ << known->second;
+    const std::string_view known = nameIn(chunks_, type);
+    writeName(known.empty() ? laterChunkName(type) : known, "chunk ", type);
     writeNumber(chunk, " tsn ", layerField("sctp.tsn"));
     writeNumber(chunk, " stream ", layerField("sctp.stream"));
     writeNumber(chunk, " seq ", layerField("sctp.stream_sequence_number"));
     if (const auto payload = view_.number(chunk, layerField("sctp.payload_protocol")); payload && *payload != 0) {
-        const auto *const name = std::ranges::find(payloadNames, *payload, &Name::first);
-        name == payloadNames.end() ? out_ << " protocol " << *payload : out_ << ' ' << name->second;
+        out_ << ' ';
+        writeName(payloadProtocolName(*payload), "protocol ", *payload);
     }
     writeNumber(chunk, " itsn ", layerField("sctp.initial_tsn"));
     writeNumber(chunk, " ack ", layerField("sctp.cumulative_tsn"));

@@ -21,7 +21,7 @@ FieldNames::FieldNames(NetfloorGetTable getTable) : fields_(1) {
             continue;
         }
         fields_.resize(std::max<std::size_t>(fields_.size(), row->fieldId + 1));
-        fields_[row->fieldId] = {row->name, row->keyIndex != 0, true, ""};
+        fields_[row->fieldId] = {row->name, "", row->keyIndex != 0, true};
     }
 }
 

@@ -15,12 +15,12 @@
 
 namespace netfloor {
 
-// What the field tables say of an id.
-struct NamedField {
+// What the field tables say of an id. Each is in one line of the cache, since one is read for each field.
+struct alignas(32) NamedField {
     std::string_view name;
+    const char *lastBlock = ""; // the name of the block in which the field was last read
     bool isKey = false;
     bool isKnown = false;
-    const char *lastBlock = ""; // the name of the block in which the field was last read
 };
 
 class FieldNames {

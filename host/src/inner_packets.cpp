@@ -302,13 +302,13 @@ std::optional<InnerPacket> findInnerPacket(std::span<const std::uint8_t> packet)
     return std::nullopt;
 }
 
-std::optional<std::uint32_t> upperLayerOctet(std::span<const std::uint8_t> packet) {
+std::optional<UpperLayer> findUpperLayer(std::span<const std::uint8_t> packet) {
     std::size_t at = 0;
     Step step = ipv6Step(packet);
     while (step.octets != 0) {
         at += step.octets;
         if (!isExtension(step.next)) {
-            return static_cast<std::uint32_t>(at);
+            return UpperLayer{static_cast<std::uint32_t>(at), static_cast<std::uint8_t>(step.next)};
         }
         step = extensionStep(step.next, packet.subspan(at));
     }

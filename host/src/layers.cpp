@@ -109,7 +109,7 @@ void LayerView::addHeader(const PlainHeader &header, std::uint32_t octet) {
     const std::uint8_t *const octets = packet_.data() + octet;
     Value *const values = values_.data() + layer.values;
     for (const PlainField &field : header.fields) {
-        values[field.place] = {field.read(octets), octet + field.octet, field.value};
+        values[field.place] = {field.read(octets), octet + field.octet, field.id, field.value};
     }
 }
 
@@ -164,7 +164,7 @@ void LayerView::field(const FieldView &field) {
     layer.present |= 1U << entry.field.place;
     layer.endOctet = std::max(layer.endOctet, place.end);
     Value &value = values_[layer.values + entry.field.place];
-    value = {field.value, place.first, entry.value};
+    value = {field.value, place.first, static_cast<std::uint16_t>(field.id), entry.value};
     if (entry.value == LayerValue::packetNumber) {
         value.number = be32(packet_, place.first);
     } else if (entry.value == LayerValue::octets) {
@@ -184,7 +184,7 @@ void LayerView::keepVersion(Layer &layer, std::uint32_t octet, LayerField opener
         return;
     }
     layer.present |= 1U << version.place;
-    values_[layer.values + version.place] = {std::uint32_t{packet_[octet]} >> 4U, octet, LayerValue::number};
+    values_[layer.values + version.place] = {std::uint32_t{packet_[octet]} >> 4U, octet, 0, LayerValue::number};
 }
 
 // A text longer than that is cut: who needs all of it has the octets.

@@ -84,6 +84,7 @@ public:
 
 private:
     struct Seen {
+        std::uint32_t id;
         LayerFieldMap::Entry entry;
         std::uint32_t firstBit; // on the wire
         std::uint32_t lastBit;
@@ -99,7 +100,7 @@ private:
         if (!entry.isKnown || field.ranges.empty()) {
             return;
         }
-        Seen seen = {entry, ~std::uint32_t{0}, 0, 0, field.value};
+        Seen seen = {field.id, entry, ~std::uint32_t{0}, 0, 0, field.value};
         for (const BitRange &range : field.ranges) {
             for (std::uint32_t bit = range.firstBit; bit <= range.lastBit; ++bit) {
                 seen.firstBit = std::min(seen.firstBit, wireBit(bit));
@@ -114,6 +115,7 @@ private:
         const std::uint32_t octet = seen.firstBit / bitsPerOctet - first;
         const std::uint32_t endOctet = seen.lastBit / bitsPerOctet + 1 - first;
         PlainField field;
+        field.id = static_cast<std::uint16_t>(seen.id);
         field.place = seen.entry.field.place;
         field.value = seen.entry.value;
         field.octet = static_cast<std::uint8_t>(octet);

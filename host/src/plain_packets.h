@@ -21,6 +21,7 @@ namespace netfloor {
 
 // A field of up to 32 bits inside four octets; an address of IPv6 has its place alone.
 struct PlainField {
+    std::uint16_t id = 0;   // the plug-in's
     std::uint8_t place = 0; // among the names of its layer
     LayerValue value = LayerValue::number;
     std::uint8_t octet = 0;    // its first one, counted from the start of the header

@@ -34,9 +34,14 @@ struct InnerPacket {
 // The IP packet that a GTP-U message carries (TS 29.281), as octets of `message`. None where it carries no packet.
 [[nodiscard]] std::optional<InnerPacket> findInGtpU(std::span<const std::uint8_t> message);
 
-// Where the header after the extension headers of an IPv6 packet starts, by their lengths. The plug-in reads on at
-// another place after an options header with several options. None where a header is cut or a later fragment.
-[[nodiscard]] std::optional<std::uint32_t> upperLayerOctet(std::span<const std::uint8_t> packet);
+struct UpperLayer {
+    std::uint32_t octet = 0; // of the packet
+    std::uint8_t protocol = 0;
+};
+
+// The header after the extension headers of an IPv6 packet, by their lengths. The plug-in reads on at another place
+// after an options header with several options. None where a header is cut or a later fragment.
+[[nodiscard]] std::optional<UpperLayer> findUpperLayer(std::span<const std::uint8_t> packet);
 
 // The packet itself and then each packet inside the one before.
 class InnerPackets {

@@ -89,6 +89,10 @@ public:
     [[nodiscard]] LayerValue valueKind(const Layer &layer, LayerField field) const {
         return values_[layer.values + field.place].kind;
     }
+    // The id of the plug-in's field that gave the value, of the several that the name stands for.
+    [[nodiscard]] std::uint32_t fieldId(const Layer &layer, LayerField field) const {
+        return values_[layer.values + field.place].fieldId;
+    }
     // The address of a field, in the form of RFC 5952 or in dotted form. Empty if the layer does not have it.
     [[nodiscard]] std::string_view address(const Layer &layer, LayerField field, TextRoom &room) const;
 
@@ -110,6 +114,7 @@ private:
     struct Value {
         std::uint32_t number; // LayerValue::octets: how many
         std::uint32_t octet;
+        std::uint16_t fieldId;
         LayerValue kind;
     };
 
