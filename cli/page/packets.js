@@ -20,6 +20,7 @@ class PacketList {
         this.packets = packets;
         this.shown = packets;
         this.index = -1;
+        this.wanted = null; // the packet that was chosen last, also while the filter leaves it out
         this.chosen = chosen;
         const columns = allColumns.filter(({ key }) => key !== 'file' || packets.some(packet => packet.file !== ''));
         this.columns = columns;
@@ -61,21 +62,24 @@ class PacketList {
         this.rows.setCount(packets.length);
     }
 
-    // Shows the packets that have all words, and none of those after '!'. Keeps the chosen one if it is among them.
+    // Shows the packets that have all words, and none of those after '!'.
     filter(text) {
         const words = text.toLowerCase().split(/\s+/).filter(word => word !== '' && word !== '!');
-        const chosen = this.shown[this.index];
         const fits = packet => words.every(word =>
             word[0] === '!' ? !packet.searched.includes(word.slice(1)) : packet.searched.includes(word));
         this.index = -1;
         this.setShown(words.length === 0 ? this.packets : this.packets.filter(fits));
-        this.choose(Math.max(0, this.shown.indexOf(chosen)));
+        if (this.shown.length > 0) {
+            this.open(Math.max(0, this.shown.indexOf(this.wanted)));
+        }
     }
 
     choose(index) {
-        if (index >= this.shown.length) {
-            return;
-        }
+        this.wanted = this.shown[index];
+        this.open(index);
+    }
+
+    open(index) {
         this.index = index;
         this.rows.show(index);
         setActive(this.pane, `packet-${index}`);

@@ -119,6 +119,8 @@ makeTheme(byId('theme'));
 makePrint(list.rows, [tree.rows, octets.rows]);
 showHeader();
 showCount();
-list.choose(0);
+if (page.packets.length > 0) {
+    list.choose(0);
+}
 byId('packets').focus();
 performance.mark('ready');

@@ -13,14 +13,17 @@ class Rows {
         this.draw = draw;
         this.count = 0;
         this.height = parseFloat(getComputedStyle(pane).lineHeight);
+        this.first = 0; // of the rows in the document
+        this.end = 0;
         pane.addEventListener('scroll', () => this.update());
         new ResizeObserver(() => this.update()).observe(pane);
     }
 
+    // Takes all rows away; `show` brings the new ones.
     setCount(count) {
         this.count = count;
         this.body.style.height = `${count * this.height}px`;
-        this.update();
+        this.fill(0, 0);
     }
 
     get visibleHeight() {
@@ -31,16 +34,21 @@ class Rows {
         return Math.max(1, Math.floor(this.visibleHeight / this.height) - 1);
     }
 
+    // Scrolling by less than a row changes none.
     update() {
         if (this.isPrinting) {
             return;
         }
         const first = Math.max(0, Math.floor(this.pane.scrollTop / this.height) - spareRows);
         const end = Math.min(this.count, first + Math.ceil(this.visibleHeight / this.height) + 2 * spareRows);
-        this.fill(first, end);
+        if (first !== this.first || end !== this.end) {
+            this.fill(first, end);
+        }
     }
 
     fill(first, end) {
+        this.first = first;
+        this.end = end;
         const rows = [];
         for (let index = first; index < end; ++index) {
             const row = this.draw(index);
@@ -62,6 +70,7 @@ class Rows {
         } else if (below > this.pane.scrollTop) {
             this.pane.scrollTop = below;
         }
+        this.first = this.end = 0; // its state may be another one
         this.update();
     }
 

@@ -68,15 +68,21 @@ test('opens packets of every capture', async () => {
     await open(...files);
     const packets = Number((await page.locator('#total').innerText()).split(' ')[0]);
     assert.equal(await page.getByRole('grid', { name: 'Packets' }).getAttribute('aria-rowcount'), String(packets + 1));
-    const opened = new Set();
-    for (let last = '', row = null; row !== last;) {
-        last = row;
-        row = await page.locator('#packets .active').innerText();
-        const [file, number] = row.split(/\s+/);
-        opened.add(file);
-        assert.equal(await chosenItem().innerText().then(text => text.replace(/\D+/, '')), number, row);
-        await press('PageDown');
-    }
+    // A packet of each screen of the list: the row that is chosen, and the packet that the fields are of.
+    const screens = await page.evaluate(() => {
+        const list = document.getElementById('packets');
+        const textOf = where => document.querySelector(where).innerText;
+        const seen = [];
+        for (let row = '', last = null; row !== last;) {
+            last = row;
+            row = textOf('#packets .active');
+            seen.push([row.split(/\s+/), textOf('#tree [aria-selected="true"]').replace(/\D+/, '')]);
+            list.dispatchEvent(new KeyboardEvent('keydown', { key: 'PageDown' }));
+        }
+        return seen;
+    });
+    const opened = new Set(screens.map(([[file]]) => file));
+    screens.forEach(([row, number]) => assert.equal(number, row[1], row.join(' ')));
     assert.ok(opened.size > files.length / 3, `${opened.size}`);
     assert.deepEqual(faults, []);
 });
@@ -154,12 +160,13 @@ test('filters the list and says how many are left', async () => {
     assert.match(await status.innerText(), new RegExp(`^\\d+ of ${all} packets$`));
     await press('Enter', 'End');
     assert.equal(await focused(), 'packets');
-    await press('/', 'Escape');
-    assert.equal(await status.innerText(), `${all} packets`);
-    assert.equal(await page.locator('#packets .active').count(), 1); // the same packet is still chosen
+    const wanted = (await page.locator('#packets .active').innerText()).replace(/\s+/g, ' ');
     await press('/');
-    await page.keyboard.type('nowhere');
-    assert.equal(await rowTexts().then(texts => texts.length), 0);
+    await page.keyboard.type(' nowhere');
+    assert.equal((await rowTexts()).length, 0);
+    await press('Escape');
+    assert.equal(await status.innerText(), `${all} packets`);
+    assert.equal((await page.locator('#packets .active').innerText()).replace(/\s+/g, ' '), wanted);
     assert.deepEqual(faults, []);
 });
 
@@ -168,18 +175,18 @@ test('is accessible in light and dark', async () => {
     await press('End'); // the damaged one
     const background = () => page.evaluate(() => getComputedStyle(document.body).backgroundColor);
     const look = { light: 'rgb(255, 255, 255)', dark: 'rgb(23, 25, 28)' };
-    const check = async () => {
-        await page.getByRole('treeitem', { name: /^DAMAGED:/ }).first().click();
-        const { violations } = await page.evaluate(() => window.axe.run());
+    const check = async rules => {
+        const { violations } = await page.evaluate(options => window.axe.run(options), { ...rules, resultTypes: ['violations'] });
         assert.deepEqual(violations.map(({ id, nodes }) => [id, nodes[0].html]), []);
     };
     // The page's policy refuses scripts of others: this one is given to the browser, not to the page.
     await page.evaluate(readFileSync(require.resolve('axe-core'), 'utf8'));
     assert.equal(await background(), look.light);
+    await page.getByRole('treeitem', { name: /^DAMAGED:/ }).first().click();
     await check();
     await page.emulateMedia({ colorScheme: 'dark' });
     assert.equal(await background(), look.dark);
-    await check();
+    await check({ runOnly: ['color-contrast'] }); // the rest is the same
     await page.getByLabel('Colours').selectOption('light');
     assert.equal(await background(), look.light);
     await page.reload();
