@@ -105,9 +105,11 @@ private:
             start();
         }
         startPart(source.capture().name());
+        printer().startCapture(source.capture().name());
         Tally tally;
         readAll(source, tally);
         source.end();
+        printer().endCapture(problemOf(source));
         all_.add(tally);
         printer().finish(tally);
         out_.flush();
@@ -189,6 +191,14 @@ private:
         }
     }
 
+    // Why packets are missing, or nothing.
+    static std::string problemOf(const PacketSource &source) {
+        if (source.damage().empty() && isInterrupted()) {
+            return "interrupted after " + countText(source.read(), "packet") + ".";
+        }
+        return source.damage();
+    }
+
     ExitCode tellEnd(const PacketSource &source, std::uint64_t shown) {
         if (const std::string refused = source.refusedText(); !refused.empty()) {
             tell(refused);
@@ -201,7 +211,7 @@ private:
             return ExitCode::cutCapture;
         }
         if (isInterrupted()) {
-            tell("interrupted after " + countText(source.read(), "packet") + ".");
+            tell(problemOf(source));
             return ExitCode::good;
         }
         if (!options_.packets.areAll() && shown == 0) {

@@ -25,6 +25,7 @@ constexpr std::array commandNames = {
     CommandName{Command::verify, "verify", "Two verdicts on each packet, of the plug-in and of checks, and totals"},
     CommandName{Command::keys, "keys", "A row for each IP layer of each packet, as CSV"},
     CommandName{Command::json, "json", "A JSON object for each packet, on a line of its own"},
+    CommandName{Command::exporting, "export", "Packets, layers, chunks and causes as tables of a SQLite database"},
     CommandName{Command::html, "html", "A page for a browser: the packets with their fields and octets, in one file"},
     CommandName{Command::fields, "fields", "The fields that the plug-in can report; takes no capture"},
 };
@@ -70,7 +71,7 @@ public:
         if (app->get_parent() != nullptr) {
             return CLI::Formatter::make_usage(app, name);
         }
-        return "Usage: netfloor [summary|detail|verify|keys|json|html] [OPTIONS] FILE...\n"
+        return "Usage: netfloor [summary|detail|verify|keys|json|export|html] [OPTIONS] FILE...\n"
                "       netfloor fields [OPTIONS] [NAME|ID]\n"
                "       netfloor detail --help    tells the options of a command\n";
     }
@@ -187,8 +188,8 @@ void addOptions(CLI::App &app, Options &options) {
            "Only these packets of the file: 7, or 3-7,9")
         ->type_name("NUMBERS");
     app.add_option("-j,--jobs", options.jobs,
-                   "Decode in N threads (default: keys and verify one for each core, the others 1); html, and with "
-                   "--count, in one")
+                   "Decode in N threads (default: keys, json and verify one for each core, the others 1); export, "
+                   "html, and with --count, in one")
         ->type_name("N")
         ->check(wholeNumber(1))
         ->check(CLI::Range(1, 1024).description(""));
@@ -224,6 +225,10 @@ void addOwnOptions(CLI::App &app, Command command, Options &options) {
     case Command::json:
         app.add_flag("--fields", options.withFields, "With every field: id, name, value, text, block and bits");
         app.add_flag("--schema", options.schema, "The JSON schema of these objects; takes no capture");
+        break;
+    case Command::exporting:
+        app.add_option("--to", options.to, "The database, a new file")->type_name("FILE.db")->required();
+        app.add_flag("--append", options.append, "Add to the database, if it is there");
         break;
     case Command::verify:
         app.add_flag("--bad", options.bad, "Only damaged packets");

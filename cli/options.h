@@ -14,7 +14,7 @@
 
 namespace netfloor::cli {
 
-enum class Command : std::uint8_t { summary, detail, verify, keys, json, html, fields };
+enum class Command : std::uint8_t { summary, detail, verify, keys, json, exporting, html, fields };
 
 enum class FieldsForm : std::uint8_t { text, json, markdown, tables };
 
@@ -58,12 +58,16 @@ struct Options {
     bool withFields = false;          // json: with every field
     bool schema = false;              // json: the schema of its objects, without a capture
     std::uint64_t limit = 10'000;     // html: packets of the page at most; it says that there are more
+    std::filesystem::path to;         // export: the database
+    bool append = false;              // export: to a database that is there
     std::vector<std::string> columns; // keys: these fields in the place of the usual ones
     std::string field;                // fields: those of this name, or of this id; empty: all
     FieldsForm form = FieldsForm::text;
 
     // Without --jobs: for rows and totals all cores, for what people look at one.
-    [[nodiscard]] bool usesAllCores() const { return command == Command::keys || command == Command::verify; }
+    [[nodiscard]] bool usesAllCores() const {
+        return command == Command::keys || command == Command::json || command == Command::verify;
+    }
 };
 
 // The options, or the code to end with when the command line has been answered: --help, or a mistake.

@@ -9,8 +9,9 @@
 #   scripts/install-packages.sh packages  what packaging/try-packages.sh needs: it builds Debian packages and a bare Debian
 set -eu
 
-decode="g++ cmake ninja-build pkg-config libpcap-dev libcli11-dev zlib1g-dev libisal-dev nlohmann-json3-dev libtbb-dev"
-all="$decode libgtest-dev libbenchmark-dev libtins-dev clang clang-format clang-tidy tshark tcpdump help2man abigail-tools"
+decode="g++ cmake ninja-build pkg-config libpcap-dev libcli11-dev zlib1g-dev libisal-dev nlohmann-json3-dev libsqlite3-dev libtbb-dev"
+all="$decode libgtest-dev libbenchmark-dev libtins-dev clang clang-format clang-tidy tshark tcpdump help2man abigail-tools
+    jq sqlite3 python3-fastjsonschema"
 # The versioned multilib: the other one excludes all cross compilers.
 hosts="$decode libgtest-dev googletest g++-12-multilib g++-s390x-linux-gnu g++-mingw-w64-i686-posix
     g++-mingw-w64-x86-64-posix wine64 qemu-user"

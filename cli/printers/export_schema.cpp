@@ -3,8 +3,8 @@
 
 #include <algorithm>
 #include <map>
+#include <set>
 #include <string_view>
-#include <utility>
 
 #include "netfloor-host/field_tables.h"
 #include "netfloor-host/layer_fields.h"
@@ -53,7 +53,7 @@ CREATE VIEW retransmissions AS
         count(*) AS times, min(packet) AS first_packet, max(packet) AS last_packet,
         max(time) - min(time) AS nanoseconds
     FROM chunks
-    WHERE sctp_chunk_type = 0
+    WHERE sctp_chunk_type = 0 AND sctp_tsn IS NOT NULL
     GROUP BY capture, sctp_source_port, sctp_destination_port, sctp_verification_tag, sctp_tsn, sctp_stream
     HAVING count(*) > 1;
 )";
@@ -70,7 +70,7 @@ std::string_view sqlType(ColumnType type) {
 std::string tableText(RowKind kind) {
     std::string text = "CREATE TABLE " + std::string(tableName(kind)) + "(capture INTEGER NOT NULL REFERENCES captures";
     for (const Column &column : columns(kind)) {
-        text += ", " + plainName(column.name) + " ";
+        text += ", " + plainName(column) + " ";
         text.append(sqlType(column.type)).append(column.isRequired ? " NOT NULL" : "");
     }
     return text + ");\n";
@@ -84,27 +84,32 @@ std::string sqlText(std::string_view text) {
     return result + "'";
 }
 
-// What the plug-in's tables call the values of a column: of types, codes and flags, and not of ports, which are too
-// many.
+// What the plug-in's tables call the values of a column. A column whose fields call one value by two names has none: a
+// code of ICMP means what its type says.
 std::string valueNamesText(std::span<const FieldDescription> fields) {
-    constexpr std::size_t mostValues = 300;
-    std::map<std::pair<std::string_view, std::uint32_t>, std::string> names;
+    std::map<std::string_view, std::map<std::uint32_t, std::string>> names; // by column
+    std::set<std::string_view> ambiguous;
     for (const LayerFieldSource &row : layerFieldSources()) {
         const auto field = std::ranges::find_if(fields, [&row](const auto &one) { return row.field.fits(one); });
-        if (field == fields.end() || field->values.size() > mostValues) {
+        if (field == fields.end()) {
             continue;
         }
         for (const NamedValue &value : field->values) {
-            if (value.from == value.to) {
-                names.try_emplace({row.name, value.from}, field->valueName(value.from));
+            const std::string name = field->valueName(value.from);
+            if (value.from == value.to && names[row.name].try_emplace(value.from, name).first->second != name) {
+                ambiguous.insert(row.name);
             }
         }
     }
     std::string text;
-    for (const auto &[key, name] : names) {
-        text += (text.empty() ? "INSERT INTO value_names VALUES" : ",") + std::string("(") +
-                sqlText(plainName(key.first)) + "," + std::to_string(key.second) + "," + sqlText(name) +
-                ")";
+    for (const auto &[column, values] : names) {
+        for (const auto &[value, name] : values) {
+            if (!ambiguous.contains(column)) {
+                text += (text.empty() ? "INSERT INTO value_names VALUES(" : ",(") +
+                        sqlText(plainName(Column{column, ColumnType::u32, {}})) + "," + std::to_string(value) + "," +
+                        sqlText(name) + ")";
+            }
+        }
     }
     return text + ";\n";
 }

@@ -93,6 +93,7 @@ std::unique_ptr<Printer> makePrinter(const Options &options, Output &out, Host &
     case Command::verify: return makeVerifyPrinter(options, out, host);
     case Command::keys: return makeKeysPrinter(options, out, host);
     case Command::json: return makeJsonPrinter(options, out, host);
+    case Command::exporting: return makeExportPrinter(options, out, host);
     case Command::html: return makeHtmlPrinter(options, out, host);
     case Command::fields: break; // prints no packets
     }

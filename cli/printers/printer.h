@@ -64,7 +64,13 @@ public:
     // Before the first packet of the first capture: the header of rows.
     virtual void start() {}
 
+    // Before the first packet of each capture.
+    virtual void startCapture(std::string_view /*name*/) {}
+
     virtual void print(const PacketToPrint &packet) = 0;
+
+    // After the last one. `problem` is a sentence where packets are missing: the capture is damaged, or Ctrl-C came.
+    virtual void endCapture(std::string_view /*problem*/) {}
 
     // After the last packet of a capture: what it had. `tally` is that of the capture.
     virtual void finish(const Tally &tally) = 0;
@@ -121,6 +127,7 @@ private:
 [[nodiscard]] std::unique_ptr<Printer> makeVerifyPrinter(const Options &options, Output &out, Host &host);
 [[nodiscard]] std::unique_ptr<Printer> makeKeysPrinter(const Options &options, Output &out, Host &host);
 [[nodiscard]] std::unique_ptr<Printer> makeJsonPrinter(const Options &options, Output &out, Host &host);
+[[nodiscard]] std::unique_ptr<Printer> makeExportPrinter(const Options &options, Output &out, Host &host);
 [[nodiscard]] std::unique_ptr<Printer> makeHtmlPrinter(const Options &options, Output &out, Host &host);
 
 } // namespace netfloor::cli
