@@ -1,7 +1,8 @@
 #!/bin/bash
 # SPDX-License-Identifier: MIT
 # Measures the command and what other programs take for the same capture: CPU time (user and system) of the whole
-# program with its output in a file, the fastest of several rounds in which all programs take turns.
+# program with its output in a file, the fastest of several rounds in which all programs take turns. A peer that is
+# missing is named, and its rows are left out.
 #
 #   scripts/measure-command.sh [CAPTURE]
 #
@@ -45,52 +46,85 @@ else
     capture=$folder/capture
 fi
 
+# A function for each program. The name of a peer's begins with that of its program.
+one_job=(--jobs 1)
+summary() { "$netfloor" summary "${one_job[@]}" "$capture"; }
+detail() { "$netfloor" detail "${one_job[@]}" "$capture"; }
+verify() { "$netfloor" verify "${one_job[@]}" "$capture"; }
+keys() { "$netfloor" keys "${one_job[@]}" "${key_fields[@]/#/--column=}" "$capture"; }
+tshark_lines() { tshark -n -r "$capture"; }
+tshark_tree() { tshark -n -V -r "$capture"; }
+tshark_fields() { tshark -n -T fields "${peer_fields[@]/#/-e}" -r "$capture"; }
+tcpdump_lines() { tcpdump -n -r "$capture"; }
+
+# The rows of the table: what is ours, its peer, and how many times as fast it is to be. A new figure is a function
+# above and a line here.
+rows=(
+    'summary tshark_lines  8'
+    'summary tcpdump_lines 3.5'
+    'detail  tshark_tree   15'
+    'verify  tshark_lines  6'
+    'keys    tshark_fields 30'
+)
+
 # The same fields; their values agree on packets with one IP header.
 peer_fields=(ip.version ip.len ip.id ip.flags.df ip.ttl ip.proto ip.src ip.dst
     tcp.srcport tcp.dstport tcp.flags.syn tcp.flags.fin udp.srcport udp.dstport)
 key_fields=(ip.version ip.total_length ip.identification ip.dont_fragment ip.ttl ip.protocol ip.source ip.destination
     tcp.source_port tcp.destination_port tcp.syn tcp.fin udp.source_port udp.destination_port)
 
-declare -A best # seconds, by the name of the program
-measure() {     # NAME COMMAND...
-    local name=$1 time status=0
-    shift
-    has "$1" || return 0
+is_missing() { # PROGRAM: a peer that is not there
+    case $1 in *_*) ! has "${1%%_*}" ;; *) false ;; esac
+}
+
+declare -A best # seconds, by program
+measure() {     # PROGRAM
+    local time status=0
     TIMEFORMAT='%3U %3S'
-    { time "$@" >"$folder/out" 2>"$folder/err"; } 2>"$folder/time" || status=$?
+    { time "$1" >"$folder/out" 2>"$folder/err"; } 2>"$folder/time" || status=$?
     # verify ends with 1 when it has found damage.
-    if [ $status -gt 1 ] || { [ $status -eq 1 ] && [ "$name" != verify ]; }; then
-        say "'$*' failed: $(head -n 1 "$folder/err")"
+    if [ $status -gt 1 ] || { [ $status -eq 1 ] && [ "$1" != verify ]; }; then
+        say "$1 failed: $(head -n 1 "$folder/err")"
         return 0
     fi
     time=$(awk '{ print $1 + $2 }' "$folder/time")
-    best[$name]=$(awk -v new="$time" -v old="${best[$name]:-$time}" 'BEGIN { print new < old ? new : old }')
+    best[$1]=$(awk -v new="$time" -v old="${best[$1]:-$time}" 'BEGIN { print new < old ? new : old }')
+    [ "$1" != verify ] || packets=$(awk '/^[0-9]+ packets?:/ { print $1 }' "$folder/out")
 }
 
-for peer in tshark tcpdump; do
-    has $peer || say "$peer is missing: its figures are left out (scripts/install-packages.sh all)"
+packets=0
+programs=$(printf '%s\n' "${rows[@]}" | awk '{ for (i = 1; i < 3; ++i) if (!seen[$i]++) print $i }')
+for program in $programs; do
+    is_missing "$program" && say "${program%%_*} is missing: $program is left out (scripts/install-packages.sh all)"
 done
 for ((round = 0; round < rounds; ++round)); do
-    measure 'tshark -n -V' tshark -n -V -r "$capture"
-    measure detail "$netfloor" detail "$capture"
-    measure 'tshark -n' tshark -n -r "$capture"
-    measure summary "$netfloor" summary "$capture"
-    measure 'tcpdump -n' tcpdump -n -r "$capture"
-    measure verify "$netfloor" verify "$capture"
-    measure 'tshark -n -T fields' tshark -n -T fields "${peer_fields[@]/#/-e}" -r "$capture"
-    measure keys "$netfloor" keys "${key_fields[@]/#/--column=}" "$capture"
-    measure 'a start' "$netfloor" --count 3 "$capture"
+    for program in $programs; do
+        is_missing "$program" || measure "$program"
+    done
 done
 
+command_of() { # PROGRAM, as a user types it
+    declare -f "$1" | sed -n '3s/^ *"$netfloor" \([a-z]*\).*/\1/; 3s/ -r .*//; 3s/ "${peer_fields.*//; 3s/^ *//; 3p'
+}
 row() { # OURS PEER WANTED
     [ -n "${best[$1]:-}" ] && [ -n "${best[$2]:-}" ] || return 0
-    awk -v ours="$1" -v peer="$2" -v wanted="$3" -v mine="${best[$1]}" -v theirs="${best[$2]}" 'BEGIN {
-        printf "%-8s %7.3f  %-20s %7.3f  %5.1f  %5.1f\n", ours, mine, peer, theirs, theirs / (mine > 0 ? mine : 0.001), wanted }'
+    awk -v ours="$1" -v peer="$(command_of "$2")" -v wanted="$3" -v mine="${best[$1]}" -v theirs="${best[$2]}" \
+        -v packets="$packets" 'BEGIN {
+        mine = mine > 0 ? mine : 0.001
+        printf "%-8s %8.3f %6.2f  %-20s %8.3f  %6.1f  %6.1f\n", ours, mine, mine * 1e6 / packets, peer, theirs,
+            theirs / mine, wanted }'
 }
-echo 'CPU seconds               peer                  ratio  wanted'
-row detail 'tshark -n -V' 15
-row summary 'tshark -n' 8
-row summary 'tcpdump -n' 3.5
-row keys 'tshark -n -T fields' 30
-row verify 'tshark -n' 6
-echo "three packets: ${best[a start]:-?} s"
+echo "CPU time of whole programs, $packets packets, the fastest of $rounds rounds"
+echo '               s  us each  peer                        s   ratio  wanted'
+for line in "${rows[@]}"; do
+    # shellcheck disable=SC2086 # three words
+    row $line
+done
+
+starts=20
+TIMEFORMAT='%3U %3S'
+{ time for ((start = 0; start < starts; ++start)); do
+    "$netfloor" --count 3 "$capture" >"$folder/out"
+done; } 2>"$folder/time"
+awk -v starts=$starts '{ printf "a start with three packets: %.1f ms, of %d the mean\n", ($1 + $2) * 1000 / starts, starts }' \
+    "$folder/time"
