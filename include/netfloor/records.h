@@ -29,7 +29,7 @@ typedef struct BitRange {
     uint32_t value;        /* the number read; a later octet is the more significant */
     uint32_t firstBit;     /* number of the first bit read */
     uint32_t lastBit;      /* number of the last bit read */
-    uint32_t flagWord;     /* 0; octets of longer fields, nibbles and groups leave what was there */
+    uint32_t flagWord;     /* 0; rows of octets and addresses in groups leave what was there */
     uint32_t untouched[2]; /* the host's own */
 } BitRange;
 
@@ -37,7 +37,7 @@ typedef struct BitRange {
  * The field read last, complete whenever the plug-in calls the host, and on return.
  *
  * Of `ranges` a host may read the first `rangeCount` elements. They are the same in all passes, word for word, also
- * where a field does not write a word itself and an earlier one has: flag words, bit numbers of the later
+ * where a field does not write a word itself and an earlier one of the entry has: flag words, bit numbers of the later
  * groups of an address. Elements past `rangeCount` are left over from earlier fields: in the MD and TO passes from the
  * last one that reached so far, in the MV and XTR passes from any.
  */
@@ -111,7 +111,8 @@ enum {
  */
 typedef struct DecodeState {
     uint8_t *data;             /* working copy of the packet: (totalBits + 7) / 8 octets that the
-                                  plug-in may change and restores from `sourceData` */
+                                  plug-in may change and restores from `sourceData`; while an entry
+                                  runs, the host changes it in hd_PreDecode only */
     const uint8_t *sourceData; /* the packet as the host holds it; only read */
     uint32_t totalBits;        /* length of the packet in bits */
     uint32_t cursor;           /* number of the next bit to be read */

@@ -134,10 +134,13 @@ private:
 };
 
 // Runs a production out of line, on a reader of its own: the caller's is not touched by the call, and so both
-// can stay in registers. What it calls by itself is inlined, so that its reader has no address.
+// can stay in registers. What it calls by itself is inlined, so that its reader has no address. A reader that is not
+// live runs nothing, so that a production which is always run so need not ask.
 template <auto production, class Pass>
 [[gnu::noinline, gnu::flatten]] void outOfLineBody(typename Pass::Context &context, Position &position) {
     Reader<Pass> reader(context, position);
+    reader.live = true; // runOutOfLine has asked; the run of a live reader has not ended
+    reader.outcome = Outcome::running;
     production(reader);
     reader.writer.flushRun(*reader.state);
     position = reader.position();

@@ -38,7 +38,8 @@ NETFLOOR_INLINE inline void checkedRun(Reader<Pass> &reader) {
         reader.outcome = Outcome::running;
         reader.writer.startRun(bitCount, mostRunBlocks);
         // For all fields of the run at once: no host looks before the last of them is read.
-        reader.writer.clearFlagWords(reader.state->fieldRecord, clearedFromTo<typename Pass::Fields>(first, last));
+        constexpr std::uint32_t cleared = clearedFromTo<typename Pass::Fields>(first, last);
+        reader.writer.template clearFlagWords<cleared>(reader.state->fieldRecord);
         production(reader);
         reader.writer.flushRun(*reader.state);
         reader.writer.endRun();

@@ -90,14 +90,16 @@ template <class List>
     return 0;
 }
 
-// How many elements' flag words the fields from `first` to `last` clear.
+// How many elements' flag words the fields from `first` to `last`, all of fixed size, clear.
 template <class List>
 [[nodiscard]] consteval std::uint32_t clearedFromTo(const Field &first, const Field &last) {
     std::uint32_t most = 0;
     bool counts = false;
     for (const Field *const field : List::pointers) {
         counts = counts || field == &first;
-        most = counts ? std::max(most, field->place.clearedFlagWords()) : most;
+        if (counts && field->place.clearsFlagWords()) {
+            most = std::max(most, field->place.elements(field->place.count));
+        }
         if (field == &last) {
             break;
         }

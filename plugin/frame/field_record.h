@@ -74,6 +74,7 @@ inline void writeGroups(FieldRecord &record, const std::uint8_t *data, std::uint
         ranges[group].firstBit = first;
         ranges[group].lastBit = first + groupBits - 1;
         ranges[group].value = octetsAt<2>(data, first);
+        ranges[group].flagWord = 0;
         value = value << groupBits | ranges[group].value;
     }
     return value;
@@ -89,6 +90,7 @@ NETFLOOR_INLINE inline void writeElements(FieldRecord &record, const std::uint8_
         ranges[index].firstBit = first;
         ranges[index].lastBit = first + nibbleBits - 1;
         ranges[index].value = nibbleAt(data, first);
+        ranges[index].flagWord = 0;
         value = value << nibbleBits | ranges[index].value;
     };
     const auto octet = [&](std::uint32_t index, std::uint32_t first) NETFLOOR_INLINE {
@@ -111,8 +113,8 @@ NETFLOOR_INLINE inline void writeElements(FieldRecord &record, const std::uint8_
         });
     } else if constexpr (place.shape == Shape::octets && !place.isRun()) {
         forEach<place.count>([&]<std::uint32_t i>() NETFLOOR_INLINE { octet(i, cursor + i * bitsPerOctet); });
-        if constexpr (place.count == 1) {
-            ranges[0].flagWord = 0; // a single octet is one piece, not a row of octets
+        if constexpr (place.clearsFlagWords()) {
+            ranges[0].flagWord = 0;
         }
     } else if constexpr (place.shape == Shape::octets) {
         for (std::uint32_t i = 0; i < units; ++i) {

@@ -3,6 +3,7 @@
 #pragma once
 
 #include <algorithm>
+#include <cassert>
 #include <cstdint>
 #include <optional>
 #include <type_traits>
@@ -135,6 +136,7 @@ NETFLOOR_INLINE inline void readRun(Reader<Pass> &reader, std::int32_t units) {
 template <const Field &field, class Pass>
 [[nodiscard]] NETFLOOR_INLINE inline std::int32_t skipUnseen(Reader<Pass> &reader, std::int32_t most) {
     constexpr std::uint32_t bitCount = neededBits<field>;
+    assert(!reader.writer.isInRun()); // a run counts its bits by the fields that it reads
     static_assert(field.place.isTested() && bitCount == field.place.advance, "these fields must follow one another");
     const bool callsHost = Pass::reportsFields || reader.state->fieldRecord.rangeCapacity <= mostFixedElements;
     if (callsHost || most < 2 || reader.left < 2 * bitCount) {

@@ -222,20 +222,35 @@ private:
         std::uint8_t *const place = context.keyRecord + row.valueOffset;
         const std::array<std::uint16_t, 2> lengthAndPlace = {addressBits, context.byteAreaOffset};
         std::memcpy(place, lengthAndPlace.data(), sizeof lengthAndPlace);
-        if (octetCount >= context.byteAreaSize) {
-            std::uint32_t failed = 0;
-            std::memcpy(&failed, place, sizeof failed);
-            failed |= 0x80000000;
-            std::memcpy(place, &failed, sizeof failed);
-            return false;
-        }
         auto octets = octetArrayAt<octetCount>(data, start);
         for (std::uint8_t &octet : octets) {
             octet = static_cast<std::uint8_t>(octet << nibbleBits | octet >> nibbleBits);
         }
+        if (octetCount >= context.byteAreaSize) [[unlikely]] {
+            std::uint32_t failed = 0;
+            std::memcpy(&failed, place, sizeof failed);
+            failed |= 0x80000000;
+            std::memcpy(place, &failed, sizeof failed);
+            storeWhatFits(context, octets);
+            return false;
+        }
         std::memcpy(context.keyRecord + context.byteAreaOffset, octets.data(), octetCount);
         context.byteAreaOffset = static_cast<std::uint16_t>(context.byteAreaOffset + octetCount);
         return true;
+    }
+
+    // An address is stored nibble by nibble, the last one first, and only a whole one is turned round at the end. So an
+    // area that is too small is left with the end of the address. The room test keeps the last nibble of it free.
+    template <std::size_t count>
+    [[gnu::cold, gnu::noinline]] static void storeWhatFits(const XtrContext &context,
+                                                           const std::array<std::uint8_t, count> &address) {
+        std::uint8_t *const area = context.keyRecord + context.byteAreaOffset;
+        for (std::size_t octet = 0; octet < context.byteAreaSize; ++octet) {
+            area[octet] = address[count - 1 - octet];
+        }
+        if (context.byteAreaSize != 0) {
+            area[context.byteAreaSize - 1] &= 0x0f;
+        }
     }
 };
 

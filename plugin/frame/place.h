@@ -58,7 +58,11 @@ struct Place {
 
     // Elements that the field fills.
     [[nodiscard]] constexpr std::uint32_t elements(std::uint32_t units) const {
-        return shape == Shape::addressNibbles ? units * nibblesPerGroup : units;
+        switch (shape) {
+        case Shape::addressNibbles: return units * nibblesPerGroup;
+        case Shape::ahead: return 0;
+        default: return units;
+        }
     }
 
     // True where a field is read only when its bits are left. An address in groups and what is shown ahead
@@ -104,10 +108,15 @@ struct Place {
         return most;
     }
 
-    // How many elements' flag words the field clears: those of pieces and of a single octet. An octet or nibble among
-    // others leaves the flag word of its element.
-    [[nodiscard]] constexpr std::uint32_t clearedFlagWords() const {
-        return shape == Shape::pieces || (shape == Shape::octets && count == 1) ? count : 0;
+    // Whether the field clears the flag words of the elements that it fills: all do but rows of octets and addresses in
+    // groups, which leave them. A single octet is a piece, not a row.
+    [[nodiscard]] constexpr bool clearsFlagWords() const {
+        switch (shape) {
+        case Shape::octets: return count == 1;
+        case Shape::octetsBackward:
+        case Shape::groups: return false;
+        default: return true;
+        }
     }
 
     // The bits of the field's value, without the gaps between its pieces; 0 for a run.

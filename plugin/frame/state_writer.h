@@ -44,6 +44,7 @@ class ImmediateWriter {
 public:
     static constexpr bool hasCheckedRuns = false;
 
+    [[nodiscard]] NETFLOOR_INLINE static bool isInRun() { return false; }
     NETFLOOR_INLINE void reset() {}
     NETFLOOR_INLINE void endRun() {}
     NETFLOOR_INLINE void flushRun(DecodeState &) {}
@@ -139,6 +140,7 @@ public:
         checkedBlocks_ = blockCount;
     }
 
+    [[nodiscard]] NETFLOOR_INLINE bool isInRun() const { return inRun_; }
     [[nodiscard]] NETFLOOR_INLINE std::uint32_t checkedBits() const { return checkedBits_; }
 
     // What was checked does not hold from here on. What is put off stays so.
@@ -195,8 +197,6 @@ public:
             beginRecord(record, last_.field.field->name);
             last_.field.writeElements(record, data);
             record.fieldId = last_.field.field->id;
-            // The first field of each entry, and of each return from a next layer, has cleared it.
-            record.ranges[0].flagWord = 0;
         }
         if (last_.peek.pieces != 0) {
             writePeek(record, data, last_.peek);
@@ -240,7 +240,13 @@ public:
         if constexpr (place.isRun() || place.shape == Shape::addressNibbles) {
             remember(start, place.elementBits(), place.elements(units));
         }
-        clearFlagWords(state.fieldRecord, place.clearedFlagWords());
+        if constexpr (place.clearsFlagWords() && !place.isRun()) {
+            clearFlagWords<place.elements(place.count)>(state.fieldRecord);
+        } else if constexpr (place.clearsFlagWords()) {
+            for (std::uint32_t i = 0; i < units; ++i) {
+                state.fieldRecord.ranges[i].flagWord = 0;
+            }
+        }
         writeWide<field>(state.fieldRecord);
         last_.peek.pieces = 0;
     }
@@ -260,19 +266,22 @@ public:
 
     NETFLOOR_INLINE std::uint32_t peek(FieldRecord &record, const std::uint8_t *data, const Peek &peek) {
         last_.peek = peek;
-        clearFlagWords(record, peek.pieces);
+        for (std::uint32_t i = 0; i < peek.pieces; ++i) {
+            record.ranges[i].flagWord = 0;
+        }
         return peek.width == bitsPerOctet ? octetsAt(data, peek.first, peek.pieces)
                                           : bits(data, peek.first, peek.first + peek.width - 1);
     }
 
     // Clears the flag words of so many elements. The plug-in writes nothing else to them, so that it need not be put
-    // off. That of the first element is cleared with the record.
-    NETFLOOR_INLINE static void clearFlagWords(FieldRecord &record, std::uint32_t elements) {
-        forEach<mostPieces>([&]<std::size_t i>() NETFLOOR_INLINE {
-            if (i > 0 && i < elements) {
-                record.ranges[i].flagWord = 0;
-            }
-        });
+    // off.
+    template <std::uint32_t elements>
+    NETFLOOR_INLINE static void clearFlagWords(FieldRecord &record) {
+        if constexpr (elements > mostPieces) {
+            clearManyFlagWords<elements>(record.ranges);
+        } else {
+            forEach<elements>([&]<std::size_t i>() NETFLOOR_INLINE { record.ranges[i].flagWord = 0; });
+        }
     }
 
     // Moves back over an address that the run has just read: inside a run its bits are there. False elsewhere, where
@@ -287,6 +296,11 @@ public:
     }
 
 private:
+    template <std::uint32_t elements>
+    [[gnu::noinline]] static void clearManyFlagWords(BitRange *ranges) {
+        forEach<elements>([&]<std::size_t i>() NETFLOOR_INLINE { ranges[i].flagWord = 0; });
+    }
+
     // Remembers a field with many elements.
     NETFLOOR_INLINE static void remember(std::uint32_t cursor, std::uint32_t width, std::uint32_t count) {
         if (count >= addressGroupCount) {

@@ -85,9 +85,6 @@ inline constexpr Field problemData          {575, "64-bit Original Data Datagram
 // messages do not read it, and the datagram ends with bits left over.
 template <class Pass>
 NETFLOOR_INLINE inline void destinationUnreachable(Reader<Pass> &reader) {
-    if (!reader.live) {
-        return;
-    }
     const Block<Pass> message{reader, "Destination Unreachable Message"};
     read<unreachableCode>(reader);
     read<unreachableChecksum>(reader);
@@ -102,9 +99,6 @@ NETFLOOR_INLINE inline void destinationUnreachable(Reader<Pass> &reader) {
 
 template <class Pass>
 NETFLOOR_INLINE inline void sourceQuench(Reader<Pass> &reader) {
-    if (!reader.live) {
-        return;
-    }
     const Block<Pass> message{reader, "Source Quench Message"};
     read<sourceQuenchCode>(reader);
     read<sourceQuenchChecksum>(reader);
@@ -115,9 +109,6 @@ NETFLOOR_INLINE inline void sourceQuench(Reader<Pass> &reader) {
 
 template <class Pass>
 NETFLOOR_INLINE inline void redirect(Reader<Pass> &reader) {
-    if (!reader.live) {
-        return;
-    }
     const Block<Pass> message{reader, "Redirect Message"};
     read<redirectCode>(reader);
     read<redirectChecksum>(reader);
@@ -128,9 +119,6 @@ NETFLOOR_INLINE inline void redirect(Reader<Pass> &reader) {
 
 template <class Pass>
 NETFLOOR_INLINE inline void timeExceeded(Reader<Pass> &reader) {
-    if (!reader.live) {
-        return;
-    }
     const Block<Pass> message{reader, "Time Exceeded Message"};
     read<timeExceededCode>(reader);
     read<timeExceededChecksum>(reader);
@@ -141,9 +129,6 @@ NETFLOOR_INLINE inline void timeExceeded(Reader<Pass> &reader) {
 
 template <class Pass>
 NETFLOOR_INLINE inline void parameterProblem(Reader<Pass> &reader) {
-    if (!reader.live) {
-        return;
-    }
     const Block<Pass> message{reader, "Parameter Problem Message"};
     read<problemCode>(reader);
     read<problemChecksum>(reader);

@@ -29,9 +29,6 @@ inline constexpr Field reservedData{541, "ICMP Reserved Data", octets(1), "%n=%x
 // A message of an unassigned type: the octets after the type are data, a field each.
 template <class Pass>
 NETFLOOR_INLINE inline void reservedMessage(Reader<Pass> &reader) {
-    if (!reader.live) {
-        return;
-    }
     auto &variables = reader.variables();
     const Block<Pass> message{reader, ""};
     variables.payloadOctets -= 1;
@@ -55,9 +52,6 @@ NETFLOOR_INLINE inline void withCodeZero(Reader<Pass> &reader) {
 
 template <class Pass>
 NETFLOOR_INLINE inline void message(Reader<Pass> &reader) {
-    if (!reader.live) {
-        return;
-    }
     const Block<Pass> block{reader, "ICMP Message Type"};
     messageType(reader);
     if (!reader.live) {

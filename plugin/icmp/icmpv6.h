@@ -149,9 +149,6 @@ NETFLOOR_INLINE inline void bodyOf(Reader<Pass> &reader, std::uint32_t type) {
 
 template <class Pass>
 NETFLOOR_INLINE inline void message(Reader<Pass> &reader) {
-    if (!reader.live) {
-        return;
-    }
     std::uint32_t type = 0;
     const Block<Pass> block{reader, " IPv6 - ICMP"};
     read<messageClass>(reader);

@@ -68,9 +68,6 @@ inline constexpr std::int32_t echoHeaderOctets = 8;
 
 template <class Pass>
 NETFLOOR_INLINE inline void echo(Reader<Pass> &reader) {
-    if (!reader.live) {
-        return;
-    }
     auto &variables = reader.variables();
     const Block<Pass> message{reader, ""};
     read<echoCode>(reader);
@@ -89,9 +86,6 @@ NETFLOOR_INLINE inline void echo(Reader<Pass> &reader) {
 
 template <class Pass>
 NETFLOOR_INLINE inline void timestamp(Reader<Pass> &reader) {
-    if (!reader.live) {
-        return;
-    }
     const Block<Pass> message{reader, ""};
     read<timestampCode>(reader);
     read<timestampChecksum>(reader);
@@ -104,9 +98,6 @@ NETFLOOR_INLINE inline void timestamp(Reader<Pass> &reader) {
 
 template <class Pass>
 NETFLOOR_INLINE inline void information(Reader<Pass> &reader) {
-    if (!reader.live) {
-        return;
-    }
     const Block<Pass> message{reader, ""};
     read<informationCode>(reader);
     read<informationChecksum>(reader);
@@ -117,9 +108,6 @@ NETFLOOR_INLINE inline void information(Reader<Pass> &reader) {
 // An entry has 8 octets, whatever the entry size field says. An entry that is cut short is counted.
 template <class Pass>
 NETFLOOR_INLINE inline void routerAdvertisement(Reader<Pass> &reader) {
-    if (!reader.live) {
-        return;
-    }
     std::uint32_t routerCount = 0;
     const Block<Pass> message{reader, ""};
     read<advertisementCode>(reader);
@@ -140,9 +128,6 @@ NETFLOOR_INLINE inline void routerAdvertisement(Reader<Pass> &reader) {
 
 template <class Pass>
 NETFLOOR_INLINE inline void routerSolicitation(Reader<Pass> &reader) {
-    if (!reader.live) {
-        return;
-    }
     const Block<Pass> message{reader, ""};
     read<solicitationCode>(reader);
     read<solicitationChecksum>(reader);
@@ -151,9 +136,6 @@ NETFLOOR_INLINE inline void routerSolicitation(Reader<Pass> &reader) {
 
 template <class Pass>
 NETFLOOR_INLINE inline void addressMaskMessage(Reader<Pass> &reader) {
-    if (!reader.live) {
-        return;
-    }
     const Block<Pass> message{reader, ""};
     read<addressMaskCode>(reader);
     read<addressMaskChecksum>(reader);

@@ -110,9 +110,6 @@ NETFLOOR_INLINE inline void quotedProtocol(Reader<Pass> &reader) {
 
 template <class Pass>
 NETFLOOR_INLINE inline void quotedHeader(Reader<Pass> &reader) {
-    if (!reader.live) {
-        return;
-    }
     std::int32_t embeddedHeaderOctets = 0; // less the fixed header
     const Block<Pass> block{reader, "Internet Protocol Message in ICMP"};
     read<quotedVersion>(reader);

@@ -30,9 +30,6 @@ NETFLOOR_INLINE inline void addressReadTwice(Reader<Pass> &reader) {
 // An address read with the bits of each octet reversed, twice over, so that its groups show in network order.
 template <Report report, class Pass>
 void reversedAddress(Reader<Pass> &reader) {
-    if (!reader.live) {
-        return;
-    }
     const ReversedBits<Pass> reversed{reader, report};
     const Block<Pass> block{reader, "IPv6 Address"};
     read<listedAddress>(reader);

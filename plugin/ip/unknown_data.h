@@ -13,9 +13,6 @@ inline constexpr Field unknownProtocolData{285, "Unknown Protocol Data", octets(
 
 template <class Pass>
 void unknownData(Reader<Pass> &reader) {
-    if (!reader.live) {
-        return;
-    }
     const Block<Pass> block{reader, ""};
     const std::int32_t payloadOctets = reader.variables().payloadOctets;
     if (payloadOctets > 0) {

@@ -74,9 +74,6 @@ NETFLOOR_INLINE inline void fieldsAfterTotalLength(Reader<Pass> &reader) {
 // Reads a datagram; `payload` is the production of its payload.
 template <auto payload, class Pass>
 NETFLOOR_INLINE inline void datagram(Reader<Pass> &reader) {
-    if (!reader.live) {
-        return;
-    }
     auto &variables = reader.variables();
     const Block<Pass> header{reader, "IPv4 Header"};
     checkedRun<headerLength, totalLength, fieldsUpToTotalLength<Pass>>(reader);

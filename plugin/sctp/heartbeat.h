@@ -37,9 +37,6 @@ inline constexpr std::uint32_t knownInfoType = 1;
 // chunk.
 template <class Pass>
 void heartbeatInformation(Reader<Pass> &reader) {
-    if (!reader.live) {
-        return;
-    }
     if (peek(reader, octets(2)) != knownInfoType) {
         return reader.raise(Flag::expectation);
     }

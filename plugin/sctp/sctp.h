@@ -216,9 +216,6 @@ NETFLOOR_INLINE inline void chunks(Reader<Pass> &reader) {
 
 template <class Pass>
 void packet(Reader<Pass> &reader) {
-    if (!reader.live) {
-        return;
-    }
     auto &variables = reader.variables();
     const LimitedBlock<Pass> body{reader, "SCTP Body", bitsOf(variables.payloadOctets)};
     variables.chunksSeen = 0;

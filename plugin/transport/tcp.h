@@ -131,9 +131,6 @@ NETFLOOR_INLINE inline void fieldsUpToDataOffset(Reader<Pass> &reader) {
 
 template <class Pass>
 NETFLOOR_INLINE inline void segment(Reader<Pass> &reader) {
-    if (!reader.live) {
-        return;
-    }
     const Block<Pass> header{reader, "Transmission Control Protocol"};
     checkedRun<sourcePort, reservedBesideDataOffset, fieldsUpToDataOffset<Pass>>(reader);
     if (!reader.live) {

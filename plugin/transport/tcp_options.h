@@ -187,9 +187,6 @@ NETFLOOR_INLINE inline void optionRound(Reader<Pass> &reader, OptionArea &area) 
 // reaches past the header ends the list, but not the segment. The payload starts at the Data Offset.
 template <class Pass>
 NETFLOOR_INLINE inline void options(Reader<Pass> &reader) {
-    if (!reader.live) {
-        return;
-    }
     OptionArea &area = reader.variables().tcpOptions;
     BlockChain<Pass> rounds{reader};
     do {

@@ -40,9 +40,6 @@ inline constexpr std::int32_t headerOctets = 8;
 
 template <class Pass>
 NETFLOOR_INLINE inline void headerAndPayload(Reader<Pass> &reader) {
-    if (!reader.live) {
-        return;
-    }
     auto &variables = reader.variables();
     const Block<Pass> header{reader, "User Datagram Protocol"};
     read<sourcePort>(reader, &variables.sourcePort);

@@ -147,9 +147,6 @@ NETFLOOR_INLINE inline void frame(Reader<Pass> &reader) {
 
 template <class Pass>
 NETFLOOR_INLINE inline void packet(Reader<Pass> &reader) {
-    if (!reader.live) {
-        return;
-    }
     const auto &variables = reader.variables();
     const Block<Pass> block{reader, "Generic Routing Encapsulation"};
     header(reader);

@@ -2,6 +2,7 @@
 // What a host can see while storage grows, in the middle of the grammar. A block stack with room for n elements grows
 // when a block opens inside n - 1 others, and `ranges` grow for a field that fills them.
 #include <algorithm>
+#include <iterator>
 #include <string>
 #include <vector>
 
@@ -83,10 +84,10 @@ TEST(GrowthView, workingCopyOfAReversedAddress) {
         });
         return hexText(copy);
     };
-    for (const Pass pass : allPasses) {
+    const auto runWithFull = [&](Pass pass, const StateOptions &full, const std::vector<std::size_t> &growths) {
         for (const bool allowed : {true, false}) {
             SCOPED_TRACE(std::string(passName(pass)) + (allowed ? "" : " without storage"));
-            StateOptions options = roomFor(12); // full when the inner block of an address opens
+            StateOptions options = full;
             std::vector<std::string> atGrowths, atAddresses, atLengths;
             BareRun *current = nullptr;
             const auto copy = [&] { return hexText({current->state().data, packet.size()}); };
@@ -103,7 +104,10 @@ TEST(GrowthView, workingCopyOfAReversedAddress) {
                 }
             };
             EXPECT_EQ(run.enter(pass), allowed ? 1 : 0);
-            EXPECT_EQ(atGrowths, std::vector<std::string>{reversedFrom(firstAddress)});
+            std::vector<std::string> copies;
+            std::ranges::transform(growths, std::back_inserter(copies), reversedFrom);
+            copies.resize(allowed ? copies.size() : 1);
+            EXPECT_EQ(atGrowths, copies);
             EXPECT_EQ(copy(), allowed ? hexText(packet) : reversedFrom(firstAddress));
             if (allowed && (pass == Pass::md || pass == Pass::to)) {
                 EXPECT_EQ(atAddresses,
@@ -111,6 +115,10 @@ TEST(GrowthView, workingCopyOfAReversedAddress) {
                 EXPECT_EQ(atLengths, (std::vector<std::string>(2, hexText(packet))));
             }
         }
+    };
+    for (const Pass pass : allPasses) {
+        runWithFull(pass, roomFor(12), {firstAddress}); // full when the inner block of an address opens
+        runWithFull(pass, roomFor(20, 8), {firstAddress, secondAddress}); // full with the elements of an address
     }
 }
 
@@ -134,6 +142,32 @@ TEST(GrowthView, groupsOfAnAddress) {
                            "6 of Source IP Address: 528 53387 0 0 0 0 "
                            "7 of Source IP Address: 528 53387 0 0 0 0 0 ")
             << passName(pass);
+    }
+}
+
+// Where the room for a group is refused, the record keeps the groups before it.
+TEST(GrowthView, groupsOfAnAddressUpToARefusal) {
+    for (const Pass pass : allPasses) {
+        for (std::uint32_t refused = 4; refused < 8; ++refused) {
+            BareRun *current = nullptr;
+            StateOptions options = roomFor(20, 4);
+            options.allowGrowth = [&](std::size_t) { return current->state().fieldRecord.rangeCount != refused; };
+            BareRun run(ipv6({}), options);
+            current = &run;
+            EXPECT_EQ(run.enter(pass), 0);
+            const std::string text = describe(run.state());
+            const std::string groups[] = {"528:", " 53387:", " 0:", " 0:"};
+            std::size_t from = text.find("ranges");
+            for (const std::string &group : groups) {
+                from = text.find(group, from);
+                EXPECT_NE(from, std::string::npos) << passName(pass) << ' ' << text;
+            }
+            EXPECT_EQ(text.substr(0, text.find(" ranges")),
+                      R"(cursor 65 left 256 advance 8 condition 1 block "IP Address" field 172 "Source IP Address" )"
+                      "value 0");
+            EXPECT_EQ(run.state().fieldRecord.rangeCount, refused) << passName(pass);
+            EXPECT_EQ(run.state().flags, NETFLOOR_FLAG_NO_RANGES);
+        }
     }
 }
 

@@ -1,6 +1,9 @@
 // SPDX-License-Identifier: MIT
 // The key-field table, its set-up, and the stores into the key record.
 #include <algorithm>
+#include <cstddef>
+#include <cstdint>
+#include <cstring>
 #include <limits>
 #include <string>
 #include <string_view>
@@ -75,6 +78,36 @@ TEST(KeyRecord, isFilledAsFarAsThePacketGoes) {
         BareRun run(Octets(examplePacket().begin(), examplePacket().begin() + static_cast<std::ptrdiff_t>(cut.octets)));
         EXPECT_EQ(run.enter(Pass::xtr), 1);
         EXPECT_EQ(run.keyText(), all.substr(0, all.find(cut.nextRow))) << cut.octets;
+    }
+}
+
+struct SmallAreaCase {
+    std::uint16_t size;
+    const char *area; // the first 17 octets; ee: not written
+};
+
+// An address is stored from its last nibble on, and turned round when it is whole. An area that is too small keeps what
+// fits, less one nibble.
+TEST(KeyRecord, addressInAnAreaThatIsTooSmall) {
+    const Octets packet = ipv6({.source = {0x20, 0x01, 0x0d, 0xb8, 1, 2, 3, 4, 5, 6, 7, 8, 9, 0xab, 0xcd, 0xef}});
+    const std::vector<SmallAreaCase> cases = {
+        {0, "ee*17"},
+        {1, "0e ee*16"},
+        {3, "fe dc 0a ee*14"},
+        {16, "fe dc ba 90 80 70 60 50 40 30 20 10 8b d0 10 02 ee"},
+        {17, "02 10 d0 8b 10 20 30 40 50 60 70 80 90 ba dc fe 02"},
+    };
+    for (const SmallAreaCase &one : cases) {
+        BareRun run(packet);
+        run.keys.addresses.fill(KeyRoom::poison);
+        run.xtr.byteAreaOffset = offsetof(KeyRoom, addresses);
+        run.xtr.byteAreaSize = one.size;
+        EXPECT_EQ(run.enter(Pass::xtr), one.size == 17 ? 1 : 0);
+        EXPECT_EQ(hexText({run.keys.addresses.data(), 17}), hexText(hex(one.area))) << one.size;
+        EXPECT_EQ(run.xtr.byteAreaOffset, offsetof(KeyRoom, addresses) + (one.size == 17 ? 32 : 0));
+        std::uint32_t value = 0; // of row 97, the source address
+        std::memcpy(&value, run.keys.values[97].data(), sizeof value);
+        EXPECT_EQ(value >> 31, one.size == 17 ? 0 : 1);
     }
 }
 
