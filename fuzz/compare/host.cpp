@@ -238,7 +238,7 @@ void setUpKeyContext(const Plan &plan) {
 void enter() {
     lastResult = plugin->passes[static_cast<std::size_t>(pass)](context);
     event("result");
-    trace->number("result", lastResult);
+    trace->number("result", static_cast<std::uint8_t>(lastResult));
 }
 
 // A next layer may have let the arrays grow.

@@ -40,7 +40,8 @@ Input inputFrom(std::span<const std::uint8_t> octets) {
         plan.cursor = static_cast<std::uint32_t>(1 + before * 8 + shift);
         plan.layerIndex = head[6] / 64;
     }
-    plan.missingBits = on(4) ? head[7] % 8 : 0;
+    const auto bitsFromCursor = static_cast<std::uint32_t>(input.packet.size() * 8 + 1 - plan.cursor);
+    plan.missingBits = on(4) ? std::min<std::uint32_t>(head[7] % 8, bitsFromCursor) : 0;
     plan.outerBits = on(5) ? head[8] : 0;
     plan.flags = on(6) ? std::uint32_t{head[9]} << 1 : 0;
     plan.sourceMask = on(7) ? head[10] : 0;
