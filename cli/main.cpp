@@ -22,6 +22,7 @@
 #include "netfloor-host/plugin_host.h"
 #include "options.h"
 #include "output.h"
+#include "plan.h"
 
 namespace netfloor::cli {
 
@@ -70,6 +71,9 @@ int runCommand(int argumentCount, char **arguments) {
         if (options.command == Command::fields) {
             showFields(options);
             return number(ExitCode::good);
+        }
+        if (options.command == Command::plan) {
+            return number(showPlan(options));
         }
         watchForInterrupt();
         const ExitCode code = decodeCapture(options);

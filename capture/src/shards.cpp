@@ -32,6 +32,7 @@ CapturePlan planShards(const std::string &path, std::uint64_t shardOctets) {
     plan.isPacked = stream.isPacked();
     const auto reader = readRecords(stream);
     CapturedPacket packet;
+    TimeStart time;
     Shard shard;
     ReadingPlace cut; // after the packet before, where one is due
     bool isCutDue = false;
@@ -42,8 +43,9 @@ CapturePlan planShards(const std::string &path, std::uint64_t shardOctets) {
                 plan.shards.push_back(shard);
                 shard = {};
                 shard.begin = cut;
+                shard.timeStart = time;
             }
-            plan.time.see(packet);
+            time.see(packet);
             if (shard.packets++ == 0) {
                 shard.firstTime = packet.time;
             }

@@ -93,7 +93,8 @@ std::unique_ptr<Printer> makePrinter(const Options &options, Output &out, Host &
     case Command::verify: return makeVerifyPrinter(options, out, host);
     case Command::keys: return makeKeysPrinter(options, out, host);
     case Command::html: return makeHtmlPrinter(options, out, host);
-    case Command::fields: break; // prints no packets
+    case Command::plan:
+    case Command::fields: break; // print no packets
     }
     return nullptr;
 }

@@ -30,6 +30,7 @@ struct Shard {
         end; // octet at which the next shard begins; none: it goes on to the end of the capture
     std::uint64_t packets = 0;
     std::optional<CaptureTime> firstTime; // of its first packet
+    TimeStart timeStart;                  // of the capture, by the packets in front of the shard
 };
 
 // The blocks of a section that describe its interfaces, by their octets in the file.
@@ -51,7 +52,6 @@ struct CapturePlan {
     std::string path;
     FileState file;
     bool isPacked = false; // with gzip, which can be read from its start alone: there is one shard
-    TimeStart time;        // of the whole capture
     std::vector<SectionBlocks> sections;
     std::vector<Shard> shards; // at least one
     std::string damage;        // at which the last shard ends, as a sentence, or empty
