@@ -16,6 +16,7 @@
 #include "output.h"
 #include "packet_decoder.h"
 #include "packet_source.h"
+#include "plan.h"
 #include "plugin_path.h"
 
 namespace netfloor::cli {
@@ -32,33 +33,47 @@ bool wantsColour(Colour colour) {
            (terminal == nullptr || std::string_view(terminal) != "dumb");
 }
 
+// A shard's output is a part of that of all captures of the plan.
+Options withFiles(Options options, const std::optional<ChosenShard> &shard) {
+    if (shard) {
+        options.totals = false;
+        for (const CapturePlan &capture : shard->captures) {
+            options.files.push_back(capture.path);
+        }
+    }
+    return options;
+}
+
 class Decoding {
 public:
-    explicit Decoding(const Options &options)
-        : options_(options),
-          out_(wantsColour(options.colour), ::isatty(STDOUT_FILENO) == 1),
-          library_(PluginLibrary::open(findPlugin(options.plugin))),
-          decoder_(options, library_, out_) {
-        if (!options.write.empty()) {
+    explicit Decoding(const Options &asked)
+        : shard_(asked.shard.empty() ? std::nullopt : std::optional(chooseShard(asked.shard))),
+          options_(withFiles(asked, shard_)),
+          isFirstPart_(!shard_ || (shard_->capture == 0 && shard_->shard == 0)),
+          out_(wantsColour(asked.colour), ::isatty(STDOUT_FILENO) == 1),
+          library_(PluginLibrary::open(findPlugin(asked.plugin))),
+          decoder_(options_, library_, out_) {
+        if (!options_.write.empty()) {
             refuseToWriteWhatIsRead();
         }
-        if (jobCount(options) > 1) {
-            jobs_.emplace(options, wantsColour(options.colour), library_);
+        if (jobCount(options_) > 1) {
+            jobs_.emplace(options_, wantsColour(asked.colour), library_);
         }
     }
 
     ExitCode run() {
         ExitCode code = ExitCode::good;
-        for (const std::string &file : options_.files) {
-            code = worse(code, tryFile(file));
-            if (isInterrupted() || isFull()) {
-                break;
-            }
+        if (shard_) {
+            const CapturePlan &plan = shard_->captures[shard_->capture];
+            code = tryDecode([&] { return PacketSource(options_, plan, shard_->shard); });
+        }
+        for (std::size_t i = 0; i < options_.files.size() && !shard_ && !isInterrupted() && !isFull(); ++i) {
+            code = worse(code, tryDecode([&] { return PacketSource(options_, options_.files[i]); }));
         }
         if (writer_) {
             writer_->finish();
         }
-        if (hasSeveral()) {
+        if (hasSeveral() && options_.totals) {
             startPart("all " + std::to_string(options_.files.size()) + " captures");
             printer().finishAll(all_);
         }
@@ -83,9 +98,11 @@ private:
     }
 
     // What is wrong with one capture does not keep the others from being read.
-    ExitCode tryFile(const std::string &file) {
+    template <typename Open>
+    ExitCode tryDecode(Open open) {
         try {
-            return decodeFile(file);
+            PacketSource source = open();
+            return decode(source);
         } catch (const CaptureError &error) {
             return fail(ExitCode::noCapture, error.what());
         } catch (const UsageError &error) {
@@ -99,19 +116,22 @@ private:
         return code;
     }
 
-    ExitCode decodeFile(const std::string &file) {
-        PacketSource source(options_, file);
+    ExitCode decode(PacketSource &source) {
         if (!isStarted_) {
             start();
         }
-        startPart(source.capture().name());
-        printer().startCapture(source.capture().name());
+        if (!shard_ || shard_->shard == 0) {
+            startPart(source.capture().name());
+            printer().startCapture(source.capture().name());
+        }
         Tally tally;
         readAll(source, tally);
         source.end();
         printer().endCapture(problemOf(source));
         all_.add(tally);
-        printer().finish(tally);
+        if (options_.totals) {
+            printer().finish(tally);
+        }
         out_.flush();
         return tellEnd(source, tally.packets);
     }
@@ -122,7 +142,9 @@ private:
         if (!options_.write.empty()) {
             writer_.emplace(options_.write);
         }
-        printer().start();
+        if (isFirstPart_) {
+            printer().start();
+        }
     }
 
     void refuseToWriteWhatIsRead() const {
@@ -140,8 +162,8 @@ private:
         if (!hasSeveral() || !printer().hasHeadings()) {
             return;
         }
-        out_ << (hasParts_ ? "\n" : "");
-        hasParts_ = true;
+        out_ << (isFirstPart_ ? "" : "\n");
+        isFirstPart_ = false;
         out_.start(Style::bold) << "==> ";
         out_.untrusted(name);
         (out_ << " <==").stop(Style::bold) << '\n';
@@ -214,6 +236,9 @@ private:
             tell(problemOf(source));
             return ExitCode::good;
         }
+        if (shard_) { // what is asked for may be in the others
+            return ExitCode::good;
+        }
         if (!options_.packets.areAll() && shown == 0) {
             throw UsageError("--packet " + options_.packets.text +
                              (source.read() < options_.packets.last
@@ -226,7 +251,9 @@ private:
         return ExitCode::good;
     }
 
-    const Options &options_;
+    const std::optional<ChosenShard> shard_; // none: all of the files
+    const Options options_;
+    bool isFirstPart_; // of the output
     Output out_;
     PluginLibrary library_;
     PacketDecoder decoder_;    // of the thread that reads, where there are no jobs
@@ -234,7 +261,6 @@ private:
     std::optional<CaptureWriter> writer_;
     Tally all_; // of all captures
     bool isStarted_ = false;
-    bool hasParts_ = false;
 };
 
 } // namespace

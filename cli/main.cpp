@@ -22,6 +22,7 @@
 #include "netfloor-host/plugin_host.h"
 #include "options.h"
 #include "output.h"
+#include "plan.h"
 #include "printers/json_schema.h"
 
 namespace netfloor::cli {
@@ -75,6 +76,9 @@ int runCommand(int argumentCount, char **arguments) {
         if (options.schema) {
             showPacketSchema();
             return number(ExitCode::good);
+        }
+        if (options.command == Command::plan) {
+            return number(showPlan(options));
         }
         watchForInterrupt();
         const ExitCode code = decodeCapture(options);

@@ -27,6 +27,7 @@ constexpr std::array commandNames = {
     CommandName{Command::json, "json", "A JSON object for each packet, on a line of its own"},
     CommandName{Command::exporting, "export", "Packets, layers, chunks and causes as tables of a SQLite database"},
     CommandName{Command::html, "html", "A page for a browser: the packets with their fields and octets, in one file"},
+    CommandName{Command::plan, "plan", "Cuts captures into shards that several programs can read at once, as JSON"},
     CommandName{Command::fields, "fields", "The fields that the plug-in can report; takes no capture"},
 };
 
@@ -64,6 +65,15 @@ Examples:
   netfloor fields 384             the same, by its id
   netfloor fields tcp             the fields of TCP)";
 
+constexpr const char *planFooter = R"(
+A shard is a range of octets with whole packets. Shards of one plan, decoded in any order and place and joined in the
+order of the plan, give what one run with --no-totals gives. The plan names the files as they are named here; a file
+that has changed since is refused. No shard is empty, so there may be fewer than asked for.
+
+Example:
+  netfloor plan --shards 8 c.pcap > plan.json
+  for k in 1 2 3 4 5 6 7 8; do netfloor keys --shard plan.json:$k > $k.csv; done)";
+
 // The word for the command may be left out, which CLI11's own usage line does not say.
 class UsageFormatter : public CLI::Formatter {
 public:
@@ -72,6 +82,7 @@ public:
             return CLI::Formatter::make_usage(app, name);
         }
         return "Usage: netfloor [summary|detail|verify|keys|json|export|html] [OPTIONS] FILE...\n"
+               "       netfloor plan --shards N FILE...\n"
                "       netfloor fields [OPTIONS] [NAME|ID]\n"
                "       netfloor detail --help    tells the options of a command\n";
     }
@@ -201,17 +212,48 @@ void addOptions(CLI::App &app, Options &options) {
         ->type_name("WHEN");
 }
 
+void addShardOption(CLI::App &app, Options &options) {
+    app.add_option("--shard", options.shard,
+                   "Shard K of a plan in the place of FILE: its packets, without totals and what stands once in front")
+        ->type_name("PLAN.json:K");
+}
+
+void addTotalsOption(CLI::App &app, Options &options) {
+    app.add_flag_callback(
+        "--no-totals", [&options] { options.totals = false; }, "Nothing after the last packet, as with --shard");
+}
+
+void addPlanOptions(CLI::App &app, Options &options) {
+    app.add_option("file", options.files, "Capture files (pcap or pcapng). One that is packed with gzip is one shard")
+        ->type_name("FILE");
+    CLI::Option *const shards =
+        app.add_option("--shards", options.shards, "Shards of all files together, at least one a file")
+            ->type_name("N")
+            ->check(wholeNumber(1));
+    app.add_option("--shard-size", options.shardSize, "Octets of a shard, also as 64M or 1G")
+        ->type_name("OCTETS")
+        ->transform(CLI::AsSizeValue(false))
+        ->check(wholeNumber(1))
+        ->excludes(shards);
+    app.footer(planFooter);
+}
+
 void addOwnOptions(CLI::App &app, Command command, Options &options) {
     switch (command) {
     case Command::summary:
+        addShardOption(app, options);
+        addTotalsOption(app, options);
         app.add_flag("-a,--all", options.all, "The text of every field, not of the key fields alone");
         break;
     case Command::detail:
+        addShardOption(app, options);
+        addTotalsOption(app, options);
         app.add_flag("-b,--bits", options.bits, "With the bits of each field; the first bit of the IP header is bit 1");
         app.add_flag("-a,--all", options.all,
                      "All octets of data, a line for each, and the second reading of addresses");
         break;
     case Command::keys:
+        addShardOption(app, options);
         app.add_option("--column", options.columns,
                        "This field in the place of the usual ones (may be repeated); a wrong name lists all")
             ->type_name("NAME")
@@ -223,6 +265,7 @@ void addOwnOptions(CLI::App &app, Command command, Options &options) {
         app.add_flag("--raw", options.raw, "Addresses as octets, in hexadecimal");
         break;
     case Command::json:
+        addShardOption(app, options);
         app.add_flag("--fields", options.withFields, "With every field: id, name, value, text, block and bits");
         app.add_flag("--schema", options.schema, "The JSON schema of these objects; takes no capture");
         break;
@@ -239,6 +282,7 @@ void addOwnOptions(CLI::App &app, Command command, Options &options) {
             ->type_name("N")
             ->check(wholeNumber(1));
         break;
+    case Command::plan:
     case Command::fields: break;
     }
 }
@@ -264,7 +308,14 @@ bool putCommandFirst(const CLI::App &app, std::vector<std::string> &words) {
 }
 
 // A command that is misspelt reads like a file.
-void checkFiles(const std::vector<std::string> &files, bool named) {
+void checkFiles(const Options &options, bool named) {
+    const std::vector<std::string> &files = options.files;
+    if (!options.shard.empty() && !files.empty()) {
+        throw CLI::ValidationError("--shard", "the plan names the captures: leave FILE out");
+    }
+    if (!options.shard.empty() && options.count) {
+        throw CLI::ValidationError("--shard", "--count cannot be kept across shards: leave it out");
+    }
     if (std::ranges::count(files, "-") > 1) {
         throw CLI::ValidationError("FILE", "standard input (-) can be read once");
     }
@@ -287,14 +338,19 @@ std::variant<Options, ExitCode> parseOptions(int argumentCount, char **arguments
         CLI::App *const sub = app.add_subcommand(row.name, row.help);
         if (row.command == Command::fields) {
             addFieldsOptions(*sub, options);
+        } else if (row.command == Command::plan) {
+            addPlanOptions(*sub, options);
         } else {
             addOptions(*sub, options);
             addOwnOptions(*sub, row.command, options);
         }
         sub->callback([&options, &row] {
             options.command = row.command;
-            if (row.command != Command::fields && !options.schema && options.files.empty()) {
+            if (row.command != Command::fields && !options.schema && options.files.empty() && options.shard.empty()) {
                 throw CLI::RequiredError("file"); // CLI11 would name the option
+            }
+            if (row.command == Command::plan && options.shards == 0 && options.shardSize == 0) {
+                throw CLI::RequiredError("--shards N or --shard-size OCTETS");
             }
         });
     }
@@ -313,7 +369,7 @@ std::variant<Options, ExitCode> parseOptions(int argumentCount, char **arguments
     std::reverse(words.begin(), words.end()); // as CLI11 takes them
     try {
         app.parse(words);
-        checkFiles(options.files, named);
+        checkFiles(options, named);
     } catch (const CLI::Success &answer) {
         app.exit(answer);
         return ExitCode::good;

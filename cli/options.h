@@ -14,7 +14,7 @@
 
 namespace netfloor::cli {
 
-enum class Command : std::uint8_t { summary, detail, verify, keys, json, exporting, html, fields };
+enum class Command : std::uint8_t { summary, detail, verify, keys, json, exporting, html, plan, fields };
 
 enum class FieldsForm : std::uint8_t { text, json, markdown, tables };
 
@@ -40,7 +40,7 @@ struct PacketNumbers {
 
 struct Options {
     Command command = Command::summary;
-    std::vector<std::string> files; // at least one
+    std::vector<std::string> files; // at least one, but for a shard
     std::filesystem::path plugin;   // empty: where the command is installed
     std::string filter;
     std::filesystem::path write;        // the packets that pass, into this file
@@ -48,6 +48,10 @@ struct Options {
     std::optional<std::uint64_t> count; // packets to show at most
     PacketNumbers packets;              // to show
     std::optional<unsigned> jobs;       // threads that decode
+    std::uint64_t shards = 0;           // plan: at most, or 0 and
+    std::uint64_t shardSize = 0;        // plan: octets
+    std::string shard;                  // of a plan, in the place of files: "PLAN.json:3"
+    bool totals = true;                 // summary, detail
     Colour colour = Colour::automatic;
     bool utc = false;                 // times of day instead of seconds since the first packet
     bool all = false;                 // summary, detail: nothing left out

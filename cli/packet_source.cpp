@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: MIT
 #include "packet_source.h"
 
+#include <utility>
+
 #include "exit_code.h"
 #include "interrupt.h"
 #include "netfloor-capture/link_layer.h"
@@ -9,7 +11,15 @@
 namespace netfloor::cli {
 
 PacketSource::PacketSource(const Options &options, const std::string &file)
-    : options_(options), capture_(file), progress_(std::make_unique<ProgressBar>(capture_)) {
+    : PacketSource(options, CaptureFile(file)) {}
+
+PacketSource::PacketSource(const Options &options, const CapturePlan &plan, std::size_t shard)
+    : PacketSource(options, CaptureFile(plan, shard)) {
+    timeStart_ = plan.shards[shard].timeStart;
+}
+
+PacketSource::PacketSource(const Options &options, CaptureFile capture)
+    : options_(options), capture_(std::move(capture)), progress_(std::make_unique<ProgressBar>(capture_)) {
     if (!options.filter.empty()) {
         filter_.emplace(options.filter);
     }

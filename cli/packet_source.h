@@ -19,6 +19,7 @@ class PacketSource {
 public:
     // Throws CaptureError and FilterError.
     PacketSource(const Options &options, const std::string &file);
+    PacketSource(const Options &options, const CapturePlan &plan, std::size_t shard);
 
     // The next packet, valid until the next call. False at the end, at damage and after an interrupt; and where the
     // next packet has not come yet, unless the call may wait for it. Throws FilterError.
@@ -39,6 +40,8 @@ public:
     [[nodiscard]] std::string refusedText() const;
 
 private:
+    PacketSource(const Options &options, CaptureFile capture);
+
     const Options &options_;
     CaptureFile capture_;
     std::optional<PacketFilter> filter_;

@@ -24,6 +24,7 @@ netfloor_add_man_page(netfloor-detail "shows every field of each packet of a cap
 netfloor_add_man_page(netfloor-verify "gives a verdict on each packet of a capture file" verify)
 netfloor_add_man_page(netfloor-keys "writes the key fields of packets as CSV" keys)
 netfloor_add_man_page(netfloor-html "makes a page for a browser of the packets of a capture file" html)
+netfloor_add_man_page(netfloor-plan "cuts captures into shards that several programs can read at once" plan)
 netfloor_add_man_page(netfloor-fields "shows the fields that packets can have" fields)
 add_custom_target(netfloor_man ALL DEPENDS ${pages})
 install(FILES ${pages} DESTINATION ${CMAKE_INSTALL_MANDIR}/man1 COMPONENT command)

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: MIT
 #include "netfloor-capture/capture_file.h"
 
+#include <algorithm>
 #include <array>
 #include <string>
 #include <string_view>
@@ -44,8 +45,9 @@ constexpr std::array packings = {
     Packing{"PK\x03\x04"sv, "zip", "unzip -p"},
 };
 
-// Finds out the format.
-std::unique_ptr<RecordReader> readerOf(OctetStream &stream) {
+} // namespace
+
+std::unique_ptr<RecordReader> readRecords(OctetStream &stream) {
     const std::string &name = stream.file().name();
     const auto peeked = stream.peek(8);
     const std::string start(peeked.begin(), peeked.end());
@@ -68,17 +70,50 @@ std::unique_ptr<RecordReader> readerOf(OctetStream &stream) {
                               "converted: editcap -F pcapng FILE NEWFILE");
 }
 
+namespace {
+
+// Gives the stream if the file is what it was.
+OctetStream &checked(OctetStream &stream, const FileState *before) {
+    const FileState now = fileState(stream);
+    if (before == nullptr || now == *before) {
+        return stream;
+    }
+    throw CaptureError(stream.file().name() + " is not what it was when it was planned: " +
+                       (now.octets != before->octets ? "it had " + std::to_string(before->octets) + " octets and has " +
+                                                           std::to_string(now.octets)
+                        : now.start != before->start ? "it begins with other octets"
+                                                     : "it has another time of change") +
+                       ". Plan it again.");
+}
+
 } // namespace
 
 // The reader borrows the stream, which must not move with the capture.
 struct CaptureFile::Parts {
-    explicit Parts(const std::string &path) : stream(path), reader(readerOf(stream)) {}
+    explicit Parts(const std::string &path, const FileState *before = nullptr)
+        : stream(path), reader(readRecords(checked(stream, before))) {}
 
     OctetStream stream;
     std::unique_ptr<RecordReader> reader;
 };
 
 CaptureFile::CaptureFile(const std::string &path) : parts_(std::make_unique<Parts>(path)) {}
+CaptureFile::CaptureFile(const CapturePlan &plan, std::size_t shard)
+    : parts_(std::make_unique<Parts>(plan.path, &plan.file)) {
+    const Shard &wanted = plan.shards.at(shard);
+    RecordReader &reader = *parts_->reader;
+    if (wanted.begin.packets != 0) {
+        const auto section = std::ranges::find(plan.sections, wanted.begin.section, &SectionBlocks::begin);
+        try {
+            reader.goTo(wanted.begin, section == plan.sections.end() ? SectionBlocks() : *section);
+        } catch (const CaptureDamage &damage) {
+            throw CaptureError(damage.what());
+        }
+    }
+    if (plan.damage.empty() || wanted.end) {
+        reader.endAt(wanted);
+    }
+}
 CaptureFile::~CaptureFile() = default;
 CaptureFile::CaptureFile(CaptureFile &&) noexcept = default;
 CaptureFile &CaptureFile::operator=(CaptureFile &&) noexcept = default;

@@ -62,6 +62,8 @@ public:
         }
         ++count_;
     }
+    // With those that are not kept.
+    void setCount(std::uint64_t count) { count_ = count; }
     void clear() {
         kept_.clear();
         names_.clear();

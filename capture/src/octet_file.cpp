@@ -54,6 +54,8 @@ void OctetFile::checkKind() {
     if (::fstat(file_, &status) == 0) {
         live_ = !S_ISREG(status.st_mode);
         size_ = live_ ? 0 : static_cast<std::uint64_t>(status.st_size);
+        constexpr std::int64_t perSecond = 1'000'000'000;
+        modified_ = std::int64_t{status.st_mtim.tv_sec} * perSecond + status.st_mtim.tv_nsec;
     }
     if (S_ISDIR(status.st_mode)) {
         throw CaptureError(name_ + " is a folder. Name the captures in it: netfloor " + name_ + "/*.pcap");
@@ -74,6 +76,13 @@ std::size_t OctetFile::read(std::span<std::uint8_t> octets) {
     }
     position_ += static_cast<std::uint64_t>(got);
     return static_cast<std::size_t>(got);
+}
+
+void OctetFile::seek(std::uint64_t position) {
+    if (::lseek(file_, static_cast<off_t>(position), SEEK_SET) < 0) {
+        error_ = std::strerror(errno);
+    }
+    position_ = position;
 }
 
 bool OctetFile::isWaiting() const {

@@ -29,6 +29,11 @@ public:
 
     [[nodiscard]] const std::string &name() const { return name_; }
     [[nodiscard]] bool isLive() const { return live_; }
+    [[nodiscard]] std::uint64_t size() const { return size_; }        // when it was opened; 0 for a live one
+    [[nodiscard]] std::int64_t modified() const { return modified_; } // nanoseconds since 1970
+
+    // What comes next from `read`. Only for a file that is not live.
+    void seek(std::uint64_t position);
     [[nodiscard]] std::optional<double> progress() const;
 
     // Why reading failed, or empty.
@@ -42,6 +47,7 @@ private:
     int file_;
     bool live_ = false;
     std::uint64_t size_ = 0; // 0 where it is not known
+    std::int64_t modified_ = 0;
     std::uint64_t position_ = 0;
     std::string error_;
 };

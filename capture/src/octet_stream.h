@@ -40,6 +40,13 @@ public:
     // Takes octets without a peek; false when the capture ends before.
     [[nodiscard]] bool skip(std::size_t count);
 
+    // Goes on elsewhere in a file that is neither packed nor live.
+    void seek(std::uint64_t position) {
+        file_.seek(position);
+        begin_ = end_ = 0;
+        position_ = position;
+    }
+
     [[nodiscard]] std::uint64_t position() const { return position_; } // octets taken
     // Where the capture ends, as far as it has been read.
     [[nodiscard]] std::uint64_t endPosition() const { return position_ + (end_ - begin_); }

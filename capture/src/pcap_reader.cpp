@@ -43,10 +43,10 @@ public:
     bool next(CapturedPacket &packet) override {
         const std::uint64_t position = stream_.position();
         const auto octets = stream_.peek(headOctets_);
+        if (isPastShard(stream_, number_, octets.empty() && stream_.error().empty())) {
+            return false;
+        }
         if (octets.size() < headOctets_) {
-            if (octets.empty() && stream_.error().empty()) {
-                return false;
-            }
             throw cutAt(stream_, number_ + 1, position);
         }
         const NumberView head(octets, bigEndian_);
@@ -58,6 +58,7 @@ public:
                            "a length of " + std::to_string(captured) + " octets, where " + std::to_string(most_) +
                                " is the limit,");
         }
+        checkFits(stream_, number_, headOctets_ + captured);
         const auto record = stream_.peek(headOctets_ + captured);
         if (record.size() < headOctets_ + captured) {
             throw cutAt(stream_, number_ + 1, position);
@@ -74,6 +75,13 @@ public:
         packet.interfaceName = {};
         packet.comments = {};
         return true;
+    }
+
+    [[nodiscard]] ReadingPlace place() const override { return {.position = stream_.position(), .packets = number_}; }
+
+    void goTo(const ReadingPlace &place, const SectionBlocks & /*section*/) override {
+        stream_.seek(place.position);
+        number_ = place.packets;
     }
 
     [[nodiscard]] bool isNextIn(std::span<const std::uint8_t> octets) const override {

@@ -57,6 +57,24 @@ public:
         return true;
     }
 
+    [[nodiscard]] ReadingPlace place() const override {
+        return {stream_.position(), number_, section_.begin, interfaces_.count()};
+    }
+    [[nodiscard]] SectionBlocks section() const override { return section_; }
+
+    void goTo(const ReadingPlace &place, const SectionBlocks &section) override {
+        goToBlock(section.begin, sectionHeader);
+        for (std::size_t i = 0; i < std::min<std::uint64_t>(place.interfaces, section.interfaces.size()); ++i) {
+            goToBlock(section.interfaces[i], interfaceDescription);
+            takeInterface();
+        }
+        interfaces_.setCount(place.interfaces);
+        stream_.seek(place.position);
+        number_ = place.packets;
+        atPacket_ = false;
+        oddBlocks_ = 0;
+    }
+
     // A packet that is found already needs the rest of its own block alone.
     [[nodiscard]] bool isNextIn(std::span<const std::uint8_t> octets) const override {
         while (octets.size() >= 8) {
@@ -108,11 +126,18 @@ private:
         return false;
     }
 
+    void goToBlock(std::uint64_t position, std::uint32_t type) {
+        stream_.seek(position);
+        if (!readBlockHead() || block_.type != type) {
+            throw damage("a block that is not what the plan says");
+        }
+    }
+
     // Peeks at the start of a block. False at the end.
     bool readBlockHead() {
         block_.position = stream_.position();
         const auto octets = stream_.peek(frameOctets);
-        if (octets.empty() && stream_.error().empty()) {
+        if (isPastShard(stream_, number_, octets.empty() && stream_.error().empty())) {
             return false;
         }
         if (octets.size() < frameOctets) {
@@ -126,6 +151,7 @@ private:
             }
             bigEndian_ = order == byteOrderMagic;
             interfaces_.clear();
+            section_ = {.begin = block_.position, .interfaces = {}};
         }
         const NumberView head(octets, bigEndian_);
         block_.type = head.u32(0);
@@ -133,6 +159,7 @@ private:
         if (block_.octets < frameOctets || block_.octets > mostBlockOctets) {
             throw damage("a block of " + std::to_string(block_.octets) + " octets");
         }
+        checkFits(stream_, number_, block_.octets);
         if (paddingOctets() != 0 && oddBlocks_++ == 0) {
             firstOddBlock_ = block_.position;
         }
@@ -174,6 +201,9 @@ private:
             throw damage("an interface description of " + std::to_string(block_.octets) + " octets");
         }
         interfaces_.add(readInterface({takeBlock(), bigEndian_}));
+        if (section_.interfaces.size() < InterfaceTable::mostKept) {
+            section_.interfaces.push_back(block_.position);
+        }
     }
 
     [[nodiscard]] const Interface &interface(std::uint32_t number) const {
@@ -254,6 +284,7 @@ private:
 
     OctetStream &stream_;
     InterfaceTable interfaces_;              // of the section
+    SectionBlocks section_;                  // where they are
     Block block_;                            // the one that is read
     std::vector<std::string_view> comments_; // of the packet
     std::uint64_t number_ = 0;

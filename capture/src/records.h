@@ -13,6 +13,7 @@
 
 #include "netfloor-capture/errors.h"
 #include "netfloor-capture/packet.h"
+#include "netfloor-capture/shards.h"
 #include "octet_stream.h"
 
 namespace netfloor {
@@ -28,14 +29,44 @@ public:
 
     [[nodiscard]] virtual bool next(CapturedPacket &packet) = 0;
 
+    // The place after the packet that came last, and what its section has described by then.
+    [[nodiscard]] virtual ReadingPlace place() const = 0;
+    [[nodiscard]] virtual SectionBlocks section() const { return {}; }
+
+    // Goes on at a place that a reader of the same capture gave, with what its section described.
+    virtual void goTo(const ReadingPlace &place, const SectionBlocks &section) = 0;
+    // Reads no further than the shard goes. What does not fit into it is damage.
+    void endAt(const Shard &shard) { shard_ = shard; }
+
     // Whether these octets, which come next, hold a whole packet.
     [[nodiscard]] virtual bool isNextIn(std::span<const std::uint8_t> octets) const = 0;
 
     // See CaptureFile::note.
     [[nodiscard]] virtual std::string note() const { return {}; }
+
+protected:
+    // Whether the next record, or the end of the capture, is past the shard, of which so many packets have come.
+    [[nodiscard]] bool isPastShard(const OctetStream &stream, std::uint64_t packets, bool isAtEnd) const;
+    // Throws CaptureDamage for a record of the shard that ends past it.
+    void checkFits(const OctetStream &stream, std::uint64_t packets, std::uint64_t octets) const {
+        if (shard_ && shard_->end && octets > *shard_->end - stream.position()) {
+            throw shardDamage(stream, packets);
+        }
+    }
+
+private:
+    [[nodiscard]] CaptureDamage shardDamage(const OctetStream &stream, std::uint64_t packets) const;
+
+    std::optional<Shard> shard_; // none: the whole capture
 };
 
-// The formats. The stream is borrowed.
+// Finds out the format. The stream is borrowed.
+[[nodiscard]] std::unique_ptr<RecordReader> readRecords(OctetStream &stream);
+
+// What the file is now. Does not take octets.
+[[nodiscard]] FileState fileState(OctetStream &stream);
+
+// The formats.
 [[nodiscard]] std::unique_ptr<RecordReader> readPcap(OctetStream &stream);
 [[nodiscard]] std::unique_ptr<RecordReader> readPcapng(OctetStream &stream);
 

@@ -95,7 +95,8 @@ std::unique_ptr<Printer> makePrinter(const Options &options, Output &out, Host &
     case Command::json: return makeJsonPrinter(options, out, host);
     case Command::exporting: return makeExportPrinter(options, out, host);
     case Command::html: return makeHtmlPrinter(options, out, host);
-    case Command::fields: break; // prints no packets
+    case Command::plan:
+    case Command::fields: break; // print no packets
     }
     return nullptr;
 }

@@ -16,6 +16,7 @@
 
 #include "netfloor-capture/errors.h"
 #include "netfloor-capture/packet.h"
+#include "netfloor-capture/shards.h"
 
 namespace netfloor {
 
@@ -23,6 +24,9 @@ class CaptureFile {
 public:
     // "-" is standard input. Throws CaptureError.
     explicit CaptureFile(const std::string &path);
+    // One shard of a capture, counted from 0. Its packets are those of the whole capture, with their numbers. Throws
+    // CaptureError, also where the file is not as it was when it was planned.
+    CaptureFile(const CapturePlan &plan, std::size_t shard);
     ~CaptureFile();
     CaptureFile(CaptureFile &&) noexcept;
     CaptureFile &operator=(CaptureFile &&) noexcept;

@@ -1,0 +1,93 @@
+// SPDX-License-Identifier: MIT
+// The outputs of all shards, joined, are the output of one run.
+#include <string>
+#include <vector>
+
+#include <gtest/gtest.h>
+
+#include "cli/command.h"
+
+using namespace netfloor::test;
+
+namespace {
+
+TEST(PlannedShards, giveTogetherWhatOneRunGives) {
+    // All test captures in one file of many interfaces; files of each byte order and unit of time, one of them cut.
+    const Outcome made = shell("netfloor --write $T/all.pcapng $C/*.pcap* > $T/out; "
+                               "head -c -10 $C/udp-tcp-rawip.pcap > $T/cut.pcap");
+    ASSERT_EQ(made.exitCode, 0) << made.err;
+    writeFile("swapped.pcap", hex("a1b2c3d4 0002 0004 00*8 0000ffff 000000e4 00000001 00000002 0000001c 0000001c") +
+                                  ipv4({.protocol = 17, .payload = udp(1, 53, {})}));
+    writeFile("fine.pcap", hex("4d3cb2a1 0200 0400 00*8 ffff0000 e4000000 01000000 02000000 1c000000 1c000000") +
+                               ipv4({.protocol = 17, .payload = udp(1, 53, {})}));
+    struct Row {
+        const char *files;
+        std::vector<int> shards;
+        std::vector<const char *> commands;
+    };
+    const std::vector<Row> rows = {
+        {"$T/all.pcapng", {1, 64}, {"summary", "keys", "json", "detail --bits --jobs 2"}},
+        {"$C/mixed-pppoe-double-vlan.pcap",
+         {7},
+         {"summary --utc --packet 3-7,90", "summary --all --where 'ip.ttl < 65'"}},
+        {"$C/pcap-big-endian-nanosecond.pcap $T/cut.pcap $T/swapped.pcap $T/fine.pcap $C/ip6-options.pcapng",
+         {7},
+         {"summary", "keys --per chunk", "detail --filter udp"}},
+        {"$C/pcapng-big-endian-two-interfaces.pcapng", {2, 64}, {"detail", "keys", "json --fields"}},
+    };
+    for (const Row &row : rows) {
+        for (const int shards : row.shards) {
+            for (const std::string command : row.commands) {
+                SCOPED_TRACE(command + " of " + row.files + " in " + std::to_string(shards));
+                const bool hasTotals = !command.starts_with("keys") && !command.starts_with("json");
+                const Outcome compared = shell(
+                    "F=\"" + std::string(row.files) + "\"\nnetfloor " + command + (hasTotals ? " --no-totals" : "") +
+                    " $F > $T/whole 2> $T/whole.err\n"
+                    "netfloor plan --shards " +
+                    std::to_string(shards) +
+                    " $F > $T/plan.json 2> $T/err\n"
+                    "for k in $(seq $(grep -c '\"shard\":' $T/plan.json)); do netfloor " +
+                    command + " --shard $T/plan.json:$k; done > $T/joined 2> $T/joined.err\n" +
+                    "cmp $T/whole $T/joined && cmp $T/whole.err $T/joined.err && [ -s $T/whole ]");
+                EXPECT_EQ(compared.exitCode, 0) << compared.out << compared.err;
+            }
+        }
+    }
+}
+
+TEST(PlannedShards, areToldWhenTheyAreWrong) {
+    struct Row {
+        const char *line;
+        int exitCode;
+        const char *err;
+    };
+    ASSERT_EQ(shell("cp $C/ip6-esp.pcap $T/one.pcap; netfloor plan --shard-size 2K $T/one.pcap > $T/one.json; "
+                    "netfloor keys --shard $T/one.json:1")
+                  .exitCode,
+              0);
+    const std::vector<Row> rows = {
+        {"netfloor plan $T/one.pcap", 2, "--shards N or --shard-size OCTETS is required"},
+        {"netfloor plan --shards 2 $T/none.pcap", 3, "No such file"},
+        {"cat $T/one.pcap | netfloor plan --shards 2 -", 3, "can be read once only"},
+        {"gzip -k $T/one.pcap; netfloor plan --shards 2 $T/one.pcap.gz", 0, "it is one shard"},
+        {"head -c 500 $T/one.pcap > $T/cut.pcap; netfloor plan --shards 2 $T/cut.pcap", 4, "cut off at octet 500"},
+        {"netfloor keys --shard $T/one.json:0", 2, "not of the form PLAN.json:3"},
+        {"netfloor keys --shard $T/one.json:999", 2, "the plan has only "},
+        {"netfloor keys --shard $T/one.pcap:1", 2, "is no plan"},
+        {"netfloor keys --shard $T/one.json:1 --count 2", 2, "--count cannot be kept across shards"},
+        {"netfloor keys --shard $T/one.json:1 $T/one.pcap", 2, "the plan names the captures"},
+        {"netfloor verify --shard $T/one.json:1", 2, "--shard"},
+        {"sed 's/\"end\":[0-9]*,\"first_packet\":1,/\"end\":1000,\"first_packet\":1,/' $T/one.json > $T/wrong.json; "
+         "netfloor --shard $T/wrong.json:1",
+         4, "has changed since it was planned. By its plan"},
+        {"touch -d yesterday $T/one.pcap; netfloor --shard $T/one.json:2", 3, "another time of change. Plan it again."},
+    };
+    for (const Row &row : rows) {
+        SCOPED_TRACE(row.line);
+        const Outcome outcome = shell(row.line);
+        EXPECT_EQ(outcome.exitCode, row.exitCode);
+        EXPECT_NE(outcome.err.find(row.err), std::string::npos) << outcome.err;
+    }
+}
+
+} // namespace
