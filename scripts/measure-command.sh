@@ -52,9 +52,14 @@ summary() { "$netfloor" summary "${one_job[@]}" "$capture"; }
 detail() { "$netfloor" detail "${one_job[@]}" "$capture"; }
 verify() { "$netfloor" verify "${one_job[@]}" "$capture"; }
 keys() { "$netfloor" keys "${one_job[@]}" "${key_fields[@]/#/--column=}" "$capture"; }
+json() { "$netfloor" json "${one_job[@]}" "$capture"; }
+jsonFields() { "$netfloor" json --fields "${one_job[@]}" "$capture"; }
+database() { rm -f "$folder/database" && "$netfloor" export --to "$folder/database" "$capture"; }
 tshark_lines() { tshark -n -r "$capture"; }
 tshark_tree() { tshark -n -V -r "$capture"; }
 tshark_fields() { tshark -n -T fields "${peer_fields[@]/#/-e}" -r "$capture"; }
+tshark_json() { tshark -n -T json -r "$capture"; }
+tshark_ek() { tshark -n -T ek -r "$capture"; }
 tcpdump_lines() { tcpdump -n -r "$capture"; }
 
 # The rows of the table: what is ours, its peer, and how many times as fast it is to be. A new figure is a function
@@ -65,6 +70,9 @@ rows=(
     'detail  tshark_tree   15'
     'verify  tshark_lines  6'
     'keys    tshark_fields 30'
+    'json    tshark_json   15'
+    'jsonFields tshark_json 6'
+    'database tshark_ek    10'
 )
 
 # The same fields; their values agree on packets with one IP header.
@@ -111,11 +119,11 @@ row() { # OURS PEER WANTED
     awk -v ours="$1" -v peer="$(command_of "$2")" -v wanted="$3" -v mine="${best[$1]}" -v theirs="${best[$2]}" \
         -v packets="$packets" 'BEGIN {
         mine = mine > 0 ? mine : 0.001
-        printf "%-8s %8.3f %6.2f  %-20s %8.3f  %6.1f  %6.1f\n", ours, mine, mine * 1e6 / packets, peer, theirs,
+        printf "%-10s %8.3f %6.2f  %-20s %8.3f  %6.1f  %6.1f\n", ours, mine, mine * 1e6 / packets, peer, theirs,
             theirs / mine, wanted }'
 }
 echo "CPU time of whole programs, $packets packets, the fastest of $rounds rounds"
-echo '               s  us each  peer                        s   ratio  wanted'
+echo '                 s  us each  peer                        s   ratio  wanted'
 for line in "${rows[@]}"; do
     # shellcheck disable=SC2086 # three words
     row $line

@@ -516,17 +516,19 @@ TEST_F(Command, readsPcapngWithInterfacesOfDifferentTypes) {
     });
 }
 
-// The examples of the README are what the command prints.
+// The examples of the README are what the command prints, and what jq and sqlite3 make of it.
 TEST_F(Command, printsWhatTheReadmeShows) {
     std::ifstream readme(NETFLOOR_CAPTURES "/../../README.md");
-    const std::string prompt = "    $ ./netfloor ";
+    ASSERT_EQ(shell("ln -s $C/.. $T/tests && ln -s \"$N\" $T/netfloor").exitCode, 0);
     std::size_t seen = 0;
     for (std::string line; std::getline(readme, line);) {
-        if (!line.starts_with(prompt)) {
+        const bool isExample = line.starts_with("    $ ./netfloor ") || line.starts_with("    $ sqlite3 ");
+        if (!isExample) {
             continue;
         }
         SCOPED_TRACE(line);
-        const Outcome outcome = shell("cd $C/../..; netfloor " + line.substr(prompt.size()));
+        const Outcome outcome = shell("cd $T; " + line.substr(6));
+        EXPECT_EQ(outcome.err, "");
         std::istringstream printed(outcome.out);
         for (std::string expected; std::getline(printed, expected) && !expected.empty();) {
             std::getline(readme, line);
@@ -534,7 +536,7 @@ TEST_F(Command, printsWhatTheReadmeShows) {
         }
         ++seen;
     }
-    EXPECT_EQ(seen, 3U);
+    EXPECT_EQ(seen, 12U);
 }
 
 // All that a capture holds goes through all commands, and no packet is lost.
