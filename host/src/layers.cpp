@@ -3,7 +3,7 @@
 
 #include <algorithm>
 
-#include "data_text.h"
+#include "data_owner.h"
 #include "octets.h"
 #include "plain_packets.h"
 
@@ -44,7 +44,7 @@ LayerView::~LayerView() = default;
 void LayerView::read(std::span<const std::uint8_t> packet, const RunOptions &options) {
     packet_ = packet;
     layers_.clear();
-    values_.clear();
+    valueCount_ = 0;
     packets_.clear();
     texts_.clear();
     limit_ = {};
@@ -95,8 +95,7 @@ bool LayerView::readPlain(std::span<const std::uint8_t> octets, std::size_t wire
     constexpr std::uint32_t mostUnread = 4; // the plug-in does not hand off so few
     if (found.isHandedOff && found.endOctet - found.payloadOctet > mostUnread) {
         const auto end = std::min(found.endOctet, static_cast<std::uint32_t>(octets.size()));
-        keepPayload(dataName, DataText(longDataStart, (end - found.payloadOctet) * bitsPerOctet).view(),
-                    offset_ + found.payloadOctet, offset_ + end);
+        keepPayload(dataName, {}, offset_ + found.payloadOctet, offset_ + end);
     }
     return true;
 }
@@ -129,8 +128,11 @@ bool LayerView::openLayer(LayerKind kind, std::uint32_t octet) {
     layer.ipLayer = ipLayers_;
     layer.packet = static_cast<std::uint16_t>(packets_.size() - 1);
     layer.firstOctet = layer.endOctet = octet;
-    layer.values = static_cast<std::uint32_t>(values_.size());
-    values_.resize(values_.size() + fieldCounts[static_cast<std::size_t>(kind)]);
+    layer.values = valueCount_;
+    valueCount_ += fieldCounts[static_cast<std::size_t>(kind)];
+    if (values_.size() < valueCount_) {
+        values_.resize(2 * std::size_t{valueCount_});
+    }
     return true;
 }
 
@@ -143,7 +145,8 @@ void LayerView::field(const FieldView &field) {
             return;
         }
         const Place place = placeOf(field.ranges);
-        keepPayload(field.name, field.text.view(), place.first + offset_, place.end + offset_);
+        const std::string_view text = field.name == dataName ? std::string_view() : field.text.view();
+        keepPayload(field.name, text, place.first + offset_, place.end + offset_);
         return;
     }
     const LayerFieldMap::Entry &entry = map_.find(field.id);

@@ -3,8 +3,9 @@
 
 #include <algorithm>
 #include <array>
+#include <charconv>
 
-#include "data_text.h"
+#include "data_owner.h"
 #include "packet_run.h"
 
 namespace netfloor {
@@ -15,13 +16,42 @@ constexpr std::uint32_t protocolNumbers = 256;
 constexpr std::uint32_t sctpProtocol = 132;
 constexpr std::uint32_t hostsOwnDecoder = 0;
 
+// "Data=12 octets", "Data - 3 octets and 4 bits". It allocates nothing.
+class DataText {
+public:
+    DataText(std::string_view start, std::uint32_t bits) {
+        const std::uint32_t octets = bits / bitsPerOctet;
+        const std::uint32_t rest = bits % bitsPerOctet;
+        append(start);
+        append(octets);
+        append(octets == 1 ? " octet" : " octets");
+        if (rest != 0) {
+            append(" and ");
+            append(rest);
+            append(" bits");
+        }
+    }
+
+    [[nodiscard]] std::string_view view() const { return {text_.data(), size_}; }
+
+private:
+    void append(std::string_view text) { size_ += text.copy(text_.data() + size_, text_.size() - size_); }
+    void append(std::uint32_t number) {
+        size_ = static_cast<std::size_t>(std::to_chars(text_.data() + size_, text_.data() + text_.size(), number).ptr -
+                                         text_.data());
+    }
+
+    std::array<char, 64> text_;
+    std::size_t size_ = 0;
+};
+
 void takeBitsAsData(NextLayer &next, std::uint32_t bits) {
     if (bits == 0) {
         return;
     }
     const std::uint32_t shown = std::min(bits, next.capturedBits());
     switch (next.pass()) {
-    case Pass::md: next.take(shown, dataName, DataText(longDataStart, shown).view(), {}); break;
+    case Pass::md: next.take(shown, dataName, DataText("Data=", shown).view(), {}); break;
     case Pass::to: next.take(shown, dataName, {}, DataText("Data - ", shown).view()); break;
     default: return next.consume(bits);
     }

@@ -238,52 +238,45 @@ bool PlainPackets::findTcp(Octets octets, PlainPacket &found) const {
     return findOptions(octets.subspan(options, found.payloadOctet - options), options, found);
 }
 
+// Options of a length that is not theirs, and those of a length that varies, are left to the pass.
 bool PlainPackets::findOptions(Octets area, std::uint32_t octet, PlainPacket &found) const {
     constexpr std::uint8_t lastOfOneOctet = 1; // end of list, which ends nothing for the plug-in, and no operation
-    constexpr std::uint8_t sack = 5;
+    constexpr std::uint8_t md5Signature = 19;
     std::size_t at = 0;
     while (at < area.size()) {
         if (area[at] <= lastOfOneOctet) {
             ++at;
             continue;
         }
-        if (at + 2 > area.size()) {
+        const PlainHeader *const header = option(area[at]);
+        if (header == nullptr) {
+            return area[at] != md5Signature; // for the plug-in all others make the rest padding
+        }
+        const bool isSack = header == &sackBlock_;
+        const std::uint32_t headOctets = isSack ? 2 : 0;
+        const std::uint32_t length = at + 1 < area.size() ? area[at + 1] : 0;
+        if (length < header->octets || at + length > area.size() || (length - headOctets) % header->octets != 0 ||
+            (!isSack && length != header->octets)) {
             return false;
         }
-        const std::uint8_t kind = area[at];
-        const std::uint32_t length = area[at + 1];
-        if (length < 2 || at + length > area.size()) {
-            return false;
-        }
-        if (kind == sack) {
-            for (std::uint32_t block = 2; block + sackBlockOctets <= length; block += sackBlockOctets) {
-                found.options[found.optionCount++] = {&sackBlock_, octet + static_cast<std::uint32_t>(at) + block};
-            }
-            if ((length - 2) % sackBlockOctets != 0) {
-                return false;
-            }
-        } else {
-            const PlainHeader *const header = option(kind, length);
-            if (header == nullptr) {
-                return false;
-            }
-            found.options[found.optionCount++] = {header, octet + static_cast<std::uint32_t>(at)};
+        const auto first = octet + static_cast<std::uint32_t>(at);
+        for (std::uint32_t part = headOctets; part < length; part += header->octets) {
+            found.options[found.optionCount++] = {header, first + part};
         }
         at += length;
     }
     return true;
 }
 
-const PlainHeader *PlainPackets::option(std::uint8_t kind, std::uint32_t length) const {
-    const PlainHeader *header = nullptr;
+const PlainHeader *PlainPackets::option(std::uint8_t kind) const {
     switch (kind) {
-    case 2: header = &maximumSegment_; break;
-    case 3: header = &windowScale_; break;
-    case 4: header = &sackPermitted_; break;
-    case 8: header = &timestamps_; break;
+    case 2: return &maximumSegment_;
+    case 3: return &windowScale_;
+    case 4: return &sackPermitted_;
+    case 5: return &sackBlock_;
+    case 8: return &timestamps_;
     default: return nullptr;
     }
-    return header->octets == length ? header : nullptr;
 }
 
 } // namespace netfloor

@@ -75,7 +75,7 @@ private:
                                      PlainPacket &found) const;
     [[nodiscard]] bool findTcp(std::span<const std::uint8_t> octets, PlainPacket &found) const;
     [[nodiscard]] bool findOptions(std::span<const std::uint8_t> area, std::uint32_t octet, PlainPacket &found) const;
-    [[nodiscard]] const PlainHeader *option(std::uint8_t kind, std::uint32_t length) const;
+    [[nodiscard]] const PlainHeader *option(std::uint8_t kind) const;
 
     bool isUsable_ = true; // the plug-in reads the samples as expected
     PlainHeader ipv4_;

@@ -166,7 +166,7 @@ std::string textOf(const LayerView &view) {
 TEST(Layers, areTheSameWithoutAPass) {
     constexpr std::uint8_t icmpProtocol = 1;
     constexpr std::uint8_t tcpProtocol = 6;
-    const Octets values = hex("00 01 02 05 08 0a 12 20 45 50 ff");
+    const Octets values = hex("00 01 02 05 08 0a 12 13 20 45 50 ff");
     const Octets tcpHead = hex("d431 0050 01234567 89abcdef");
     const auto tcp = [&](const std::string &rest) { return tcpHead + hex(rest); };
     const Octets payloads[] = {

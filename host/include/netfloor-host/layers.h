@@ -96,7 +96,7 @@ public:
     // The address of a field, in the form of RFC 5952 or in dotted form. Empty if the layer does not have it.
     [[nodiscard]] std::string_view address(const Layer &layer, LayerField field, TextRoom &room) const;
 
-    // LayerKind::payload: what the owner reported.
+    // LayerKind::payload: what the owner reported. Data without an owner have no text.
     [[nodiscard]] std::string_view name(const Layer &layer) const {
         return std::string_view(texts_).substr(layer.name, layer.nameEnd - layer.name);
     }
@@ -138,7 +138,8 @@ private:
     std::unique_ptr<PlainPackets> plain_; // from the first packet on
     std::span<const std::uint8_t> packet_;
     std::vector<Layer> layers_;
-    std::vector<Value> values_;
+    std::vector<Value> values_; // it only grows; those that are not present are left as they were
+    std::uint32_t valueCount_ = 0;
     std::vector<InnerPacket> packets_;
     std::string texts_;
     std::string_view limit_;
