@@ -56,8 +56,8 @@ if(NETFLOOR_FUZZ)
     add_compile_options(-fsanitize=fuzzer-no-link)
 endif()
 if(NETFLOOR_COVERAGE)
-    add_compile_options(--coverage)
-    add_link_options(--coverage)
+    add_compile_options(-fprofile-instr-generate -fcoverage-mapping)
+    add_link_options(-fprofile-instr-generate)
 endif()
 
 # Compiles the standard library's headers that most sources include once for the target: they take longer than a source.

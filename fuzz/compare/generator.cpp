@@ -76,6 +76,10 @@ Forms parsedRules() {
     return parsed;
 }
 
+void append(Octets &front, const Octets &back) {
+    front.insert(front.end(), back.begin(), back.end());
+}
+
 class Generator {
 public:
     explicit Generator(Random &random) : random_(random) {}
@@ -173,14 +177,22 @@ private:
             return packet();
         }
         if (protocol == 6) {
+            // One statement each: compilers evaluate the operands of a sum in different orders.
             const Octets options = form("TcpOptions");
-            return form("Port") + form("Port") + drawn(8) +
-                   Octets{static_cast<std::uint8_t>(length(5 + options.size() / 4) << 4)} + drawn(7) + options +
-                   drawn(random_.below(40));
+            Octets segment = form("Port");
+            append(segment, form("Port"));
+            append(segment, drawn(8));
+            segment.push_back(static_cast<std::uint8_t>(length(5 + options.size() / 4) << 4));
+            append(segment, drawn(7));
+            append(segment, options);
+            append(segment, drawn(random_.below(40)));
+            return segment;
         }
         if (protocol == 55) {
             const auto inner = random_.pick<std::uint8_t>({1, 4, 6, 17, 47, 132});
-            return form("55", inner) + carried(inner);
+            Octets packet = form("55", inner);
+            append(packet, carried(inner));
+            return packet;
         }
         const std::string rule = std::to_string(protocol);
         return rules.contains(rule) ? form(rule) : drawn(random_.below(40));

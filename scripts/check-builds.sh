@@ -1,0 +1,55 @@
+#!/bin/bash
+# SPDX-License-Identifier: MIT
+# Builds the plug-in in other ways, and holds each build to the known answers and to the whole sweep; then runs the command
+# over the test captures under valgrind. A build that has passed is not done again until the commit changes, so a run that
+# was interrupted goes on where it was.
+#
+#   scripts/check-builds.sh [NAME...]    of the names below; valgrind
+set -uo pipefail
+cd "$(dirname "$0")/.." || exit 1
+
+declare -A compilers=([gcc-O0]=g++ [gcc-O3]=g++ [gcc-assertions]=g++ [clang-O0]=clang++ [clang-O2]=clang++)
+declare -A flags=([gcc-O0]=-O0 [gcc-O3]=-O3 [gcc-assertions]='-O2 -D_GLIBCXX_ASSERTIONS' [clang-O0]=-O0 [clang-O2]=-O2)
+names=${*:-gcc-O0 gcc-O3 gcc-assertions clang-O0 clang-O2 valgrind}
+stamps=build/builds
+commit=$(git rev-parse HEAD)$(git status --porcelain | sha256sum | cut -c1-12)
+mkdir -p $stamps
+failed=0
+
+# build NAME: configures, builds and holds it to the answers.
+build() {
+    local folder=$stamps/$1 programs
+    programs=$folder/fuzz/compare
+    cmake -S . -B "$folder" -G Ninja -DCMAKE_BUILD_TYPE=Debug -DCMAKE_CXX_COMPILER="${compilers[$1]}" \
+        -DCMAKE_CXX_FLAGS_DEBUG="${flags[$1]}" -DNETFLOOR_TESTS=ON -DNETFLOOR_BENCH=OFF -DNETFLOOR_COMMAND=OFF \
+        -DNETFLOOR_INSTALL=OFF &&
+        ninja -C "$folder" digests sweep &&
+        "$programs/digests" "$folder/plugin/libnetfloor.so" fuzz/compare/digests.txt &&
+        "$programs/sweep" "$folder/plugin/libnetfloor.so" --all
+}
+
+# Each capture, with the command of the optimised build.
+valgrind_captures() {
+    local file
+    for file in tests/captures/*.pcap*; do
+        for command in 'detail --all --bits' verify 'keys --per chunk'; do
+            # shellcheck disable=SC2086
+            valgrind -q --error-exitcode=99 build/cli/netfloor $command "$file" >/dev/null
+            [ $? -ne 99 ] || { echo "valgrind: $command $file"; return 1; }
+        done
+    done
+}
+
+for name in $names; do
+    [ "$(cat "$stamps/$name.passed" 2>/dev/null)" != "$commit" ] || { echo "$name: passed before"; continue; }
+    if [ "$name" = valgrind ]; then valgrind_captures; else build "$name"; fi >"$stamps/$name.log" 2>&1
+    if [ $? -eq 0 ]; then
+        echo "$commit" >"$stamps/$name.passed"
+        echo "$name: passed"
+    else
+        tail -n 30 "$stamps/$name.log"
+        echo "FAILED: $name, see $stamps/$name.log"
+        failed=1
+    fi
+done
+exit $failed
