@@ -2,6 +2,7 @@
 #include "netfloor-analysis/rows.h"
 
 #include <algorithm>
+#include <utility>
 
 #include "column_table.h"
 #include "netfloor-analysis/utf8.h"
@@ -31,15 +32,20 @@ consteval std::size_t column(RowKind kind, std::string_view name) {
 constexpr std::size_t mostFields = 32;
 using FieldColumns = std::array<std::array<std::uint8_t, mostFields>, layerKinds>;
 
+// In one walk: compilers bound the steps of a constant. All rows of a name stand together.
 constexpr FieldColumns fieldColumns(RowKind row) {
     FieldColumns columns = {};
     for (auto &ofKind : columns) {
         ofKind.fill(noColumn);
     }
+    std::array<std::size_t, layerKinds> fields = {};
+    std::string_view before;
     for (const LayerFieldSource &source : layerFieldSources()) {
-        const LayerField field = findLayerField(source.name).value();
-        columns[static_cast<std::size_t>(field.kind)][field.place] =
-            static_cast<std::uint8_t>(findColumn(row, source.name));
+        if (source.name != before) {
+            const auto kind = static_cast<std::size_t>(source.kind);
+            columns[kind][fields[kind]++] = static_cast<std::uint8_t>(findColumn(row, source.name));
+        }
+        before = source.name;
     }
     return columns;
 }
@@ -47,21 +53,26 @@ constexpr FieldColumns fieldColumns(RowKind row) {
 constexpr FieldColumns layerColumns = fieldColumns(RowKind::layer);
 constexpr FieldColumns chunkColumns = fieldColumns(RowKind::chunk);
 
+// Whether each column of a protocol is that of a field: no two have one name.
+constexpr bool haveFields(RowKind row, const FieldColumns &columns) {
+    std::ptrdiff_t found = 0;
+    for (const auto &ofKind : columns) {
+        found += std::ranges::count_if(ofKind, [](std::uint8_t column) { return column != noColumn; });
+    }
+    return found ==
+           std::ranges::count_if(column_table::of(row), [](const Column &one) { return !one.group().empty(); });
+}
+
 constexpr bool isComplete() {
-    for (const LayerFieldSource &source : layerFieldSources()) {
-        const RowKind row = source.kind == LayerKind::chunk ? RowKind::chunk : RowKind::layer;
-        if (findColumn(row, source.name) == noColumn) {
+    for (std::size_t kind = 0; kind < layerKinds; ++kind) {
+        const bool isChunk = static_cast<LayerKind>(kind) == LayerKind::chunk;
+        const auto &columns = (isChunk ? chunkColumns : layerColumns)[kind];
+        const std::uint32_t fields = layerFieldCount(static_cast<LayerKind>(kind));
+        if (std::cmp_not_equal(std::ranges::count(columns, std::uint8_t{noColumn}), mostFields - fields)) {
             return false;
         }
     }
-    for (const RowKind row : {RowKind::layer, RowKind::chunk}) {
-        for (const Column &one : column_table::of(row)) {
-            if (!one.group().empty() && !findLayerField(one.name)) {
-                return false;
-            }
-        }
-    }
-    return true;
+    return haveFields(RowKind::layer, layerColumns) && haveFields(RowKind::chunk, chunkColumns);
 }
 static_assert(isComplete(), "each field of layer_fields.h has a column, and each column of a protocol has a field");
 static_assert(column_table::layers.size() <= Row::mostColumns);
