@@ -64,7 +64,11 @@ void CaptureWriter::write(const CapturedPacket &packet) {
     time_ = packet.time.value_or(time_);
     const std::int64_t offset = offsetOf(time_.seconds);
     const std::uint8_t digits = packet.time ? std::min(packet.timeDigits, mostDigits) : mostDigits;
-    const std::uint32_t interface = numberOf({packet.linkType, digits, offset, std::string(packet.interfaceName)});
+    wanted_.linkType = packet.linkType;
+    wanted_.timeDigits = digits;
+    wanted_.timeOffset = offset;
+    wanted_.name.assign(packet.interfaceName);
+    const std::uint32_t interface = numberOf(wanted_);
     std::uint64_t unitsPerSecond = 1;
     std::uint32_t nanosecondsPerUnit = 1'000'000'000;
     for (std::uint8_t digit = 0; digit < digits; ++digit) {

@@ -5,7 +5,7 @@
 #include <cstdint>
 #include <cstring>
 #include <fstream>
-#include <iterator>
+#include <sstream>
 #include <string>
 
 #include <dlfcn.h>
@@ -47,12 +47,13 @@ int copyToMemory(const std::filesystem::path &path) {
                      " Free some memory or file descriptors and try again.");
     };
     std::ifstream source(path, std::ios::binary);
-    const std::string content((std::istreambuf_iterator<char>(source)), std::istreambuf_iterator<char>());
+    std::ostringstream content;
+    content << source.rdbuf();
     const int copy = ::memfd_create(path.filename().c_str(), MFD_CLOEXEC);
     if (copy < 0) {
         fail(copy);
     }
-    std::string_view rest = content;
+    std::string_view rest = content.view();
     while (!rest.empty()) {
         const ssize_t written = ::write(copy, rest.data(), rest.size());
         if (written < 0) {

@@ -55,6 +55,7 @@ private:
     std::ofstream file_;
     std::string block_; // that is being written
     std::map<Interface, std::uint32_t> interfaces_;
+    Interface wanted_; // of the packet at hand; its storage is kept
     CaptureTime time_; // of the last packet that had one
 };
 
