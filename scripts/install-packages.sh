@@ -11,7 +11,7 @@ set -eu
 
 decode="g++ cmake ninja-build pkg-config libpcap-dev libcli11-dev zlib1g-dev libisal-dev nlohmann-json3-dev libsqlite3-dev libtbb-dev"
 all="$decode libgtest-dev libbenchmark-dev libtins-dev clang libclang-rt-14-dev llvm valgrind clang-format clang-tidy
-    tshark tcpdump help2man abigail-tools jq sqlite3 python3-fastjsonschema"
+    tshark tcpdump time help2man abigail-tools jq sqlite3 python3-fastjsonschema"
 # The versioned multilib: the other one excludes all cross compilers.
 hosts="$decode libgtest-dev googletest g++-12-multilib g++-s390x-linux-gnu g++-mingw-w64-i686-posix
     g++-mingw-w64-x86-64-posix wine64 qemu-user"

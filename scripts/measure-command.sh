@@ -136,3 +136,33 @@ TIMEFORMAT='%3U %3S'
 done; } 2>"$folder/time"
 awk -v starts=$starts '{ printf "a start with three packets: %.1f ms, of %d the mean\n", ($1 + $2) * 1000 / starts, starts }' \
     "$folder/time"
+
+# Threads, and the cutting into shards. The time of a clock says something on a machine that does nothing else.
+by_clock() { # NAME COMMAND...: the fastest of the rounds
+    local name=$1 round
+    shift
+    : >"$folder/clock"
+    for ((round = 0; round < rounds; ++round)); do
+        # 1 is the exit code of verify where it has found damage.
+        command time -f '%e %U %S %M' -o "$folder/time" "$@" >"$folder/out" 2>"$folder/err" || [ $? -eq 1 ]
+        tail -n 1 "$folder/time" >>"$folder/clock"
+    done
+    sort -n "$folder/clock" | head -n 1 | awk -v name="$name" -v packets="$packets" \
+        -v octets="$(stat -Lc %s "$capture")" '{
+        seconds = $1 > 0 ? $1 : 0.01
+        printf "%-18s %7.2f  %8.2f  %12.0f  %8.0f  %7.1f\n", name, $1, $2 + $3, packets / seconds, octets / seconds / 1e6,
+            $4 / 1024 }'
+}
+echo
+if ! command time -f %e true 2>"$folder/err"; then
+    say "GNU time (Debian's time) is missing: threads are left out (scripts/install-packages.sh all)"
+    exit 0
+fi
+echo "Threads and shards on $(nproc) cores, load $(cut -d' ' -f1 /proc/loadavg) before"
+echo '                    clock s   CPU s  packets/s     MB/s   peak MiB'
+for command in summary keys json verify; do
+    for jobs in 1 2; do
+        by_clock "$command --jobs $jobs" "$netfloor" $command --jobs $jobs "$capture"
+    done
+done
+by_clock 'plan --shards 64' "$netfloor" plan --shards 64 "$capture"

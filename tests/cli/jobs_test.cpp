@@ -31,6 +31,7 @@ TEST_F(Jobs, giveWhatOneGives) {
         "netfloor verify --bad --all $J $T/many.pcapng $C/icmp-types.pcapng $T/many.pcapng",
         "netfloor keys $J $T/many.pcapng $T/once.pcapng",
         "netfloor keys --per chunk $J - < $T/many.pcapng",
+        "netfloor json --fields $J $T/many.pcapng $T/once.pcapng",
         "gzip < $T/many.pcapng | netfloor keys --raw $J -",
         "netfloor $J --where 'ip.ttl < 50' --filter 'not tcp' $T/many.pcapng",
         "netfloor $J --packet 3-7,900-1500 $T/many.pcapng",
