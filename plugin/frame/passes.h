@@ -102,7 +102,7 @@ struct MdPass : PreDecodePass<Grammar, NETFLOOR_MODE_MD> {
     }
 
 private:
-    // Out of line, as it calls the host anyway: inlined, it would take compilers half as long again.
+    // Out of line, as it calls the host anyway: inlined, it takes compilers longer.
     template <const Field &field>
     [[gnu::noinline]] static void report(PreDecodeContext &context, const FieldRecord &record, std::uint32_t bitOrder) {
         static constexpr Format format = parseFormat(longText<field>);
