@@ -8,8 +8,8 @@ build=${1:-build}
 stamps=$build/tidy
 mkdir -p "$stamps"
 
-# The commands without their precompiled headers, which are in the form of the compiler in use.
-sed -e 's/-Winvalid-pch//' -e 's/-include [^ ]*cmake_pch\.hxx//' "$build/compile_commands.json" \
+# The commands without their precompiled headers, which are in the form of the compiler in use, and without limits of GCC.
+sed -e 's/-Winvalid-pch//' -e 's/-include [^ ]*cmake_pch\.hxx//' -e 's/--param=[^ ]*//' "$build/compile_commands.json" \
     >"$stamps/compile_commands.json"
 
 export stamps build

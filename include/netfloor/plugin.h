@@ -64,7 +64,8 @@ uint8_t NETFLOOR_CDECL vex_PreDecodeMV(PreDecodeContext *context);
  * Returns 1 at the end of the packet or at a hand-off: then `layerHandedOff` is 1, the blocks are
  * still open, and the host goes on with the owner of the next layer by itself. Returns 0 when cut
  * off: storage ran out, or an address did not fit into `byteAreaSize` (the row's word has its top
- * bit set). Returns what hx_InitialiseOptXTR returned when that was negative, at this and each later call.
+ * bit set, and that many octets of the area hold a part of the address, of no use). Returns what hx_InitialiseOptXTR
+ * returned when that was negative, at this and each later call.
  */
 int32_t NETFLOOR_CDECL XTR_netfloor(XtrContext *context);
 

@@ -69,9 +69,17 @@ template <const Field &field>
 inline constexpr bool canBeInRun =
     !field.place.isRun() && field.place.shape != Shape::ahead && field.place.advance % bitsPerOctet == 0;
 
-// The step of a field of `units` units; see `read` and `readRun`.
-template <const Field &field, class Pass, class Store>
-NETFLOOR_INLINE inline void step(Reader<Pass> &reader, std::uint32_t units, Store into) {
+// The number of units of a field of fixed size.
+template <const Field &field>
+inline constexpr std::uint32_t fixedUnits = [] {
+    static_assert(!field.place.isRun(), "a run needs its number of units: read it by readRun");
+    return field.place.count;
+}();
+
+// Reads a field. `into` takes its value: a pointer to a variable, or a function of the value.
+// A field that does not fit clears the live flag and the condition, and changes nothing else.
+template <const Field &field, class Pass, class Store = Unstored>
+NETFLOOR_INLINE inline void read(Reader<Pass> &reader, Store into = {}, std::uint32_t units = fixedUnits<field>) {
     static_assert(isListed<typename Pass::Fields, field>,
                   "this field is read and stands in no list: add it to the rows at the end of its protocol's file, and "
                   "those rows to tables/catalogue.h");
@@ -115,20 +123,12 @@ NETFLOOR_INLINE inline void step(Reader<Pass> &reader, std::uint32_t units, Stor
     Pass::template output<field>(reader, start, units);
 }
 
-// Reads a field of fixed size. `into` takes its value: a pointer to a variable, or a function of the value.
-// A field that does not fit clears the live flag and the condition, and changes nothing else.
-template <const Field &field, class Pass, class Store = Unstored>
-NETFLOOR_INLINE inline void read(Reader<Pass> &reader, Store into = {}) {
-    static_assert(!field.place.isRun(), "a run needs its number of units");
-    step<field>(reader, field.place.count, into);
-}
-
 // Reads a field of as many units (octets, nibbles) as the packet tells. The number counts as unsigned in the
 // test of the bits left, so that a negative one does not fit.
 template <const Field &field, class Pass>
 NETFLOOR_INLINE inline void readRun(Reader<Pass> &reader, std::int32_t units) {
     static_assert(field.place.isRun(), "a field of fixed size has its number of units");
-    step<field>(reader, static_cast<std::uint32_t>(units), Unstored{});
+    read<field>(reader, Unstored{}, static_cast<std::uint32_t>(units));
 }
 
 // Goes over up to `most` fields of one declaration that no host can see: where the host is not called for each field,

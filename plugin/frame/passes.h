@@ -98,19 +98,24 @@ struct MdPass : PreDecodePass<Grammar, NETFLOOR_MODE_MD> {
 
     template <const Field &field, class Reader>
     NETFLOOR_INLINE static void output(Reader &reader, std::uint32_t, std::uint32_t) {
+        report<field>(*reader.context, reader.state->fieldRecord, reader.bitOrder);
+    }
+
+private:
+    // Out of line, as it calls the host anyway: inlined, it takes compilers longer.
+    template <const Field &field>
+    [[gnu::noinline]] static void report(PreDecodeContext &context, const FieldRecord &record, std::uint32_t bitOrder) {
         static constexpr Format format = parseFormat(longText<field>);
-        const FieldRecord &record = reader.state->fieldRecord;
-        std::uint8_t *const decoded =
-            reader.context->fieldRecords + reader.context->fieldRecordCount * decodedFieldOctets;
-        decoded[0] = reader.context->layerNumber;
+        std::uint8_t *const decoded = context.fieldRecords + context.fieldRecordCount * decodedFieldOctets;
+        decoded[0] = context.layerNumber;
         decoded[1] = 0;
         if constexpr (field.place.shape != Shape::groups) {
             decoded[2] = 0;
         }
         Line line(buffer);
         fill<field, format>(line, record);
-        hs_AddDecodedFieldsData(reader.context, record.outputRangeCount, record.ranges, line.terminated(), 0,
-                                record.fieldName, field.id, 0, reader.bitOrder);
+        hs_AddDecodedFieldsData(&context, record.outputRangeCount, record.ranges, line.terminated(), 0,
+                                record.fieldName, field.id, 0, bitOrder);
     }
 };
 
@@ -123,10 +128,17 @@ struct ToPass : PreDecodePass<Grammar, NETFLOOR_MODE_TO> {
 
     template <const Field &field, class Reader>
     NETFLOOR_INLINE static void output(Reader &reader, std::uint32_t, std::uint32_t) {
+        report<field>(*reader.context, reader.state->fieldRecord);
+    }
+
+private:
+    // Out of line, as that of the MD pass.
+    template <const Field &field>
+    [[gnu::noinline]] static void report(PreDecodeContext &context, const FieldRecord &record) {
         static constexpr Format format = parseFormat(shortText<field>);
         Line line(buffer);
-        fill<field, format>(line, reader.state->fieldRecord);
-        hs_AddFieldsToDisplayData(reader.context, line.terminated(), Grammar::template displayId<field>);
+        fill<field, format>(line, record);
+        hs_AddFieldsToDisplayData(&context, line.terminated(), Grammar::template displayId<field>);
     }
 };
 
@@ -214,39 +226,51 @@ private:
         std::memcpy(record + row.valueOffset, &value, sizeof value);
     }
 
-    // Stores an address as a string of octets, each with its two nibbles exchanged, as the nibbles were read.
-    // The room test counts one octet more than is written. False when there is no room.
-    static bool storeAddress(XtrContext &context, const KeyFieldRow &row, const std::uint8_t *data,
-                             std::uint32_t start) {
-        constexpr std::uint32_t octetCount = addressBits / bitsPerOctet;
-        std::uint8_t *const place = context.keyRecord + row.valueOffset;
-        const std::array<std::uint16_t, 2> lengthAndPlace = {addressBits, context.byteAreaOffset};
-        std::memcpy(place, lengthAndPlace.data(), sizeof lengthAndPlace);
-        auto octets = octetArrayAt<octetCount>(data, start);
+    static constexpr std::uint32_t addressOctets = addressBits / bitsPerOctet;
+
+    // An address as it is stored: each octet with its two nibbles exchanged, as the nibbles were read.
+    NETFLOOR_INLINE static std::array<std::uint8_t, addressOctets> storedAddress(const std::uint8_t *data,
+                                                                                 std::uint32_t start) {
+        auto octets = octetArrayAt<addressOctets>(data, start);
         for (std::uint8_t &octet : octets) {
             octet = static_cast<std::uint8_t>(octet << nibbleBits | octet >> nibbleBits);
         }
-        if (octetCount >= context.byteAreaSize) [[unlikely]] {
-            std::uint32_t failed = 0;
-            std::memcpy(&failed, place, sizeof failed);
-            failed |= 0x80000000;
-            std::memcpy(place, &failed, sizeof failed);
-            storeWhatFits(context, octets);
+        return octets;
+    }
+
+    // Stores an address as a string of octets. The room test counts one octet more than is written. False when there is
+    // no room.
+    NETFLOOR_INLINE static bool storeAddress(XtrContext &context, const KeyFieldRow &row, const std::uint8_t *data,
+                                             std::uint32_t start) {
+        std::uint8_t *const place = context.keyRecord + row.valueOffset;
+        const std::array<std::uint16_t, 2> lengthAndPlace = {addressBits, context.byteAreaOffset};
+        std::memcpy(place, lengthAndPlace.data(), sizeof lengthAndPlace);
+        if (addressOctets >= context.byteAreaSize) [[unlikely]] {
+            markFailed(place);
+            storeWhatFits(context, data, start);
             return false;
         }
-        std::memcpy(context.keyRecord + context.byteAreaOffset, octets.data(), octetCount);
-        context.byteAreaOffset = static_cast<std::uint16_t>(context.byteAreaOffset + octetCount);
+        const auto octets = storedAddress(data, start);
+        std::memcpy(context.keyRecord + context.byteAreaOffset, octets.data(), addressOctets);
+        context.byteAreaOffset = static_cast<std::uint16_t>(context.byteAreaOffset + addressOctets);
         return true;
+    }
+
+    [[gnu::cold, gnu::noinline]] static void markFailed(std::uint8_t *place) {
+        std::uint32_t failed = 0;
+        std::memcpy(&failed, place, sizeof failed);
+        failed |= 0x80000000;
+        std::memcpy(place, &failed, sizeof failed);
     }
 
     // An address is stored nibble by nibble, the last one first, and only a whole one is turned round at the end. So an
     // area that is too small is left with the end of the address. The room test keeps the last nibble of it free.
-    template <std::size_t count>
-    [[gnu::cold, gnu::noinline]] static void storeWhatFits(const XtrContext &context,
-                                                           const std::array<std::uint8_t, count> &address) {
+    [[gnu::cold, gnu::noinline]] static void storeWhatFits(const XtrContext &context, const std::uint8_t *data,
+                                                           std::uint32_t start) {
+        const auto address = storedAddress(data, start);
         std::uint8_t *const area = context.keyRecord + context.byteAreaOffset;
         for (std::size_t octet = 0; octet < context.byteAreaSize; ++octet) {
-            area[octet] = address[count - 1 - octet];
+            area[octet] = address[addressOctets - 1 - octet];
         }
         if (context.byteAreaSize != 0) {
             area[context.byteAreaSize - 1] &= 0x0f;

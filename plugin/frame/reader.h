@@ -219,11 +219,13 @@ private:
 
     [[gnu::cold, gnu::noinline]] bool makeRoom(BitStack &stack) {
         giveState();
+        writer.flushFlagWords(state->fieldRecord);
         return growStack(*state, stack, variables().reversedFrom);
     }
 
     [[gnu::cold, gnu::noinline]] bool makeRoom(std::uint32_t elements, const char *name) {
         giveState();
+        writer.flushFlagWords(state->fieldRecord);
         if (name != nullptr) {
             beginRecord(state->fieldRecord, name);
         }
@@ -232,6 +234,7 @@ private:
 
     [[gnu::cold, gnu::noinline]] bool makeRoomForGroups(const char *name) {
         giveState();
+        writer.flushFlagWords(state->fieldRecord);
         beginRecord(state->fieldRecord, name);
         return growRangesForGroups(*state);
     }

@@ -49,6 +49,7 @@ public:
     NETFLOOR_INLINE void endRun() {}
     NETFLOOR_INLINE void flushRun(DecodeState &) {}
     NETFLOOR_INLINE void flush(const Position &, DecodeState &, const std::uint8_t *) {}
+    NETFLOOR_INLINE static void flushFlagWords(FieldRecord &) {}
 
     NETFLOOR_INLINE void pushed(BitStack &stack) { ++stack.top; }
     NETFLOOR_INLINE void popped(BitStack &stack) { --stack.top; }
@@ -123,6 +124,8 @@ struct LastRead {
     FieldRead before; // the field before an address in groups
     Elements wide;    // the last field that filled all the elements that an address has
     Elements medium;  // the last one that filled only some of those after the first four
+
+    std::uint32_t cleared = 0; // so many elements' flag words are cleared; those after the first four are still to be
 };
 
 // Puts off what the host cannot see yet. In a checked run (see checked_run.h) it puts off more: what is known there
@@ -152,6 +155,7 @@ public:
         last_.peek.pieces = 0;
         last_.wide.count = 0;
         last_.medium.count = 0;
+        last_.cleared = 0;
         endRun();
     }
 
@@ -273,15 +277,22 @@ public:
                                           : bits(data, peek.first, peek.first + peek.width - 1);
     }
 
-    // Clears the flag words of so many elements. The plug-in writes nothing else to them, so that it need not be put
-    // off.
+    // Clears the flag words of so many elements. The plug-in writes nothing else to them, so that the first need not be
+    // put off. Those of an address take longer than the rest of its header, and few packets show them.
     template <std::uint32_t elements>
     NETFLOOR_INLINE static void clearFlagWords(FieldRecord &record) {
-        if constexpr (elements > mostPieces) {
-            clearManyFlagWords<elements>(record.ranges);
-        } else {
-            forEach<elements>([&]<std::size_t i>() NETFLOOR_INLINE { record.ranges[i].flagWord = 0; });
+        forEach<std::min(elements, fewElements)>([&]<std::size_t i>()
+                                                     NETFLOOR_INLINE { record.ranges[i].flagWord = 0; });
+        if constexpr (elements > fewElements) {
+            last_.cleared = std::max(last_.cleared, elements);
         }
+    }
+
+    // Clears what is still to be cleared, also what the record does not show: before a call after which the run reads
+    // on, as a later field may show it.
+    static void flushFlagWords(FieldRecord &record) {
+        clearRemaining(record, last_.cleared);
+        last_.cleared = 0;
     }
 
     // Moves back over an address that the run has just read: inside a run its bits are there. False elsewhere, where
@@ -296,9 +307,11 @@ public:
     }
 
 private:
-    template <std::uint32_t elements>
-    [[gnu::noinline]] static void clearManyFlagWords(BitRange *ranges) {
-        forEach<elements>([&]<std::size_t i>() NETFLOOR_INLINE { ranges[i].flagWord = 0; });
+    // Clears the flag words that are still to be cleared, of the first `elements`.
+    static void clearRemaining(FieldRecord &record, std::uint32_t elements) {
+        for (std::uint32_t i = fewElements; i < std::min(elements, last_.cleared); ++i) {
+            record.ranges[i].flagWord = 0;
+        }
     }
 
     // Remembers a field with many elements.
@@ -329,6 +342,9 @@ private:
             writeOlderElements(record, data);
         }
         writeElements<place>(record, data, cursor, place.isRun() ? units : place.count);
+        if constexpr (!place.clearsFlagWords()) {
+            clearRemaining(record, record.rangeCount);
+        }
     }
 
     template <const Field &field>

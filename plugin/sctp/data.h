@@ -67,6 +67,7 @@ NETFLOOR_INLINE inline void dataChunk(Reader<Pass> &reader) {
     read<streamSequenceNumber>(reader);
     read<payloadProtocolIdentifier>(reader);
     if (reader.test(reader.variables().chunkOctets > emptyDataOctets)) {
+        reader.writer.flushFlagWords(reader.state->fieldRecord); // the walk goes on after the next layer
         handOff(reader);
     }
 }

@@ -4,6 +4,8 @@
 // that the rows of the others keep their numbers, which hosts may have stored.
 #pragma once
 
+#include <algorithm>
+#include <array>
 #include <cstdint>
 
 #include "frame/field_list.h"
@@ -16,6 +18,7 @@
 #include "ipv6/extension_headers.h"
 #include "ipv6/header.h"
 #include "sctp/sctp.h"
+#include "tables/text_numbers.h"
 #include "transport/tcp.h"
 #include "transport/udp.h"
 #include "tunnels/gre.h"
@@ -51,14 +54,22 @@ inline constexpr auto &catalogue = CatalogueFields::pointers;
 // meaning is not known.
 using CatalogueOfTopOctet6 = Joined<tcp::FieldsOfTopOctet6, udp::FieldsOfTopOctet6, sctp::FieldsOfTopOctet6>;
 
-// The id under which the TO pass reports a field: that of the first field of the same name.
-[[nodiscard]] constexpr std::uint32_t displayIdOf(const Field &field) {
-    for (const Field *const candidate : catalogue) {
-        if (candidate->tableName() == field.tableName()) {
-            return candidate->id;
-        }
+// For each field id the id under which the TO pass reports the field: that of the first field of the same name.
+inline constexpr auto displayIds = [] {
+    constexpr std::uint32_t highest = std::ranges::max(catalogue, {}, &Field::id)->id;
+    std::array<std::uint32_t, highest + 1> ids{};
+    std::array<std::uint32_t, catalogue.size()> ofName{};
+    TextNumbers<catalogue.size()> names;
+    for (const Field *const field : catalogue) {
+        std::uint32_t &first = ofName[names.numberOf(field->tableName())];
+        first = first == 0 ? field->id : first;
+        ids[field->id] = first;
     }
-    return field.id;
+    return ids;
+}();
+
+[[nodiscard]] constexpr std::uint32_t displayIdOf(const Field &field) {
+    return displayIds[field.id];
 }
 
 } // namespace netfloor::plugin
