@@ -13,15 +13,9 @@ namespace {
 
 constexpr std::uint32_t bitsPerOctet = 8;
 constexpr std::uint32_t numberBits = 32; // that a field record holds
-constexpr std::uint32_t leastRun = 5;    // fewer octets of data are items of their own
 
 std::uint32_t octetOf(std::uint32_t bit) {
     return (bit - 1) / bitsPerOctet;
-}
-
-bool isOneOctet(const FieldView &field) {
-    return field.ranges.size() == 1 && field.ranges[0].firstBit % bitsPerOctet == 1 &&
-           field.ranges[0].lastBit - field.ranges[0].firstBit + 1 == bitsPerOctet;
 }
 
 } // namespace
@@ -44,7 +38,7 @@ void PageTree::blockOpened(const BlockView &block) {
 }
 
 void PageTree::field(const FieldView &field) {
-    if (continuesRun(field)) {
+    if (run_.continues(field)) {
         return addToRun(field);
     }
     endRun();
@@ -62,33 +56,24 @@ void PageTree::field(const FieldView &field) {
     if (isReadAgain) {
         return;
     }
-    if (isOneOctet(field)) {
-        run_ = {field.id, field.name, span.first, 1, field.depth, out_.mark()};
-    }
+    run_.begin(field, out_.mark());
     writeField(field);
-}
-
-bool PageTree::continuesRun(const FieldView &field) const {
-    return run_.octets != 0 && field.id == run_.id && isOneOctet(field) &&
-           octetOf(field.ranges[0].firstBit) == run_.first + run_.octets && field.depth == run_.depth &&
-           field.name == run_.name;
 }
 
 void PageTree::addToRun(const FieldView &field) {
     const std::uint32_t octet = run_.first + run_.octets;
     gaps_.cover({octet, octet + 1});
     ++run_.octets;
-    if (run_.octets < leastRun) {
+    if (run_.octets < DataRun::least) {
         writeField(field);
-    } else if (run_.octets == leastRun) {
+    } else if (run_.octets == DataRun::least) {
         out_.takeBack(run_.start);
     }
 }
 
 void PageTree::endRun() {
-    if (run_.octets >= leastRun) {
-        writeOctets(PageItems::Kind::field, withoutLeadingBlanks(run_.name), {run_.first, run_.first + run_.octets},
-                    run_.depth);
+    if (run_.isOne()) {
+        writeOctets(PageItems::Kind::field, withoutLeadingBlanks(run_.name), run_.span(), run_.depth);
     }
     run_.octets = 0;
 }

@@ -9,6 +9,7 @@
 
 #include "gaps.h"
 #include "netfloor-host/sink.h"
+#include "printers/data_run.h"
 #include "printers/page_data.h"
 
 namespace netfloor::cli {
@@ -32,17 +33,6 @@ public:
     void end(const PassEnd &end) override;
 
 private:
-    // Octets of data come as a field each. More than a few are taken back and become one item.
-    struct Run {
-        std::uint32_t id = 0;
-        std::string_view name;
-        std::uint32_t first = 0; // octet
-        std::uint32_t octets = 0;
-        std::uint32_t depth = 0;
-        Output::Mark start = 0; // of the items, as long as there are few
-    };
-
-    [[nodiscard]] bool continuesRun(const FieldView &field) const;
     void addToRun(const FieldView &field);
     void endRun();
     void writeGapsBefore(std::uint32_t octet, std::uint32_t depth);
@@ -58,7 +48,7 @@ private:
 
     std::span<const std::uint8_t> packet_;
     GapFinder gaps_;
-    Run run_;
+    DataRun run_;
     std::uint32_t lastDepth_ = 0;
     bool isReadToCut_ = false;
     OctetSpan lastOctets_; // of the field before

@@ -15,17 +15,11 @@ namespace {
 constexpr std::uint32_t bitsPerOctet = 8;
 constexpr std::uint32_t numberBits = 32; // that a field record holds
 constexpr std::uint32_t addressBits = 128;
-constexpr std::uint32_t leastRun = 5;       // fewer octets of data stand on lines of their own
 constexpr std::uint32_t octetsPerLine = 16; // of data
 constexpr std::uint32_t mostDataLines = 4;  // without --all
 
 std::uint32_t octetOf(std::uint32_t bit) {
     return (bit - 1) / bitsPerOctet;
-}
-
-bool isOneOctet(const FieldView &field) {
-    return field.ranges.size() == 1 && field.ranges[0].firstBit % bitsPerOctet == 1 &&
-           field.ranges[0].lastBit - field.ranges[0].firstBit + 1 == bitsPerOctet;
 }
 
 } // namespace
@@ -48,7 +42,7 @@ void Tree::blockOpened(const BlockView &block) {
 }
 
 void Tree::field(const FieldView &field) {
-    if (continuesRun(field)) {
+    if (run_.continues(field)) {
         return addToRun(field);
     }
     endRun();
@@ -63,36 +57,26 @@ void Tree::field(const FieldView &field) {
     if (isReadAgain(field, text)) {
         return;
     }
-    beginRun(field);
-    writeField(field, text);
-}
-
-bool Tree::continuesRun(const FieldView &field) const {
-    return run_.octets != 0 && field.id == run_.id && isOneOctet(field) &&
-           octetOf(field.ranges[0].firstBit) == run_.first + run_.octets && field.depth == run_.depth &&
-           field.name == run_.name;
-}
-
-void Tree::beginRun(const FieldView &field) {
-    if (!all_ && isOneOctet(field)) {
-        run_ = {field.id, field.name, octetOf(field.ranges[0].firstBit), 1, field.depth, out_.mark()};
+    if (!all_) {
+        run_.begin(field, out_.mark());
     }
+    writeField(field, text);
 }
 
 void Tree::addToRun(const FieldView &field) {
     const std::uint32_t octet = run_.first + run_.octets;
     gaps_.cover({octet, octet + 1});
     ++run_.octets;
-    if (run_.octets < leastRun) {
+    if (run_.octets < DataRun::least) {
         writeField(field, field.text.view());
-    } else if (run_.octets == leastRun) {
+    } else if (run_.octets == DataRun::least) {
         out_.takeBack(run_.start);
     }
 }
 
 void Tree::endRun() {
-    if (run_.octets >= leastRun) {
-        writeOctets(run_.name, {run_.first, run_.first + run_.octets}, run_.depth);
+    if (run_.isOne()) {
+        writeOctets(run_.name, run_.span(), run_.depth);
     }
     run_.octets = 0;
 }

@@ -11,6 +11,7 @@
 #include "netfloor-host/sink.h"
 #include "options.h"
 #include "output.h"
+#include "printers/data_run.h"
 
 namespace netfloor::cli {
 
@@ -27,19 +28,6 @@ public:
     void end(const PassEnd &end) override;
 
 private:
-    // Octets of data come as a field each. A few stand on lines of their own; more of them are taken back and shown as
-    // one.
-    struct Run {
-        std::uint32_t id = 0;
-        std::string_view name;
-        std::uint32_t first = 0; // octet
-        std::uint32_t octets = 0;
-        std::uint32_t depth = 0;
-        Output::Mark start = 0; // of the lines, as long as there are few
-    };
-
-    [[nodiscard]] bool continuesRun(const FieldView &field) const;
-    void beginRun(const FieldView &field);
     void addToRun(const FieldView &field);
     void endRun();
 
@@ -65,7 +53,7 @@ private:
 
     std::span<const std::uint8_t> packet_;
     GapFinder gaps_;
-    Run run_;
+    DataRun run_;
     std::uint32_t depth_ = 0; // of the last line
     bool isReadToCut_ = false;
     std::string_view addressName_; // of the field before, if it is an IPv6 address
