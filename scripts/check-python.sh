@@ -1,7 +1,6 @@
 #!/bin/bash
 # SPDX-License-Identifier: MIT
-# Builds the Python package, installs it into a virtual environment of its own under build/, checks its types and runs
-# its tests. Ends with a line that counts what passed and what failed.
+# Builds the Python package, checks its types and runs its tests. Ends with a line that counts what passed and what failed.
 #
 #   scripts/check-python.sh [PYTEST-ARGUMENT...]
 set -uo pipefail
@@ -10,44 +9,38 @@ venv=$PWD/build/python
 log=$(mktemp)
 results=$(mktemp)
 trap 'rm -f "$log" "$results"' EXIT
-
-scripts/install-packages.sh python || exit 1
-[ -x "$venv/bin/python" ] || python3 -m venv "$venv" || exit 1
-requirements=$(sha256sum <python/tests/requirements.txt)
-if [ "$(cat "$venv/requirements" 2>/dev/null)" != "$requirements" ]; then
-    echo "== packages from PyPI"
-    "$venv/bin/pip" install -q --disable-pip-version-check -r python/tests/requirements.txt || exit 1
-    echo "$requirements" >"$venv/requirements"
-fi
-
-echo "== building: ./python"
-if ! "$venv/bin/pip" install --disable-pip-version-check --no-deps --no-build-isolation --force-reinstall ./python \
-    >"$log" 2>&1; then
-    tail -n 60 "$log"
-    echo "0 passed, 1 failed"
-    exit 1
-fi
-
 passed=0
 failed=0
-echo "== types"
-for check in "mypy --config-file python/pyproject.toml python/netfloor" "mypy.stubtest netfloor._netfloor"; do
-    # shellcheck disable=SC2086
-    if (cd build && "$venv/bin/python" -m ${check//python\//..\/python\/}) >"$log" 2>&1; then
+
+# verdict NAME COMMAND...: counts one check; its output is shown when it fails.
+verdict() {
+    local name=$1
+    shift
+    if "$@" >"$log" 2>&1; then
         passed=$((passed + 1))
     else
         failed=$((failed + 1))
         cat "$log"
+        echo "FAILED: $name"
     fi
-done
+}
+
+if ! scripts/python-environment.sh; then
+    echo "0 passed, 1 failed"
+    exit 1
+fi
+
+echo "== types"
+verdict mypy "$venv/bin/mypy" --config-file python/pyproject.toml --cache-dir build/mypy python/netfloor
+
 
 echo "== tests"
-"$venv/bin/pytest" -q --junit-xml="$results" "${@:-python/tests}"
+"$venv/bin/pytest" -q -o cache_dir="$PWD/build/pytest" --junit-xml="$results" "${@:-python/tests}"
 status=$?
-count() { grep -o "<testcase\|<failure\|<error\|<skipped" "$results" | grep -c "$1"; }
-test_failures=$(($(count failure) + $(count error)))
-passed=$((passed + $(count testcase) - test_failures - $(count skipped)))
-failed=$((failed + test_failures))
-[ $status -eq 0 ] || [ $test_failures -gt 0 ] || failed=$((failed + 1))
+in_state() { grep -o "$1" "$results" | wc -l; }
+tests_failed=$(($(in_state '<failure') + $(in_state '<error')))
+passed=$((passed + $(in_state '<testcase') - tests_failed - $(in_state '<skipped')))
+failed=$((failed + tests_failed))
+[ $status -eq 0 ] || [ $tests_failed -gt 0 ] || failed=$((failed + 1))
 echo "$passed passed, $failed failed"
 [ $failed -eq 0 ]

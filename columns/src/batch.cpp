@@ -56,20 +56,16 @@ void Batch::add(const Row &row) {
     row.forEach([&](std::size_t column, const Value &value) {
         if (byColumn_[column] != nullptr) {
             byColumn_[column]->set(rows_, value);
+            octets_ += value.text.size() + value.octets.size();
         }
     });
     ++rows_;
 }
 
-bool Batch::isFull() const {
-    return rows_ >= mostRows_ || std::ranges::any_of(builders_, [this](const std::unique_ptr<ColumnBuilder> &builder) {
-               return builder->octets() >= mostOctets_;
-           });
-}
-
 OwnedArray Batch::finish() {
     ArrayParts parts;
     const std::size_t rows = std::exchange(rows_, 0);
+    octets_ = 0;
     parts.length = static_cast<std::int64_t>(rows);
     for (const std::unique_ptr<ColumnBuilder> &builder : builders_) {
         parts.children.push_back(builder->finish(rows));

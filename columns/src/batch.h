@@ -20,7 +20,7 @@ public:
 
     void add(const Row &row);
     [[nodiscard]] std::size_t rows() const { return rows_; }
-    [[nodiscard]] bool isFull() const;
+    [[nodiscard]] bool isFull() const { return rows_ >= mostRows_ || octets_ >= mostOctets_; }
 
     // A record of the columns; the batch is empty again.
     [[nodiscard]] OwnedArray finish();
@@ -29,6 +29,7 @@ private:
     std::size_t mostRows_;
     std::size_t mostOctets_;
     std::size_t rows_ = 0;
+    std::size_t octets_ = 0; // of all texts, addresses and runs of octets
     std::vector<std::unique_ptr<ColumnBuilder>> builders_;
     std::vector<ColumnBuilder *> byColumn_; // of the table; null where a column is not wanted
 };

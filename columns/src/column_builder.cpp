@@ -74,7 +74,6 @@ public:
         octets_.insert(octets_.end(), octets.begin(), octets.end());
         fillTo(row + 1);
     }
-    [[nodiscard]] std::size_t size() const { return octets_.size(); }
 
     void finish(std::size_t rows, ArrayParts &parts) {
         fillTo(rows);
@@ -101,10 +100,6 @@ std::span<const std::uint8_t> octetsOf(std::string_view text) {
 }
 
 class TextBuilder final : public ColumnBuilder {
-public:
-    [[nodiscard]] std::size_t octets() const override { return run_.size(); }
-
-private:
     void keep(std::size_t row, const Value &value) override { run_.add(row, octetsOf(value.text)); }
     void finishValues(std::size_t rows, ArrayParts &parts) override { run_.finish(rows, parts); }
 
@@ -112,10 +107,6 @@ private:
 };
 
 class OctetsBuilder final : public ColumnBuilder {
-public:
-    [[nodiscard]] std::size_t octets() const override { return run_.size(); }
-
-private:
     void keep(std::size_t row, const Value &value) override { run_.add(row, value.octets); }
     void finishValues(std::size_t rows, ArrayParts &parts) override { run_.finish(rows, parts); }
 
@@ -154,10 +145,6 @@ std::string_view addressText(std::span<const std::uint8_t> octets, TextRoom &roo
 
 // Numbers of addresses; their texts are made once a batch.
 class AddressBuilder final : public ColumnBuilder {
-public:
-    [[nodiscard]] std::size_t octets() const override { return texts_.size(); }
-
-private:
     void keep(std::size_t row, const Value &value) override {
         const auto [found, isNew] = numbers_.try_emplace(Address(value.octets), numbers_.size());
         if (isNew) {

@@ -23,9 +23,6 @@ public:
     // The column with so many rows; the builder is empty again.
     [[nodiscard]] OwnedArray finish(std::size_t rows);
 
-    // Of texts and octets, which have no fixed length.
-    [[nodiscard]] virtual std::size_t octets() const { return 0; }
-
 protected:
     // Fills the buffers of the values.
     virtual void finishValues(std::size_t rows, ArrayParts &parts) = 0;

@@ -33,7 +33,7 @@ public:
     explicit ColumnReader(ColumnScan scan)
         : scan_(std::move(scan)),
           batch_(scan_),
-          capture_(scan_.path),
+          capture_(scan_.shard ? CaptureFile(*scan_.shard, 0) : CaptureFile(scan_.path)),
           host_(PluginLibrary::openCopy(scan_.plugin)),
           rows_(host_) {
         if (!scan_.where.empty()) {

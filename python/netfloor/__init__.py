@@ -1,12 +1,13 @@
 # SPDX-License-Identifier: MIT
 """Decodes the IP layers of captured packets: IPv4, IPv6, ICMP, TCP, UDP, SCTP and tunnels.
 
-scan() gives a capture as columns, packets() its packets one by one.
+scan() gives a capture as columns, packets() its packets one by one,
+plan() its shards, which several processes can read.
 """
 
 from ._errors import CaptureDamage, CaptureError, ConditionError, PluginError
-from ._netfloor import Field, Packet
-from ._scan import Column, Scan, columns, packets, scan
+from ._netfloor import Field, Packet, Shard
+from ._scan import Column, Scan, columns, packets, plan, scan
 
 __all__ = [
     "CaptureDamage",
@@ -17,7 +18,9 @@ __all__ = [
     "Packet",
     "PluginError",
     "Scan",
+    "Shard",
     "columns",
     "packets",
+    "plan",
     "scan",
 ]

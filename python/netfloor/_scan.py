@@ -12,9 +12,10 @@ PLUGIN = str(Path(__file__).parent / "lib" / "netfloor" / "libnetfloor.so")
 
 
 class Column(NamedTuple):
-    """A column of a table: its name, type ("u8", "address", "time"...) and meaning; required if no row is without it."""
+    """A column of a table, such as ip_ttl. A condition calls it by field, ip.ttl; required if no row is without it."""
 
     name: str
+    field: str
     type: str
     meaning: str
     required: bool
@@ -39,13 +40,14 @@ class Scan:
         where: str | None = None,
         columns: Sequence[str] | None = None,
         binary_addresses: bool = False,
+        shard: _netfloor.Shard | None = None,
     ) -> None:
         if columns is not None and (isinstance(columns, str) or not columns):
             raise ValueError("columns is a list of at least one name, or None for all.")
         self._path = os.fspath(path)
         self._table = table
         self._scan = _netfloor.ColumnScan(
-            self._path, PLUGIN, table, list(columns or []), where or "", binary_addresses
+            self._path, PLUGIN, table, list(columns or []), where or "", binary_addresses, shard
         )
 
     def __arrow_c_schema__(self) -> Any:
@@ -71,6 +73,7 @@ def scan(
     where: str | None = None,
     columns: Sequence[str] | None = None,
     binary_addresses: bool = False,
+    shard: _netfloor.Shard | None = None,
 ) -> Scan:
     """The rows of one table of a capture, for any library that takes an Arrow C stream.
 
@@ -81,11 +84,26 @@ def scan(
     table is "packets", "layers" (a row for each IP header), "chunks" or "causes" (of SCTP). where is a condition such as
     "tcp.port == 443 and ip.ttl < 5": the rows for which it holds. columns chooses and orders the columns, all by default;
     columns() lists them. Addresses are strings, dictionary-encoded; with binary_addresses they are 4 or 16 octets.
+    shard reads one shard of plan() alone, with the packet numbers of the whole capture.
 
     Raises ValueError for a table, column or condition without meaning, at once, and CaptureError when the stream is
     opened.
     """
-    return Scan(path, table, where=where, columns=columns, binary_addresses=binary_addresses)
+    return Scan(path, table, where=where, columns=columns, binary_addresses=binary_addresses, shard=shard)
+
+
+def plan(
+    path: str | os.PathLike[str], shards: int = 0, *, shard_octets: int = 0
+) -> list[_netfloor.Shard]:
+    """Cuts a capture into shards: into about so many, or of so many octets each.
+
+    The rows of all shards, one after the other, are those of the capture. It hops from packet to packet, and decodes
+    nothing. A capture that is packed with gzip is one shard. A file that has changed since it was planned is refused.
+    """
+    if (shards > 0) == (shard_octets > 0):
+        raise ValueError("Give either shards or shard_octets, above 0.")
+    size = shard_octets or max(1, -(-os.path.getsize(path) // shards))
+    return _netfloor.plan(os.fspath(path), size)
 
 
 def packets(path: str | os.PathLike[str]) -> _netfloor.PacketReader:

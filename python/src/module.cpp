@@ -37,6 +37,7 @@ void translate(const std::exception_ptr &thrown, void * /*unused*/) {
 
 NB_MODULE(_netfloor, module) {
     nb::register_exception_translator(&netfloor::python::translate);
+    netfloor::python::addShards(module);
     netfloor::python::addScan(module);
     netfloor::python::addPackets(module);
 }

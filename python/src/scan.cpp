@@ -1,18 +1,21 @@
 // SPDX-License-Identifier: MIT
 // Columns: Arrow records in capsules, as the Arrow PyCapsule interface has them.
 #include <memory>
+#include <optional>
 #include <stdexcept>
 #include <string>
 #include <string_view>
 #include <tuple>
 #include <vector>
 
+#include <nanobind/stl/optional.h>
 #include <nanobind/stl/string.h>
 #include <nanobind/stl/tuple.h>
 #include <nanobind/stl/vector.h>
 
 #include "module.h"
 #include "netfloor-columns/column_stream.h"
+#include "shards.h"
 
 namespace nb = nanobind;
 
@@ -55,12 +58,12 @@ nb::capsule schema(const ColumnScan &scan) {
     return inCapsule<ArrowSchema>("arrow_schema", [&](ArrowSchema &out) { columnSchema(scan, out); });
 }
 
-using ColumnTuple = std::tuple<std::string, std::string, std::string, bool>;
+using ColumnTuple = std::tuple<std::string, std::string, std::string, std::string, bool>;
 
 std::vector<ColumnTuple> columnsOf(const std::string &table) {
     std::vector<ColumnTuple> rows;
     for (const Column &column : columns(tableOf(table))) {
-        rows.emplace_back(plainName(column), typeName(column.type), column.meaning, column.isRequired);
+        rows.emplace_back(plainName(column), column.name, typeName(column.type), column.meaning, column.isRequired);
     }
     return rows;
 }
@@ -72,18 +75,22 @@ void addScan(nb::module_ &module) {
         .def(
             "__init__",
             [](ColumnScan *self, std::string path, const std::string &plugin, const std::string &table,
-               std::vector<std::string> columns, std::string where, bool binaryAddresses) {
+               std::vector<std::string> columns, std::string where, bool binaryAddresses,
+               const std::optional<PlannedShard> &shard) {
                 ColumnScan scan = {.path = std::move(path),
                                    .plugin = plugin,
                                    .table = tableOf(table),
                                    .columns = std::move(columns),
                                    .where = std::move(where),
                                    .binaryAddresses = binaryAddresses};
+                if (shard) {
+                    scan.shard = shard->plan;
+                }
                 checkScan(scan);
                 new (self) ColumnScan(std::move(scan));
             },
             nb::arg("path"), nb::arg("plugin"), nb::arg("table"), nb::arg("columns"), nb::arg("where"),
-            nb::arg("binary_addresses"))
+            nb::arg("binary_addresses"), nb::arg("shard").none())
         .def("stream", &stream)
         .def("schema", &schema);
     module.def("columns", &columnsOf, nb::arg("table"));

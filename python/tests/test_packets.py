@@ -15,7 +15,7 @@ def test_fields_have_texts_values_and_bits() -> None:
     port = fields["SCTP Destination Port Number"]
     assert (port.value, port.text, port.bits) == (80, "SCTP Destination Port Number=80", [(337, 352)])
     assert port.path.startswith("Ip Header/IPv6 Header/")
-    assert any("Shutdown" in text for text in packet.texts())
+    assert "SCTP - SHUTDOWN (7)" in packet.texts()
     assert (packet.number, packet.length, packet.ip_offset, packet.no_ip) == (1, 74, 14, None)
     assert packet.octets[packet.ip_offset] >> 4 == 6
 

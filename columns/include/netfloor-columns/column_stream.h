@@ -24,22 +24,25 @@
 
 #include <cstddef>
 #include <filesystem>
+#include <optional>
 #include <string>
 #include <vector>
 
 #include "netfloor-analysis/columns.h"
+#include "netfloor-capture/shards.h"
 #include "netfloor-columns/arrow_abi.h"
 
 namespace netfloor {
 
 struct ColumnScan {
-    std::string path; // of the capture
+    std::string path;                      // of the capture
+    std::optional<CapturePlan> shard = {}; // its first shard alone, instead of all of `path`
     std::filesystem::path plugin = {};
     RowKind table = RowKind::layer;
     std::vector<std::string> columns = {}; // "ip.ttl" or "ip_ttl"; none: all
     std::string where = {};                // the rows for which this condition holds, see condition.h
     bool binaryAddresses = false;
-    // A batch ends after so many rows, or where the texts or octets of a column reach so many octets.
+    // A batch ends after so many rows, or where its texts, addresses and octets reach so many octets.
     std::size_t batchRows = 65536;
     std::size_t batchOctets = 16777216;
 };

@@ -1,0 +1,64 @@
+# SPDX-License-Identifier: MIT
+"""Shards in this process, under Dask and under GNU parallel."""
+
+import os
+import pickle
+import subprocess
+import sys
+from pathlib import Path
+
+import dask.dataframe
+import netfloor
+import pandas
+import pyarrow as pa
+import pytest
+
+from conftest import CAPTURES
+
+
+def rows(shard: netfloor.Shard) -> pandas.DataFrame:
+    return pa.table(netfloor.scan(shard.path, "chunks", columns=["packet", "sctp_tsn"], shard=shard)).to_pandas()
+
+
+@pytest.mark.parametrize("name", ["sctp-s1ap-sll.pcapng", "pcapng-big-endian-two-interfaces.pcapng", "tunnel-gre-sample.pcap"])
+def test_pickled_shards_have_the_rows_of_the_capture(name: str) -> None:
+    shards = pickle.loads(pickle.dumps(netfloor.plan(CAPTURES / name, 7)))
+    assert len(shards) > 2
+    for table in ("packets", "layers"):
+        parts = [pa.table(netfloor.scan(shard.path, table, shard=shard)) for shard in shards]
+        assert [part.num_rows for part in parts if table == "packets"] in ([], [shard.packets for shard in shards])
+        whole = pa.table(netfloor.scan(CAPTURES / name, table))
+        assert pa.concat_tables(parts).to_pylist() == whole.to_pylist()
+
+
+def test_a_changed_capture_is_refused(sctp_capture: Path) -> None:
+    shard = netfloor.plan(sctp_capture, 4)[2]
+    assert (shard.first_packet, shard.path) == (sum(s.packets for s in netfloor.plan(sctp_capture, 4)[:2]) + 1, str(sctp_capture))
+    sctp_capture.write_bytes(sctp_capture.read_bytes() + b"x")
+    with pytest.raises(netfloor.CaptureError, match="planned"):
+        pa.table(netfloor.scan(shard.path, "chunks", shard=shard))
+    with pytest.raises(ValueError, match="either"):
+        netfloor.plan(sctp_capture)
+
+
+def test_dask_reads_a_shard_a_partition(sctp_capture: Path) -> None:
+    frame = dask.dataframe.from_map(rows, netfloor.plan(sctp_capture, 7))
+    assert frame.npartitions == 7
+    assert frame["sctp_tsn"].sum().compute(scheduler="processes", num_workers=2) == sum(range(1000))
+
+
+PART = """
+import pickle, sys
+import netfloor, pyarrow as pa
+shard = pickle.load(open(sys.argv[1], "rb"))
+print(sum(pa.table(netfloor.scan(shard.path, "chunks", shard=shard))["sctp_tsn"].to_pylist()))
+"""
+
+
+def test_gnu_parallel_reads_a_shard_a_process(sctp_capture: Path, tmp_path: Path) -> None:
+    (tmp_path / "part.py").write_text(PART)
+    for number, shard in enumerate(netfloor.plan(sctp_capture, 3)):
+        (tmp_path / f"{number}.shard").write_bytes(pickle.dumps(shard))
+    command = ["parallel", "-j2", sys.executable, str(tmp_path / "part.py"), ":::", *map(str, tmp_path.glob("*.shard"))]
+    output = subprocess.run(command, check=True, capture_output=True, text=True, env=os.environ).stdout
+    assert sum(map(int, output.split())) == sum(range(1000))
