@@ -172,7 +172,7 @@ private:
     void writeFields(const PacketToPrint &packet) {
         const std::span<const std::uint8_t> octets = packet.network.octets;
         const RunOptions options = packet.runOptions();
-        InnerPackets at(octets);
+        InnerPackets at(octets, options.wireOctets);
         for (; !at.ended(); at.next()) {
             if (at.isInner()) {
                 text_.assign(tunnelName(at.opened().tunnel));
@@ -184,10 +184,8 @@ private:
                 text_.append(", at octet ").append(std::to_string(at.firstOctet()));
                 writeItem(Kind::block, 0, "Packet inside", text_);
             }
-            // What is cut is the end of the outermost packet, and so of all that reach it.
-            const bool isCut = at.firstOctet() + at.octets().size() == octets.size() && packet.captured.isCut();
             RunOptions inner = options;
-            inner.wireOctets = isCut ? options.wireOctets - at.firstOctet() : 0;
+            inner.wireOctets = at.wireOctets();
             tree_.place(at.firstOctet(), at.isInner() ? 1 : 0);
             host().run(Pass::md, at.octets(), tree_, inner);
         }

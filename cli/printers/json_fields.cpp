@@ -28,11 +28,10 @@ void JsonFields::write(const PacketInput &packet) {
         return;
     }
     RunOptions options = packet.runOptions();
-    const std::size_t wireOctets = options.wireOctets;
-    for (InnerPackets at(packet.network.octets); !at.ended(); at.next()) {
+    for (InnerPackets at(packet.network.octets, options.wireOctets); !at.ended(); at.next()) {
         packet_ = at.octets();
         offset_ = at.firstOctet();
-        options.wireOctets = at.wireOctets(wireOctets);
+        options.wireOctets = at.wireOctets();
         host_.run(Pass::md, packet_, *this, options);
     }
 }

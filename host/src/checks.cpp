@@ -7,33 +7,10 @@
 #include <charconv>
 
 #include "checksum.h"
+#include "ip_numbers.h"
 #include "packet_walk.h"
 
 namespace netfloor {
-
-namespace {
-
-constexpr std::uint8_t protocolHopByHop = 0;
-constexpr std::uint8_t protocolIcmp = 1;
-constexpr std::uint8_t protocolIpv4 = 4;
-constexpr std::uint8_t protocolTcp = 6;
-constexpr std::uint8_t protocolUdp = 17;
-constexpr std::uint8_t protocolIpv6 = 41;
-constexpr std::uint8_t protocolRouting = 43;
-constexpr std::uint8_t protocolFragment = 44;
-constexpr std::uint8_t protocolGre = 47;
-constexpr std::uint8_t protocolAuthentication = 51;
-constexpr std::uint8_t protocolIcmpv6 = 58;
-constexpr std::uint8_t protocolDestination = 60;
-constexpr std::uint8_t protocolSctp = 132;
-constexpr std::uint8_t protocolMobility = 135;
-
-constexpr std::size_t ipv4Octets = 20;
-constexpr std::size_t ipv6Octets = 40;
-constexpr std::size_t addressOctets = 16;
-constexpr std::size_t mostDatagram = 65535;
-
-} // namespace
 
 std::span<const Fault> PacketChecks::check(std::span<const std::uint8_t> packet, std::size_t wireOctets) {
     faults_.clear();
@@ -116,6 +93,9 @@ void PacketWalk::ipv4(std::size_t at, std::size_t end) {
         total = end - at;
     }
     if (!hasHeader("IPv4", at, at + total, headerOctets)) {
+        if (headerOctets <= total) { // the snap length has cut it
+            ipv4Options(at + ipv4Octets, at + headerOctets);
+        }
         return;
     }
     if (!isSoundSum(addOctets(0, part(at, at + headerOctets)))) {
@@ -129,9 +109,9 @@ void PacketWalk::ipv4(std::size_t at, std::size_t end) {
 
     const std::uint32_t fragment = u16(at + 6);
     const std::size_t offset = std::size_t{fragment & 0x1fffU} * 8;
-    if (offset + total - headerOctets > mostDatagram) {
+    if (offset + total - headerOctets > mostPayload) {
         damage("IPv4", "the fragment ends at octet # of its datagram, and # is the most", at + 6,
-               offset + total - headerOctets, mostDatagram);
+               offset + total - headerOctets, mostPayload);
     }
     if (offset != 0) {
         return; // no header of what it carries
@@ -145,40 +125,6 @@ void PacketWalk::ipv4(std::size_t at, std::size_t end) {
     payload(carried);
 }
 
-void PacketWalk::ipv4Options(std::size_t at, std::size_t end) {
-    while (at < end) {
-        const std::uint32_t type = u8(at);
-        if (type == 0) {
-            return;
-        }
-        if (type == 1) {
-            ++at;
-            continue;
-        }
-        if (at + 2 > end) {
-            return damage("IPv4", "option # has no length, as the header ends", at, type);
-        }
-        const std::size_t octets = u8(at + 1);
-        const bool hasPointer = type == 7 || type == 131 || type == 137 || type == 68;
-        const bool isFixed = type == 136 || type == 148;
-        const std::size_t least = hasPointer ? 3 : isFixed ? 4 : 2;
-        if (octets < least || (isFixed && octets != least)) {
-            return damage("IPv4", "option # has a length of #", at, type, octets);
-        }
-        if (at + octets > end) {
-            return damage("IPv4", "option # ends # octets after the header", at, type, at + octets - end);
-        }
-        if (hasPointer && u8(at + 2) < 4) {
-            damage("IPv4", "option # has a pointer of #", at, type, u8(at + 2));
-        }
-        at += octets;
-        constexpr std::array<std::uint32_t, 8> read = {0, 1, 7, 68, 130, 131, 136, 137};
-        if (at == end && has(at, 1) && std::ranges::find(read, u8(at)) != read.end()) {
-            add(FaultKind::misread, "IPv4", "the plug-in reads the octet after the options as one more", at);
-        }
-    }
-}
-
 void PacketWalk::ipv6(std::size_t at, std::size_t end) {
     if (!hasHeader("IPv6", at, end, ipv6Octets)) {
         return;
@@ -188,9 +134,10 @@ void PacketWalk::ipv6(std::size_t at, std::size_t end) {
     if (last > end) {
         damage("IPv6", "the payload length is # octets, and the packet has #", at + 4, length, end - at - ipv6Octets);
     }
-    if (length == 0 && u8(at + 6) != 59) {
+    if (length == 0 && u8(at + 6) != protocolNone) {
         note("IPv6", "the payload length is 0, as of a jumbogram or where the network card fills it in", at + 4);
-        last = end;
+        constexpr std::array maybeIs = {protocolHopByHop, protocolTcp, protocolUdp};
+        last = std::ranges::find(maybeIs, u8(at + 6)) != maybeIs.end() ? end : last;
     }
     Payload carried;
     carried.at = at + ipv6Octets;
@@ -205,10 +152,7 @@ void PacketWalk::extensionHeaders(Payload payload, std::size_t first) {
     for (;;) {
         const std::size_t at = payload.at;
         const std::uint8_t type = payload.protocol;
-        const bool isOptions = type == protocolHopByHop || type == protocolDestination;
-        const bool isExtension = isOptions || type == protocolRouting || type == protocolFragment ||
-                                 type == protocolAuthentication || type == protocolMobility;
-        if (!isExtension) {
+        if (!isExtension(type) && type != protocolMobility) {
             return this->payload(payload);
         }
         if (!hasHeader("IPv6 extension", at, payload.end, 8)) {
@@ -217,24 +161,24 @@ void PacketWalk::extensionHeaders(Payload payload, std::size_t first) {
         if (type == protocolHopByHop && at != first + ipv6Octets) {
             damage("IPv6", "a hop-by-hop header is not the first one", at);
         }
-        std::size_t octets = (std::size_t{u8(at + 1)} + 1) * 8;
-        if (type == protocolFragment) {
-            octets = 8;
-        } else if (type == protocolAuthentication) {
-            octets = (std::size_t{u8(at + 1)} + 2) * 4;
-            if (octets < 12) {
-                return damage("IPv6", "the authentication header has # octets, and # is the least", at + 1, octets, 12);
-            }
+        const std::size_t octets = extensionOctets(type, u8(at + 1));
+        constexpr std::size_t leastAuthentication = 12;
+        if (type == protocolAuthentication && octets < leastAuthentication) {
+            return damage("IPv6", "the authentication header has # octets, and # is the least", at + 1, octets,
+                          leastAuthentication);
         }
         if (!hasHeader("IPv6 extension", at, payload.end, octets)) {
             return;
         }
-        if (isOptions) {
+        if (type == protocolHopByHop || type == protocolDestination) {
             ipv6Options(at + 2, at + octets, payload, first);
         } else if (type == protocolRouting) {
             routingHeader(at, at + octets, payload, first);
         } else if (type == protocolFragment) {
             const std::uint32_t word = u16(at + 2);
+            if (payload.isJumbo) {
+                damage("IPv6", "a fragment of a jumbo payload", at);
+            }
             payload.isFragment = payload.isFragment || (word & 0xfff9U) != 0;
             if ((word & 1U) != 0 && (payload.end - at - octets) % 8 != 0) {
                 damage("IPv6", "a fragment with others after it has # octets, which is no multiple of #", at,
@@ -252,51 +196,32 @@ void PacketWalk::extensionHeaders(Payload payload, std::size_t first) {
     }
 }
 
-void PacketWalk::ipv6Options(std::size_t at, std::size_t end, Payload &payload, std::size_t header) {
-    constexpr std::uint32_t homeAddress = 201;
-    const std::size_t start = at;
-    while (at < end) {
-        if (at != start && at == start + (u8(start) == 0 ? 1 : 2 + u8(start + 1))) {
-            add(FaultKind::misread, "IPv6", "the plug-in reads the options after the first as the next header", at);
-        }
-        if (u8(at) == 0) {
-            ++at;
-            continue;
-        }
-        if (at + 2 > end) {
-            return damage("IPv6", "option # has no length, as the header ends", at, u8(at));
-        }
-        const std::size_t next = at + 2 + u8(at + 1);
-        if (next > end) {
-            return damage("IPv6", "option # ends # octets after the header", at, u8(at), next - end);
-        }
-        if (u8(at) == homeAddress && u8(at + 1) == addressOctets) {
-            payload.otherSource = addOctets(addOctets(0, part(at + 2, next)), part(header + 24, header + ipv6Octets));
-        }
-        at = next;
-    }
-}
-
 void PacketWalk::routingHeader(std::size_t at, std::size_t end, Payload &payload, std::size_t header) {
-    const std::size_t addresses = (end - at - 8) / addressOctets;
+    const std::size_t addresses = (end - at - 8) / ipv6AddressOctets;
     const std::uint32_t type = u8(at + 2);
     const std::uint32_t left = u8(at + 3);
     const bool isList = type == 0 || type == 2;
-    if (isList && (end - at - 8) % addressOctets != 0) {
+    if (isList && (end - at - 8) % ipv6AddressOctets != 0) {
         damage("IPv6", "the routing header has # octets, which hold no whole addresses", at + 1, end - at);
     }
     if (isList && left > addresses) {
+        payload.hasAddresses = false;
         return damage("IPv6", "the routing header has # segments left and # addresses", at + 3, left, addresses);
+    }
+    const bool isSegmentList = type == 4; // its first entry is the last segment
+    if (isSegmentList && u8(at + 4) >= addresses) {
+        payload.hasAddresses = false;
+        return damage("IPv6", "the last entry of the routing header is number #, and it has # addresses", at + 4,
+                      u8(at + 4), addresses);
     }
     if (left == 0) {
         return;
     }
-    const bool isSegmentList = type == 4; // its first entry is the last segment
     payload.hasAddresses = (isList || isSegmentList) && addresses != 0;
     if (payload.hasAddresses) {
-        const std::size_t target = isSegmentList ? at + 8 : at + 8 + (addresses - 1) * addressOctets;
+        const std::size_t target = isSegmentList ? at + 8 : at + 8 + (addresses - 1) * ipv6AddressOctets;
         payload.addresses =
-            addOctets(addOctets(0, part(header + 8, header + 24)), part(target, target + addressOctets));
+            addOctets(addOctets(0, part(header + 8, header + 24)), part(target, target + ipv6AddressOctets));
     }
 }
 
@@ -306,7 +231,7 @@ void PacketWalk::payload(const Payload &payload) {
     case protocolIpv6: return payload.isFragment ? void() : ip(payload.at, payload.end);
     case protocolTcp: return tcp(payload);
     case protocolUdp: return udp(payload);
-    case protocolIcmp: return payload.isIpv6 ? void() : icmp(payload);
+    case protocolIcmp: return icmp(payload);
     case protocolIcmpv6: return payload.isIpv6 ? icmpv6(payload) : void();
     case protocolSctp: return sctp(payload);
     case protocolGre: return payload.isFragment ? void() : gre(payload);
@@ -320,12 +245,12 @@ void PacketWalk::gre(const Payload &payload) {
     }
     const std::uint32_t flags = u16(payload.at);
     const std::uint32_t version = flags & 7U;
+    if (version > 1) {
+        return note("GRE", "the version is #", payload.at, version);
+    }
     const auto part4 = [flags](std::uint32_t mask) { return (flags & mask) != 0 ? std::size_t{4} : 0; };
     std::size_t octets = 4 + part4(0xc000) + part4(0x2000) + part4(0x1000);
     octets += version == 1 ? part4(0x0080) : 0;
-    if (version > 1 || (flags & 0x4000U) != 0) {
-        return; // another form, or one with a list of routes
-    }
     if (!hasHeader("GRE", payload.at, payload.end, octets)) {
         return;
     }
@@ -333,9 +258,27 @@ void PacketWalk::gre(const Payload &payload) {
         !isSoundSum(addOctets(0, part(payload.at, payload.end)))) {
         damage("GRE", "the checksum is wrong", payload.at + 4);
     }
+    std::size_t carried = payload.at + octets;
+    if ((flags & 0x4000U) != 0) { // the list of routes of RFC 1701, up to an entry without a length
+        constexpr std::size_t entryHead = 4;
+        for (std::size_t length = 1; length != 0; carried += entryHead + length) {
+            if (!hasHeader("GRE route", carried, payload.end, entryHead)) {
+                return;
+            }
+            length = u8(carried + 3);
+        }
+    }
     const std::uint32_t type = u16(payload.at + 2);
-    if ((type == 0x0800 || type == 0x86dd) && payload.at + octets < payload.end) {
-        ip(payload.at + octets, payload.end);
+    if (type == etherIpv4 || type == etherIpv6) {
+        return ip(carried, payload.end);
+    }
+    const std::size_t captured = std::min(payload.end, octets_.size());
+    inner(payload.at, findInGre(part(payload.at, captured), payload.end - payload.at));
+}
+
+void PacketWalk::inner(std::size_t at, const std::optional<InnerPacket> &found) {
+    if (found) {
+        ip(at + found->firstOctet, at + found->firstOctet + found->wireOctets);
     }
 }
 

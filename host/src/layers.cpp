@@ -54,7 +54,7 @@ void LayerView::read(std::span<const std::uint8_t> packet, const RunOptions &opt
     if (!plain_ && reading_ == LayerReading::fast) {
         plain_ = std::make_unique<PlainPackets>(host_, map_);
     }
-    InnerPackets at(packet);
+    InnerPackets at(packet, options.wireOctets);
     for (; !at.ended(); at.next()) {
         open_.fill(-1);
         isLaterFragment_ = false;
@@ -63,7 +63,7 @@ void LayerView::read(std::span<const std::uint8_t> packet, const RunOptions &opt
         packets_.back().octets = static_cast<std::uint32_t>(at.octets().size());
         offset_ = at.firstOctet();
         RunOptions inner = options;
-        inner.wireOctets = at.wireOctets(options.wireOctets);
+        inner.wireOctets = at.wireOctets();
         if (!readPlain(at.octets(), inner.wireOctets)) {
             ++passes_;
             host_.run(Pass::md, at.octets(), *this, inner);

@@ -3,11 +3,14 @@
 #pragma once
 
 #include <cstdint>
+#include <optional>
 #include <span>
 #include <string_view>
 #include <vector>
 
 #include "netfloor-host/checks.h"
+#include "netfloor-host/inner_packets.h"
+#include "octets.h"
 
 namespace netfloor {
 
@@ -26,6 +29,7 @@ private:
         std::uint8_t protocol = 0;
         bool isFragment = false;
         bool isIpv6 = false;
+        bool isJumbo = false;
         bool hasAddresses = true;      // the addresses that its checksum covers are known
         std::uint64_t addresses = 0;   // their sum
         std::uint64_t otherSource = 0; // the sum with the address of a home address option, or 0
@@ -33,9 +37,12 @@ private:
 
     void ipv4(std::size_t at, std::size_t end);
     void ipv4Options(std::size_t at, std::size_t end);
+    void ipv4Entries(std::uint32_t type, std::uint32_t leastPointer, std::size_t at, std::size_t end);
+    void cipsoTags(std::size_t at, std::size_t end);
     void ipv6(std::size_t at, std::size_t end);
     void extensionHeaders(Payload payload, std::size_t first);
     void ipv6Options(std::size_t at, std::size_t end, Payload &payload, std::size_t header);
+    void ipv6Option(std::size_t at, std::size_t end, Payload &payload, std::size_t header);
     void routingHeader(std::size_t at, std::size_t end, Payload &payload, std::size_t header);
     void payload(const Payload &payload);
     void tcp(const Payload &payload);
@@ -43,17 +50,23 @@ private:
     void udp(Payload payload);
     void icmp(const Payload &payload);
     void icmpv6(const Payload &payload);
-    // The packet in an ICMP error, up to the end of that.
-    void quoted(std::size_t at, std::size_t end);
+    // The packet in an ICMP error, with its length field in units of so many octets, and the extension after it.
+    void quoteAndExtension(std::string_view protocol, const Payload &payload, std::size_t lengthAt, std::size_t unit);
+    void quoted(std::string_view protocol, std::size_t at, std::size_t end);
+    void icmpExtension(std::string_view protocol, std::size_t at, std::size_t end);
+    void multicastQuery(std::size_t at, std::size_t end);
     void multicastRecords(std::size_t at, std::size_t end);
     void neighbourOptions(std::size_t at, std::size_t end);
     void gre(const Payload &payload);
+    // A packet inside, whose place is counted from there.
+    void inner(std::size_t at, const std::optional<InnerPacket> &found);
     void sctp(const Payload &payload);
     void sctpChecksum(const Payload &payload);
     void sctpChunk(std::size_t at, std::size_t end);
-    // Parameters of INIT, causes of ABORT and ERROR.
-    void sctpItems(std::size_t at, std::size_t end, std::string_view tooShort, std::string_view tooLong,
-                   bool arePadded);
+    void sctpSack(std::size_t at, std::size_t end);
+    enum class ParameterPlace : std::uint8_t { init, chunk, parameter }; // of INIT, of other chunks, in another one
+    void sctpParameters(std::size_t at, std::size_t end, ParameterPlace place);
+    void sctpCauses(std::size_t at, std::size_t end);
 
     // The checksum of the payload with the addresses before it.
     void checksum(const Payload &payload, std::string_view protocol, std::size_t fieldAt);
@@ -62,8 +75,8 @@ private:
     // Whether a header fits and was captured.
     [[nodiscard]] bool hasHeader(std::string_view protocol, std::size_t at, std::size_t end, std::size_t count);
     [[nodiscard]] std::uint32_t u8(std::size_t at) const { return octets_[at]; }
-    [[nodiscard]] std::uint32_t u16(std::size_t at) const { return u8(at) << 8U | u8(at + 1); }
-    [[nodiscard]] std::uint32_t u32(std::size_t at) const { return u16(at) << 16U | u16(at + 2); }
+    [[nodiscard]] std::uint32_t u16(std::size_t at) const { return be16(octets_, at); }
+    [[nodiscard]] std::uint32_t u32(std::size_t at) const { return be32(octets_, at); }
     [[nodiscard]] std::span<const std::uint8_t> part(std::size_t at, std::size_t end) const {
         return octets_.subspan(at, end - at);
     }
@@ -77,11 +90,13 @@ private:
                 std::size_t second = 0) {
         add(FaultKind::damage, protocol, text, octet, first, second);
     }
-    void note(std::string_view protocol, std::string_view text, std::size_t octet, std::size_t first = 0) {
-        add(FaultKind::note, protocol, text, octet, first);
+    void note(std::string_view protocol, std::string_view text, std::size_t octet, std::size_t first = 0,
+              std::size_t second = 0) {
+        add(FaultKind::note, protocol, text, octet, first, second);
     }
 
     static constexpr std::uint32_t mostLayers = 16;
+    static constexpr std::size_t mostPayload = 65535;
 
     std::span<const std::uint8_t> octets_;
     std::vector<Fault> &faults_;

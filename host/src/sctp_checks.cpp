@@ -20,8 +20,39 @@ std::size_t padded(std::size_t octets) {
     return (octets + 3) & ~std::size_t{3};
 }
 
-// The least octets of the chunk types from 0 on.
-constexpr std::array<std::size_t, 15> leastChunk = {17, 20, 20, 16, 4, 4, 4, 8, 4, 4, 4, 4, 8, 8, 4};
+// The least octets of a chunk, a parameter or a cause with its head, as the RFCs of SCTP give them.
+struct ItemLength {
+    std::uint32_t type;
+    std::size_t octets;
+};
+constexpr std::array chunkLengths = {
+    ItemLength{0, 17},  ItemLength{1, 20},  ItemLength{2, 20},  ItemLength{3, 16},  ItemLength{7, 8},
+    ItemLength{12, 8},  ItemLength{13, 8},  ItemLength{15, 8},  ItemLength{16, 20}, ItemLength{64, 20},
+    ItemLength{128, 8}, ItemLength{192, 8}, ItemLength{193, 8}, ItemLength{194, 8},
+};
+constexpr std::array parameterLengths = {
+    ItemLength{5, 8},      ItemLength{6, 20},     ItemLength{9, 8},      ItemLength{13, 16},    ItemLength{14, 8},
+    ItemLength{15, 8},     ItemLength{16, 12},    ItemLength{17, 12},    ItemLength{18, 12},    ItemLength{0xc001, 8},
+    ItemLength{0xc002, 8}, ItemLength{0xc003, 8}, ItemLength{0xc004, 8}, ItemLength{0xc005, 8}, ItemLength{0xc006, 8},
+};
+// Where a parameter begins that another one holds, or 0.
+constexpr std::size_t placeOfInner(std::uint32_t type) {
+    switch (type) {
+    case 8: return itemHead; // it was not recognised
+    case 0xc001:
+    case 0xc002:
+    case 0xc004: return 2 * itemHead; // an address, after a number
+    default: return 0;
+    }
+}
+
+constexpr std::array causeLengths = {ItemLength{1, 8}, ItemLength{2, 8}, ItemLength{3, 8}, ItemLength{9, 8}};
+
+template <std::size_t count>
+std::size_t leastOctets(const std::array<ItemLength, count> &lengths, std::uint32_t type) {
+    const auto *const row = std::ranges::find(lengths, type, &ItemLength::type);
+    return row == lengths.end() ? itemHead : row->octets;
+}
 
 #ifdef NETFLOOR_HAS_CRC32C
 std::uint32_t crc32c(std::uint32_t start, std::span<const std::uint8_t> octets) {
@@ -109,46 +140,82 @@ void PacketWalk::sctpChecksum(const Payload &payload) {
 
 void PacketWalk::sctpChunk(std::size_t at, std::size_t end) {
     const std::uint32_t type = u8(at);
-    const std::size_t octets = end - at;
-    if (type < leastChunk.size() && octets < leastChunk[type]) {
-        return damage("SCTP", "chunk # has a length of #, which is too short for its fields", at, type, octets);
+    if (end - at < leastOctets(chunkLengths, type)) {
+        return damage("SCTP", "chunk # has a length of #, which is too short for its fields", at, type, end - at);
     }
     switch (type) {
     case 1:
-    case 2:
-        return sctpItems(at + 20, end, "parameter # has a length of #", "parameter # ends # octets after its chunk",
-                         true);
-    case 3: {
-        const std::size_t listed = 16 + 4 * (std::size_t{u16(at + 12)} + u16(at + 14));
-        if (listed != octets) {
-            damage("SCTP", "the SACK has # octets, and its blocks and duplicates need #", at, octets, listed);
-        }
-        return;
-    }
+    case 2: return sctpParameters(at + 20, end, ParameterPlace::init);
+    case 3:
+    case 16: return sctpSack(at, end);
+    case 4:
+    case 5: return sctpParameters(at + itemHead, end, ParameterPlace::chunk);
     case 6:
-    case 9:
-        return sctpItems(at + itemHead, end, "cause # has a length of #", "cause # ends # octets after its chunk",
-                         false);
+    case 9: return sctpCauses(at + itemHead, end);
+    case 128:
+    case 193: return sctpParameters(at + 2 * itemHead, end, ParameterPlace::chunk);
+    case 130: return sctpParameters(at + itemHead, end, ParameterPlace::chunk);
     default: return;
     }
 }
 
-void PacketWalk::sctpItems(std::size_t at, std::size_t end, std::string_view tooShort, std::string_view tooLong,
-                           bool arePadded) {
+// Also one with gaps that are not to be renounced.
+void PacketWalk::sctpSack(std::size_t at, std::size_t end) {
+    const bool isPlain = u8(at) == 3;
+    const std::size_t head = isPlain ? 16 : 20;
+    const std::size_t gaps = u16(at + 12);
+    const std::size_t others = isPlain ? u16(at + 14) : std::size_t{u16(at + 14)} + u16(at + 16);
+    if (head + 4 * (gaps + others) != end - at) {
+        return damage("SCTP", "the SACK has # octets, and its blocks and duplicates need #", at, end - at,
+                      head + 4 * (gaps + others));
+    }
+    std::uint32_t last = 0;
+    for (std::size_t gap = at + head; gap < at + head + 4 * gaps; gap += 4) {
+        if (u16(gap) > u16(gap + 2)) {
+            return damage("SCTP", "a gap block goes from # to #", gap, u16(gap), u16(gap + 2));
+        }
+        if (u16(gap) <= last) {
+            return note("SCTP", "a gap block begins at #, and the one before ends at #", gap, u16(gap), last);
+        }
+        last = u16(gap + 2);
+    }
+}
+
+void PacketWalk::sctpParameters(std::size_t at, std::size_t end, ParameterPlace place) {
     while (at < end) {
         if (at + itemHead > end) {
-            return damage("SCTP", "# octets after the last parameter or cause are none", at, end - at);
+            return damage("SCTP", "# octets after the last parameter are none", at, end - at);
         }
+        const std::uint32_t type = u16(at);
         const std::size_t octets = u16(at + 2);
-        if (octets < itemHead) {
-            return damage("SCTP", tooShort, at, u16(at), octets);
+        if (octets < leastOctets(parameterLengths, type)) {
+            return damage("SCTP", "parameter # has a length of #", at, type, octets);
         }
         if (at + octets > end) {
-            return damage("SCTP", tooLong, at, u16(at), at + octets - end);
+            return damage("SCTP", "parameter # ends # octets after its chunk", at, type, at + octets - end);
         }
-        if (arePadded && padded(octets) != octets && at + padded(octets) < end) {
+        if (const std::size_t inner = placeOfInner(type); inner != 0 && place != ParameterPlace::parameter) {
+            sctpParameters(at + inner, at + octets, ParameterPlace::parameter);
+        }
+        if (place == ParameterPlace::init && padded(octets) != octets && at + padded(octets) < end) {
             add(FaultKind::misread, "SCTP", "the plug-in reads the padding after parameter # as the next one",
-                at + octets, u16(at));
+                at + octets, type);
+        }
+        at += padded(octets);
+    }
+}
+
+void PacketWalk::sctpCauses(std::size_t at, std::size_t end) {
+    while (at < end) {
+        if (at + itemHead > end) {
+            return damage("SCTP", "# octets after the last cause are none", at, end - at);
+        }
+        const std::size_t octets = u16(at + 2);
+        if (octets < leastOctets(causeLengths, u16(at))) {
+            return damage("SCTP", "cause # has a length of #", at, u16(at), octets);
+        }
+        if (at + octets > end) {
+            return damage("SCTP", "cause # ends # octets after its chunk", at, u16(at), at + octets - end);
         }
         at += padded(octets);
     }

@@ -1,17 +1,16 @@
 // SPDX-License-Identifier: MIT
-// The checks of TCP, UDP, ICMP and ICMPv6.
+// The checks of TCP and UDP.
 #include <algorithm>
 #include <array>
 
 #include "checksum.h"
+#include "ip_numbers.h"
 #include "packet_walk.h"
+#include "ports.h"
 
 namespace netfloor {
 
 namespace {
-
-constexpr std::size_t tcpOctets = 20;
-constexpr std::size_t udpOctets = 8;
 
 // The lengths that the RFCs give to options of TCP.
 struct OptionLength {
@@ -20,14 +19,18 @@ struct OptionLength {
     std::size_t most;
 };
 constexpr std::array optionLengths = {
-    OptionLength{2, 4, 4},   OptionLength{3, 3, 3},   OptionLength{4, 2, 2},
-    OptionLength{5, 10, 34}, OptionLength{8, 10, 10}, OptionLength{19, 18, 18},
-    OptionLength{28, 4, 4},  OptionLength{29, 4, 40}, OptionLength{30, 3, 40},
+    OptionLength{2, 4, 4},    OptionLength{3, 3, 3},    OptionLength{4, 2, 2},   OptionLength{5, 10, 34},
+    OptionLength{6, 6, 6},    OptionLength{7, 6, 6},    OptionLength{8, 10, 10}, OptionLength{9, 2, 2},
+    OptionLength{10, 3, 3},   OptionLength{11, 6, 6},   OptionLength{12, 6, 6},  OptionLength{13, 6, 6},
+    OptionLength{14, 3, 3},   OptionLength{19, 18, 18}, OptionLength{20, 4, 4},  OptionLength{21, 6, 6},
+    OptionLength{22, 2, 2},   OptionLength{23, 2, 2},   OptionLength{27, 8, 8},  OptionLength{28, 4, 4},
+    OptionLength{29, 4, 40},  OptionLength{30, 3, 40},  OptionLength{34, 2, 18}, OptionLength{253, 4, 40},
+    OptionLength{254, 4, 40},
 };
 
 // Tunnels whose outer checksum may be 0 over IPv6 (RFC 6935).
 bool mayLackChecksum(std::uint32_t port) {
-    constexpr std::array<std::uint32_t, 6> tunnels = {2152, 4341, 4754, 4789, 6081, 6635};
+    constexpr std::array<std::uint32_t, 6> tunnels = {gtpUPort, 4341, 4754, vxlanPort, 6081, 6635};
     return std::ranges::find(tunnels, port) != tunnels.end();
 }
 
@@ -35,8 +38,12 @@ bool mayLackChecksum(std::uint32_t port) {
 
 void PacketWalk::checksum(const Payload &payload, std::string_view protocol, std::size_t fieldAt) {
     const std::size_t octets = payload.end - payload.at;
-    if (payload.isFragment || !payload.hasAddresses || !has(payload.at, octets)) {
+    if (payload.isFragment || !has(payload.at, octets)) {
         return;
+    }
+    if (!payload.hasAddresses) {
+        return note(protocol, "the checksum is not checked, as the routing header does not tell the last address",
+                    fieldAt);
     }
     const std::array<std::uint8_t, 8> head = {static_cast<std::uint8_t>(octets >> 24U),
                                               static_cast<std::uint8_t>(octets >> 16U),
@@ -89,9 +96,14 @@ void PacketWalk::tcp(const Payload &payload) {
 }
 
 void PacketWalk::tcpOptions(std::size_t at, std::size_t end) {
+    constexpr std::uint32_t windowScale = 3;
+    constexpr std::uint32_t mostShift = 14;
     while (at < end) {
         const std::uint32_t kind = u8(at);
         if (kind == 0) {
+            if (std::ranges::any_of(part(at, end), [](std::uint8_t octet) { return octet != 0; })) {
+                note("TCP", "octets after the end of the options are not 0", at);
+            }
             return;
         }
         if (kind == 1) {
@@ -112,6 +124,8 @@ void PacketWalk::tcpOptions(std::size_t at, std::size_t end) {
         const bool isOdd = kind == 5 && octets % 8 != 2;
         if (row != optionLengths.end() && (octets < row->least || octets > row->most || isOdd)) {
             damage("TCP", "option # has a length of #", at, kind, octets);
+        } else if (kind == windowScale && u8(at + 2) > mostShift) {
+            note("TCP", "the window scale is #, and # is the most", at + 2, u8(at + 2), mostShift);
         }
         at += octets;
     }
@@ -138,96 +152,12 @@ void PacketWalk::udp(Payload payload) {
         payload.end = at + length;
     }
     if (u16(at + 6) != 0) {
-        return checksum(payload, "UDP", at + 6);
-    }
-    if (payload.isIpv6 && !mayLackChecksum(u16(at)) && !mayLackChecksum(u16(at + 2))) {
+        checksum(payload, "UDP", at + 6);
+    } else if (payload.isIpv6 && !mayLackChecksum(u16(at)) && !mayLackChecksum(u16(at + 2))) {
         damage("UDP", "the checksum is 0, which IPv6 does not allow", at + 6);
     }
-}
-
-void PacketWalk::icmp(const Payload &payload) {
-    if (!hasHeader("ICMP", payload.at, payload.end, 8)) {
-        return;
-    }
-    const bool isWhole = !payload.isFragment && has(payload.at, payload.end - payload.at);
-    if (isWhole && !isSoundSum(addOctets(0, part(payload.at, payload.end)))) {
-        damage("ICMP", "the checksum is wrong", payload.at + 2);
-    }
-    const std::uint32_t type = u8(payload.at);
-    constexpr std::array<std::uint32_t, 11> codeZero = {0, 4, 8, 9, 10, 13, 14, 15, 16, 17, 18};
-    if (u8(payload.at + 1) != 0 && std::ranges::find(codeZero, type) != codeZero.end()) {
-        add(FaultKind::misread, "ICMP", "the plug-in reads type # with code 0 only", payload.at + 1, type);
-    }
-    constexpr std::array<std::uint32_t, 5> errors = {3, 4, 5, 11, 12};
-    if (std::ranges::find(errors, type) != errors.end()) {
-        quoted(payload.at + 8, payload.end);
-    }
-}
-
-// A quote may end anywhere: what is after it counts as not captured.
-void PacketWalk::quoted(std::size_t at, std::size_t end) {
-    if (isQuoted_ || !has(at, 6) || at + 6 > end) {
-        return;
-    }
-    const std::size_t length = u8(at) >> 4U == 6 ? 40 + std::size_t{u16(at + 4)} : u16(at + 2);
-    const auto all = octets_;
-    octets_ = octets_.first(std::min(octets_.size(), end));
-    isQuoted_ = true;
-    ip(at, std::max(at + length, end));
-    isQuoted_ = false;
-    octets_ = all;
-}
-
-void PacketWalk::icmpv6(const Payload &payload) {
-    if (!hasHeader("ICMPv6", payload.at, payload.end, 4)) {
-        return;
-    }
-    checksum(payload, "ICMPv6", payload.at + 2);
-    if (payload.isFragment || !has(payload.at, payload.end - payload.at)) {
-        return;
-    }
-    const std::uint32_t type = u8(payload.at);
-    if (type >= 1 && type <= 4) {
-        return quoted(payload.at + 8, payload.end);
-    }
-    if (type == 143 && hasHeader("ICMPv6", payload.at, payload.end, 8)) {
-        return multicastRecords(payload.at, payload.end);
-    }
-    constexpr std::array<std::size_t, 5> headers = {8, 16, 24, 24, 40}; // of neighbour discovery, types 133 to 137
-    if (type < 133 || type > 137) {
-        return;
-    }
-    const std::size_t header = headers[type - 133];
-    if (hasHeader("ICMPv6", payload.at, payload.end, header)) {
-        neighbourOptions(payload.at + header, payload.end);
-    }
-}
-
-// RFC 3810.
-void PacketWalk::multicastRecords(std::size_t at, std::size_t end) {
-    constexpr std::size_t recordHead = 20;
-    std::size_t record = at + 8;
-    for (std::uint32_t left = u16(at + 6); left != 0; --left) {
-        const std::size_t octets = record + recordHead <= end ? recordHead + std::size_t{16} * u16(record + 2) +
-                                                                    std::size_t{4} * u8(record + 1)
-                                                              : recordHead;
-        if (record + octets > end) {
-            return damage("ICMPv6", "a multicast record ends # octets after the packet", record, record + octets - end);
-        }
-        record += octets;
-    }
-}
-
-void PacketWalk::neighbourOptions(std::size_t at, std::size_t end) {
-    while (at + 2 <= end) {
-        const std::size_t octets = u8(at + 1) * std::size_t{8};
-        if (octets == 0) {
-            return damage("ICMPv6", "option # has a length of 0", at, u8(at));
-        }
-        if (at + octets > end) {
-            return damage("ICMPv6", "option # ends # octets after the packet", at, u8(at), at + octets - end);
-        }
-        at += octets;
+    if (!payload.isFragment) {
+        inner(at, findInUdp(part(at, std::min(payload.end, octets_.size())), payload.end - at));
     }
 }
 

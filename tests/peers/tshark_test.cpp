@@ -4,14 +4,11 @@
 // Captures of another folder are compared with
 //     NETFLOOR_PEER_CAPTURES=FOLDER build/tests/test_peers
 #include <algorithm>
-#include <cstdio>
 #include <cstdlib>
 #include <filesystem>
-#include <memory>
 #include <set>
 #include <string>
 #include <string_view>
-#include <utility>
 #include <vector>
 
 #include <gtest/gtest.h>
@@ -22,6 +19,7 @@
 #include "peers/known_differences.h"
 #include "peers/packet.h"
 #include "peers/pairs.h"
+#include "peers/peer_output.h"
 #include "support/runs.h"
 
 namespace netfloor::test {
@@ -64,18 +62,6 @@ std::vector<Values> ourValues(const Packet &packet) {
     return values;
 }
 
-Values split(std::string_view text, char separator) {
-    Values parts(text.empty() ? 0 : 1);
-    for (const char character : text) {
-        if (character == separator) {
-            parts.emplace_back();
-        } else {
-            parts.back() += character;
-        }
-    }
-    return parts;
-}
-
 // A number in any notation as decimal, a truth value as a number, other texts as they are.
 std::string theirText(const std::string &text) {
     if (text == "True" || text == "False") {
@@ -84,20 +70,6 @@ std::string theirText(const std::string &text) {
     char *end = nullptr;
     const unsigned long long number = std::strtoull(text.c_str(), &end, 0);
     return end == text.c_str() || *end != '\0' ? text : std::to_string(number);
-}
-
-std::vector<std::string> linesOf(const std::string &command) {
-    std::vector<std::string> lines;
-    const std::unique_ptr<FILE, int (*)(FILE *)> pipe(popen(command.c_str(), "r"), pclose);
-    std::string line;
-    for (int letter = 0; pipe != nullptr && (letter = std::fgetc(pipe.get())) != EOF;) {
-        if (letter == '\n') {
-            lines.push_back(std::exchange(line, {}));
-        } else {
-            line += static_cast<char>(letter);
-        }
-    }
-    return lines;
 }
 
 // A line a packet, with the values in the order of the pairs.
@@ -187,7 +159,7 @@ private:
 };
 
 TEST(Tshark, agreesOnRealCaptures) {
-    if (std::system("tshark --version >/dev/null 2>&1") != 0) {
+    if (!isInstalled("tshark")) {
         GTEST_SKIP() << "tshark is not installed";
     }
     const char *const other = std::getenv("NETFLOOR_PEER_CAPTURES");
