@@ -124,13 +124,15 @@ private:
             const std::int32_t wordOctet = static_cast<std::int32_t>(std::min(octet + wordOctets, header.octets)) -
                                            static_cast<std::int32_t>(wordOctets);
             const std::uint32_t wordEnd = (first + wordOctets) * bitsPerOctet + wordOctet * bitsPerOctet;
-            isUsable_ &=
-                seen.bits == seen.lastBit - seen.firstBit + 1 && seen.bits <= wordBits && seen.lastBit < wordEnd;
+            if (seen.bits != seen.lastBit - seen.firstBit + 1 || seen.bits > wordBits || seen.lastBit >= wordEnd) {
+                isUsable_ = false;
+                return;
+            }
             field.wordOctet = static_cast<std::int8_t>(wordOctet);
             field.shift = static_cast<std::uint8_t>(wordEnd - 1 - seen.lastBit);
             field.mask = ~std::uint32_t{0} >> (wordBits - seen.bits);
             const std::uint32_t number = field.read(packet_.data() + first);
-            if (field.value != LayerValue::packetNumber && number != seen.number) {
+            if (field.value != LayerValue::packetNumber && number != seen.number) { // in a unit of its own
                 isUsable_ &= number != 0 && seen.number % number == 0;
                 field.unit = static_cast<std::uint8_t>(number == 0 ? 0 : seen.number / number);
                 isUsable_ &= field.read(packet_.data() + first) == seen.number;
