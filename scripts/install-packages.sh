@@ -10,6 +10,7 @@
 #   scripts/install-packages.sh packages  what packaging/try-packages.sh needs: it builds Debian packages and a bare Debian
 set -eu
 
+# libsqlite3-dev is for `export`; jq, sqlite3 and python3-fastjsonschema are what its output and that of `json` is tested with.
 decode="g++ cmake ninja-build pkg-config libpcap-dev libcli11-dev zlib1g-dev libisal-dev nlohmann-json3-dev libsqlite3-dev libtbb-dev"
 all="$decode libgtest-dev libbenchmark-dev libtins-dev clang libclang-rt-14-dev llvm valgrind clang-format clang-tidy
     tshark tcpdump time help2man abigail-tools jq sqlite3 python3-fastjsonschema"

@@ -101,7 +101,7 @@ void JsonFields::writeValue(const FieldView &field, const FieldDescription *desc
     }
     if (const auto address = ipv6Address(field, packet_)) {
         TextRoom room;
-        out_ << ",\"value\":\"" << ipv6Text(*address, room) << '"';
+        out_ << R"(,"value":")" << ipv6Text(*address, room) << '"';
     } else if (const auto octets = octetsOf(field)) {
         out_ << ",\"value\":";
         writeJsonOctets(out_, packet_.subspan(octets->first, octets->end - octets->first));
