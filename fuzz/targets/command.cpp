@@ -43,6 +43,7 @@ cli::Options optionsFrom(std::span<const std::uint8_t> head) {
     options.utc = on(5);
     options.colour = on(6) ? cli::Colour::always : cli::Colour::never;
     options.plugin = NETFLOOR_PLUGIN;
+    options.jobs = 1;
     return options;
 }
 
@@ -100,7 +101,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t *data, std::size_t size
     const std::span packet(data + headOctets, std::min(size - headOctets, mostPacketOctets));
     capture.set(captureOf(packet, linkTypes[head[2] % linkTypes.size()], head[3]));
     netfloor::cli::Options options = optionsFrom(head);
-    options.file = capture.path();
+    options.files = {capture.path()};
     runCommand(options, packet.size() + head[3]);
     return 0;
 }
