@@ -1,6 +1,6 @@
 #!/bin/bash
 # SPDX-License-Identifier: MIT
-# Makes the virtual environment build/python with all that the package's tests and ./spark need, and installs the package
+# Makes the virtual environment build/python with all that the package's tests need, and installs the package
 # into it. Says little unless something fails.
 set -euo pipefail
 cd "$(dirname "$0")/.."
