@@ -23,16 +23,18 @@ FlagExplainer::FlagExplainer(const FieldTables &tables)
     : tables_(tables), knowledge_(tables.fields()), flagNames_(flagNames(~std::uint32_t{0})) {}
 
 std::span<const Finding> FlagExplainer::explain(std::uint32_t flags, Host &host, std::span<const std::uint8_t> packet,
-                                                const RunOptions &options) {
+                                                const RunOptions &options, std::uint32_t firstOctet) {
+    firstOctet_ = firstOctet;
     wanted_ = flags;
     wantsGap_ = (flags & NETFLOOR_FLAG_BITS_LEFT_OVER) != 0;
     wantsLengths_ = (flags & NETFLOOR_FLAG_LIMIT_TOO_LONG) != 0;
     host.run(Pass::md, packet, *this, options);
-    findings_.clear();
+    const std::size_t before = findings_.size();
     for (std::uint32_t left = flags; left != 0; left &= left - 1) {
         findings_.push_back(finding(left & -left));
+        findings_.back().place.lastOctet += firstOctet_;
     }
-    return findings_;
+    return findings().subspan(before);
 }
 
 void FlagExplainer::begin(Pass /*pass*/, std::span<const std::uint8_t> /*packet*/) {

@@ -47,9 +47,14 @@ class FlagExplainer final : public Sink {
 public:
     explicit FlagExplainer(const FieldTables &tables);
 
-    // One finding for each flag, valid until the next call.
+    // Adds one finding for each flag, and gives these. The packet begins at `firstOctet` of the one around it.
     [[nodiscard]] std::span<const Finding> explain(std::uint32_t flags, Host &host,
-                                                   std::span<const std::uint8_t> packet, const RunOptions &options);
+                                                   std::span<const std::uint8_t> packet, const RunOptions &options,
+                                                   std::uint32_t firstOctet = 0);
+
+    // All that were added since `clear`.
+    [[nodiscard]] std::span<const Finding> findings() const { return findings_; }
+    void clear() { findings_.clear(); }
 
     // What a finding says, and where it was raised.
     void write(Output &out, const Finding &finding) const;
@@ -84,6 +89,7 @@ private:
     std::vector<Finding> findings_;
 
     // Of the pass.
+    std::uint32_t firstOctet_ = 0;
     std::uint32_t wanted_ = 0; // flags to explain
     bool wantsGap_ = false;
     bool wantsLengths_ = false;

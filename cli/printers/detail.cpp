@@ -1,8 +1,10 @@
 // SPDX-License-Identifier: MIT
 // Every field of a packet as a tree, out of the MD pass.
+#include <optional>
 #include <string>
 #include <string_view>
 
+#include "netfloor-host/inner_packets.h"
 #include "printers/printer.h"
 #include "printers/tree.h"
 
@@ -17,7 +19,7 @@ public:
     void print(const PacketToPrint &packet) override {
         printHeading(packet);
         if (packet.network.isIp()) {
-            run(Pass::md, packet, tree_);
+            printFields(packet);
         } else {
             out() << "  ";
             printOther(packet);
@@ -40,6 +42,34 @@ public:
     void finishAll(const Tally &tally) override { printTally(tally); }
 
 private:
+    // Of the packet, and of those inside it.
+    void printFields(const PacketToPrint &packet) {
+        RunOptions options = packet.runOptions();
+        InnerPackets at(packet.network.octets, options.wireOctets);
+        while (!at.ended()) {
+            const auto octets = at.octets();
+            const std::uint32_t first = at.firstOctet();
+            options.wireOctets = at.wireOctets();
+            if (at.isInner()) {
+                printInside(at.opened(), first);
+            }
+            at.next();
+            tree_.place(first, at.ended() ? std::nullopt : std::optional(at.firstOctet() - first));
+            host().run(Pass::md, octets, tree_, options);
+        }
+        if (!at.limit().empty()) {
+            (out().start(Style::warning) << "  [" << at.limit() << ']').stop(Style::warning) << '\n';
+        }
+    }
+
+    void printInside(const InnerPacket &opened, std::uint32_t firstOctet) {
+        out().start(Style::bold) << "  Inside " << tunnelName(opened.tunnel);
+        if (opened.id) {
+            out() << " 0x" << Hex{*opened.id};
+        }
+        out().stop(Style::bold) << ", from octet " << firstOctet << " on\n";
+    }
+
     void printHeading(const PacketToPrint &packet) {
         const CapturedPacket &captured = packet.captured;
         (out().start(Style::bold) << "Packet " << captured.number).stop(Style::bold);

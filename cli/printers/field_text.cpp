@@ -41,16 +41,16 @@ bool isLetter(char character) {
 
 } // namespace
 
-void writeBits(Output &out, std::span<const BitRange> ranges) {
+void writeBits(Output &out, std::span<const BitRange> ranges, std::uint32_t bitsBefore) {
     for (std::size_t i = 0; i < ranges.size();) {
         const std::uint32_t first = ranges[i].firstBit;
         std::uint32_t last = ranges[i].lastBit;
-        out << (i == 0 ? "" : ",") << first;
+        out << (i == 0 ? "" : ",") << bitsBefore + first;
         for (++i; i < ranges.size() && ranges[i].firstBit == last + 1; ++i) {
             last = ranges[i].lastBit;
         }
         if (last != first) {
-            out << '-' << last;
+            out << '-' << bitsBefore + last;
         }
     }
 }

@@ -14,7 +14,7 @@
 namespace netfloor::cli {
 
 // "17-32", and for a field whose pieces do not follow one another "1-5,9-16".
-void writeBits(Output &out, std::span<const BitRange> ranges);
+void writeBits(Output &out, std::span<const BitRange> ranges, std::uint32_t bitsBefore = 0);
 
 // "octet 7", "octets 7 to 9"
 void writeOctetNumbers(Output &out, OctetSpan octets);

@@ -36,6 +36,7 @@ void Tree::begin(Pass /*pass*/, std::span<const std::uint8_t> packet) {
     run_.octets = 0;
     depth_ = 0;
     isReadToCut_ = false;
+    isOpenedShown_ = false;
     addressName_ = {};
 }
 
@@ -58,6 +59,9 @@ void Tree::field(const FieldView &field) {
     writeGapsBefore(octets ? std::min(octets->first, passed) : passed, field.depth);
     if (octets) {
         gaps_.cover(*octets);
+        if (opened_ && octets->end > *opened_) {
+            return writeOpened(field, *octets);
+        }
     }
     const std::string_view text = field.text.view();
     if (isReadAgain(field, text)) {
@@ -106,17 +110,38 @@ void Tree::writeGaps(std::uint32_t octet, std::uint32_t depth) {
     while (const auto gap = gaps_.before(octet)) {
         newLine(depth);
         out_.start(Style::dim) << "[in no field: ";
-        writeOctetNumbers(out_, {gap->firstOctet, gap->firstOctet + gap->octets});
+        writePlace({gap->firstOctet, gap->firstOctet + gap->octets});
+        (out_ << ']').stop(Style::dim) << '\n';
+    }
+}
+
+void Tree::writePlace(OctetSpan octets) {
+    writeOctetNumbers(out_, {firstOctet_ + octets.first, firstOctet_ + octets.end});
+}
+
+void Tree::writeOpened(const FieldView &field, OctetSpan octets) {
+    if (octets.first < *opened_) { // it begins with the header of the tunnel
+        const std::string_view text = withoutLeadingBlanks(field.text.view());
+        newLine(field.depth);
+        out_.untrusted(text.empty() ? nameOf(field) : text);
+        out_ << '\n';
+    }
+    if (!isOpenedShown_) {
+        isOpenedShown_ = true;
+        newLine(field.depth);
+        out_.start(Style::dim) << "[shown below: ";
+        writePlace({*opened_, static_cast<std::uint32_t>(packet_.size())});
         (out_ << ']').stop(Style::dim) << '\n';
     }
 }
 
 void Tree::writeField(const FieldView &field, std::string_view text) {
     const std::uint32_t bits = bitCount(field.ranges);
-    const auto address = bits == addressBits ? ipv6Address(field, packet_) : std::nullopt;
+    const auto address = bits == addressBits && field.id != 0 ? ipv6Address(field, packet_) : std::nullopt;
     addressName_ = address ? field.name : std::string_view();
     addressBit_ = address ? field.ranges.front().firstBit : 0;
-    if (bits > numberBits && !address) {
+    const bool isPayload = field.id == 0 && !text.empty(); // the host's own line on it
+    if (bits > numberBits && !address && !isPayload) {
         if (const auto octets = unshownOctets(field, bits, text)) {
             return writeOctets(nameOf(field), *octets, field.depth);
         }
@@ -132,7 +157,7 @@ void Tree::writeField(const FieldView &field, std::string_view text) {
     }
     if (bits_ && !field.ranges.empty()) {
         out_.start(Style::dim) << "  [";
-        writeBits(out_, field.ranges);
+        writeBits(out_, field.ranges, firstOctet_ * bitsPerOctet);
         (out_ << ']').stop(Style::dim);
     }
     out_ << '\n';
@@ -144,7 +169,8 @@ void Tree::writeOctets(std::string_view name, OctetSpan octets, std::uint32_t de
     newLine(depth);
     (out_ << name << ": ").count(size, "octet");
     if (bits_) {
-        out_.start(Style::dim) << "  [" << octets.first * bitsPerOctet + 1 << '-' << octets.end * bitsPerOctet;
+        out_.start(Style::dim) << "  [" << (firstOctet_ + octets.first) * bitsPerOctet + 1 << '-'
+                               << (firstOctet_ + octets.end) * bitsPerOctet;
         (out_ << ']').stop(Style::dim);
     }
     out_ << '\n';
@@ -192,7 +218,7 @@ void Tree::layer(const LayerRecord &layer) {
     }
     newLine(0);
     out_.start(Style::dim) << "[layer " << layer.layerNumber << ", ";
-    writeOctetNumbers(out_, {octetOf(layer.firstBit), octetOf(layer.lastBit) + 1});
+    writePlace({octetOf(layer.firstBit), octetOf(layer.lastBit) + 1});
     (out_ << ']').stop(Style::dim) << '\n';
 }
 
@@ -204,7 +230,7 @@ void Tree::end(const PassEnd &end) {
     if (end.bitsLeft != 0 && end.ending == Ending::complete) {
         const std::uint32_t total = static_cast<std::uint32_t>(packet_.size()) * bitsPerOctet;
         out_.start(Style::dim) << "  not decoded: ";
-        writeOctetNumbers(out_, {octetOf(total - end.bitsLeft + 1), octetOf(total) + 1});
+        writePlace({octetOf(total - end.bitsLeft + 1), octetOf(total) + 1});
         out_.stop(Style::dim) << '\n';
     }
     if (end.ending == Ending::cutOff) {

@@ -4,6 +4,7 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <optional>
 #include <span>
 #include <string_view>
 
@@ -17,6 +18,13 @@ namespace netfloor::cli {
 class Tree final : public Sink {
 public:
     Tree(const Options &options, Output &out) : all_(options.all), bits_(options.bits), out_(out) {}
+
+    // Of the next packet: where it begins in the outermost one, from where octets are counted, and where another one
+    // begins in it, which is shown by itself.
+    void place(std::uint32_t firstOctet, std::optional<std::uint32_t> opened) {
+        firstOctet_ = firstOctet;
+        opened_ = opened;
+    }
 
     void begin(Pass pass, std::span<const std::uint8_t> packet) override;
     void blockOpened(const BlockView &block) override;
@@ -56,6 +64,9 @@ private:
         }
     }
     void writeGaps(std::uint32_t octet, std::uint32_t depth);
+    void writePlace(OctetSpan octets);
+    // A field of octets that hold the packet that was opened.
+    void writeOpened(const FieldView &field, OctetSpan octets);
     void writeField(const FieldView &field, std::string_view text);
     void writeOctets(std::string_view name, OctetSpan octets, std::uint32_t depth);
 
@@ -68,6 +79,9 @@ private:
     Run run_;
     std::uint32_t depth_ = 0; // of the last line
     bool isReadToCut_ = false;
+    std::uint32_t firstOctet_ = 0;
+    std::optional<std::uint32_t> opened_;
+    bool isOpenedShown_ = false;
     std::string_view addressName_; // of the field before, if it is an IPv6 address
     std::uint32_t addressBit_ = 0;
 };

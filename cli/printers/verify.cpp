@@ -8,6 +8,7 @@
 
 #include "findings.h"
 #include "netfloor-host/checks.h"
+#include "netfloor-host/inner_packets.h"
 #include "printers/printer.h"
 
 namespace netfloor::cli {
@@ -127,22 +128,46 @@ private:
     }
 
     void judge(const PacketToPrint &packet) {
-        run(Pass::mv, packet, outcome_);
         faults_ = checks_.check(packet.network.octets, packet.runOptions().wireOctets);
-        const auto has = [this](FaultKind kind) {
-            return std::ranges::find(faults_, kind, &Fault::kind) != faults_.end();
-        };
-        // Flags that come from a wrong place need no explanation, which takes a pass of its own.
-        const bool isMisread =
-            outcome_.ending == Ending::complete && outcome_.verdict.fault() && has(FaultKind::misread);
-        findings_ = {};
-        if (outcome_.verdict.fault() && (!isMisread || options().all)) {
-            findings_ = explainer_.explain(outcome_.verdict.flags, host(), packet.network.octets, packet.runOptions());
+        explainer_.clear();
+        plugin_ = PacketVerdict::good;
+        isCutOff_ = false;
+        InnerPackets at(packet.network.octets, packet.runOptions().wireOctets);
+        for (; !at.ended(); at.next()) {
+            plugin_ = std::max(plugin_, verdictOn(at, packet));
         }
+        limit_ = at.limit();
         checked_ = has(FaultKind::damage) ? PacketVerdict::damaged : PacketVerdict::good;
-        plugin_ = isMisread ? PacketVerdict::misread : verdictOf(outcome_, findings_, packet.captured.isCut());
         ++counts_.plugin[static_cast<std::size_t>(plugin_)];
         ++counts_.checks[static_cast<std::size_t>(checked_)];
+    }
+
+    // On the packet or on one inside it.
+    [[nodiscard]] PacketVerdict verdictOn(const InnerPackets &at, const PacketToPrint &packet) {
+        RunOptions options = packet.runOptions();
+        options.wireOctets = at.wireOctets();
+        host().run(Pass::mv, at.octets(), outcome_, options);
+        if (!at.isInner()) {
+            bitsLeft_ = outcome_.bitsLeft;
+        }
+        if (outcome_.ending == Ending::cutOff) {
+            isCutOff_ = true;
+            return PacketVerdict::damaged;
+        }
+        if (!outcome_.verdict.fault()) {
+            return PacketVerdict::good;
+        }
+        // Flags that come from a wrong place need no explanation, which takes a pass of its own.
+        const bool isMisread = has(FaultKind::misread);
+        if (isMisread && !this->options().all) {
+            return PacketVerdict::misread;
+        }
+        const auto findings = explainer_.explain(outcome_.verdict.flags, host(), at.octets(), options, at.firstOctet());
+        return isMisread ? PacketVerdict::misread : worstOf(findings, packet.captured.isCut());
+    }
+
+    [[nodiscard]] bool has(FaultKind kind) const {
+        return std::ranges::find(faults_, kind, &Fault::kind) != faults_.end();
     }
 
     void printVerdicts() {
@@ -156,11 +181,11 @@ private:
         for (const Fault &fault : faults_) {
             printFault(fault);
         }
-        if (outcome_.ending == Ending::cutOff) {
+        if (isCutOff_) {
             startNote();
             out() << "the pass was cut off";
         }
-        for (const Finding &finding : findings_) {
+        for (const Finding &finding : explainer_.findings()) {
             if (finding.kind == FindingKind::byDesign && !options().all) {
                 continue;
             }
@@ -171,9 +196,13 @@ private:
                 out().styled(Style::dim, " (by design)");
             }
         }
-        if (outcome_.bitsLeft != 0) {
+        if (!limit_.empty()) {
             startNote();
-            (out().start(Style::dim) << "plug-in: ").count(outcome_.bitsLeft / 8, "octet") << " not decoded";
+            out() << limit_;
+        }
+        if (bitsLeft_ != 0) {
+            startNote();
+            (out().start(Style::dim) << "plug-in: ").count(bitsLeft_ / 8, "octet") << " not decoded";
             out().stop(Style::dim);
         }
         // The column of the second verdict is the last one where there is no note.
@@ -208,14 +237,7 @@ private:
         out() << '\n';
     }
 
-    [[nodiscard]] static PacketVerdict verdictOf(const Outcome &outcome, std::span<const Finding> findings,
-                                                 bool isCut) {
-        if (outcome.ending == Ending::cutOff) {
-            return PacketVerdict::damaged;
-        }
-        if (!outcome.verdict.fault()) {
-            return PacketVerdict::good;
-        }
+    [[nodiscard]] static PacketVerdict worstOf(std::span<const Finding> findings, bool isCut) {
         FindingKind worst = FindingKind::byDesign;
         for (const Finding &finding : findings) {
             worst = std::max(worst, finding.kind);
@@ -236,10 +258,12 @@ private:
     // Of the packet.
     std::string text_;
     Outcome outcome_;
-    std::span<const Finding> findings_;
     std::span<const Fault> faults_;
     PacketVerdict plugin_ = PacketVerdict::good;
     PacketVerdict checked_ = PacketVerdict::good;
+    std::string_view limit_; // why packets inside it stay closed
+    std::uint32_t bitsLeft_ = 0;
+    bool isCutOff_ = false;
     bool isFirstNote_ = true;
 };
 

@@ -5,53 +5,77 @@
 #include <array>
 
 #include "data_text.h"
+#include "ip_numbers.h"
+#include "octets.h"
 #include "packet_run.h"
+#include "payload_line.h"
 
 namespace netfloor {
 namespace {
 
 constexpr std::uint32_t bitsPerOctet = 8;
 constexpr std::uint32_t protocolNumbers = 256;
-constexpr std::uint32_t sctpProtocol = 132;
 constexpr std::uint32_t hostsOwnDecoder = 0;
 
-void takeBitsAsData(NextLayer &next, std::uint32_t bits) {
+// As data, or as a payload that is known, in one piece.
+void takeBits(NextLayer &next, std::uint32_t bits, const PayloadLine &known) {
     if (bits == 0) {
         return;
     }
     const std::uint32_t shown = std::min(bits, next.capturedBits());
+    const std::string_view name = known.isKnown() ? known.name() : dataName;
     switch (next.pass()) {
-    case Pass::md: next.take(shown, dataName, DataText(longDataStart, shown).view(), {}); break;
-    case Pass::to: next.take(shown, dataName, {}, DataText("Data - ", shown).view()); break;
+    case Pass::md:
+        next.take(shown, name, known.isKnown() ? known.text() : DataText(longDataStart, shown).view(), {});
+        break;
+    case Pass::to:
+        next.take(shown, name, {}, known.isKnown() ? known.text() : DataText("Data - ", shown).view());
+        break;
     default: return next.consume(bits);
     }
     if (shown < bits) {
-        next.take(bits - shown, dataName, {}, {});
+        next.take(bits - shown, name, {}, {});
     }
+}
+
+bool showsText(const NextLayer &next) {
+    return next.pass() == Pass::md || next.pass() == Pass::to;
+}
+
+// The octets right before the payload; none where there are fewer.
+std::span<const std::uint8_t> octetsBefore(NextLayer &next, std::size_t count) {
+    const std::uint32_t bitsBefore = next.state().cursor - 1;
+    const std::size_t first = bitsBefore / bitsPerOctet;
+    if (bitsBefore % bitsPerOctet != 0 || first < count || first > next.packet().size()) {
+        return {};
+    }
+    return next.packet().subspan(first - count, count);
 }
 
 // The user data of the DATA chunk whose head is the 16 octets before the payload.
 struct UserData {
     std::uint32_t octets;
     std::uint32_t paddingOctets;
+    std::uint32_t protocol; // its payload protocol identifier
 };
 
 std::optional<UserData> userDataAt(NextLayer &next) {
     constexpr std::uint32_t headOctets = 16;
     constexpr std::uint32_t lengthPlace = 2;
+    constexpr std::uint32_t protocolPlace = 12;
     constexpr std::uint8_t dataChunk = 0;
     constexpr std::uint32_t chunkAlignment = 4;
 
-    const std::uint32_t bitsBefore = next.state().cursor - 1;
-    if (bitsBefore % bitsPerOctet != 0 || bitsBefore / bitsPerOctet < headOctets) {
+    const auto head = octetsBefore(next, headOctets);
+    if (head.empty()) {
         return std::nullopt;
     }
-    const auto head = next.packet().subspan(bitsBefore / bitsPerOctet - headOctets, headOctets);
-    const auto length = static_cast<std::uint32_t>(head[lengthPlace] << bitsPerOctet | head[lengthPlace + 1]);
+    const std::uint32_t length = be16(head, lengthPlace);
     if (head[0] != dataChunk || length < headOctets) {
         return std::nullopt;
     }
-    return UserData{length - headOctets, (chunkAlignment - length % chunkAlignment) % chunkAlignment};
+    return UserData{length - headOctets, (chunkAlignment - length % chunkAlignment) % chunkAlignment,
+                    be32(head, protocolPlace)};
 }
 
 } // namespace
@@ -136,7 +160,10 @@ bool NextLayer::runPlugin() {
 }
 
 Handled takeAsData(NextLayer &next) {
-    next.layer(hostsOwnDecoder, [&] { takeBitsAsData(next, next.bitsLeft()); });
+    const PayloadLine line = showsText(next) && next.ipProtocol() == protocolUdp
+                                 ? PayloadLine::ofUdp(octetsBefore(next, udpOctets), next.payload())
+                                 : PayloadLine();
+    next.layer(hostsOwnDecoder, [&] { takeBits(next, next.bitsLeft(), line); });
     return Handled::yes;
 }
 
@@ -145,15 +172,21 @@ Handled takeSctpUserData(NextLayer &next) {
     if (!data) {
         return takeAsData(next);
     }
+    const std::uint32_t bits = std::min(data->octets * bitsPerOctet, next.bitsLeft());
+    const auto payload = next.payload();
+    const PayloadLine line =
+        showsText(next)
+            ? PayloadLine::ofSctp(data->protocol, payload.first(std::min<std::size_t>(payload.size(), data->octets)))
+            : PayloadLine();
     next.layer(hostsOwnDecoder, [&] {
-        takeBitsAsData(next, std::min(data->octets * bitsPerOctet, next.bitsLeft()));
+        takeBits(next, bits, line);
         next.consume(data->paddingOctets * bitsPerOctet);
     });
     return Handled::yes;
 }
 
 OwnerRegistry::OwnerRegistry() : default_(takeAsData) {
-    byProtocol_.emplace(sctpProtocol, takeSctpUserData);
+    byProtocol_.emplace(protocolSctp, takeSctpUserData);
 }
 
 void OwnerRegistry::add(std::uint32_t key, Owner owner) {

@@ -5,6 +5,7 @@
 #include <utility>
 
 #include "octets.h"
+#include "ports.h"
 
 namespace netfloor {
 namespace {
@@ -206,7 +207,8 @@ bool PlainPackets::findTransport(std::uint8_t protocol, Octets octets, PlainPack
         found.transport = &udp_;
         found.transportKind = LayerKind::udp;
         found.payloadOctet = first + udpOctets;
-        return found.payloadOctet <= found.endOctet;
+        return found.payloadOctet <= found.endOctet && !isGtpPort(be16(octets, first)) &&
+               !isGtpPort(be16(octets, first + 2));
     case icmpProtocol: {
         constexpr std::uint32_t echoReply = 0; // type and code
         constexpr std::uint32_t echo = 0x0800;
