@@ -11,16 +11,12 @@ namespace netfloor::cli {
 
 namespace {
 
-constexpr std::string_view sourcePort = "source_port";
-constexpr std::string_view destinationPort = "destination_port";
+// Of the names that stand for several fields, those of which a layer has one.
+constexpr std::span portColumns = std::span(jointFields).first(2);
 
 std::optional<KeyColumn> findColumn(std::string_view name) {
-    if (name == sourcePort || name == destinationPort) {
-        const bool isSource = name == sourcePort;
-        return KeyColumn{std::string(name),
-                         {isSource ? layerField("tcp.source_port") : layerField("tcp.destination_port"),
-                          isSource ? layerField("udp.source_port") : layerField("udp.destination_port"),
-                          isSource ? layerField("sctp.source_port") : layerField("sctp.destination_port")}};
+    if (const auto ports = std::ranges::find(portColumns, name, &JointField::name); ports != portColumns.end()) {
+        return KeyColumn{std::string(name), {ports->fields.begin(), ports->fields.end()}};
     }
     const auto field = findLayerField(name);
     return field ? std::optional(KeyColumn{std::string(name), {*field}}) : std::nullopt;
@@ -78,7 +74,7 @@ std::vector<KeyColumn> keyColumns(const std::vector<std::string> &names, bool pe
     return columns;
 }
 
-bool isPlainIpv4(std::span<const std::uint8_t> packet) {
+bool isPlainIpv4(std::span<const std::uint8_t> packet, std::size_t wireOctets) {
     constexpr std::size_t leastOctets = 40;
     constexpr std::uint8_t tcp = 6;
     constexpr std::uint8_t udp = 17;
@@ -86,7 +82,7 @@ bool isPlainIpv4(std::span<const std::uint8_t> packet) {
         return false;
     }
     const bool isFirst = (packet[6] & 0x1fU) == 0 && packet[7] == 0;
-    return isFirst && (packet[9] == tcp || !findInnerPacket(packet));
+    return isFirst && (packet[9] == tcp || !findInnerPacket(packet, wireOctets));
 }
 
 std::vector<std::string_view> plainKeyFields(const KeyColumn &column) {

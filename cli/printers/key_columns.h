@@ -26,7 +26,7 @@ struct KeyColumn {
 [[nodiscard]] std::vector<KeyColumn> keyColumns(const std::vector<std::string> &names, bool perChunk);
 
 // The packets that XTR reads with the same values, and faster: one IPv4 header, then TCP or UDP.
-[[nodiscard]] bool isPlainIpv4(std::span<const std::uint8_t> packet);
+[[nodiscard]] bool isPlainIpv4(std::span<const std::uint8_t> packet, std::size_t wireOctets);
 
 // The key field of the plug-in that has the values of a column in such a packet, or nothing.
 [[nodiscard]] std::vector<std::string_view> plainKeyFields(const KeyColumn &column);

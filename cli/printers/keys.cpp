@@ -129,7 +129,8 @@ public:
     void print(const PacketToPrint &packet) override {
         if (!packet.network.isIp()) {
             printWithoutLayers(packet);
-        } else if (!options().perChunk && !options().raw && plain_.isComplete() && isPlainIpv4(packet.network.octets)) {
+        } else if (!options().perChunk && !options().raw && plain_.isComplete() &&
+                   isPlainIpv4(packet.network.octets, packet.runOptions().wireOctets)) {
             printPlain(packet);
         } else {
             view_.read(packet.network.octets, packet.runOptions());

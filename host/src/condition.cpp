@@ -30,19 +30,6 @@ constexpr std::array<std::pair<std::string_view, LayerKind>, layerKinds> layerNa
     {"payload", LayerKind::payload},
 }};
 
-// Names that stand for two fields.
-struct EitherField {
-    std::string_view name;
-    LayerField source;
-    LayerField destination;
-};
-constexpr std::array eitherFields = {
-    EitherField{"ip.address", layerField("ip.source"), layerField("ip.destination")},
-    EitherField{"tcp.port", layerField("tcp.source_port"), layerField("tcp.destination_port")},
-    EitherField{"udp.port", layerField("udp.source_port"), layerField("udp.destination_port")},
-    EitherField{"sctp.port", layerField("sctp.source_port"), layerField("sctp.destination_port")},
-};
-
 // How many letters change one name into the other.
 std::size_t distance(std::string_view left, std::string_view right) {
     std::vector<std::size_t> row(right.size() + 1);
@@ -73,8 +60,8 @@ std::string_view nearestName(std::string_view wrong) {
     for (const LayerFieldSource &row : layerFieldSources()) {
         consider(row.name);
     }
-    for (const EitherField &either : eitherFields) {
-        consider(either.name);
+    for (const JointField &joint : jointFields) {
+        consider(joint.name);
     }
     for (const auto &[name, kind] : layerNames) {
         consider(name);
@@ -210,12 +197,12 @@ private:
     bool parseName(Term &term) {
         const std::string_view name = word_.text;
         const auto *const layer = std::ranges::find(layerNames, name, &std::pair<std::string_view, LayerKind>::first);
-        const auto *const either = std::ranges::find(eitherFields, name, &EitherField::name);
+        const auto *const joint = std::ranges::find(jointFields, name, &JointField::name);
         const std::optional<LayerField> field = findLayerField(name);
         if (layer != layerNames.end()) {
             term.kind = layer->second;
-        } else if (either != eitherFields.end()) {
-            term.fields = {either->source, either->destination};
+        } else if (joint != jointFields.end()) {
+            term.fields.assign(joint->fields.begin(), joint->fields.end());
         } else if (field) {
             term.fields = {*field};
         } else {
@@ -395,7 +382,8 @@ bool Condition::holds(std::size_t node, const LayerView &view, std::uint16_t ipL
         return chunk != nullptr && holds(term, view, *chunk);
     }
     return std::ranges::any_of(view.layers(), [&](const Layer &layer) {
-        return layer.kind == term.kind && layer.ipLayer == ipLayer && holds(term, view, layer);
+        const bool isAsked = layer.kind == term.kind || !term.fields.empty(); // which may be of several kinds
+        return isAsked && layer.ipLayer == ipLayer && holds(term, view, layer);
     });
 }
 

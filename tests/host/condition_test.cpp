@@ -40,6 +40,9 @@ TEST(Condition, holdsForOneLayerAndOneChunk) {
         {inner, "!(tcp.source_port == 53)", true},
         {inner, "udp.port == 53 and udp.port == 5000", true},
         {inner, "udp.port in {1, 52-54}", true},
+        {inner, "source_port in {53, 5000} and destination_port in {53, 5000}", true},
+        {inner, "source_port == 2905", false},
+        {chunks, "source_port == 2905", true}, // of any transport
         {inner, "udp.port in {1, 54-60}", false},
         {inner, "udp.source_port == 1 or udp.source_port == 2 and udp or ip.version == 4", true},
         {inner, "ip.dont_fragment", false}, // a flag that is not set

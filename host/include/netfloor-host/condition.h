@@ -11,9 +11,9 @@
 //                 FIELD == VALUE            also !=, and < <= > >= of numbers
 //                 FIELD in VALUE            also of several: in {80, 443, 8000-8080}
 //
-// A field has a name of layer_fields.h, or is "ip.address", "tcp.port", "udp.port" or "sctp.port": the source or the
-// destination. A value is a decimal number, a hexadecimal one (0x1f), an IPv4 or IPv6 address, or a prefix
-// (2001:db8::/32). A term of a field that is not there does not hold.
+// A field has a name of layer_fields.h, also one that stands for several: "ip.address" and "tcp.port" are the source or
+// the destination, "source_port" is that of any transport. A value is a decimal number, a hexadecimal one (0x1f), an
+// IPv4 or IPv6 address, or a prefix (2001:db8::/32). A term of a field that is not there does not hold.
 //
 // All terms are asked of one IP layer with what it carries and one of its SCTP chunks. `&&`, `||` and `!` are taken for
 // the words.

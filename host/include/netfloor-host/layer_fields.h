@@ -262,6 +262,27 @@ inline constexpr std::array sources = {
     return findLayerField(name).value();
 }
 
+// A name that stands for several fields, of which any may be meant. The rest of `fields` repeats the last one.
+struct JointField {
+    std::string_view name;
+    std::array<LayerField, 3> fields;
+};
+inline constexpr std::array jointFields = {
+    JointField{"source_port",
+               {layerField("tcp.source_port"), layerField("udp.source_port"), layerField("sctp.source_port")}},
+    JointField{
+        "destination_port",
+        {layerField("tcp.destination_port"), layerField("udp.destination_port"), layerField("sctp.destination_port")}},
+    JointField{"ip.address", {layerField("ip.source"), layerField("ip.destination"), layerField("ip.destination")}},
+    JointField{"tcp.port",
+               {layerField("tcp.source_port"), layerField("tcp.destination_port"), layerField("tcp.destination_port")}},
+    JointField{"udp.port",
+               {layerField("udp.source_port"), layerField("udp.destination_port"), layerField("udp.destination_port")}},
+    JointField{
+        "sctp.port",
+        {layerField("sctp.source_port"), layerField("sctp.destination_port"), layerField("sctp.destination_port")}},
+};
+
 // How many names a kind has.
 [[nodiscard]] constexpr std::uint32_t layerFieldCount(LayerKind kind) {
     std::uint32_t count = 0;
