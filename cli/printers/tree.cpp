@@ -121,10 +121,11 @@ void Tree::writeOpened(const FieldView &field, OctetSpan octets) {
 
 void Tree::writeField(const FieldView &field, std::string_view text) {
     const std::uint32_t bits = bitCount(field.ranges);
-    const auto address = bits == addressBits ? ipv6Address(field, packet_) : std::nullopt;
+    const auto address = bits == addressBits && field.id != 0 ? ipv6Address(field, packet_) : std::nullopt;
     addressName_ = address ? field.name : std::string_view();
     addressBit_ = address ? field.ranges.front().firstBit : 0;
-    if (bits > numberBits && !address) {
+    const bool isPayload = field.id == 0 && !text.empty(); // the host's own line on it
+    if (bits > numberBits && !address && !isPayload) {
         if (const auto octets = unshownOctets(field, bits, text)) {
             return writeOctets(nameOf(field), *octets, field.depth);
         }
