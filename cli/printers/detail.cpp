@@ -4,6 +4,7 @@
 #include <string>
 #include <string_view>
 
+#include "netfloor-host/checks.h"
 #include "netfloor-host/inner_packets.h"
 #include "printers/printer.h"
 #include "printers/tree.h"
@@ -45,6 +46,7 @@ private:
     // Of the packet, and of those inside it.
     void printFields(const PacketToPrint &packet) {
         RunOptions options = packet.runOptions();
+        printMisread(packet);
         InnerPackets at(packet.network.octets, options.wireOctets);
         while (!at.ended()) {
             const auto octets = at.octets();
@@ -59,6 +61,17 @@ private:
         }
         if (!at.limit().empty()) {
             (out().start(Style::warning) << "  [" << at.limit() << ']').stop(Style::warning) << '\n';
+        }
+    }
+
+    // Which fields are not to be believed.
+    void printMisread(const PacketToPrint &packet) {
+        for (const Fault &fault : checks_.check(packet.network.octets, packet.runOptions().wireOctets)) {
+            if (fault.kind == FaultKind::misread) {
+                text_.clear();
+                appendFaultText(text_, fault);
+                (out().start(Style::warning) << "  [misread: " << text_ << ']').stop(Style::warning) << '\n';
+            }
         }
     }
 
@@ -97,6 +110,8 @@ private:
     }
 
     Tree tree_;
+    PacketChecks checks_;
+    std::string text_;
     int linkType_ = -1;
     std::string linkName_; // of that type
 };

@@ -124,12 +124,8 @@ SummaryLine::Columns SummaryLine::write(std::span<const std::uint8_t> packet, co
         out_.styled(Style::warning, "no whole IP header");
         return {start, start, start};
     }
-    const Layer *carried = transport();
-    const std::optional<UpperLayer> unread = findUnread(*ip, carried);
-    if (unread) {
-        carried = nullptr;
-    }
-    writeProtocol(unread ? unread->protocol : view_.number(*ip, layerField("ip.protocol")), carried);
+    const Layer *const carried = transport();
+    writeProtocol(view_.number(*ip, layerField("ip.protocol")), carried);
     if (!view_.has(*ip, layerField("ip.destination"))) {
         const Output::Mark start = out_.mark();
         out_ << "the header ends before the addresses, or its length is wrong";
@@ -140,13 +136,13 @@ SummaryLine::Columns SummaryLine::write(std::span<const std::uint8_t> packet, co
     writeFragment(*ip);
     if (carried != nullptr) {
         writeCarried(*ip, *carried);
-    } else if (unread) {
-        writeUnread(ip->firstOctet + unread->octet, unread->protocol);
+    } else if (const auto unread = view_.unread()) {
+        writeUnread(unread->octet, unread->protocol);
     } else if (const auto protocol = view_.number(*ip, layerField("ip.protocol")); protocol && isCarried(*protocol)) {
         out_ << (view_.number(*ip, layerField("ip.fragment_offset")).value_or(0) == 0 ? " its header is cut short"
                                                                                       : "");
     }
-    if (!view_.limit().empty()) {
+    if (!view_.limit().empty() && !view_.unread()) {
         out_ << "  [" << view_.limit() << ']';
     }
     if (view_.isCutOff()) {
@@ -172,17 +168,6 @@ const Layer *SummaryLine::transport() const {
         }
     }
     return last;
-}
-
-// After an IPv6 options header of several options the plug-in takes the second one for the next header. Gives what is
-// there instead of that.
-std::optional<UpperLayer> SummaryLine::findUnread(const Layer &ip, const Layer *carried) const {
-    if (carried == nullptr || view_.number(ip, layerField("ip.version")) != 6U || ip.packet != carried->packet ||
-        carried->kind == LayerKind::security) {
-        return std::nullopt;
-    }
-    const auto upper = findUpperLayer(view_.packet().subspan(ip.firstOctet));
-    return upper && ip.firstOctet + upper->octet != carried->firstOctet ? upper : std::nullopt;
 }
 
 void SummaryLine::writeProtocol(std::optional<std::uint32_t> protocol, const Layer *carried) {

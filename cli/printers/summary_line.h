@@ -48,7 +48,6 @@ private:
     [[nodiscard]] const Layer *find(LayerKind kind) const; // in the innermost IP layer
     [[nodiscard]] const Layer *transport() const;
     [[nodiscard]] Endpoint endpoint(const Layer &ip, LayerField address, std::optional<std::uint32_t> port) const;
-    [[nodiscard]] std::optional<UpperLayer> findUnread(const Layer &ip, const Layer *carried) const;
     void writeProtocol(std::optional<std::uint32_t> protocol, const Layer *carried);
     Columns writeEndpoints(const Layer &ip, const Layer *carried);
     void writeTunnels(const Layer &innermost);

@@ -49,6 +49,7 @@ void LayerView::read(std::span<const std::uint8_t> packet, const RunOptions &opt
     texts_.clear();
     limit_ = {};
     ipLayers_ = 0;
+    unread_.reset();
     isCutOff_ = false;
     isFull_ = false;
     if (!plain_ && reading_ == LayerReading::fast) {
@@ -66,11 +67,42 @@ void LayerView::read(std::span<const std::uint8_t> packet, const RunOptions &opt
         inner.wireOctets = at.wireOctets();
         if (!readPlain(at.octets(), inner.wireOctets)) {
             ++passes_;
+            const std::size_t firstLayer = layers_.size();
             host_.run(Pass::md, at.octets(), *this, inner);
+            leaveOutMisread(firstLayer, inner.wireOctets);
         }
     }
     if (limit_.empty()) {
         limit_ = at.limit();
+    }
+}
+
+// The layers of a pass are those from `firstLayer` on.
+void LayerView::leaveOutMisread(std::size_t firstLayer, std::size_t wireOctets) {
+    constexpr LayerField version = layerField("ip.version");
+    constexpr LayerField protocol = layerField("ip.protocol");
+    for (std::size_t i = firstLayer; i + 1 < layers_.size(); ++i) {
+        std::size_t carried = i + 1;
+        while (carried < layers_.size() && layers_[carried].kind == LayerKind::security) {
+            ++carried;
+        }
+        if (number(layers_[i], version) != 6U || carried == layers_.size() ||
+            layers_[carried].kind == LayerKind::payload) {
+            continue;
+        }
+        const std::uint32_t first = layers_[i].firstOctet;
+        const std::size_t before = first - offset_;
+        auto upper = findUpperLayer(packet_.subspan(first), wireOctets > before ? wireOctets - before : 0);
+        if (!upper || first + upper->octet == layers_[carried].firstOctet) {
+            continue;
+        }
+        upper->octet += first;
+        unread_ = upper;
+        values_[layers_[i].values + protocol.place].number = upper->protocol;
+        ipLayers_ = layers_[i].ipLayer;
+        layers_.resize(carried);
+        limit_ = "what follows several IPv6 options is not decoded";
+        return;
     }
 }
 

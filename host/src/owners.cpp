@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <array>
 #include <charconv>
+#include <functional>
 
 #include "data_owner.h"
 #include "ip_numbers.h"
@@ -55,9 +56,7 @@ void takeBits(NextLayer &next, std::uint32_t bits, const PayloadLine &known) {
     const std::uint32_t shown = std::min(bits, next.capturedBits());
     const std::string_view name = known.isKnown() ? known.name() : dataName;
     switch (next.pass()) {
-    case Pass::md:
-        next.take(shown, name, known.isKnown() ? known.text() : DataText("Data=", shown).view(), {});
-        break;
+    case Pass::md: next.take(shown, name, known.isKnown() ? known.text() : DataText("Data=", shown).view(), {}); break;
     case Pass::to:
         next.take(shown, name, {}, known.isKnown() ? known.text() : DataText("Data - ", shown).view());
         break;
@@ -208,10 +207,11 @@ Handled takeSctpUserData(NextLayer &next) {
         showsText(next)
             ? PayloadLine::ofSctp(data->protocol, payload.first(std::min<std::size_t>(payload.size(), data->octets)))
             : PayloadLine();
-    next.layer(hostsOwnDecoder, [&] {
+    const auto take = [&] {
         takeBits(next, bits, line);
         next.consume(data->paddingOctets * bitsPerOctet);
-    });
+    };
+    next.layer(hostsOwnDecoder, std::ref(take)); // a copy of its references would need the heap
     return Handled::yes;
 }
 

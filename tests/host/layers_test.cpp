@@ -115,6 +115,31 @@ TEST(Layers, keepTheValuesOfEachLayer) {
     EXPECT_EQ(view.packets()[1].id, 7U);
 }
 
+// What the plug-in reads from a wrong place is left out, also inside a tunnel that it reads itself.
+TEST(Layers, leaveOutWhatIsMisread) {
+    Host host(PluginLibrary::open(NETFLOOR_PLUGIN));
+    LayerView view(host);
+    const std::string router = "1100 0502 0000 0100"; // router alert, padding; then UDP
+    const std::string udp = "1388 0035 0008 0000";
+    const Octets misread = ipv6({.nextHeader = 0, .payload = hex(router + udp)});
+    view.read(misread);
+    ASSERT_TRUE(view.unread());
+    EXPECT_EQ(view.unread()->octet, 48U);
+    ASSERT_EQ(view.layers().size(), 1U);
+    EXPECT_EQ(view.number(view.layers()[0], layerField("ip.protocol")), 17U);
+    EXPECT_NE(view.limit().find("several IPv6 options"), std::string_view::npos);
+
+    view.read(ipv6({.nextHeader = 41, .payload = misread}));
+    ASSERT_TRUE(view.unread());
+    EXPECT_EQ(view.unread()->octet, 88U);
+    EXPECT_EQ(view.ipLayers(), 2);
+    EXPECT_EQ(view.layers().size(), 2U);
+
+    view.read(ipv6({.nextHeader = 0, .payload = hex("1100 0104 0000 0000" + udp)})); // one option
+    EXPECT_FALSE(view.unread());
+    EXPECT_EQ(view.layers().size(), 2U);
+}
+
 // Neither a chain of tunnels that the plug-in reads nor one that the host opens ends in silence.
 TEST(Layers, nameTheLimits) {
     Host host(PluginLibrary::open(NETFLOOR_PLUGIN));

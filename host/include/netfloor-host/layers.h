@@ -105,7 +105,11 @@ public:
     }
 
     [[nodiscard]] std::string_view limit() const { return limit_; } // why layers are missing, or nothing
-    [[nodiscard]] bool isCutOff() const { return isCutOff_; }       // a pass was
+
+    // The header that follows several IPv6 options; its octet is one of packet(). The plug-in takes the second option
+    // for the next header, so that all that it reads from there on is left out, and limit() says so.
+    [[nodiscard]] std::optional<UpperLayer> unread() const { return unread_; }
+    [[nodiscard]] bool isCutOff() const { return isCutOff_; } // a pass was
 
     // Passes that were run for all packets so far. Packets that were read without one are not in it.
     [[nodiscard]] std::uint64_t passes() const { return passes_; }
@@ -126,6 +130,7 @@ private:
     void field(const FieldView &field) override;
     void end(const PassEnd &end) override;
 
+    void leaveOutMisread(std::size_t firstLayer, std::size_t wireOctets);
     [[nodiscard]] bool readPlain(std::span<const std::uint8_t> octets, std::size_t wireOctets);
     void addHeader(const PlainHeader &header, std::uint32_t octet);
     [[nodiscard]] bool openLayer(LayerKind kind, std::uint32_t octet);
@@ -146,6 +151,7 @@ private:
     std::array<std::int32_t, layerKinds> open_ = {}; // the current layer of each kind, or -1
     std::uint32_t offset_ = 0;                       // of the current packet
     std::uint16_t ipLayers_ = 0;
+    std::optional<UpperLayer> unread_;
     bool isCutOff_ = false;
     bool isFull_ = false;
     std::uint64_t passes_ = 0;
