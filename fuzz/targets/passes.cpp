@@ -45,7 +45,7 @@ Input inputFrom(std::span<const std::uint8_t> octets) {
     plan.outerBits = on(5) ? head[8] : 0;
     plan.flags = on(6) ? std::uint32_t{head[9]} << 1 : 0;
     plan.sourceMask = on(7) ? head[10] : 0;
-    plan.byteAreaSize = head[11] == 0 ? 64 : head[11] % 32;
+    plan.byteAreaSize = static_cast<std::uint16_t>(head[11] == 0 ? 64 : head[11] % 32);
     return input;
 }
 
