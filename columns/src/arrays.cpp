@@ -2,6 +2,7 @@
 #include "arrays.h"
 
 #include <array>
+#include <cstddef>
 #include <memory>
 #include <utility>
 

@@ -101,6 +101,8 @@ private:
 };
 
 struct StreamStorage {
+    explicit StreamStorage(const ColumnScan &scan) : reader(scan) {}
+
     ColumnReader reader;
     std::string error;
 };
@@ -166,7 +168,7 @@ void columnSchema(const ColumnScan &scan, ArrowSchema &out) {
 
 void openColumns(const ColumnScan &scan, ArrowArrayStream &out) {
     checkScan(scan);
-    auto storage = std::unique_ptr<StreamStorage>(new StreamStorage{ColumnReader(scan), {}});
+    auto storage = std::make_unique<StreamStorage>(scan);
     out = {&getSchema, &getNext, &getLastError, &releaseStream, storage.release()};
 }
 
