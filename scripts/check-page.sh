@@ -7,14 +7,21 @@
 set -eu
 cd "$(dirname "$0")/.."
 say() { printf '== %s\n' "$*"; }
+skip() {
+    echo "SKIPPED: $*"
+    exit 0
+}
 
 say "packages"
-scripts/install-packages.sh page
+scripts/install-packages.sh page || skip "the packages of the browser cannot be installed"
 CHROMIUM=${CHROMIUM:-$(command -v chromium || command -v chromium-browser || true)}
 if [ -z "$CHROMIUM" ]; then
     echo "FAILED: no Chromium on the path; CHROMIUM=... names one" >&2
     exit 1
 fi
+
+timeout 60 "$CHROMIUM" --headless --no-sandbox --disable-gpu --dump-dom about:blank >/dev/null 2>&1 ||
+    skip "Chromium does not start on this machine"
 
 say "building"
 scripts/build-command.sh
@@ -27,7 +34,7 @@ if ! cmp -s tests/page/package.json "$modules/package.json"; then
     mkdir -p "$modules"
     cp tests/page/package.json "$modules/"
     (cd "$modules" && npm install --no-audit --no-fund --ignore-scripts --no-package-lock --loglevel=error) ||
-        { rm -rf "$modules"; echo "SKIPPED: npm cannot fetch what tests/page/package.json names"; exit 0; }
+        { rm -rf "$modules"; skip "npm cannot fetch what tests/page/package.json names"; }
 fi
 
 say "testing"
