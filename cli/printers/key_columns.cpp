@@ -74,49 +74,6 @@ std::vector<KeyColumn> keyColumns(const std::vector<std::string> &names, bool pe
     return columns;
 }
 
-bool isPlainIpv4(std::span<const std::uint8_t> packet, std::size_t wireOctets) {
-    constexpr std::size_t leastOctets = 40;
-    constexpr std::uint8_t tcp = 6;
-    constexpr std::uint8_t udp = 17;
-    if (packet.size() < leastOctets || packet[0] != 0x45 || (packet[9] != tcp && packet[9] != udp)) {
-        return false;
-    }
-    const bool isFirst = (packet[6] & 0x1fU) == 0 && packet[7] == 0;
-    return isFirst && (packet[9] == tcp || !findInnerPacket(packet, wireOctets));
-}
-
-std::vector<std::string_view> plainKeyFields(const KeyColumn &column) {
-    constexpr std::array names = {"ip.version",
-                                  "ip.total_length",
-                                  "ip.identification",
-                                  "ip.dont_fragment",
-                                  "ip.more_fragments",
-                                  "ip.fragment_offset",
-                                  "ip.ttl",
-                                  "ip.protocol",
-                                  "ip.source",
-                                  "ip.destination",
-                                  "tcp.source_port",
-                                  "tcp.destination_port",
-                                  "tcp.data_offset",
-                                  "tcp.acknowledgement_number",
-                                  "tcp.rst",
-                                  "tcp.syn",
-                                  "tcp.fin",
-                                  "udp.source_port",
-                                  "udp.destination_port"};
-    std::vector<std::string_view> keys;
-    for (const LayerFieldSource &row : layerFieldSources()) {
-        const bool isWanted =
-            std::ranges::find(column.fields, findLayerField(row.name).value()) != column.fields.end() &&
-            std::ranges::find(names, row.name) != names.end();
-        if (isWanted && std::ranges::find(keys, row.field.name) == keys.end()) {
-            keys.push_back(row.field.name);
-        }
-    }
-    return keys;
-}
-
 void KeyRows::write(const LayerView &view, std::uint16_t ipLayer, const Layer *chunk) const {
     for (const KeyColumn &column : columns_) {
         out_ << ',';

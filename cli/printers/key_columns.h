@@ -25,12 +25,6 @@ struct KeyColumn {
 // The columns of these names; without names the usual ones. Throws UsageError for a name that is none.
 [[nodiscard]] std::vector<KeyColumn> keyColumns(const std::vector<std::string> &names, bool perChunk);
 
-// The packets that XTR reads with the same values, and faster: one IPv4 header, then TCP or UDP.
-[[nodiscard]] bool isPlainIpv4(std::span<const std::uint8_t> packet, std::size_t wireOctets);
-
-// The key field of the plug-in that has the values of a column in such a packet, or nothing.
-[[nodiscard]] std::vector<std::string_view> plainKeyFields(const KeyColumn &column);
-
 class KeyRows {
 public:
     KeyRows(Output &out, std::span<const KeyColumn> columns, bool raw) : out_(out), columns_(columns), raw_(raw) {}

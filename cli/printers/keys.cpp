@@ -1,13 +1,12 @@
 // SPDX-License-Identifier: MIT
-// CSV (RFC 4180) out of the layers of each packet: a row for each IP layer, or for each SCTP chunk. Most packets have
-// one IPv4 header and TCP or UDP: these are read by XTR, where all columns are key fields, which takes half the time.
-#include <algorithm>
+// CSV (RFC 4180) out of the layers of each packet: a row for each IP layer, or for each SCTP chunk.
 #include <array>
 #include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
 
+#include "netfloor-analysis/rows.h"
 #include "printers/key_columns.h"
 #include "printers/printer.h"
 #include "where.h"
@@ -15,76 +14,6 @@
 namespace netfloor::cli {
 
 namespace {
-
-// The columns out of one XTR pass.
-class PlainKeys final : public Sink {
-public:
-    // `names` are those of the key-field table. Of several rows of one name the last is the one that is filled.
-    PlainKeys(const std::vector<std::string> &names, std::span<const KeyColumn> columns)
-        : columns_(names.size(), noColumn), values_(columns.size()) {
-        for (std::size_t column = 0; column < columns.size(); ++column) {
-            bool isKnown = false;
-            for (const std::string_view key : plainKeyFields(columns[column])) {
-                const auto row = std::find(names.rbegin(), names.rend(), key);
-                if (row != names.rend()) {
-                    std::size_t &place = columns_[static_cast<std::size_t>(names.rend() - row) - 1];
-                    isKnown = place == noColumn; // a column that is named twice takes the other way
-                    place = isKnown ? column : place;
-                }
-            }
-            isComplete_ &= isKnown;
-        }
-    }
-
-    [[nodiscard]] bool isComplete() const { return isComplete_; }
-
-    void begin(Pass /*pass*/, std::span<const std::uint8_t> /*packet*/) override {
-        for (Value &value : values_) {
-            value.isPresent = false;
-        }
-    }
-    void key(const KeyView &key) override {
-        if (key.row < columns_.size() && columns_[key.row] != noColumn) {
-            values_[columns_[key.row]] = {key.number, key.type == KeyType::ipv4Address, true};
-        }
-    }
-
-    void write(Output &out) const {
-        TextRoom room;
-        for (const Value &value : values_) {
-            out << ',';
-            if (!value.isPresent) {
-                continue;
-            }
-            if (value.isAddress) {
-                out << ipv4Text(value.number, room);
-            } else {
-                out << value.number;
-            }
-        }
-    }
-
-private:
-    static constexpr std::size_t noColumn = static_cast<std::size_t>(-1);
-    struct Value {
-        std::uint32_t number;
-        bool isAddress;
-        bool isPresent;
-    };
-
-    std::vector<std::size_t> columns_; // by row of the table
-    std::vector<Value> values_;        // by column
-    bool isComplete_ = true;
-};
-
-// The names in the plug-in's key-field table, row by row.
-std::vector<std::string> keyFieldNames(Host &host) {
-    // The plug-in hands its table over in its first XTR pass, whatever the packet.
-    constexpr std::array<std::uint8_t, 1> noPacket = {0};
-    Sink nothing;
-    host.run(Pass::xtr, noPacket, nothing);
-    return host.library().keyFieldNames();
-}
 
 // Seconds since 1970 with nine digits after the point.
 void writeTime(Output &out, const CaptureTime &time) {
@@ -109,7 +38,6 @@ public:
         : Printer(options, out, host),
           columns_(keyColumns(options.columns, options.perChunk)),
           rows_(out, columns_, options.raw),
-          plain_(keyFieldNames(host), columns_),
           view_(host) {
         if (!options.where.empty()) {
             condition_.emplace(parseWhere(options.where));
@@ -129,9 +57,6 @@ public:
     void print(const PacketToPrint &packet) override {
         if (!packet.network.isIp()) {
             printWithoutLayers(packet);
-        } else if (!options().perChunk && !options().raw && plain_.isComplete() &&
-                   isPlainIpv4(packet.network.octets, packet.runOptions().wireOctets)) {
-            printPlain(packet);
         } else {
             view_.read(packet.network.octets, packet.runOptions());
             printLayers(packet);
@@ -141,13 +66,6 @@ public:
     void finish(const Tally & /*tally*/) override {}
 
 private:
-    void printPlain(const PacketToPrint &packet) {
-        const Ending ending = run(Pass::xtr, packet, plain_);
-        startRow(packet, 1, {}, ending == Ending::complete ? "" : "the pass was cut off");
-        plain_.write(out());
-        out() << '\n';
-    }
-
     void printWithoutLayers(const PacketToPrint &packet) {
         note_ = "no IP: ";
         note_ += packet.other;
@@ -170,7 +88,7 @@ private:
             if (condition_ && !meetsCondition(layer)) {
                 continue;
             }
-            startRow(packet, layer.ipLayer, tunnelOf(layer), note);
+            startRow(packet, layer.ipLayer, tunnelOf(view_, layer), note);
             rows_.write(view_, layer.ipLayer, options().perChunk ? &layer : nullptr);
             out() << '\n';
         }
@@ -179,18 +97,6 @@ private:
     [[nodiscard]] bool meetsCondition(const Layer &layer) const {
         return layer.kind == LayerKind::chunk ? condition_->holdsFor(view_, layer.ipLayer, &layer)
                                               : condition_->holdsFor(view_, layer.ipLayer);
-    }
-
-    // How the IP layer came into the one before.
-    [[nodiscard]] std::string_view tunnelOf(const Layer &layer) const {
-        const InnerPacket &packet = view_.packets()[layer.packet];
-        const auto before = std::ranges::find_if(view_.layers(), [&](const Layer &other) {
-            return other.kind == LayerKind::ip && other.packet == layer.packet;
-        });
-        if (before->ipLayer == layer.ipLayer) {
-            return tunnelName(packet.tunnel);
-        }
-        return view_.has(layer, layerField("ip.version")) ? "IP" : "minimal";
     }
 
     void startRow(const PacketToPrint &packet, std::uint32_t layer, std::string_view tunnel, std::string_view note) {
@@ -224,7 +130,6 @@ private:
 
     std::vector<KeyColumn> columns_;
     KeyRows rows_;
-    PlainKeys plain_;
     LayerView view_;
     std::optional<Condition> condition_; // of the rows
     std::string note_;

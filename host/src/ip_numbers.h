@@ -28,11 +28,11 @@ enum IpProtocol : std::uint8_t {
     protocolMobility = 135,
 };
 
-constexpr std::size_t ipv4Octets = 20; // without options
-constexpr std::size_t ipv6Octets = 40;
-constexpr std::size_t ipv6AddressOctets = 16;
-constexpr std::size_t tcpOctets = 20; // without options
-constexpr std::size_t udpOctets = 8;
+constexpr std::uint32_t ipv4Octets = 20; // without options
+constexpr std::uint32_t ipv6Octets = 40;
+constexpr std::uint32_t ipv6AddressOctets = 16;
+constexpr std::uint32_t tcpOctets = 20; // without options
+constexpr std::uint32_t udpOctets = 8;
 
 constexpr std::uint32_t etherIpv4 = 0x0800;
 constexpr std::uint32_t etherIpv6 = 0x86dd;

@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <utility>
 
+#include "ip_numbers.h"
 #include "octets.h"
 #include "ports.h"
 
@@ -15,15 +16,8 @@ using Octets = std::span<const std::uint8_t>;
 constexpr std::uint32_t bitsPerOctet = 8;
 constexpr std::uint32_t wordOctets = 4;
 constexpr std::uint32_t wordBits = 32;
-constexpr std::uint32_t ipv4Octets = 20;
-constexpr std::uint32_t ipv6Octets = 40;
-constexpr std::uint32_t tcpOctets = 20;
-constexpr std::uint32_t udpOctets = 8;
 constexpr std::uint32_t sackBlockOctets = 8;
 constexpr std::uint32_t echoOctets = 8;
-constexpr std::uint8_t icmpProtocol = 1;
-constexpr std::uint8_t tcpProtocol = 6;
-constexpr std::uint8_t udpProtocol = 17;
 
 // The samples. No field has the same value when its octets are read in another order. As DF is set, the fragment offset
 // does not matter to the plug-in.
@@ -204,14 +198,14 @@ bool PlainPackets::findTransport(std::uint8_t protocol, Octets octets, PlainPack
     const std::uint32_t first = found.ip->octets;
     found.isHandedOff = true;
     switch (protocol) {
-    case tcpProtocol: return findTcp(octets, found);
-    case udpProtocol:
+    case protocolTcp: return findTcp(octets, found);
+    case protocolUdp:
         found.transport = &udp_;
         found.transportKind = LayerKind::udp;
         found.payloadOctet = first + udpOctets;
         return found.payloadOctet <= found.endOctet && !isGtpPort(be16(octets, first)) &&
                !isGtpPort(be16(octets, first + 2));
-    case icmpProtocol: {
+    case protocolIcmp: {
         constexpr std::uint32_t echoReply = 0; // type and code
         constexpr std::uint32_t echo = 0x0800;
         const std::uint32_t message = be16(octets, first);
