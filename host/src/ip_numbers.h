@@ -30,7 +30,7 @@ enum IpProtocol : std::uint8_t {
 
 constexpr std::uint32_t ipv4Octets = 20; // without options
 constexpr std::uint32_t ipv6Octets = 40;
-constexpr std::uint32_t ipv6AddressOctets = 16;
+constexpr std::size_t ipv6AddressOctets = 16;
 constexpr std::uint32_t tcpOctets = 20; // without options
 constexpr std::uint32_t udpOctets = 8;
 
