@@ -287,24 +287,61 @@ void addOwnOptions(CLI::App &app, Command command, Options &options) {
     }
 }
 
-// Brings the command's name to the front, so that options may stand before it, and adds the one that
-// 'netfloor FILE' leaves out. Gives whether there was one.
-bool putCommandFirst(const CLI::App &app, std::vector<std::string> &words) {
-    const CLI::App *const common = app.get_subcommand(commandNames.front().name);
+const CommandName *findCommand(const std::string &word) {
+    const auto *const row =
+        std::ranges::find_if(commandNames, [&](const CommandName &name) { return word == name.name; });
+    return row == commandNames.end() ? nullptr : row;
+}
+
+// Options may stand before the command's name. Those of the usual command tell which of them take a value.
+std::vector<std::string>::iterator firstNoOption(std::vector<std::string> &words) {
+    const auto isOption = [](const std::string &word) { return word.starts_with("-") && word != "-"; };
     auto word = words.begin();
-    while (word != words.end() && word->starts_with("-") && *word != "-") {
-        const CLI::Option *const option = common->get_option_no_throw(*word);
+    if (word == words.end() || !isOption(*word)) {
+        return word;
+    }
+    Options unused;
+    CLI::App usual;
+    addOptions(usual, unused);
+    addOwnOptions(usual, commandNames.front().command, unused);
+    while (word != words.end() && isOption(*word)) {
+        const CLI::Option *const option = usual.get_option_no_throw(*word);
         const bool valueFollows = option != nullptr && option->get_items_expected() > 0;
         word += valueFollows && std::next(word) != words.end() ? 2 : 1;
     }
-    const bool named = word != words.end() && std::any_of(commandNames.begin(), commandNames.end(),
-                                                          [&](const CommandName &row) { return *word == row.name; });
-    if (named) {
-        std::rotate(words.begin(), word, word + 1);
-    } else {
+    return word;
+}
+
+// Brings the command's name to the front, and adds the one that 'netfloor FILE' leaves out. Gives whether there was
+// one.
+bool putCommandFirst(std::vector<std::string> &words) {
+    const auto word = firstNoOption(words);
+    if (word == words.end() || findCommand(*word) == nullptr) {
         words.insert(words.begin(), commandNames.front().name);
+        return false;
     }
-    return named;
+    std::rotate(words.begin(), word, word + 1);
+    return true;
+}
+
+void describeCommand(CLI::App &sub, const CommandName &row, Options &options) {
+    if (row.command == Command::fields) {
+        addFieldsOptions(sub, options);
+    } else if (row.command == Command::plan) {
+        addPlanOptions(sub, options);
+    } else {
+        addOptions(sub, options);
+        addOwnOptions(sub, row.command, options);
+    }
+    sub.callback([&options, &row] {
+        options.command = row.command;
+        if (row.command != Command::fields && !options.schema && options.files.empty() && options.shard.empty()) {
+            throw CLI::RequiredError("file"); // CLI11 would name the option
+        }
+        if (row.command == Command::plan && options.shards == 0 && options.shardSize == 0) {
+            throw CLI::RequiredError("--shards N or --shard-size OCTETS");
+        }
+    });
 }
 
 // A command that is misspelt reads like a file.
@@ -335,24 +372,7 @@ std::variant<Options, ExitCode> parseOptions(int argumentCount, char **arguments
     app.footer(footer);
     app.require_subcommand(1);
     for (const CommandName &row : commandNames) {
-        CLI::App *const sub = app.add_subcommand(row.name, row.help);
-        if (row.command == Command::fields) {
-            addFieldsOptions(*sub, options);
-        } else if (row.command == Command::plan) {
-            addPlanOptions(*sub, options);
-        } else {
-            addOptions(*sub, options);
-            addOwnOptions(*sub, row.command, options);
-        }
-        sub->callback([&options, &row] {
-            options.command = row.command;
-            if (row.command != Command::fields && !options.schema && options.files.empty() && options.shard.empty()) {
-                throw CLI::RequiredError("file"); // CLI11 would name the option
-            }
-            if (row.command == Command::plan && options.shards == 0 && options.shardSize == 0) {
-                throw CLI::RequiredError("--shards N or --shard-size OCTETS");
-            }
-        });
+        app.add_subcommand(row.name, row.help);
     }
 
     std::vector<std::string> words(arguments + 1, arguments + argumentCount);
@@ -364,8 +384,11 @@ std::variant<Options, ExitCode> parseOptions(int argumentCount, char **arguments
     if (words.empty()) {
         words.emplace_back("--help");
     }
-    const bool named =
-        std::find(forAll.begin(), forAll.end(), words.front()) != forAll.end() || putCommandFirst(app, words);
+    const bool named = std::find(forAll.begin(), forAll.end(), words.front()) != forAll.end() || putCommandFirst(words);
+    if (const CommandName *const row =
+            findCommand(words.front())) { // to build those of all commands takes longer than to read a small capture
+        describeCommand(*app.get_subcommand(row->name), *row, options);
+    }
     std::reverse(words.begin(), words.end()); // as CLI11 takes them
     try {
         app.parse(words);
