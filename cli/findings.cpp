@@ -5,6 +5,7 @@
 
 #include <netfloor/records.h>
 
+#include "netfloor-host/plain_tcp.h"
 #include "text.h"
 
 namespace netfloor::cli {
@@ -24,15 +25,24 @@ FlagExplainer::FlagExplainer(const FieldTables &tables)
 
 std::span<const Finding> FlagExplainer::explain(std::uint32_t flags, Host &host, std::span<const std::uint8_t> packet,
                                                 const RunOptions &options, std::uint32_t firstOctet) {
+    const std::size_t before = findings_.size();
+    const bool isPlain =
+        flags == NETFLOOR_FLAG_EXPECTATION && options.wireOctets <= packet.size() && isPlainTcp(packet);
+    if (isPlain && plainTcp_) {
+        findings_.push_back(*plainTcp_);
+        return findings().subspan(before);
+    }
     firstOctet_ = firstOctet;
     wanted_ = flags;
     wantsGap_ = (flags & NETFLOOR_FLAG_BITS_LEFT_OVER) != 0;
     wantsLengths_ = (flags & NETFLOOR_FLAG_LIMIT_TOO_LONG) != 0;
     host.run(Pass::md, packet, *this, options);
-    const std::size_t before = findings_.size();
     for (std::uint32_t left = flags; left != 0; left &= left - 1) {
         findings_.push_back(finding(left & -left));
         findings_.back().place.lastOctet += firstOctet_;
+    }
+    if (isPlain && findings_.back().kind == FindingKind::byDesign) {
+        plainTcp_ = findings_.back();
     }
     return findings().subspan(before);
 }

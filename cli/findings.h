@@ -6,6 +6,7 @@
 #include <array>
 #include <bit>
 #include <cstdint>
+#include <optional>
 #include <span>
 #include <string>
 #include <string_view>
@@ -42,7 +43,8 @@ struct Finding {
     bool isShortOfCount = false;
 };
 
-// Finds the places in an MD pass over the packet whose MV pass raised the flags.
+// Finds the places in an MD pass over the packet whose MV pass raised the flags. Every TCP header raises one by design,
+// and in plain TCP packets that is always in the same place: for these, one such pass is enough.
 class FlagExplainer final : public Sink {
 public:
     explicit FlagExplainer(const FieldTables &tables);
@@ -87,6 +89,7 @@ private:
     FieldKnowledge knowledge_;
     std::vector<std::string> flagNames_; // by bit
     std::vector<Finding> findings_;
+    std::optional<Finding> plainTcp_; // that of all plain TCP packets, once one came
 
     // Of the pass.
     std::uint32_t firstOctet_ = 0;

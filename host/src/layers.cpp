@@ -34,6 +34,14 @@ Place placeOf(std::span<const BitRange> ranges) {
             (std::max(front.lastBit, back.lastBit) - 1) / bitsPerOctet + 1};
 }
 
+LayerKind layerKindOf(PlainPart transport) {
+    switch (transport) {
+    case PlainPart::udp: return LayerKind::udp;
+    case PlainPart::icmpEcho: return LayerKind::icmp;
+    default: return LayerKind::tcp;
+    }
+}
+
 } // namespace
 
 LayerView::LayerView(Host &host, LayerReading reading)
@@ -108,24 +116,25 @@ void LayerView::leaveOutMisread(std::size_t firstLayer, std::size_t wireOctets) 
 
 bool LayerView::readPlain(std::span<const std::uint8_t> octets, std::size_t wireOctets) {
     PlainPacket found;
-    if (!plain_ || !host_.owners().isUnchanged() || !plain_->find(octets, wireOctets, found)) {
+    if (!plain_ || !plain_->isUsable() || !host_.owners().isUnchanged() || !findPlain(octets, wireOctets, found)) {
         return false;
     }
     if (!openLayer(LayerKind::ip, offset_)) {
         return true;
     }
-    addHeader(*found.ip, offset_);
-    if (found.transport == nullptr) {
+    addHeader(plain_->header(found.ip), offset_);
+    if (!found.transport) {
         return true;
     }
-    const std::uint32_t transport = offset_ + found.ip->octets;
-    (void)openLayer(found.transportKind, transport); // only those of IP have a limit
-    addHeader(*found.transport, transport);
+    const std::uint32_t transport = offset_ + octetsOf(found.ip);
+    (void)openLayer(layerKindOf(*found.transport), transport); // only those of IP have a limit
+    addHeader(plain_->header(*found.transport), transport);
     for (std::uint32_t i = 0; i < found.optionCount; ++i) {
-        addHeader(*found.options[i].header, offset_ + found.options[i].octet);
+        addHeader(plain_->header(found.options[i].part), offset_ + found.options[i].octet);
     }
     constexpr std::uint32_t mostUnread = 4; // the plug-in does not hand off so few
-    if (found.isHandedOff && found.endOctet - found.payloadOctet > mostUnread) {
+    const bool isHandedOff = found.transport != PlainPart::icmpEcho;
+    if (isHandedOff && found.endOctet - found.payloadOctet > mostUnread) {
         const auto end = std::min(found.endOctet, static_cast<std::uint32_t>(octets.size()));
         keepPayload(dataName, {}, offset_ + found.payloadOctet, offset_ + end);
     }

@@ -5,8 +5,6 @@
 #include <utility>
 
 #include "ip_numbers.h"
-#include "octets.h"
-#include "ports.h"
 
 namespace netfloor {
 namespace {
@@ -16,8 +14,6 @@ using Octets = std::span<const std::uint8_t>;
 constexpr std::uint32_t bitsPerOctet = 8;
 constexpr std::uint32_t wordOctets = 4;
 constexpr std::uint32_t wordBits = 32;
-constexpr std::uint32_t sackBlockOctets = 8;
-constexpr std::uint32_t echoOctets = 8;
 
 // The samples. No field has the same value when its octets are read in another order. As DF is set, the fragment offset
 // does not matter to the plug-in.
@@ -146,135 +142,24 @@ private:
 } // namespace
 
 PlainPackets::PlainPackets(Host &host, const LayerFieldMap &map) {
+    const auto take = [this](Sample &sample, PlainPart part, std::uint32_t firstOctet) {
+        headers_[static_cast<std::size_t>(part)] = sample.header(firstOctet, octetsOf(part));
+        isUsable_ &= sample.isUsable();
+    };
     Sample tcp(host, map, tcpSample);
-    ipv4_ = tcp.header(0, ipv4Octets);
-    tcp_ = tcp.header(ipv4Octets, tcpOctets);
-    maximumSegment_ = tcp.header(optionsOctet, 4);
-    sackPermitted_ = tcp.header(optionsOctet + 4, 2);
-    windowScale_ = tcp.header(optionsOctet + 6, 3);
-    sackBlock_ = tcp.header(optionsOctet + 12, sackBlockOctets);
-    timestamps_ = tcp.header(optionsOctet + 20, 10);
+    take(tcp, PlainPart::ipv4, 0);
+    take(tcp, PlainPart::tcp, ipv4Octets);
+    take(tcp, PlainPart::maximumSegment, optionsOctet);
+    take(tcp, PlainPart::sackPermitted, optionsOctet + 4);
+    take(tcp, PlainPart::windowScale, optionsOctet + 6);
+    take(tcp, PlainPart::sackBlock, optionsOctet + 12);
+    take(tcp, PlainPart::timestamps, optionsOctet + 20);
     Sample udp(host, map, udpSample);
-    udp_ = udp.header(ipv4Octets, udpOctets);
+    take(udp, PlainPart::udp, ipv4Octets);
     Sample echo(host, map, echoSample);
-    icmpEcho_ = echo.header(ipv4Octets, echoOctets);
+    take(echo, PlainPart::icmpEcho, ipv4Octets);
     Sample ipv6(host, map, ipv6Sample);
-    ipv6_ = ipv6.header(0, ipv6Octets);
-    isUsable_ = tcp.isUsable() && udp.isUsable() && echo.isUsable() && ipv6.isUsable();
-}
-
-bool PlainPackets::find(Octets octets, std::size_t wireOctets, PlainPacket &found) const {
-    if (!isUsable_ || octets.size() < ipv4Octets + udpOctets) {
-        return false;
-    }
-    std::uint8_t protocol = 0;
-    bool isLaterFragment = false;
-    if (octets[0] == 0x45) {
-        found.ip = &ipv4_;
-        found.endOctet = be16(octets, 2);
-        protocol = octets[9];
-        isLaterFragment = (be16(octets, 6) & 0x1fffU) != 0;
-    } else if (octets[0] >> 4U == 6 && octets.size() >= ipv6Octets + udpOctets) {
-        found.ip = &ipv6_;
-        found.endOctet = ipv6Octets + be16(octets, 4);
-        protocol = octets[6];
-    } else {
-        return false;
-    }
-    found.optionCount = 0;
-    if (found.endOctet < found.ip->octets || found.endOctet > std::max(octets.size(), wireOctets)) {
-        return false;
-    }
-    if (isLaterFragment) {
-        found.transport = nullptr;
-        return true;
-    }
-    // A pass looks up to four octets ahead; what it sees there must have been captured.
-    return findTransport(protocol, octets, found) &&
-           (found.endOctet <= octets.size() || found.payloadOctet + wordOctets <= octets.size());
-}
-
-bool PlainPackets::findTransport(std::uint8_t protocol, Octets octets, PlainPacket &found) const {
-    const std::uint32_t first = found.ip->octets;
-    found.isHandedOff = true;
-    switch (protocol) {
-    case protocolTcp: return findTcp(octets, found);
-    case protocolUdp:
-        found.transport = &udp_;
-        found.transportKind = LayerKind::udp;
-        found.payloadOctet = first + udpOctets;
-        return found.payloadOctet <= found.endOctet && !isGtpPort(be16(octets, first)) &&
-               !isGtpPort(be16(octets, first + 2));
-    case protocolIcmp: {
-        constexpr std::uint32_t echoReply = 0; // type and code
-        constexpr std::uint32_t echo = 0x0800;
-        const std::uint32_t message = be16(octets, first);
-        found.transport = &icmpEcho_;
-        found.transportKind = LayerKind::icmp;
-        found.payloadOctet = first + echoOctets;
-        found.isHandedOff = false;
-        return found.ip == &ipv4_ && (message == echo || message == echoReply) && found.payloadOctet <= found.endOctet;
-    }
-    default: return false;
-    }
-}
-
-bool PlainPackets::findTcp(Octets octets, PlainPacket &found) const {
-    constexpr std::uint32_t dataOffset = 12;
-    const std::uint32_t first = found.ip->octets;
-    if (first + tcpOctets > std::min<std::size_t>(found.endOctet, octets.size())) {
-        return false;
-    }
-    const std::uint32_t header = (octets[first + dataOffset] >> 4U) * wordOctets;
-    found.transport = &tcp_;
-    found.transportKind = LayerKind::tcp;
-    found.payloadOctet = first + header;
-    if (header < tcpOctets || found.payloadOctet > std::min<std::size_t>(found.endOctet, octets.size())) {
-        return false;
-    }
-    const std::uint32_t options = first + tcpOctets;
-    return findOptions(octets.subspan(options, found.payloadOctet - options), options, found);
-}
-
-// Options of a length that is not theirs, and those of a length that varies, are left to the pass.
-bool PlainPackets::findOptions(Octets area, std::uint32_t octet, PlainPacket &found) const {
-    constexpr std::uint8_t lastOfOneOctet = 1; // end of list, which ends nothing for the plug-in, and no operation
-    constexpr std::uint8_t md5Signature = 19;
-    std::size_t at = 0;
-    while (at < area.size()) {
-        if (area[at] <= lastOfOneOctet) {
-            ++at;
-            continue;
-        }
-        const PlainHeader *const header = option(area[at]);
-        if (header == nullptr) {
-            return area[at] != md5Signature; // for the plug-in all others make the rest padding
-        }
-        const bool isSack = header == &sackBlock_;
-        const std::uint32_t headOctets = isSack ? 2 : 0;
-        const std::uint32_t length = at + 1 < area.size() ? area[at + 1] : 0;
-        if (length < header->octets || at + length > area.size() || (length - headOctets) % header->octets != 0 ||
-            (!isSack && length != header->octets)) {
-            return false;
-        }
-        const auto first = octet + static_cast<std::uint32_t>(at);
-        for (std::uint32_t part = headOctets; part < length; part += header->octets) {
-            found.options[found.optionCount++] = {header, first + part};
-        }
-        at += length;
-    }
-    return true;
-}
-
-const PlainHeader *PlainPackets::option(std::uint8_t kind) const {
-    switch (kind) {
-    case 2: return &maximumSegment_;
-    case 3: return &windowScale_;
-    case 4: return &sackPermitted_;
-    case 5: return &sackBlock_;
-    case 8: return &timestamps_;
-    default: return nullptr;
-    }
+    take(ipv6, PlainPart::ipv6, 0);
 }
 
 } // namespace netfloor

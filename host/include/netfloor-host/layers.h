@@ -44,7 +44,6 @@ struct Layer {
 
 class PlainPackets;
 struct PlainHeader;
-struct PlainPacket;
 
 // How a view reads packets.
 enum class LayerReading : std::uint8_t {
