@@ -28,7 +28,7 @@ struct OctetSpan {
     if (field.ranges.empty()) {
         return std::nullopt;
     }
-    // Some fields are read from the last octet on.
+    // Some fields are read from the last octet on, in many pieces.
     std::uint32_t first = field.ranges[0].firstBit;
     std::uint32_t last = field.ranges[0].lastBit;
     for (std::size_t i = 1; i < field.ranges.size(); ++i) {

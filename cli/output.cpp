@@ -26,40 +26,6 @@ constexpr std::string_view startOf(Style style) {
     return "";
 }
 
-constexpr bool isPrintable(unsigned char octet) {
-    return octet >= 0x20 && octet < 0x7f;
-}
-
-constexpr std::size_t wordOctets = 8;
-
-std::uint64_t loadWord(const char *text) {
-    std::uint64_t word = 0;
-    std::memcpy(&word, text, sizeof word);
-    return word;
-}
-
-// Has the top bit of an octet set if one of the characters is not printable: below a blank, DEL, or with its own top
-// bit set. A borrow or a carry goes only to octets above one for which the answer is known already.
-constexpr std::uint64_t unprintableIn(std::uint64_t word) {
-    constexpr std::uint64_t ones = 0x0101010101010101;
-    return (word | (word - ones * 0x20) | (word + ones)) & ones * 0x80;
-}
-
-bool areAllPrintable(std::string_view text) {
-    if (text.size() < wordOctets) {
-        bool all = true;
-        for (const char character : text) {
-            all &= isPrintable(static_cast<unsigned char>(character));
-        }
-        return all;
-    }
-    std::uint64_t found = unprintableIn(loadWord(text.data() + text.size() - wordOctets));
-    for (std::size_t i = 0; i + wordOctets < text.size(); i += wordOctets) {
-        found |= unprintableIn(loadWord(text.data() + i));
-    }
-    return found == 0;
-}
-
 void writeOut(std::string_view text) {
     while (!text.empty()) {
         const ssize_t written = ::write(STDOUT_FILENO, text.data(), text.size());
@@ -82,11 +48,7 @@ void Output::octet(std::uint8_t octet) {
     next_ = to + 2;
 }
 
-void Output::untrusted(std::string_view text) {
-    if (areAllPrintable(text)) {
-        *this << text;
-        return;
-    }
+void Output::escaped(std::string_view text) {
     for (const char character : text) {
         const auto octet = static_cast<unsigned char>(character);
         if (isPrintable(octet)) {
@@ -109,16 +71,27 @@ Output &Output::startStyle(Style style) {
 }
 
 void Output::rightAligned(std::string_view text, std::size_t width) {
-    if (text.size() < width) {
-        blanks(width - text.size());
+    char *const to = roomAfterBlanks(text.size() < width ? width - text.size() : 0, text.size());
+    if (!text.empty()) {
+        std::memcpy(to, text.data(), text.size());
     }
-    *this << text;
+    next_ = to + text.size();
 }
 
 void Output::rightAligned(std::uint64_t number, std::size_t width) {
-    std::array<char, mostDigits> text;
-    const char *const end = std::to_chars(text.data(), text.data() + text.size(), number).ptr;
-    rightAligned(std::string_view(text.data(), end), width);
+    constexpr std::uint64_t base = 10;
+    char *const end = roomAfterBlanks(width, 0);
+    std::uint64_t rest = number;
+    std::size_t digits = 0;
+    do {
+        end[-static_cast<std::ptrdiff_t>(++digits)] = static_cast<char>('0' + rest % base);
+        rest /= base;
+    } while (rest != 0 && digits < width);
+    if (rest == 0) {
+        next_ = end;
+    } else { // it is wider
+        *this << number;
+    }
 }
 
 void Output::flush() {

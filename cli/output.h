@@ -69,8 +69,16 @@ public:
     // Two digits.
     void octet(std::uint8_t octet);
 
-    // Text that came out of a packet: what a terminal would not just print is shown as \x1b.
-    void untrusted(std::string_view text);
+    // Text that came out of a packet, after blanks: what a terminal would not just print is shown as \x1b.
+    void untrusted(std::string_view text, std::size_t blanksBefore = 0) {
+        char *const to = roomAfterBlanks(blanksBefore, text.size());
+        next_ = to;
+        if (copyPrintable(text, to)) {
+            next_ = to + text.size();
+        } else {
+            escaped(text);
+        }
+    }
 
     // What stands between the two is in that style, if there is colour.
     Output &start(Style style) { return colour_ ? startStyle(style) : *this; }
@@ -126,6 +134,44 @@ private:
     static constexpr std::size_t flushOctets = std::size_t{256} * 1024;
     static constexpr std::size_t firstRoom = flushOctets + std::size_t{64} * 1024;
     static constexpr std::size_t mostDigits = 24;
+    static constexpr std::size_t usualBlanks = 32;
+    static constexpr std::size_t wordOctets = 8;
+
+    [[nodiscard]] static std::uint64_t loadWord(const char *text) {
+        std::uint64_t word = 0;
+        std::memcpy(&word, text, sizeof word);
+        return word;
+    }
+    // Has the top bit of an octet set if one of the characters is not printable: below a blank, DEL, or with its own
+    // top bit set. A borrow or a carry goes only to octets above one for which the answer is known already.
+    [[nodiscard]] static constexpr std::uint64_t unprintableIn(std::uint64_t word) {
+        constexpr std::uint64_t ones = 0x0101010101010101;
+        return (word | (word - ones * 0x20) | (word + ones)) & ones * 0x80;
+    }
+    [[nodiscard]] static constexpr bool isPrintable(unsigned char octet) { return octet >= 0x20 && octet < 0x7f; }
+
+    // Copies a text and tells whether all of it is printable, in one go.
+    [[nodiscard]] static bool copyPrintable(std::string_view text, char *to) {
+        if (text.size() < wordOctets) {
+            bool all = true;
+            for (std::size_t i = 0; i < text.size(); ++i) {
+                all &= isPrintable(static_cast<unsigned char>(text[i]));
+                to[i] = text[i];
+            }
+            return all;
+        }
+        const std::size_t last = text.size() - wordOctets; // overlaps the word before
+        std::uint64_t word = loadWord(text.data() + last);
+        std::uint64_t found = unprintableIn(word);
+        std::memcpy(to + last, &word, sizeof word);
+        for (std::size_t i = 0; i < last; i += wordOctets) {
+            word = loadWord(text.data() + i);
+            found |= unprintableIn(word);
+            std::memcpy(to + i, &word, sizeof word);
+        }
+        return found == 0;
+    }
+    void escaped(std::string_view text);
 
     // The end of the text, with room for so many octets.
     [[nodiscard]] char *room(std::size_t octets) {
@@ -133,6 +179,16 @@ private:
             grow(octets);
         }
         return next_;
+    }
+    // The end of so many blanks after the text, with room for so many octets. They are not part of the text yet.
+    [[nodiscard]] char *roomAfterBlanks(std::size_t blanks, std::size_t octets) {
+        char *const to = room(blanks + usualBlanks + octets);
+        if (blanks > usualBlanks) {
+            std::memset(to, ' ', blanks);
+        } else {
+            std::memset(to, ' ', usualBlanks); // of a known size, which is one or two instructions
+        }
+        return to + blanks;
     }
     Output &advanceTo(char *end) {
         next_ = end;

@@ -12,12 +12,7 @@ namespace {
 
 constexpr std::uint32_t nanosecondsPerSecond = 1'000'000'000;
 
-template <typename Number>
-void append(std::string &text, Number number) {
-    std::array<char, 24> digits{};
-    const auto end = std::to_chars(digits.data(), digits.data() + digits.size(), number);
-    text.append(digits.data(), end.ptr);
-}
+using Room = std::array<char, 40>; // for the longest number of seconds, with nine digits after it
 
 } // namespace
 
@@ -38,6 +33,13 @@ const std::string &TimeText::text(const CapturedPacket &packet) {
     return text_;
 }
 
+template <typename Seconds>
+void TimeText::writeSeconds(Seconds seconds, std::uint32_t nanoseconds) {
+    Room room;
+    char *const end = std::to_chars(room.data(), room.data() + room.size(), seconds).ptr;
+    text_.append(room.data(), writeFraction(end, nanoseconds));
+}
+
 // The larger minus the smaller: a difference of two signed numbers always fits into the unsigned one.
 void TimeText::writeSinceFirst(const CaptureTime &time) {
     const bool isEarlier = time < *start_.time;
@@ -52,8 +54,7 @@ void TimeText::writeSinceFirst(const CaptureTime &time) {
     if (isEarlier) {
         text_ += '-';
     }
-    append(text_, seconds);
-    writeFraction(nanoseconds);
+    writeSeconds(seconds, nanoseconds);
 }
 
 void TimeText::writeDate(const CaptureTime &time) {
@@ -68,22 +69,22 @@ void TimeText::writeDate(const CaptureTime &time) {
         }
     }
     if (date_.empty()) { // a year that has no calendar
-        append(text_, time.seconds);
-        writeFraction(time.nanoseconds);
-        return;
+        return writeSeconds(time.seconds, time.nanoseconds);
     }
-    text_ += date_;
-    writeFraction(time.nanoseconds);
-    text_ += 'Z';
+    Room room;
+    char *const end = writeFraction(room.data(), time.nanoseconds);
+    text_.append(date_).append(room.data(), end) += 'Z';
 }
 
-void TimeText::writeFraction(std::uint32_t nanoseconds) {
-    std::array<char, 9> digits{};
-    for (std::size_t i = digits.size(); i > 0; nanoseconds /= 10) {
-        digits[--i] = static_cast<char>('0' + nanoseconds % 10);
+char *TimeText::writeFraction(char *to, std::uint32_t nanoseconds) const {
+    constexpr unsigned microsecondDigits = 6;
+    constexpr std::uint32_t nanosecondsPerMicrosecond = 1000;
+    std::uint32_t rest = start_.digits == microsecondDigits ? nanoseconds / nanosecondsPerMicrosecond : nanoseconds;
+    *to++ = '.';
+    for (std::size_t i = start_.digits; i > 0; rest /= 10) {
+        to[--i] = static_cast<char>('0' + rest % 10);
     }
-    text_ += '.';
-    text_.append(digits.data(), start_.digits);
+    return to + start_.digits;
 }
 
 } // namespace netfloor

@@ -29,16 +29,17 @@ struct DataRun {
     void begin(const FieldView &field, Output::Mark mark) {
         octets = 0;
         if (isOneOctet(field)) {
-            *this = {field.id, field.name, octetsOf(field)->first, 1, field.depth, mark};
+            *this = {field.id, field.name, octetOf(field), 1, field.depth, mark};
         }
     }
 
     [[nodiscard]] bool continues(const FieldView &field) const {
-        return octets != 0 && field.id == id && isOneOctet(field) && octetsOf(field)->first == first + octets &&
-               field.depth == depth && field.name == name;
+        return octets != 0 && field.id == id && isOneOctet(field) && octetOf(field) == first + octets &&
+               field.depth == depth && (field.name.data() == name.data() || field.name == name);
     }
 
 private:
+    [[nodiscard]] static std::uint32_t octetOf(const FieldView &field) { return (field.ranges[0].firstBit - 1) / 8; }
     [[nodiscard]] static bool isOneOctet(const FieldView &field) {
         constexpr std::uint32_t bitsPerOctet = 8;
         return field.ranges.size() == 1 && field.ranges[0].firstBit % bitsPerOctet == 1 &&

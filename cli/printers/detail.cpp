@@ -6,6 +6,7 @@
 
 #include "netfloor-host/checks.h"
 #include "netfloor-host/inner_packets.h"
+#include "netfloor-host/plain_tcp.h"
 #include "printers/printer.h"
 #include "printers/tree.h"
 
@@ -66,6 +67,9 @@ private:
 
     // Which fields are not to be believed.
     void printMisread(const PacketToPrint &packet) {
+        if (isPlainTcp(packet.network.octets)) { // they are
+            return;
+        }
         for (const Fault &fault : checks_.check(packet.network.octets, packet.runOptions().wireOctets)) {
             if (fault.kind == FaultKind::misread) {
                 text_.clear();

@@ -12,12 +12,6 @@ namespace {
 
 constexpr std::uint32_t bitsPerOctet = 8;
 
-// What stands after the field's name in its text; none where there is only a name.
-std::optional<std::string_view> shownValue(std::string_view text) {
-    const auto equals = text.find('=');
-    return equals == std::string_view::npos ? std::nullopt : std::optional(text.substr(equals + 1));
-}
-
 // Whether the text is the number in hexadecimal, or ends with "(number)".
 bool showsNumber(std::string_view text, std::uint32_t number) {
     std::array<char, 12> room;
@@ -63,12 +57,10 @@ void writeOctetNumbers(Output &out, OctetSpan octets) {
     out << "octets " << octets.first << " to " << octets.end - 1;
 }
 
-std::string_view nameOf(const FieldView &field) {
-    return field.name.empty() ? "(without a name)" : field.name;
-}
-
 std::optional<OctetSpan> unshownOctets(const FieldView &field, std::uint32_t bits, std::string_view text) {
-    if (shownValue(text).value_or("").find_first_not_of("0123456789abcdef") != std::string_view::npos) {
+    const auto equals = text.find('=');
+    if (equals != std::string_view::npos &&
+        text.find_first_not_of("0123456789abcdef", equals + 1) != std::string_view::npos) {
         return std::nullopt;
     }
     const OctetSpan octets = *octetsOf(field);
@@ -77,10 +69,14 @@ std::optional<OctetSpan> unshownOctets(const FieldView &field, std::uint32_t bit
 }
 
 bool showsItsNumber(std::string_view text, std::uint32_t number) {
-    const auto shown = shownValue(text);
+    const auto equals = text.find('=');
+    if (equals == std::string_view::npos) {
+        return true;
+    }
     // A text that starts with a digit is a number; a single letter is an octet of text.
-    const bool isName = shown && (shown->empty() || (shown->size() > 1 && isLetter(shown->front())));
-    return !isName || showsNumber(*shown, number);
+    const std::string_view shown = text.substr(equals + 1);
+    const bool isName = shown.empty() || (shown.size() > 1 && isLetter(shown.front()));
+    return !isName || showsNumber(shown, number);
 }
 
 } // namespace netfloor::cli

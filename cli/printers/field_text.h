@@ -19,7 +19,9 @@ void writeBits(Output &out, std::span<const BitRange> ranges, std::uint32_t bits
 // "octet 7", "octets 7 to 9"
 void writeOctetNumbers(Output &out, OctetSpan octets);
 
-[[nodiscard]] std::string_view nameOf(const FieldView &field);
+[[nodiscard]] inline std::string_view nameOf(const FieldView &field) {
+    return field.name.empty() ? "(without a name)" : field.name;
+}
 
 [[nodiscard]] inline std::uint32_t bitCount(std::span<const BitRange> ranges) {
     std::uint32_t bits = 0;

@@ -5,8 +5,6 @@
 #include <string>
 
 #include "netfloor-host/value_text.h"
-#include "printers/field_text.h"
-#include "text.h"
 
 namespace netfloor::cli {
 
@@ -43,10 +41,12 @@ void Tree::blockOpened(const BlockView &block) {
 }
 
 void Tree::field(const FieldView &field) {
-    if (run_.continues(field)) {
-        return addToRun(field);
+    if (run_.octets != 0) {
+        if (run_.continues(field)) {
+            return addToRun(field);
+        }
+        endRun();
     }
-    endRun();
     out_.mayFlush();
     const auto octets = octetsOf(field);
     const std::uint32_t passed = octetOf(field.cursor);
@@ -58,7 +58,7 @@ void Tree::field(const FieldView &field) {
         }
     }
     const std::string_view text = field.text.view();
-    if (isReadAgain(field, text)) {
+    if (text.empty() && isReadAgain(field)) {
         return;
     }
     if (!all_) {
@@ -85,9 +85,9 @@ void Tree::endRun() {
     run_.octets = 0;
 }
 
-bool Tree::isReadAgain(const FieldView &field, std::string_view text) const {
-    return !all_ && text.empty() && !addressName_.empty() && field.name == addressName_ &&
-           ipv6Address(field, packet_) && field.ranges.front().firstBit == addressBit_;
+bool Tree::isReadAgain(const FieldView &field) const {
+    return !all_ && !addressName_.empty() && field.name == addressName_ && ipv6Address(field, packet_) &&
+           field.ranges.front().firstBit == addressBit_;
 }
 
 void Tree::writeGaps(std::uint32_t octet, std::uint32_t depth) {
@@ -121,30 +121,41 @@ void Tree::writeOpened(const FieldView &field, OctetSpan octets) {
 
 void Tree::writeField(const FieldView &field, std::string_view text) {
     const std::uint32_t bits = bitCount(field.ranges);
+    addressName_ = {};
+    if (bits > numberBits) {
+        return writeWide(field, bits, text);
+    }
+    writeText(field, text);
+    if ((bits == bitsPerOctet || bits == 2 * bitsPerOctet) && !showsItsNumber(text, field.value)) {
+        (out_.start(Style::dim) << "  (" << field.value << ')').stop(Style::dim); // of types and codes, no single bits
+    }
+    endField(field);
+}
+
+void Tree::writeWide(const FieldView &field, std::uint32_t bits, std::string_view text) {
     const auto address = bits == addressBits && field.id != 0 ? ipv6Address(field, packet_) : std::nullopt;
-    addressName_ = address ? field.name : std::string_view();
-    addressBit_ = address ? field.ranges.front().firstBit : 0;
+    if (address) {
+        addressName_ = field.name;
+        addressBit_ = field.ranges.front().firstBit;
+        writeText(field, text);
+        TextRoom room;
+        (out_.start(Style::good) << "  (" << ipv6Text(*address, room) << ')').stop(Style::good);
+        return endField(field);
+    }
     const bool isPayload = field.id == 0 && !text.empty(); // the host's own line on it
-    if (bits > numberBits && !address && !isPayload) {
+    if (!isPayload) {
         if (const auto octets = unshownOctets(field, bits, text)) {
             return writeOctets(nameOf(field), *octets, field.depth);
         }
     }
-    newLine(field.depth);
-    const std::string_view shown = withoutLeadingBlanks(text);
-    out_.untrusted(shown.empty() ? nameOf(field) : shown);
-    if (address) {
-        TextRoom room;
-        (out_.start(Style::good) << "  (" << ipv6Text(*address, room) << ')').stop(Style::good);
-    } else if ((bits == bitsPerOctet || bits == 2 * bitsPerOctet) && !showsItsNumber(text, field.value)) {
-        (out_.start(Style::dim) << "  (" << field.value << ')').stop(Style::dim); // of types and codes, no single bits
-    }
-    if (bits_ && !field.ranges.empty()) {
-        out_.start(Style::dim) << "  [";
-        writeBits(out_, field.ranges, firstOctet_ * bitsPerOctet);
-        (out_ << ']').stop(Style::dim);
-    }
-    out_ << '\n';
+    writeText(field, text);
+    endField(field);
+}
+
+void Tree::writeFieldBits(const FieldView &field) {
+    out_.start(Style::dim) << "  [";
+    writeBits(out_, field.ranges, firstOctet_ * bitsPerOctet);
+    (out_ << ']').stop(Style::dim);
 }
 
 // Octets as they stand in the packet.

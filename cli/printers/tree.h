@@ -13,6 +13,8 @@
 #include "options.h"
 #include "output.h"
 #include "printers/data_run.h"
+#include "printers/field_text.h"
+#include "text.h"
 
 namespace netfloor::cli {
 
@@ -40,10 +42,11 @@ private:
     void endRun();
 
     // An address is read a second time for its key, without a text.
-    [[nodiscard]] bool isReadAgain(const FieldView &field, std::string_view text) const;
+    [[nodiscard]] bool isReadAgain(const FieldView &field) const;
 
+    [[nodiscard]] static std::size_t indent(std::uint32_t depth) { return 2 * (std::size_t{depth} + 1); }
     void newLine(std::uint32_t depth, std::size_t extra = 0) {
-        out_.blanks(2 * (std::size_t{depth} + 1 + extra));
+        out_.blanks(indent(depth) + 2 * extra);
         depth_ = depth;
     }
     void writeGapsBefore(std::uint32_t octet, std::uint32_t depth) {
@@ -56,6 +59,20 @@ private:
     // A field of octets that hold the packet that was opened.
     void writeOpened(const FieldView &field, OctetSpan octets);
     void writeField(const FieldView &field, std::string_view text);
+    void writeText(const FieldView &field, std::string_view text) {
+        const std::string_view shown = withoutLeadingBlanks(text);
+        depth_ = field.depth;
+        out_.untrusted(shown.empty() ? nameOf(field) : shown, indent(field.depth));
+    }
+    // A field of more bits than a number holds.
+    void writeWide(const FieldView &field, std::uint32_t bits, std::string_view text);
+    void endField(const FieldView &field) {
+        if (bits_ && !field.ranges.empty()) {
+            writeFieldBits(field);
+        }
+        out_ << '\n';
+    }
+    void writeFieldBits(const FieldView &field);
     void writeOctets(std::string_view name, OctetSpan octets, std::uint32_t depth);
 
     bool all_;

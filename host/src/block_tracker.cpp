@@ -8,22 +8,8 @@
 
 namespace netfloor {
 
-namespace {
-
-constexpr std::size_t usualDepth = 32;
-
-template <typename Element>
-void makeRoom(std::vector<Element> &elements, std::size_t count) {
-    if (elements.size() < count) {
-        elements.resize(2 * count);
-    }
-}
-
-} // namespace
-
-BlockTracker::BlockTracker(FieldNames &names)
-    : names_(names), views_(usualDepth), levels_(usualDepth), shown_(usualDepth) {
-    toOpen_.reserve(usualDepth);
+BlockTracker::BlockTracker(FieldNames &names) : names_(names), views_(room_), levels_(room_), shown_(shownRoom_) {
+    toOpen_.reserve(shownRoom_);
 }
 
 void BlockTracker::reset() {
@@ -69,8 +55,11 @@ std::uint32_t BlockTracker::levelsKept(const DecodeState &state, std::uint32_t d
 }
 
 void BlockTracker::open(std::uint32_t firstBit, std::uint32_t limitDepth) {
-    makeRoom(views_, depth_ + std::size_t{1});
-    makeRoom(levels_, depth_ + std::size_t{1});
+    if (depth_ == room_) {
+        room_ *= 2;
+        views_.resize(room_);
+        levels_.resize(room_);
+    }
     Level &level = levels_[depth_];
     level = {};
     level.limitDepth = limitDepth;
@@ -135,7 +124,10 @@ void BlockTracker::show(Sink &sink) {
 }
 
 void BlockTracker::openInSink(std::uint32_t level, Sink &sink) {
-    makeRoom(shown_, shownDepth_ + std::size_t{1});
+    if (shownDepth_ == shownRoom_) {
+        shownRoom_ *= 2;
+        shown_.resize(shownRoom_);
+    }
     BlockView &view = views_[level];
     view.continued = levels_[level].wasShown;
     levels_[level].wasShown = true;

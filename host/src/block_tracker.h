@@ -87,7 +87,11 @@ private:
 
     FieldNames &names_;
 
+    static constexpr std::uint32_t usualDepth = 32;
+
     // Room that only grows, and how much of it is in use.
+    std::uint32_t room_ = usualDepth;
+    std::uint32_t shownRoom_ = usualDepth;
     std::vector<BlockView> views_; // of the open blocks, the outermost first
     std::vector<Level> levels_;    // the same
     std::vector<BlockView> shown_; // those that are open in the sink

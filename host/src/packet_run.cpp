@@ -243,6 +243,25 @@ HandOff PacketRun::describeHandOff() const {
     return record;
 }
 
+// Completes the view by what the decode state tells. Inside its callers: it is what most of the MD pass's time in the
+// host goes to.
+[[gnu::always_inline]] inline void PacketRun::reportField(NamedField &field) {
+    const DecodeState &state = *state_;
+    view_.flags = state.flags;
+    view_.cursor = state.cursor;
+    if (withBlocks_) {
+        blocks_.moveTo(state, field, *sink_);
+        view_.depth = blocks_.shownDepth();
+        view_.blocks = blocks_.open();
+        view_.blockName = LazyText(view_.blocks.empty() ? std::string_view() : view_.blocks.back().name);
+    } else {
+        view_.depth = 0;
+        view_.blocks = {};
+        view_.blockName = withBlockNames_ ? LazyText(names_.blockName(field, state.blockName)) : LazyText();
+    }
+    sink_->field(view_);
+}
+
 void PacketRun::addField(std::uint32_t outputRangeCount, const BitRange *ranges, const char *display,
                          const char *fieldName, std::uint32_t fieldId, std::uint32_t bitOrder) noexcept {
     if (exception_) {
@@ -254,7 +273,6 @@ void PacketRun::addField(std::uint32_t outputRangeCount, const BitRange *ranges,
     }
     try {
         NamedField &field = names_.find(fieldId);
-        const std::uint8_t *const head = fieldRecordHead();
         const LazyText reportedName(fieldName);
         view_.id = fieldId;
         view_.name = field.isKnown ? field.name : withoutLeadingBlanks(reportedName.view());
@@ -264,8 +282,8 @@ void PacketRun::addField(std::uint32_t outputRangeCount, const BitRange *ranges,
         view_.value = state().fieldRecord.value;
         view_.ranges = {ranges, outputRangeCount};
         view_.bitOrder = bitOrder;
-        view_.recordHead = {head[0], head[1], head[2]};
-        if ((!cut_.isCut() || isCaptured(view_.name, view_.ranges)) && isWanted) {
+        std::memcpy(view_.recordHead.data(), fieldRecordHead(), headOctets);
+        if (!cut_.isCut() || (isCaptured(view_.name, view_.ranges) && isWanted)) {
             reportField(field);
         }
         preDecode_.context.fieldRecordCount = (preDecode_.context.fieldRecordCount + 1) % fieldRecordCount;
@@ -355,23 +373,6 @@ bool PacketRun::isCaptured(std::string_view name, std::span<const BitRange> rang
         sink_->notCaptured({name, state().flags});
     }
     return !isReadToCut_;
-}
-
-// Completes the view by what the decode state tells.
-void PacketRun::reportField(NamedField &field) {
-    view_.flags = state().flags;
-    view_.cursor = state().cursor;
-    if (withBlocks_) {
-        blocks_.moveTo(state(), field, *sink_);
-        view_.depth = blocks_.shownDepth();
-        view_.blocks = blocks_.open();
-        view_.blockName = LazyText(view_.blocks.empty() ? std::string_view() : view_.blocks.back().name);
-    } else {
-        view_.depth = 0;
-        view_.blocks = {};
-        view_.blockName = withBlockNames_ ? LazyText(names_.blockName(field, state().blockName)) : LazyText();
-    }
-    sink_->field(view_);
 }
 
 void PacketRun::keepException() noexcept {

@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <charconv>
 #include <cstddef>
+#include <cstring>
 #include <string_view>
 
 #include <netfloor/records.h>
@@ -36,6 +37,13 @@ public:
     explicit TextWriter(TextRoom &room) : room_(room), end_(room.data()) {}
 
     void character(char character) { *end_++ = character; }
+    // All of the array is copied, and so many of it count: a copy of known size needs no call.
+    template <std::size_t Size>
+    void text(const std::array<char, Size> &text, std::size_t count) {
+        std::memcpy(end_, text.data(), Size);
+        end_ += count;
+    }
+    void takeBack(std::size_t count) { end_ -= count; }
     void text(std::string_view text) { end_ += text.copy(end_, static_cast<std::size_t>(limit() - end_)); }
     void number(std::uint32_t number, int base) { end_ = std::to_chars(end_, limit(), number, base).ptr; }
 
@@ -93,13 +101,29 @@ void writeGroups(const Groups &groups, std::size_t first, std::size_t end, TextW
     }
 }
 
+// An octet in decimal, with a dot after it.
+struct OctetText {
+    std::array<char, 4> characters;
+    std::uint8_t size;
+};
+constexpr auto octetTexts = [] {
+    std::array<OctetText, 256> texts = {};
+    for (std::uint32_t octet = 0; octet < texts.size(); ++octet) {
+        OctetText &text = texts[octet];
+        for (std::uint32_t unit = octet < 10 ? 1 : octet < 100 ? 10 : 100; unit != 0; unit /= 10) {
+            text.characters[text.size++] = static_cast<char>('0' + octet / unit % 10);
+        }
+        text.characters[text.size++] = '.';
+    }
+    return texts;
+}();
+
 void writeIpv4(std::uint32_t address, TextWriter &text) {
     for (std::uint32_t shift = 32; shift != 0; shift -= bitsPerOctet) {
-        text.number(address >> (shift - bitsPerOctet) & 0xff, decimal);
-        if (shift != bitsPerOctet) {
-            text.character('.');
-        }
+        const OctetText &octet = octetTexts[address >> (shift - bitsPerOctet) & 0xff];
+        text.text(octet.characters, octet.size);
     }
+    text.takeBack(1);
 }
 
 // The bits of a field whose ranges follow one another without a gap.

@@ -43,7 +43,10 @@ public:
 private:
     void writeSinceFirst(const CaptureTime &time);
     void writeDate(const CaptureTime &time);
-    void writeFraction(std::uint32_t nanoseconds);
+    template <typename Seconds>
+    void writeSeconds(Seconds seconds, std::uint32_t nanoseconds);
+    // Gives the end of the text.
+    [[nodiscard]] char *writeFraction(char *to, std::uint32_t nanoseconds) const;
 
     TimeForm form_;
     TimeStart start_;
