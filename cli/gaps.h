@@ -22,20 +22,31 @@ struct OctetSpan {
     std::uint32_t end = 0; // the one after the last
 };
 
-// The octets of a field. None for a field that was looked at ahead of its turn and has no ranges.
-[[nodiscard]] inline std::optional<OctetSpan> octetsOf(const FieldView &field) {
+// What the ranges of a field cover. Without bits for a field that was looked at ahead of its turn and has no ranges.
+struct FieldExtent {
+    OctetSpan octets;
+    std::uint32_t bits = 0;
+};
+[[nodiscard]] inline FieldExtent extentOf(const FieldView &field) {
     constexpr std::uint32_t bitsPerOctet = 8;
     if (field.ranges.empty()) {
-        return std::nullopt;
+        return {};
     }
     // Some fields are read from the last octet on, in many pieces.
     std::uint32_t first = field.ranges[0].firstBit;
     std::uint32_t last = field.ranges[0].lastBit;
+    std::uint32_t bits = last - first + 1;
     for (std::size_t i = 1; i < field.ranges.size(); ++i) {
-        first = std::min(first, field.ranges[i].firstBit);
-        last = std::max(last, field.ranges[i].lastBit);
+        const BitRange &range = field.ranges[i];
+        first = std::min(first, range.firstBit);
+        last = std::max(last, range.lastBit);
+        bits += range.lastBit - range.firstBit + 1;
     }
-    return OctetSpan{(first - 1) / bitsPerOctet, (last - 1) / bitsPerOctet + 1};
+    return {{(first - 1) / bitsPerOctet, (last - 1) / bitsPerOctet + 1}, bits};
+}
+[[nodiscard]] inline std::optional<OctetSpan> octetsOf(const FieldView &field) {
+    const FieldExtent extent = extentOf(field);
+    return extent.bits == 0 ? std::nullopt : std::optional(extent.octets);
 }
 
 // A pass reads forwards, but it looks ahead now and then. So an octet is in no field when the cursor is past it and no

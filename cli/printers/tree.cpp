@@ -40,6 +40,18 @@ void Tree::blockOpened(const BlockView &block) {
     out_ << '\n';
 }
 
+inline void Tree::writeField(const FieldView &field, std::uint32_t bits, std::string_view text) {
+    addressName_ = {};
+    if (bits > numberBits) {
+        return writeWide(field, bits, text);
+    }
+    writeText(field, text);
+    if ((bits == bitsPerOctet || bits == 2 * bitsPerOctet) && !showsItsNumber(text, field.value)) {
+        (out_.start(Style::dim) << "  (" << field.value << ')').stop(Style::dim); // of types and codes, no single bits
+    }
+    endField(field);
+}
+
 void Tree::field(const FieldView &field) {
     if (run_.octets != 0) {
         if (run_.continues(field)) {
@@ -48,13 +60,13 @@ void Tree::field(const FieldView &field) {
         endRun();
     }
     out_.mayFlush();
-    const auto octets = octetsOf(field);
+    const auto [octets, bits] = extentOf(field);
     const std::uint32_t passed = octetOf(field.cursor);
-    writeGapsBefore(octets ? std::min(octets->first, passed) : passed, field.depth);
-    if (octets) {
-        gaps_.cover(*octets);
-        if (opened_ && octets->end > *opened_) {
-            return writeOpened(field, *octets);
+    writeGapsBefore(bits != 0 ? std::min(octets.first, passed) : passed, field.depth);
+    if (bits != 0) {
+        gaps_.cover(octets);
+        if (opened_ && octets.end > *opened_) {
+            return writeOpened(field, octets);
         }
     }
     const std::string_view text = field.text.view();
@@ -64,7 +76,7 @@ void Tree::field(const FieldView &field) {
     if (!all_) {
         run_.begin(field, out_.mark());
     }
-    writeField(field, text);
+    writeField(field, bits, text);
 }
 
 void Tree::addToRun(const FieldView &field) {
@@ -72,7 +84,7 @@ void Tree::addToRun(const FieldView &field) {
     gaps_.cover({octet, octet + 1});
     ++run_.octets;
     if (run_.octets < DataRun::least) {
-        writeField(field, field.text.view());
+        writeField(field, bitsPerOctet, field.text.view());
     } else if (run_.octets == DataRun::least) {
         out_.takeBack(run_.start);
     }
@@ -117,19 +129,6 @@ void Tree::writeOpened(const FieldView &field, OctetSpan octets) {
         writePlace({*opened_, static_cast<std::uint32_t>(packet_.size())});
         (out_ << ']').stop(Style::dim) << '\n';
     }
-}
-
-void Tree::writeField(const FieldView &field, std::string_view text) {
-    const std::uint32_t bits = bitCount(field.ranges);
-    addressName_ = {};
-    if (bits > numberBits) {
-        return writeWide(field, bits, text);
-    }
-    writeText(field, text);
-    if ((bits == bitsPerOctet || bits == 2 * bitsPerOctet) && !showsItsNumber(text, field.value)) {
-        (out_.start(Style::dim) << "  (" << field.value << ')').stop(Style::dim); // of types and codes, no single bits
-    }
-    endField(field);
 }
 
 void Tree::writeWide(const FieldView &field, std::uint32_t bits, std::string_view text) {

@@ -58,7 +58,7 @@ private:
     void writePlace(OctetSpan octets);
     // A field of octets that hold the packet that was opened.
     void writeOpened(const FieldView &field, OctetSpan octets);
-    void writeField(const FieldView &field, std::string_view text);
+    void writeField(const FieldView &field, std::uint32_t bits, std::string_view text);
     void writeText(const FieldView &field, std::string_view text) {
         const std::string_view shown = withoutLeadingBlanks(text);
         depth_ = field.depth;
