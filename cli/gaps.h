@@ -22,9 +22,12 @@ struct OctetSpan {
     std::uint32_t end = 0; // the one after the last
 };
 
+[[nodiscard]] inline std::uint32_t octetOf(std::uint32_t bit) {
+    return (bit - 1) / bitsPerOctet;
+}
+
 // The octets of a field. None for a field that was looked at ahead of its turn and has no ranges.
 [[nodiscard]] inline std::optional<OctetSpan> octetsOf(const FieldView &field) {
-    constexpr std::uint32_t bitsPerOctet = 8;
     if (field.ranges.empty()) {
         return std::nullopt;
     }
@@ -35,7 +38,7 @@ struct OctetSpan {
         first = std::min(first, field.ranges[i].firstBit);
         last = std::max(last, field.ranges[i].lastBit);
     }
-    return OctetSpan{(first - 1) / bitsPerOctet, (last - 1) / bitsPerOctet + 1};
+    return OctetSpan{octetOf(first), octetOf(last) + 1};
 }
 
 // A pass reads forwards, but it looks ahead now and then. So an octet is in no field when the cursor is past it and no

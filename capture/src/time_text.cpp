@@ -10,8 +10,6 @@ namespace netfloor {
 
 namespace {
 
-constexpr std::uint32_t nanosecondsPerSecond = 1'000'000'000;
-
 template <typename Number>
 void append(std::string &text, Number number) {
     std::array<char, 24> digits{};

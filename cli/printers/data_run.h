@@ -40,7 +40,6 @@ struct DataRun {
 
 private:
     [[nodiscard]] static bool isOneOctet(const FieldView &field) {
-        constexpr std::uint32_t bitsPerOctet = 8;
         return field.ranges.size() == 1 && field.ranges[0].firstBit % bitsPerOctet == 1 &&
                field.ranges[0].lastBit - field.ranges[0].firstBit + 1 == bitsPerOctet;
     }

@@ -10,8 +10,6 @@ namespace netfloor::cli {
 
 namespace {
 
-constexpr std::uint32_t bitsPerOctet = 8;
-
 // What stands after the field's name in its text; none where there is only a name.
 std::optional<std::string_view> shownValue(std::string_view text) {
     const auto equals = text.find('=');
