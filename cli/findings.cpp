@@ -12,8 +12,6 @@ namespace netfloor::cli {
 
 namespace {
 
-constexpr std::uint32_t bitsPerOctet = 8;
-
 std::size_t indexOf(std::uint32_t flag) {
     return static_cast<std::size_t>(std::countr_zero(flag));
 }

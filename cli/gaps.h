@@ -22,13 +22,16 @@ struct OctetSpan {
     std::uint32_t end = 0; // the one after the last
 };
 
+[[nodiscard]] inline std::uint32_t octetOf(std::uint32_t bit) {
+    return (bit - 1) / bitsPerOctet;
+}
+
 // What the ranges of a field cover. Without bits for a field that was looked at ahead of its turn and has no ranges.
 struct FieldExtent {
     OctetSpan octets;
     std::uint32_t bits = 0;
 };
 [[nodiscard]] inline FieldExtent extentOf(const FieldView &field) {
-    constexpr std::uint32_t bitsPerOctet = 8;
     if (field.ranges.empty()) {
         return {};
     }
@@ -42,7 +45,7 @@ struct FieldExtent {
         last = std::max(last, range.lastBit);
         bits += range.lastBit - range.firstBit + 1;
     }
-    return {{(first - 1) / bitsPerOctet, (last - 1) / bitsPerOctet + 1}, bits};
+    return {{octetOf(first), octetOf(last) + 1}, bits};
 }
 [[nodiscard]] inline std::optional<OctetSpan> octetsOf(const FieldView &field) {
     const FieldExtent extent = extentOf(field);

@@ -7,6 +7,7 @@
 #include <string>
 
 #include "netfloor-analysis/utf8.h"
+#include "text.h"
 
 namespace netfloor::cli {
 
@@ -17,7 +18,6 @@ constexpr bool isPlain(char character) {
 }
 
 void writeCharacter(Output &out, std::string_view character) {
-    constexpr std::string_view digits = "0123456789abcdef";
     const char first = character.front();
     if (character.size() > 1 || isPlain(first)) {
         out << character;
@@ -25,7 +25,7 @@ void writeCharacter(Output &out, std::string_view character) {
         out << '\\' << first;
     } else {
         const auto octet = static_cast<unsigned char>(first);
-        out << "\\u00" << digits[octet >> 4U] << digits[octet & 0xfU];
+        out << "\\u00" << hexDigits[octet >> 4U] << hexDigits[octet & 0xfU];
     }
 }
 

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: MIT
 #include "messages.h"
+#include "text.h"
 
 #include <algorithm>
 #include <iostream>
@@ -7,8 +8,6 @@
 namespace netfloor::cli {
 
 namespace {
-
-constexpr std::string_view digits = "0123456789abcdef";
 
 unsigned char octetAt(std::string_view text, std::size_t at) {
     return at < text.size() ? static_cast<unsigned char>(text[at]) : '\0';
@@ -49,7 +48,7 @@ std::string withoutControls(std::string_view text) {
         const std::size_t length = printableAtStart(text);
         if (length == 0) {
             const unsigned char octet = octetAt(text, 0);
-            printable += {'\\', 'x', digits[octet >> 4U], digits[octet & 0xfU]};
+            printable += {'\\', 'x', hexDigits[octet >> 4U], hexDigits[octet & 0xfU]};
         } else {
             printable += text.substr(0, length);
         }

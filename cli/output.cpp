@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: MIT
 #include "output.h"
+#include "text.h"
 
 #include <algorithm>
 #include <array>
@@ -11,8 +12,6 @@
 namespace netfloor::cli {
 
 namespace {
-
-constexpr std::string_view digits = "0123456789abcdef";
 
 constexpr std::string_view startOf(Style style) {
     switch (style) {
@@ -43,8 +42,8 @@ void writeOut(std::string_view text) {
 
 void Output::octet(std::uint8_t octet) {
     char *const to = room(2);
-    to[0] = digits[octet >> 4U];
-    to[1] = digits[octet & 0xfU];
+    to[0] = hexDigits[octet >> 4U];
+    to[1] = hexDigits[octet & 0xfU];
     next_ = to + 2;
 }
 
@@ -54,7 +53,7 @@ void Output::escaped(std::string_view text) {
         if (isPrintable(octet)) {
             *this << character;
         } else {
-            *this << '\\' << 'x' << digits[octet >> 4U] << digits[octet & 0xfU];
+            *this << '\\' << 'x' << hexDigits[octet >> 4U] << hexDigits[octet & 0xfU];
         }
     }
 }

@@ -8,6 +8,7 @@
 
 #include "exit_code.h"
 #include "plan.h"
+#include "text.h"
 
 namespace netfloor::cli {
 
@@ -16,13 +17,12 @@ namespace {
 using Json = nlohmann::ordered_json;
 
 constexpr unsigned planVersion = 1;
-constexpr std::string_view digits = "0123456789abcdef";
 
 std::string hexOf(const std::string &octets) {
     std::string text;
     for (const char character : octets) {
         const auto octet = static_cast<unsigned char>(character);
-        text += {digits[octet >> 4U], digits[octet & 0xfU]};
+        text += {hexDigits[octet >> 4U], hexDigits[octet & 0xfU]};
     }
     return text;
 }
@@ -30,7 +30,7 @@ std::string hexOf(const std::string &octets) {
 std::string octetsOf(const std::string &hex) {
     std::string octets;
     for (std::size_t i = 0; i + 1 < hex.size(); i += 2) {
-        octets += static_cast<char>(digits.find(hex[i]) << 4U | digits.find(hex[i + 1]));
+        octets += static_cast<char>(hexDigits.find(hex[i]) << 4U | hexDigits.find(hex[i + 1]));
     }
     return octets;
 }

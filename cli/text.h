@@ -8,6 +8,8 @@
 
 namespace netfloor::cli {
 
+constexpr std::string_view hexDigits = "0123456789abcdef";
+
 // Names and texts carry blanks in front, by which a host may lay them out; here a tree does.
 [[nodiscard]] inline std::string_view withoutLeadingBlanks(std::string_view text) {
     while (text.starts_with(' ')) {

@@ -60,11 +60,15 @@ if(NETFLOOR_COVERAGE)
     add_link_options(-fprofile-instr-generate)
 endif()
 
-# Compiles the standard library's headers that most sources include once for the target: they take longer than a source.
-function(netfloor_precompile_headers target)
-    if(PROJECT_IS_TOP_LEVEL)
-        target_precompile_headers(${target} PRIVATE <algorithm> <array> <cstdint> <functional> <map> <memory> <optional>
-            <span> <stdexcept> <string> <string_view> <vector>)
+# Compiles the sources of a target in a few units: most of the time would go to headers that all of them include. A unit is
+# small enough that who edits a source waits seconds.
+function(netfloor_join_sources target)
+    if(NETFLOOR_JOIN_SOURCES)
+        set_target_properties(${target} PROPERTIES UNITY_BUILD ON UNITY_BUILD_BATCH_SIZE 12)
+        if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU")
+            # It is about types of headers, and takes every included file for one.
+            target_compile_options(${target} PRIVATE -Wno-subobject-linkage)
+        endif()
     endif()
 endfunction()
 

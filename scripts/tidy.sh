@@ -1,18 +1,16 @@
 #!/bin/sh
 # SPDX-License-Identifier: MIT
-# clang-tidy over every source of the build in $1 (default: build), a file a core. A file that passed
-# is not checked again until it, a header or the set of checks has changed.
+# clang-tidy over every source, a file a core. A file that passed is not checked again until it, a header or the set of
+# checks has changed.
 set -eu
 cd "$(dirname "$0")/.."
-build=${1:-build}
-stamps=$build/tidy
-mkdir -p "$stamps"
+stamps=build/tidy
 
-# The commands without their precompiled headers, which are in the form of the compiler in use, and without limits of GCC.
-sed -e 's/-Winvalid-pch//' -e 's/-include [^ ]*cmake_pch\.hxx//' -e 's/--param=[^ ]*//' "$build/compile_commands.json" \
-    >"$stamps/compile_commands.json"
+# Each source by itself, without limits of GCC.
+cmake --preset release -B "$stamps" -DNETFLOOR_JOIN_SOURCES=OFF -DNETFLOOR_TESTS=OFF -DNETFLOOR_BENCH=OFF >/dev/null
+sed -i -e 's/--param=[^ ]*//' "$stamps/compile_commands.json"
 
-export stamps build
+export stamps
 shared=$(git ls-files -z --cached --others --exclude-standard -- '*.h' '*.hpp' .clang-tidy |
     xargs -0 cat | sha256sum | cut -c1-16)
 export shared

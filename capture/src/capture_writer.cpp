@@ -8,19 +8,11 @@
 #include <string>
 
 #include "netfloor-capture/errors.h"
+#include "pcapng_numbers.h"
 
 namespace netfloor {
 namespace {
 
-constexpr std::uint32_t sectionHeader = 0x0a0d0d0a;
-constexpr std::uint32_t interfaceDescription = 1;
-constexpr std::uint32_t enhancedPacket = 6;
-constexpr std::uint32_t byteOrderMagic = 0x1a2b3c4d; // in the order of this machine, which the file has
-
-constexpr std::uint16_t commentOption = 1;
-constexpr std::uint16_t nameOption = 2;
-constexpr std::uint16_t timeResolutionOption = 9;
-constexpr std::uint16_t timeOffsetOption = 14;
 constexpr std::size_t mostOptionOctets = 65535;
 
 constexpr std::uint8_t mostDigits = 9;
@@ -88,7 +80,7 @@ void CaptureWriter::write(const CapturedPacket &packet) {
         addOption(commentOption, comment);
     }
     if (!packet.comments.empty()) {
-        addOption(0, {});
+        addOption(endOption, {});
     }
     endBlock();
 }
@@ -119,7 +111,7 @@ std::uint32_t CaptureWriter::numberOf(const Interface &interface) {
         if (interface.timeOffset != 0) {
             addOption(timeOffsetOption, octetsOf(interface.timeOffset));
         }
-        addOption(0, {});
+        addOption(endOption, {});
         endBlock();
     }
     return found->second;

@@ -3,13 +3,11 @@
 
 #include <array>
 
+#include "pcapng_numbers.h"
+
 namespace netfloor {
 
 namespace {
-
-constexpr std::uint16_t optionName = 2;
-constexpr std::uint16_t optionTimeResolution = 9;
-constexpr std::uint16_t optionTimeOffset = 14;
 
 constexpr unsigned digitsOfNanoseconds = 9;
 
@@ -82,11 +80,11 @@ Interface readInterface(const NumberView &body) {
     result.snapOctets = body.u32(4);
     const NumberView options = body.from(8);
     forEachOption(options, [&](std::uint16_t code, std::size_t at, std::size_t size) {
-        if (code == optionName) {
+        if (code == nameOption) {
             result.name = options.text(at, std::min(size, Interface::mostNameOctets));
-        } else if (code == optionTimeResolution && size >= 1) {
+        } else if (code == timeResolutionOption && size >= 1) {
             result.timeResolution = options.u8(at);
-        } else if (code == optionTimeOffset && size >= 8) {
+        } else if (code == timeOffsetOption && size >= 8) {
             result.timeOffset = static_cast<std::int64_t>(options.u64(at));
         }
     });

@@ -5,25 +5,19 @@
 #include <vector>
 
 #include "interfaces.h"
+#include "pcapng_numbers.h"
 #include "records.h"
 
 namespace netfloor {
 
 namespace {
 
-constexpr std::uint32_t sectionHeader = 0x0a0d0d0a;
-constexpr std::uint32_t interfaceDescription = 1;
-constexpr std::uint32_t packetBlock = 2; // obsolete, still found
-constexpr std::uint32_t simplePacket = 3;
-constexpr std::uint32_t enhancedPacket = 6;
-
-constexpr std::uint32_t byteOrderMagic = 0x1a2b3c4d; // as a section in network order has it
-constexpr std::uint32_t frameOctets = 12;            // type and length before a block's body, the length again after it
+constexpr std::uint32_t frameOctets = 12; // type and length before a block's body, the length again after it
 constexpr std::uint32_t mostBlockOctets = 2 * mostPacketOctets;
 // Two kinds of blocks are read as a whole, and so must fit into the buffer: the description of an interface, and a
 // packet with its comments.
 constexpr std::uint32_t mostInterfaceOctets = std::uint32_t{1024} * 1024;
-constexpr std::uint32_t mostOptionOctets = std::uint32_t{1024} * 1024;
+constexpr std::uint32_t mostOptionsOctets = std::uint32_t{1024} * 1024;
 
 bool isPacket(std::uint32_t type) {
     return type == enhancedPacket || type == packetBlock || type == simplePacket;
@@ -251,11 +245,10 @@ private:
     }
 
     void findComments(std::span<const std::uint8_t> options) {
-        constexpr std::uint16_t optionComment = 1;
         constexpr std::size_t mostComments = 64;
         comments_.clear();
         forEachOption({options, bigEndian_}, [&](std::uint16_t code, std::size_t at, std::size_t size) {
-            if (code == optionComment && comments_.size() < mostComments) {
+            if (code == commentOption && comments_.size() < mostComments) {
                 comments_.emplace_back(reinterpret_cast<const char *>(options.data() + at), size);
             }
         });
@@ -277,7 +270,7 @@ private:
             throw damage("a length of " + std::to_string(captured) + " octets, where " + std::to_string(most) +
                          " is the limit,");
         }
-        if (room - captured > mostOptionOctets) {
+        if (room - captured > mostOptionsOctets) {
             throw damage("a packet block with " + std::to_string(room - captured) + " octets of options");
         }
     }

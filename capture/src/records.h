@@ -18,8 +18,6 @@
 
 namespace netfloor {
 
-constexpr std::uint32_t nanosecondsPerSecond = 1'000'000'000;
-
 class RecordReader {
 public:
     RecordReader() = default;

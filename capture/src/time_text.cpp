@@ -10,8 +10,6 @@ namespace netfloor {
 
 namespace {
 
-constexpr std::uint32_t nanosecondsPerSecond = 1'000'000'000;
-
 using Room = std::array<char, 40>; // for the longest number of seconds, with nine digits after it
 
 } // namespace

@@ -11,7 +11,6 @@ namespace netfloor::cli {
 
 namespace {
 
-constexpr std::uint32_t bitsPerOctet = 8;
 constexpr std::uint32_t bitsPerNibble = 4;
 constexpr std::size_t bitsPerLine = 32;
 constexpr std::string_view margin = "     ";

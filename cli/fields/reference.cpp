@@ -12,7 +12,7 @@ namespace netfloor::cli {
 
 namespace {
 
-constexpr std::string_view introduction =
+constexpr std::string_view referenceIntroduction =
     R"(# Fields
 
 All fields that the plug-in reports, as its own tables describe them. This page is written by the command, and a test
@@ -104,7 +104,7 @@ private:
 } // namespace
 
 std::string referenceText(const Fields &fields) {
-    std::string text(introduction);
+    std::string text(referenceIntroduction);
     ValueLists lists;
     std::string_view open;
     for (const auto &[field, section] : fields) {

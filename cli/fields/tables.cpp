@@ -9,7 +9,7 @@ namespace netfloor::cli {
 
 namespace {
 
-constexpr std::string_view introduction =
+constexpr std::string_view tablesIntroduction =
     R"(# Tables and their columns
 
 What `netfloor json` and `netfloor export` tell of a packet. This page is written by the command, and a test compares the two;
@@ -33,7 +33,7 @@ std::string_view remarkOf(const Column &column) {
 } // namespace
 
 std::string tablesText() {
-    std::string text(introduction);
+    std::string text(tablesIntroduction);
     for (const RowKind kind : {RowKind::packet, RowKind::layer, RowKind::chunk, RowKind::cause}) {
         text.append("\n## ").append(tableName(kind)).append("\n\nA row is ").append(rowMeaning(kind));
         text += ".\n\n| column | type | each row | remark | meaning |\n|---|---|---|---|---|\n";

@@ -41,7 +41,6 @@ struct DataRun {
 private:
     [[nodiscard]] static std::uint32_t octetOf(const FieldView &field) { return (field.ranges[0].firstBit - 1) / 8; }
     [[nodiscard]] static bool isOneOctet(const FieldView &field) {
-        constexpr std::uint32_t bitsPerOctet = 8;
         return field.ranges.size() == 1 && field.ranges[0].firstBit % bitsPerOctet == 1 &&
                field.ranges[0].lastBit - field.ranges[0].firstBit + 1 == bitsPerOctet;
     }

@@ -10,8 +10,6 @@ namespace netfloor::cli {
 
 namespace {
 
-constexpr std::uint32_t bitsPerOctet = 8;
-
 // Whether the text is the number in hexadecimal, or ends with "(number)".
 bool showsNumber(std::string_view text, std::uint32_t number) {
     std::array<char, 12> room;

@@ -13,6 +13,8 @@
 
 namespace netfloor::cli {
 
+constexpr std::uint32_t numberBits = 32; // that a field record holds
+
 // "17-32", and for a field whose pieces do not follow one another "1-5,9-16".
 void writeBits(Output &out, std::span<const BitRange> ranges, std::uint32_t bitsBefore = 0);
 

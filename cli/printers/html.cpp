@@ -18,8 +18,6 @@ namespace netfloor::cli {
 
 namespace {
 
-constexpr std::uint32_t bitsPerOctet = 8;
-
 std::string_view withoutBlanks(std::string_view text) {
     text = withoutLeadingBlanks(text);
     while (text.ends_with(' ')) {

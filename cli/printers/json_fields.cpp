@@ -11,9 +11,7 @@ namespace netfloor::cli {
 
 namespace {
 
-constexpr std::uint32_t bitsPerOctet = 8;
-constexpr std::uint32_t numberBits = 32; // that a field record holds
-constexpr std::uint32_t leastRun = 5;    // fewer octets of data are a field each
+constexpr std::uint32_t leastRun = 5; // fewer octets of data are a field each
 
 bool isOneOctet(const FieldView &field) {
     return field.ranges.size() == 1 && field.ranges[0].firstBit % bitsPerOctet == 1 &&

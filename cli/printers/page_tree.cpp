@@ -9,17 +9,6 @@
 
 namespace netfloor::cli {
 
-namespace {
-
-constexpr std::uint32_t bitsPerOctet = 8;
-constexpr std::uint32_t numberBits = 32; // that a field record holds
-
-std::uint32_t octetOf(std::uint32_t bit) {
-    return (bit - 1) / bitsPerOctet;
-}
-
-} // namespace
-
 void PageTree::begin(Pass /*pass*/, std::span<const std::uint8_t> packet) {
     packet_ = packet;
     gaps_.reset();

@@ -10,15 +10,9 @@ namespace netfloor::cli {
 
 namespace {
 
-constexpr std::uint32_t bitsPerOctet = 8;
-constexpr std::uint32_t numberBits = 32; // that a field record holds
 constexpr std::uint32_t addressBits = 128;
 constexpr std::uint32_t octetsPerLine = 16; // of data
 constexpr std::uint32_t mostDataLines = 4;  // without --all
-
-std::uint32_t octetOf(std::uint32_t bit) {
-    return (bit - 1) / bitsPerOctet;
-}
 
 } // namespace
 

@@ -1,44 +1,38 @@
 // SPDX-License-Identifier: MIT
 #include "netfloor-host/assigned_names.h"
 
-#include <algorithm>
 #include <array>
-#include <span>
-#include <utility>
+
+#include "number_names.h"
 
 namespace netfloor {
 namespace {
 
-using Name = std::pair<std::uint32_t, std::string_view>;
+constexpr std::array chunkNames = {NumberName{15, "AUTH"},        NumberName{64, "I-DATA"},
+                                   NumberName{128, "ASCONF ACK"}, NumberName{130, "RE-CONFIG"},
+                                   NumberName{132, "PAD"},        NumberName{192, "FORWARD TSN"},
+                                   NumberName{193, "ASCONF"},     NumberName{194, "I-FORWARD TSN"}};
 
-constexpr std::array chunkNames = {Name{15, "AUTH"},       Name{64, "I-DATA"},        Name{128, "ASCONF ACK"},
-                                   Name{130, "RE-CONFIG"}, Name{132, "PAD"},          Name{192, "FORWARD TSN"},
-                                   Name{193, "ASCONF"},    Name{194, "I-FORWARD TSN"}};
+constexpr std::array payloadProtocols = {NumberName{1, "IUA"},
+                                         NumberName{2, "M2UA"},
+                                         NumberName{3, "M3UA"},
+                                         NumberName{4, "SUA"},
+                                         NumberName{5, "M2PA"},
+                                         NumberName{18, "S1AP"},
+                                         NumberName{19, "RUA"},
+                                         NumberName{20, "HNBAP"},
+                                         NumberName{27, "X2AP"},
+                                         NumberName{46, "Diameter"},
+                                         NumberName{50, "WebRTC control"},
+                                         NumberName{60, "NGAP"},
+                                         NumberName{61, "XnAP"}};
 
-constexpr std::array payloadProtocols = {Name{1, "IUA"},
-                                         Name{2, "M2UA"},
-                                         Name{3, "M3UA"},
-                                         Name{4, "SUA"},
-                                         Name{5, "M2PA"},
-                                         Name{18, "S1AP"},
-                                         Name{19, "RUA"},
-                                         Name{20, "HNBAP"},
-                                         Name{27, "X2AP"},
-                                         Name{46, "Diameter"},
-                                         Name{50, "WebRTC control"},
-                                         Name{60, "NGAP"},
-                                         Name{61, "XnAP"}};
-
-constexpr std::array icmpv6Messages = {Name{130, "multicast listener query"},    Name{131, "multicast listener report"},
-                                       Name{132, "multicast listener done"},     Name{133, "router solicitation"},
-                                       Name{134, "router advertisement"},        Name{135, "neighbor solicitation"},
-                                       Name{136, "neighbor advertisement"},      Name{137, "redirect"},
-                                       Name{143, "multicast listener report v2"}};
-
-std::string_view nameIn(std::span<const Name> names, std::uint32_t number) {
-    const auto found = std::ranges::find(names, number, &Name::first);
-    return found == names.end() ? std::string_view() : found->second;
-}
+constexpr std::array icmpv6Messages = {
+    NumberName{130, "multicast listener query"},    NumberName{131, "multicast listener report"},
+    NumberName{132, "multicast listener done"},     NumberName{133, "router solicitation"},
+    NumberName{134, "router advertisement"},        NumberName{135, "neighbor solicitation"},
+    NumberName{136, "neighbor advertisement"},      NumberName{137, "redirect"},
+    NumberName{143, "multicast listener report v2"}};
 
 } // namespace
 

@@ -13,7 +13,6 @@
 namespace netfloor {
 namespace {
 
-constexpr std::uint32_t bitsPerOctet = 8;
 constexpr std::uint32_t most = std::numeric_limits<std::uint32_t>::max();
 
 constexpr std::array<std::pair<std::string_view, LayerKind>, layerKinds> layerNames = {{

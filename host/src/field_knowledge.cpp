@@ -68,7 +68,7 @@ constexpr std::array designedFlags = {
 constexpr std::uint32_t sctpHead = 16;
 constexpr std::string_view causesWhy =
     "a list of SCTP error causes leaves it, as the plug-in tries to read one cause more after the last";
-constexpr std::array lengths = {
+constexpr std::array lengthFields = {
     LengthField{"SCTP INIT, INIT ACK",
                 {"Length", 824},
                 sctpHead,
@@ -82,7 +82,6 @@ constexpr std::array lengths = {
 } // namespace
 
 std::uint32_t LengthField::endBit(const FieldView &view) const {
-    constexpr std::uint32_t bitsPerOctet = 8;
     return view.ranges.front().firstBit - bitsBefore + view.value * bitsPerOctet;
 }
 
@@ -146,7 +145,7 @@ void FieldKnowledge::addFlags(Fields fields) {
 }
 
 void FieldKnowledge::addLengths(Fields fields) {
-    for (const LengthField &row : lengths) {
+    for (const LengthField &row : lengthFields) {
         bool isFound = false;
         for (const FieldDescription &field : fieldsOf(fields, row.section)) {
             if (row.field.fits(field)) {

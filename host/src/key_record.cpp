@@ -8,7 +8,6 @@
 namespace netfloor {
 namespace {
 
-constexpr std::uint32_t bitsPerOctet = 8;
 constexpr std::uint32_t valueOctets = 4;
 constexpr std::uint32_t addressRoom = 2 * 65536;
 constexpr std::uint32_t presenceStart = addressRoom;

@@ -10,8 +10,7 @@
 namespace netfloor {
 namespace {
 
-constexpr std::uint32_t bitsPerOctet = 8;
-constexpr std::uint8_t textOctets = 120; // of what an owner says
+constexpr std::uint8_t mostTextOctets = 120; // of what an owner says
 
 constexpr auto fieldCounts = [] {
     std::array<std::uint32_t, layerKinds> counts = {};
@@ -239,9 +238,9 @@ void LayerView::keepPayload(std::string_view name, std::string_view text, std::u
     Layer &layer = layers_.back();
     layer.endOctet = endOctet;
     layer.name = static_cast<std::uint32_t>(texts_.size());
-    texts_.append(name.substr(0, textOctets));
+    texts_.append(name.substr(0, mostTextOctets));
     layer.nameEnd = static_cast<std::uint32_t>(texts_.size());
-    texts_.append(text.substr(0, textOctets));
+    texts_.append(text.substr(0, mostTextOctets));
     layer.textEnd = static_cast<std::uint32_t>(texts_.size());
 }
 

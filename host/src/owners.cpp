@@ -15,7 +15,6 @@
 namespace netfloor {
 namespace {
 
-constexpr std::uint32_t bitsPerOctet = 8;
 constexpr std::uint32_t protocolNumbers = 256;
 constexpr std::uint32_t hostsOwnDecoder = 0;
 

@@ -11,9 +11,8 @@ namespace {
 
 constexpr std::int32_t refusal = -1;
 constexpr std::size_t usualLayers = 8;
-constexpr std::uint16_t addressRoom = 64; // for one address, which takes 17 octets
+constexpr std::uint16_t addressAreaOctets = 64; // for one address, which takes 17 octets
 
-constexpr std::uint32_t bitsPerOctet = 8;
 constexpr std::size_t mostPacketOctets = std::numeric_limits<std::uint32_t>::max() / bitsPerOctet;
 
 std::uint32_t modeOf(Pass pass) {
@@ -156,7 +155,7 @@ void PacketRun::prepareKeyContext(const TestRunOptions *test) {
     xtr_.bitsLeft = 0;
     xtr_.keyRecord = keyRecord_.octets();
     xtr_.byteAreaOffset = 0;
-    xtr_.byteAreaSize = test == nullptr ? addressRoom : test->byteAreaSize;
+    xtr_.byteAreaSize = test == nullptr ? addressAreaOctets : test->byteAreaSize;
     xtr_.decodeState = &state();
 }
 

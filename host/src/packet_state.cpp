@@ -14,7 +14,6 @@
 namespace netfloor {
 namespace {
 
-constexpr std::uint32_t bitsPerOctet = 8;
 constexpr std::size_t mostOctets = std::numeric_limits<std::uint32_t>::max() / bitsPerOctet;
 constexpr std::size_t textOctets = 255;
 

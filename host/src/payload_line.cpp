@@ -1,62 +1,56 @@
 // SPDX-License-Identifier: MIT
 #include "payload_line.h"
 
-#include <algorithm>
 #include <charconv>
-#include <utility>
 
 #include "ip_numbers.h"
 #include "netfloor-host/assigned_names.h"
+#include "number_names.h"
 #include "octets.h"
 #include "ports.h"
 
 namespace netfloor {
 namespace {
 
-using Name = std::pair<std::uint32_t, std::string_view>;
-
 constexpr std::uint32_t m3uaIdentifier = 3;
 constexpr std::size_t messageHead = 8; // of GTP and of M3UA
 
 // TS 29.281.
-constexpr std::array userPlane = {Name{1, "echo request"},      Name{2, "echo response"},
-                                  Name{26, "error indication"}, Name{31, "supported extension headers"},
-                                  Name{254, "end marker"},      Name{255, "G-PDU"}};
+constexpr std::array userPlane = {NumberName{1, "echo request"},      NumberName{2, "echo response"},
+                                  NumberName{26, "error indication"}, NumberName{31, "supported extension headers"},
+                                  NumberName{254, "end marker"},      NumberName{255, "G-PDU"}};
 // TS 29.060.
-constexpr std::array versionOne = {Name{1, "echo request"},
-                                   Name{2, "echo response"},
-                                   Name{16, "create PDP context request"},
-                                   Name{17, "create PDP context response"},
-                                   Name{18, "update PDP context request"},
-                                   Name{19, "update PDP context response"},
-                                   Name{20, "delete PDP context request"},
-                                   Name{21, "delete PDP context response"}};
+constexpr std::array versionOne = {NumberName{1, "echo request"},
+                                   NumberName{2, "echo response"},
+                                   NumberName{16, "create PDP context request"},
+                                   NumberName{17, "create PDP context response"},
+                                   NumberName{18, "update PDP context request"},
+                                   NumberName{19, "update PDP context response"},
+                                   NumberName{20, "delete PDP context request"},
+                                   NumberName{21, "delete PDP context response"}};
 // TS 29.274.
-constexpr std::array versionTwo = {Name{1, "echo request"},
-                                   Name{2, "echo response"},
-                                   Name{32, "create session request"},
-                                   Name{33, "create session response"},
-                                   Name{34, "modify bearer request"},
-                                   Name{35, "modify bearer response"},
-                                   Name{36, "delete session request"},
-                                   Name{37, "delete session response"},
-                                   Name{95, "create bearer request"},
-                                   Name{96, "create bearer response"},
-                                   Name{170, "release access bearers request"},
-                                   Name{171, "release access bearers response"},
-                                   Name{176, "downlink data notification"}};
+constexpr std::array versionTwo = {NumberName{1, "echo request"},
+                                   NumberName{2, "echo response"},
+                                   NumberName{32, "create session request"},
+                                   NumberName{33, "create session response"},
+                                   NumberName{34, "modify bearer request"},
+                                   NumberName{35, "modify bearer response"},
+                                   NumberName{36, "delete session request"},
+                                   NumberName{37, "delete session response"},
+                                   NumberName{95, "create bearer request"},
+                                   NumberName{96, "create bearer response"},
+                                   NumberName{170, "release access bearers request"},
+                                   NumberName{171, "release access bearers response"},
+                                   NumberName{176, "downlink data notification"}};
 // RFC 4666: class and type.
 constexpr std::array m3uaMessages = {
-    Name{0x0000, "ERR"},       Name{0x0001, "NTFY"},      Name{0x0101, "DATA"},     Name{0x0201, "DUNA"},
-    Name{0x0202, "DAVA"},      Name{0x0203, "DAUD"},      Name{0x0204, "SCON"},     Name{0x0205, "DUPU"},
-    Name{0x0206, "DRST"},      Name{0x0301, "ASPUP"},     Name{0x0302, "ASPDN"},    Name{0x0303, "BEAT"},
-    Name{0x0304, "ASPUP ACK"}, Name{0x0305, "ASPDN ACK"}, Name{0x0306, "BEAT ACK"}, Name{0x0401, "ASPAC"},
-    Name{0x0402, "ASPIA"},     Name{0x0403, "ASPAC ACK"}, Name{0x0404, "ASPIA ACK"}};
-
-std::string_view nameIn(std::span<const Name> names, std::uint32_t number) {
-    const auto found = std::ranges::find(names, number, &Name::first);
-    return found == names.end() ? std::string_view() : found->second;
-}
+    NumberName{0x0000, "ERR"},       NumberName{0x0001, "NTFY"},      NumberName{0x0101, "DATA"},
+    NumberName{0x0201, "DUNA"},      NumberName{0x0202, "DAVA"},      NumberName{0x0203, "DAUD"},
+    NumberName{0x0204, "SCON"},      NumberName{0x0205, "DUPU"},      NumberName{0x0206, "DRST"},
+    NumberName{0x0301, "ASPUP"},     NumberName{0x0302, "ASPDN"},     NumberName{0x0303, "BEAT"},
+    NumberName{0x0304, "ASPUP ACK"}, NumberName{0x0305, "ASPDN ACK"}, NumberName{0x0306, "BEAT ACK"},
+    NumberName{0x0401, "ASPAC"},     NumberName{0x0402, "ASPIA"},     NumberName{0x0403, "ASPAC ACK"},
+    NumberName{0x0404, "ASPIA ACK"}};
 
 } // namespace
 
@@ -95,9 +89,9 @@ void PayloadLine::gtp(std::span<const std::uint8_t> message, bool isUserPlane) {
         return;
     }
     start(isUserPlane ? "GTP-U" : "GTP-C");
-    const auto names = isUserPlane    ? std::span<const Name>(userPlane)
-                       : version == 1 ? std::span<const Name>(versionOne)
-                                      : std::span<const Name>(versionTwo);
+    const auto names = isUserPlane    ? std::span<const NumberName>(userPlane)
+                       : version == 1 ? std::span<const NumberName>(versionOne)
+                                      : std::span<const NumberName>(versionTwo);
     const std::string_view name = nameIn(names, message[1]);
     append(name.empty() ? "message " : name);
     if (name.empty()) {

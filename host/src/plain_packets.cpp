@@ -11,7 +11,6 @@ namespace {
 
 using Octets = std::span<const std::uint8_t>;
 
-constexpr std::uint32_t bitsPerOctet = 8;
 constexpr std::uint32_t wordOctets = 4;
 constexpr std::uint32_t wordBits = 32;
 

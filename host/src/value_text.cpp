@@ -12,7 +12,6 @@
 namespace netfloor {
 namespace {
 
-constexpr std::uint32_t bitsPerOctet = 8;
 constexpr std::size_t groupCount = 8;
 constexpr int decimal = 10;
 constexpr int hexadecimal = 16;

@@ -10,6 +10,8 @@
 
 namespace netfloor {
 
+constexpr std::uint32_t nanosecondsPerSecond = 1'000'000'000;
+
 // Time since 1970-01-01 00:00:00 UTC; the nanoseconds are always below a second.
 struct CaptureTime {
     std::int64_t seconds = 0;
@@ -17,10 +19,9 @@ struct CaptureTime {
 
     // The same as one number; none before the year 1678 and after 2261, where 64 bits do not hold it.
     [[nodiscard]] std::optional<std::int64_t> inNanoseconds() const {
-        constexpr std::int64_t perSecond = 1'000'000'000;
         std::int64_t product = 0;
         std::int64_t sum = 0;
-        if (__builtin_mul_overflow(seconds, perSecond, &product) ||
+        if (__builtin_mul_overflow(seconds, std::int64_t{nanosecondsPerSecond}, &product) ||
             __builtin_add_overflow(product, nanoseconds, &sum)) {
             return std::nullopt;
         }

@@ -28,6 +28,8 @@
 
 namespace netfloor {
 
+constexpr std::uint32_t bitsPerOctet = 8;
+
 enum class Pass : std::uint8_t {
     md,  // every field with its long text and its bit ranges
     to,  // every field's short display text
