@@ -264,9 +264,9 @@ class NetfloorDataSource(DataSource):
         return "netfloor"
 
     def schema(self) -> StructType:
-        fields = [StructField("file", StringType(), False)]
+        fields = [StructField("file", StringType())]
         for column in _Options.of(self.options).wanted():
-            fields.append(StructField(column.name, _TYPES[column.type][0], not column.required))
+            fields.append(StructField(column.name, _TYPES[column.type][0]))
             if column.type == "time":
                 fields.append(StructField("time_ns", LongType()))
         return StructType(fields)
