@@ -1,0 +1,60 @@
+# SPDX-License-Identifier: MIT
+"""Writes a table of captures as Parquet, by a Spark cluster on this machine: what ./spark runs."""
+
+import argparse
+import os
+import tempfile
+from pathlib import Path
+
+from pyspark.sql import SparkSession
+
+from . import _cluster, spark
+
+
+def main() -> None:
+    parser = argparse.ArgumentParser(prog="./spark", description="Writes a table of captures as Parquet.")
+    parser.add_argument("captures", nargs="+", metavar="FILE", help="captures that can be read several times")
+    parser.add_argument("--table", default="layers", help="packets, layers (default), chunks or causes")
+    parser.add_argument("--to", default="netfloor.parquet", metavar="FOLDER", help="must not exist (default: %(default)s)")
+    parser.add_argument("--columns", default="", help="names with commas between them (default: all)")
+    parser.add_argument("--where", default="", help="a condition, as in netfloor --where")
+    parser.add_argument("--workers", type=int, default=max(2, os.cpu_count() or 2), help="default: one a core")
+    parser.add_argument("--keep", action="store_true", help="keep the dashboard until Enter is pressed")
+    options = parser.parse_args()
+    if os.path.exists(options.to):
+        parser.error(f"{options.to} exists already. Name another folder with --to.")
+
+    with tempfile.TemporaryDirectory() as folder, _cluster.LocalCluster(Path(folder), options.workers) as cluster:
+        print(f"Dashboard of the cluster: {cluster.dashboard}", flush=True)
+        session = (
+            SparkSession.builder.master(cluster.url)
+            .appName("netfloor")
+            .config("spark.driver.host", _cluster.HOST)
+            .config("spark.ui.showConsoleProgress", "false")
+            .config("spark.log.level", "ERROR")
+            .getOrCreate()
+        )
+        print(f"Dashboard of this job: {session.sparkContext.uiWebUrl}", flush=True)
+        spark.register(session)
+        frames = [
+            session.read.format("netfloor")
+            .option("table", options.table)
+            .option("columns", options.columns)
+            .option("where", options.where)
+            .option("shards", str(2 * options.workers))
+            .load(os.path.abspath(capture) if os.path.exists(capture) else capture)
+            for capture in options.captures
+        ]
+        rows = frames[0]
+        for frame in frames[1:]:
+            rows = rows.unionAll(frame)
+        rows.write.parquet(os.path.abspath(options.to))
+        count = session.read.parquet(os.path.abspath(options.to)).count()
+        print(f"{options.to}: {count} rows", flush=True)
+        if options.keep:
+            input("Press Enter to end the cluster. ")
+        session.stop()
+
+
+if __name__ == "__main__":
+    main()
