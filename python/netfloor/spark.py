@@ -13,6 +13,9 @@ Options:
     corrupt    fail (by default), or skip: the rows in front of a damage are kept, and the capture is listed
     skipped    the folder of that list, a JSON file for each capture; all workers must reach it
 
+A capture FILE with a plan beside it, FILE.plan.json, as `netfloor plan --shards 64 FILE` writes it, is cut as the plan
+says. Of a URL, the task of a shard fetches the octets of its shard alone; without a plan it fetches the whole capture.
+
 Each row has the name of its capture in the column file. Types that Spark lacks become wider or plain: unsigned numbers
 the next signed ones, addresses strings, time microseconds, with all its nanoseconds in time_ns.
 """
@@ -24,8 +27,9 @@ import ipaddress
 import json
 import math
 import os
-from collections.abc import Iterable, Iterator, Mapping
+from collections.abc import Iterable, Iterator, Mapping, Sequence
 from dataclasses import dataclass
+from pathlib import Path
 from typing import Any
 
 import pyarrow as pa
@@ -56,7 +60,7 @@ from pyspark.sql.types import (
     TimestampType,
 )
 
-from . import CaptureError, Column, Shard, columns, plan, scan
+from . import CaptureError, Column, ConditionError, Shard, columns, plan, read_plan, scan
 
 # By the types of netfloor.columns(). A packet's number is the only u64.
 _TYPES: dict[str, tuple[DataType, pa.DataType]] = {
@@ -116,6 +120,9 @@ class _Partition(InputPartition):
     shard: Shard | None = None
 
 
+_PLAN = ".plan.json"
+
+
 def _is_url(path: str) -> bool:
     return "://" in path
 
@@ -127,27 +134,39 @@ def _files(path: str) -> list[str]:
         files = [str(file.full_name) for file in fsspec.open_files(path)]
     else:
         files = [path] if os.path.isfile(path) else glob.glob(os.path.join(path, "*") if os.path.isdir(path) else path)
-    if not files:
+    captures = sorted(file for file in files if not file.endswith(_PLAN))
+    if not captures:
         raise CaptureError(f"{path}: there is no such capture.")
-    return sorted(files)
+    return captures
 
 
-@contextlib.contextmanager
-def _local(path: str) -> Iterator[str]:
-    """A path that can be opened here: of a URL, its octets in memory."""
-    if not _is_url(path):
-        yield path
-        return
-    import fsspec
+def _planned(file: str) -> list[Shard] | None:
+    """The shards of the plan beside a capture, if there is one."""
+    if _is_url(file):
+        from . import _remote
 
-    memory = os.memfd_create("netfloor")
+        text = _remote.read_beside(file, _PLAN)
+    else:
+        beside = Path(file + _PLAN)
+        text = beside.read_bytes() if beside.exists() else None
+    if text is None:
+        return None
     try:
-        with fsspec.open(path, "rb") as remote:
-            while piece := remote.read(1 << 22):
-                os.write(memory, piece)
-        yield f"/proc/self/fd/{memory}"
-    finally:
-        os.close(memory)
+        shards = read_plan(text)
+    except ValueError as error:
+        raise ValueError(f"{file}{_PLAN}: {error}") from None
+    if len({shard.path for shard in shards}) != 1:
+        raise ValueError(f"{file}{_PLAN} is not the plan of one capture. Make it by: netfloor plan {file}")
+    return shards
+
+
+def _openable(partition: "_Partition") -> contextlib.AbstractContextManager[str]:
+    """A path at which this process can open the capture."""
+    if not _is_url(partition.path):
+        return contextlib.nullcontext(partition.path)
+    from . import _remote
+
+    return _remote.in_memory(partition.path, partition.shard)
 
 
 def _condition(filter: Filter, known: dict[str, Column]) -> str | None:
@@ -174,6 +193,15 @@ def _condition(filter: Filter, known: dict[str, Column]) -> str | None:
     return f"{column.field} {operator} {value}"
 
 
+def _is_condition(text: str) -> bool:
+    # Some columns are none of a layer, such as the name of an interface, and a condition cannot ask for them.
+    try:
+        scan("", where=text)
+    except ConditionError:
+        return False
+    return True
+
+
 def _value(value: Any, column: Column) -> str | None:
     if column.type == "boolean":
         return str(int(value)) if isinstance(value, bool) else None
@@ -195,30 +223,33 @@ class NetfloorReader(DataSourceReader):
         """All filters are still Spark's: a condition may let more rows through, but never fewer."""
         known = {column.name: column for column in columns(self._options.table)}
         for filter in filters:
-            if condition := _condition(filter, known):
+            condition = _condition(filter, known)
+            if condition and _is_condition(condition):
                 self._conditions.append(condition)
         return filters
 
     def partitions(self) -> list[_Partition]:
         files = _files(self._options.path)
         local = [file for file in files if not _is_url(file)]
-        if self._options.shards == 0 or not local:
-            return [_Partition(file) for file in files]
-        octets = max(1, math.ceil(sum(os.path.getsize(file) for file in local) / self._options.shards))
-        return [part for file in files for part in self._shards(file, octets)]
+        # As many octets for each shard, in however many captures they are.
+        octets = math.ceil(sum(map(os.path.getsize, local)) / self._options.shards) if self._options.shards else 0
+        return [_Partition(file, shard) for file in files for shard in self._shards(file, octets)]
 
-    def _shards(self, file: str, octets: int) -> list[_Partition]:
-        if _is_url(file):
-            return [_Partition(file)]
+    def _shards(self, file: str, octets: int) -> Sequence[Shard | None]:
+        planned = _planned(file)
+        if planned is not None:
+            return planned
+        if octets == 0 or _is_url(file):
+            return [None]
         try:
-            return [_Partition(file, shard) for shard in plan(file, shard_octets=octets)]
+            return plan(file, shard_octets=octets)
         except CaptureError:
-            return [_Partition(file)]  # the task that reads it fails or skips it
+            return [None]  # the task that reads it fails or skips it
 
     def read(self, partition: _Partition) -> Iterator[pa.RecordBatch]:  # type: ignore[override]
         options = self._options
         where = " and ".join(f"({text})" for text in [options.where, *self._conditions] if text)
-        with _local(partition.path) as path:
+        with _openable(partition) as path:
             try:
                 rows = scan(path, options.table, where=where, columns=options.columns, shard=partition.shard)
                 for batch in pa.RecordBatchReader.from_stream(rows):
