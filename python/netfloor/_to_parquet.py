@@ -36,18 +36,14 @@ def main() -> None:
         )
         print(f"Dashboard of this job: {session.sparkContext.uiWebUrl}", flush=True)
         spark.register(session)
-        frames = [
+        rows = (
             session.read.format("netfloor")
             .option("table", options.table)
             .option("columns", options.columns)
             .option("where", options.where)
-            .option("shards", str(2 * options.workers))
-            .load(os.path.abspath(capture) if os.path.exists(capture) else capture)
-            for capture in options.captures
-        ]
-        rows = frames[0]
-        for frame in frames[1:]:
-            rows = rows.unionAll(frame)
+            .option("shards", str(4 * options.workers))
+            .load([os.path.abspath(capture) if os.path.exists(capture) else capture for capture in options.captures])
+        )
         rows.write.parquet(os.path.abspath(options.to))
         count = session.read.parquet(os.path.abspath(options.to)).count()
         print(f"{options.to}: {count} rows", flush=True)

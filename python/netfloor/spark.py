@@ -80,7 +80,7 @@ _MOST = 2**32 - 1  # of the numbers in a condition
 
 @dataclass(frozen=True)
 class _Options:
-    path: str
+    paths: list[str]
     table: str
     columns: list[str] | None
     where: str
@@ -92,14 +92,16 @@ class _Options:
     def of(options: Mapping[str, str]) -> "_Options":
         names = [name.strip() for name in options.get("columns", "").split(",") if name.strip()]
         corrupt = options.get("corrupt", "fail")
-        if "path" not in options:
+        # load() passes one path as it is, and several as JSON.
+        paths = json.loads(options["paths"]) if "paths" in options else [options.get("path", "")]
+        if not all(paths):
             raise ValueError("Name the captures: load('captures/*.pcap').")
         if corrupt not in ("fail", "skip"):
             raise ValueError(f"corrupt is 'fail' or 'skip', and not '{corrupt}'.")
         if corrupt == "skip" and not options.get("skipped"):
             raise ValueError("With corrupt=skip, name a folder for the list of what was skipped: option skipped.")
         return _Options(
-            options["path"],
+            paths,
             options.get("table", "layers"),
             names or None,
             options.get("where", ""),
@@ -229,7 +231,7 @@ class NetfloorReader(DataSourceReader):
         return filters
 
     def partitions(self) -> list[_Partition]:
-        files = _files(self._options.path)
+        files = [file for path in self._options.paths for file in _files(path)]
         local = [file for file in files if not _is_url(file)]
         # As many octets for each shard, in however many captures they are.
         octets = math.ceil(sum(map(os.path.getsize, local)) / self._options.shards) if self._options.shards else 0

@@ -3,6 +3,7 @@
 
 import hashlib
 import json
+import shutil
 import threading
 import time
 from collections.abc import Iterator
@@ -15,7 +16,7 @@ import pytest
 from netfloor import _cluster, spark
 from pyspark.sql import DataFrame, SparkSession
 
-from conftest import sctp_packet, write_pcap
+from conftest import CAPTURES, sctp_packet, write_pcap, write_plan
 
 
 @pytest.fixture(scope="module")
@@ -114,8 +115,39 @@ def test_filters_reach_the_scan() -> None:
         netfloor.scan("x", "chunks", where=condition)
 
 
-def test_a_url_is_decoded_from_memory(session: SparkSession, captures: Path) -> None:
-    assert load(session, f"file://{captures}/*.pcap").count() == 10_000
+@pytest.mark.parametrize(
+    ("table", "name"),
+    [
+        ("packets", "mixed-pppoe-double-vlan.pcap"),
+        ("layers", "tunnel-gre-sample.pcap"),
+        ("layers", "sctp-over-ipv6.pcap"),
+        ("chunks", "sctp-s1ap-sll.pcapng"),
+    ],
+)
+def test_no_filter_loses_a_row(table: str, name: str) -> None:
+    options = spark._Options.of({"path": str(CAPTURES / name), "table": table})
+
+    def rows(*filters: Any) -> list[dict[str, Any]]:
+        reader = spark.NetfloorReader(options)
+        reader.pushFilters(list(filters))
+        return [row for part in reader.partitions() for batch in reader.read(part) for row in batch.to_pylist()]
+
+    whole = rows()
+    for column in netfloor.columns(table):
+        for value in {row[column.name] for row in whole if row[column.name] is not None}:
+            wanted = [row for row in whole if row[column.name] == value]
+            for filter in (spark.EqualTo((column.name,), value), spark.In((column.name,), (value,))):
+                assert [row for row in rows(filter) if row[column.name] == value] == wanted
+
+
+def test_urls_with_and_without_a_plan(session: SparkSession, captures: Path, tmp_path: Path) -> None:
+    planned = Path(shutil.copy(captures / "a.pcap", tmp_path))
+    write_plan(planned, 3)
+    frame = session.read.format("netfloor").option("table", "chunks").load([f"file://{captures}/b.pcap", f"file://{tmp_path}/*"])
+    assert frame.rdd.getNumPartitions() == 4
+    assert frame.groupBy("file").count().orderBy("file").collect() == sorted(
+        (f"file://{path}", 5000) for path in (captures / "b.pcap", planned)
+    )
 
 
 def test_a_corrupt_capture_fails_or_is_listed(session: SparkSession, captures: Path, tmp_path: Path) -> None:
