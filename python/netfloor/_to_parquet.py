@@ -3,9 +3,13 @@
 
 import argparse
 import os
+import re
+import shutil
+import sys
 import tempfile
 from pathlib import Path
 
+from pyspark.errors import PySparkException
 from pyspark.sql import SparkSession
 
 from . import _cluster, spark
@@ -31,25 +35,41 @@ def main() -> None:
             .appName("netfloor")
             .config("spark.driver.host", _cluster.HOST)
             .config("spark.ui.showConsoleProgress", "false")
-            .config("spark.log.level", "ERROR")
+            .config("spark.log.level", "OFF")  # what fails is told below, in a line
             .getOrCreate()
         )
         print(f"Dashboard of this job: {session.sparkContext.uiWebUrl}", flush=True)
-        spark.register(session)
-        rows = (
-            session.read.format("netfloor")
-            .option("table", options.table)
-            .option("columns", options.columns)
-            .option("where", options.where)
-            .option("shards", str(4 * options.workers))
-            .load([os.path.abspath(capture) if os.path.exists(capture) else capture for capture in options.captures])
-        )
-        rows.write.parquet(os.path.abspath(options.to))
-        count = session.read.parquet(os.path.abspath(options.to)).count()
-        print(f"{options.to}: {count} rows", flush=True)
-        if options.keep:
-            input("Press Enter to end the cluster. ")
-        session.stop()
+        try:
+            _write(session, options)
+        except PySparkException as error:
+            shutil.rmtree(options.to, ignore_errors=True)  # what Spark has begun
+            sys.exit(f"./spark: {_reason(error)}")
+        finally:
+            if options.keep:
+                input("Press Enter to end the cluster. ")
+            session.stop()
+
+
+def _write(session: SparkSession, options: argparse.Namespace) -> None:
+    spark.register(session)
+    folder = os.path.abspath(options.to)
+    (
+        session.read.format("netfloor")
+        .option("table", options.table)
+        .option("columns", options.columns)
+        .option("where", options.where)
+        .option("shards", str(4 * options.workers))
+        .load([os.path.abspath(capture) if os.path.exists(capture) else capture for capture in options.captures])
+        .write.parquet(folder)
+    )
+    print(f"{options.to}: {session.read.parquet(folder).count()} rows", flush=True)
+
+
+def _reason(error: PySparkException) -> str:
+    """The sentence of the package among the frames of Java and Python, if there is one."""
+    text = str(error)
+    found = re.findall(r"^(?:netfloor\.[\w.]+|ValueError): (.+)$", text, re.MULTILINE)
+    return str(found[-1]) if found else text
 
 
 if __name__ == "__main__":

@@ -309,5 +309,6 @@ class NetfloorDataSource(DataSource):
 
 
 def register(spark: SparkSession) -> None:
-    """Makes the format "netfloor" known. The package must be installed where the workers run, too."""
+    """Makes the format "netfloor" known, and lets filters reach it. Where the workers run, the package is needed, too."""
+    spark.conf.set("spark.sql.python.filterPushdown.enabled", "true")  # without it, Spark refuses what takes filters
     spark.dataSource.register(NetfloorDataSource)
