@@ -1,6 +1,7 @@
 # SPDX-License-Identifier: MIT
 """A Spark cluster on this machine: a master and workers, each a process of its own, on the loopback address."""
 
+import ctypes
 import os
 import signal
 import socket
@@ -20,6 +21,12 @@ def _free_port() -> int:
     with socket.socket() as probe:
         probe.bind((HOST, 0))
         return int(probe.getsockname()[1])
+
+
+def _end_with_parent() -> None:
+    """The kernel ends this process when the one that started it is killed."""
+    set_parent_death_signal = 1
+    ctypes.CDLL(None).prctl(set_parent_death_signal, signal.SIGTERM)
 
 
 class LocalCluster:
@@ -71,7 +78,9 @@ class LocalCluster:
         command = [str(home / "bin" / "spark-class"), f"org.apache.spark.deploy.{name}", "--host", HOST, *arguments]
         with open(self._folder / f"{name}.{len(self._processes)}.log", "wb") as log:
             # A session of its own: a worker and its executors are ended together.
-            process = subprocess.Popen(command, env=environment, stdout=log, stderr=log, start_new_session=True)
+            process = subprocess.Popen(
+                command, env=environment, stdout=log, stderr=log, start_new_session=True, preexec_fn=_end_with_parent
+            )
         self._processes.append(process)
 
     def _wait_for(self, workers: int, seconds: float = 180) -> None:
