@@ -25,14 +25,14 @@ verdict() {
     fi
 }
 
-if ! scripts/python-environment.sh; then
+# The command is what the package's rows are compared with.
+if ! scripts/build-command.sh || ! scripts/python-environment.sh; then
     echo "0 passed, 1 failed"
     exit 1
 fi
 
 echo "== types"
 verdict mypy "$venv/bin/mypy" --config-file python/pyproject.toml --cache-dir build/mypy python/netfloor
-
 
 echo "== tests"
 "$venv/bin/pytest" -q -o cache_dir="$PWD/build/pytest" --junit-xml="$results" "${@:-python/tests}"

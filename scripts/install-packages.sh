@@ -6,7 +6,7 @@
 #   scripts/install-packages.sh all       that, and what the tests, the checks and the benchmarks need
 #   scripts/install-packages.sh hosts     what ./check hosts needs: compilers for other machines, and what runs their programs
 #   scripts/install-packages.sh page      what ./check page needs: a browser, and what drives it
-#   scripts/install-packages.sh python    what ./check python needs: Python's headers, and GNU parallel
+#   scripts/install-packages.sh python    what ./check python and ./spark need: Python's headers, Java, GNU parallel
 #   scripts/install-packages.sh packages  what packaging/try-packages.sh needs: it builds Debian packages and a bare Debian
 set -eu
 
@@ -19,7 +19,7 @@ hosts="$decode libgtest-dev googletest g++-12-multilib g++-s390x-linux-gnu g++-m
     g++-mingw-w64-x86-64-posix wine64 qemu-user"
 page="$decode chromium nodejs"
 command -v npm >/dev/null || page="$page npm" # some packages of nodejs have it, and exclude Debian's own
-python="$decode python3-dev python3-venv parallel"
+python="$decode python3-dev python3-venv parallel openjdk-17-jre-headless"
 packages="$decode help2man dpkg-dev file debootstrap"
 
 case "${1:-all}" in

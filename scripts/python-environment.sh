@@ -22,5 +22,13 @@ if [ "$(cat "$venv/requirements" 2>/dev/null)" != "$requirements" ]; then
     step "packages from PyPI" "$venv/bin/pip" install --disable-pip-version-check -r python/tests/requirements.txt
     echo "$requirements" >"$venv/requirements"
 fi
-step "building: ./python" "$venv/bin/pip" install --disable-pip-version-check --no-deps --no-build-isolation \
-    --force-reinstall ./python
+
+# Anything that is newer than the installation. A folder is when a file in it has gone.
+sources="CMakeLists.txt cmake include plugin host capture analysis columns python"
+# shellcheck disable=SC2086
+if [ ! -f "$venv/installed" ] || [ -n "$(find $sources -newer "$venv/installed" ! -name __pycache__ -print -quit)" ]; then
+    touch "$venv/installing"
+    step "building: ./python" "$venv/bin/pip" install --disable-pip-version-check --no-deps --no-build-isolation \
+        --force-reinstall ./python
+    mv "$venv/installing" "$venv/installed"
+fi

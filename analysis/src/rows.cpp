@@ -329,21 +329,23 @@ void PacketRows::readCauses(const Layer &chunk, RowSink &sink) {
 
 // The fields of a layer for which the row has columns. What is there stays: of two AH or ESP headers, the first.
 void PacketRows::fill(Row &row, const Layer &layer) const {
+    const std::span<const Column> types = columns(row.kind());
     const FieldColumns &columns = row.kind() == RowKind::layer ? layerColumns : chunkColumns;
     const auto &ofKind = columns[static_cast<std::size_t>(layer.kind)];
     for (std::uint32_t rest = layer.present; rest != 0; rest &= rest - 1) {
         const auto place = static_cast<std::uint8_t>(std::countr_zero(rest));
         const std::size_t to = ofKind[place];
         if (to != noColumn && !row.has(to)) {
-            row.set(to, valueOf(layer, {layer.kind, place}));
+            row.set(to, valueOf(layer, {layer.kind, place}, types[to].type));
         }
     }
 }
 
-Value PacketRows::valueOf(const Layer &layer, LayerField field) const {
+Value PacketRows::valueOf(const Layer &layer, LayerField field, ColumnType type) const {
     const LayerValue kind = view_.valueKind(layer, field);
     if (kind == LayerValue::number || kind == LayerValue::packetNumber) {
-        return number(view_.number(layer, field).value());
+        const std::uint32_t value = view_.number(layer, field).value();
+        return number(type == ColumnType::boolean ? std::uint32_t{value != 0} : value); // it may be an option's kind
     }
     return {0, {}, view_.octets(layer, field)};
 }

@@ -7,6 +7,7 @@ plan() its shards, which several processes can read.
 
 from ._errors import CaptureDamage, CaptureError, ConditionError, PluginError
 from ._netfloor import Field, Packet, Shard
+from ._plans import read_plan
 from ._scan import Column, Scan, columns, packets, plan, scan
 
 __all__ = [
@@ -22,5 +23,6 @@ __all__ = [
     "columns",
     "packets",
     "plan",
+    "read_plan",
     "scan",
 ]

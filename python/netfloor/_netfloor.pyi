@@ -18,6 +18,18 @@ class Shard:
     def packets(self) -> int: ...
     @property
     def first_time_ns(self) -> int | None: ...
+    @property
+    def file_octets(self) -> int:
+        """The size of the capture when it was planned."""
+    @property
+    def file_modified_ns(self) -> int:
+        """Its time of change then, since 1970."""
+    @property
+    def is_packed(self) -> bool:
+        """Whether it is packed with gzip."""
+    @property
+    def blocks_before(self) -> list[int]:
+        """The octets at which the pcapng blocks begin that a reader of the shard needs before it."""
     def __getstate__(self) -> Any: ...
     def __setstate__(self, state: Any) -> None: ...
 

@@ -85,6 +85,7 @@ void addScan(nb::module_ &module) {
                                    .binaryAddresses = binaryAddresses};
                 if (shard) {
                     scan.shard = shard->plan;
+                    scan.shard->path = scan.path; // which may be that of a copy
                 }
                 checkScan(scan);
                 new (self) ColumnScan(std::move(scan));

@@ -2,6 +2,7 @@
 // Shards of a capture. They are pickled, so that other processes and machines can read them.
 #include "shards.h"
 
+#include <algorithm>
 #include <new>
 #include <string>
 #include <tuple>
@@ -81,6 +82,21 @@ const Shard &shardOf(const PlannedShard &planned) {
     return planned.plan.shards.front();
 }
 
+// Where the blocks begin that a reader of the shard needs before it.
+std::vector<std::uint64_t> blocksBefore(const PlannedShard &planned) {
+    const ReadingPlace &begin = shardOf(planned).begin;
+    const auto &sections = planned.plan.sections;
+    const auto section = std::ranges::find(sections, begin.section, &SectionBlocks::begin);
+    if (section == sections.end()) {
+        return {};
+    }
+    const std::size_t known = std::min<std::uint64_t>(begin.interfaces, section->interfaces.size());
+    std::vector<std::uint64_t> blocks = {section->begin};
+    blocks.insert(blocks.end(), section->interfaces.begin(),
+                  section->interfaces.begin() + static_cast<std::ptrdiff_t>(known));
+    return blocks;
+}
+
 std::optional<std::int64_t> firstTime(const PlannedShard &planned) {
     const auto &time = shardOf(planned).firstTime;
     return time ? time->inNanoseconds() : std::nullopt;
@@ -97,7 +113,11 @@ void addShards(nb::module_ &module) {
         .def_prop_ro("end", [](const PlannedShard &planned) { return shardOf(planned).end; })
         .def_prop_ro("first_packet", [](const PlannedShard &planned) { return shardOf(planned).begin.packets + 1; })
         .def_prop_ro("packets", [](const PlannedShard &planned) { return shardOf(planned).packets; })
-        .def_prop_ro("first_time_ns", &firstTime);
+        .def_prop_ro("first_time_ns", &firstTime)
+        .def_prop_ro("file_octets", [](const PlannedShard &planned) { return planned.plan.file.octets; })
+        .def_prop_ro("file_modified_ns", [](const PlannedShard &planned) { return planned.plan.file.modified; })
+        .def_prop_ro("is_packed", [](const PlannedShard &planned) { return planned.plan.isPacked; })
+        .def_prop_ro("blocks_before", &blocksBefore);
     module.def("plan", &planOf, nb::arg("path"), nb::arg("shard_octets"));
 }
 

@@ -2,16 +2,34 @@
 """What several tests need: the captures of the repository, and captures made for a test."""
 
 import struct
+import subprocess
 from pathlib import Path
 
 import pytest
 
-CAPTURES = Path(__file__).parents[2] / "tests" / "captures"
+ROOT = Path(__file__).parents[2]
+CAPTURES = ROOT / "tests" / "captures"
+COMMAND = ROOT / "build" / "cli" / "netfloor"
 
 
-def sctp_packet(tsn: int) -> bytes:
-    """IPv4, SCTP and one DATA chunk."""
-    chunk = struct.pack(">BBHIHHI", 0, 3, 20, tsn, 2, 3, 46) + b"data"
+def captures() -> list[Path]:
+    return sorted(path for path in CAPTURES.iterdir() if path.suffix in (".pcap", ".pcapng"))
+
+
+def write_plan(path: Path, shards: int, plan: Path | None = None) -> Path:
+    """By the command; beside the capture unless it is told where."""
+    plan = plan or path.with_name(path.name + ".plan.json")
+    command = [COMMAND, "plan", "--shards", str(shards), path]
+    plan.write_bytes(subprocess.run(command, check=True, capture_output=True).stdout)
+    return plan
+
+
+ABORT = struct.pack(">BBHHH", 6, 0, 16, 12, 12) + b"by users"
+
+
+def sctp_packet(tsn: int, chunk: bytes = b"") -> bytes:
+    """IPv4, SCTP and one chunk: DATA, or the one that is given."""
+    chunk = chunk or struct.pack(">BBHIHHI", 0, 3, 20, tsn, 2, 3, 46) + b"data"
     sctp = struct.pack(">HHII", 2905, 2906, 42, 0) + chunk
     addresses = bytes([10, 0, 0, tsn % 250, 192, 168, 0, 2])
     return struct.pack(">BBHHHBBH", 0x45, 0, 20 + len(sctp), tsn & 0xFFFF, 0, 64, 132, 0) + addresses + sctp

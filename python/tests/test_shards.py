@@ -1,10 +1,8 @@
 # SPDX-License-Identifier: MIT
 """Shards in this process, under Dask and under GNU parallel."""
 
-import os
 import pickle
 import subprocess
-import sys
 from pathlib import Path
 
 import dask.dataframe
@@ -13,7 +11,7 @@ import pandas
 import pyarrow as pa
 import pytest
 
-from conftest import CAPTURES
+from conftest import CAPTURES, COMMAND, write_plan
 
 
 def rows(shard: netfloor.Shard) -> pandas.DataFrame:
@@ -47,18 +45,19 @@ def test_dask_reads_a_shard_a_partition(sctp_capture: Path) -> None:
     assert frame["sctp_tsn"].sum().compute(scheduler="processes", num_workers=2) == sum(range(1000))
 
 
-PART = """
-import pickle, sys
-import netfloor, pyarrow as pa
-shard = pickle.load(open(sys.argv[1], "rb"))
-print(sum(pa.table(netfloor.scan(shard.path, "chunks", shard=shard))["sctp_tsn"].to_pylist()))
-"""
-
-
 def test_gnu_parallel_reads_a_shard_a_process(sctp_capture: Path, tmp_path: Path) -> None:
-    (tmp_path / "part.py").write_text(PART)
-    for number, shard in enumerate(netfloor.plan(sctp_capture, 3)):
-        (tmp_path / f"{number}.shard").write_bytes(pickle.dumps(shard))
-    command = ["parallel", "-j2", sys.executable, str(tmp_path / "part.py"), ":::", *map(str, tmp_path.glob("*.shard"))]
-    output = subprocess.run(command, check=True, capture_output=True, text=True, env=os.environ).stdout
-    assert sum(map(int, output.split())) == sum(range(1000))
+    plan = write_plan(sctp_capture, 7)
+    keys = f"{COMMAND} keys --per chunk"
+    parts = subprocess.run(f"seq 7 | parallel -k -j2 {keys} --shard {plan}:{{}}", shell=True, check=True, capture_output=True)
+    whole = subprocess.run(f"{keys} {sctp_capture}", shell=True, check=True, capture_output=True)
+    assert whole.stdout.count(b"\n") == 1001
+    assert parts.stdout == whole.stdout
+
+
+def test_a_plan_of_the_command_has_the_same_shards(tmp_path: Path) -> None:
+    capture = CAPTURES / "pcapng-big-endian-two-interfaces.pcapng"
+    found = netfloor.read_plan(write_plan(capture, 3, tmp_path / "plan.json").read_bytes())
+    assert [pickle.dumps(shard) for shard in found] == [pickle.dumps(shard) for shard in netfloor.plan(capture, 3)]
+    for text in ("{", "{}", '{"plan_version": 2}', '{"plan_version": 1, "captures": [], "shards": [{"capture": 0}]}'):
+        with pytest.raises(ValueError, match="plan"):
+            netfloor.read_plan(text)

@@ -43,7 +43,7 @@ struct PacketInput {
 
 // One of the three, by the type of its column.
 struct Value {
-    std::uint64_t number = 0; // boolean, u8 to u64; of a time the bits of the signed number
+    std::uint64_t number = 0; // boolean (0 or 1), u8 to u64; of a time the bits of the signed number
     std::string_view text;
     std::span<const std::uint8_t> octets; // also of an address
 
@@ -130,7 +130,7 @@ private:
     void readChunks(std::span<const Layer> layers, RowSink &sink);
     void readCauses(const Layer &chunk, RowSink &sink);
     void fill(Row &row, const Layer &layer) const;
-    [[nodiscard]] Value valueOf(const Layer &layer, LayerField field) const;
+    [[nodiscard]] Value valueOf(const Layer &layer, LayerField field, ColumnType type) const;
 
     LayerView view_;
     PacketChecks checks_;

@@ -1,0 +1,102 @@
+# SPDX-License-Identifier: MIT
+"""The columns against the database that `netfloor export` writes of the same captures."""
+
+import sqlite3
+import subprocess
+from collections.abc import Iterator
+from pathlib import Path
+from typing import Any
+
+import duckdb
+import netfloor
+import pyarrow as pa
+import pyarrow.parquet
+import pytest
+
+from conftest import ABORT, COMMAND, captures, sctp_packet, write_pcap
+
+TABLES = ["packets", "layers", "chunks", "causes"]
+
+
+@pytest.fixture(scope="module")
+def database(tmp_path_factory: pytest.TempPathFactory) -> Iterator[sqlite3.Connection]:
+    folder = tmp_path_factory.mktemp("export")
+    path = folder / "traffic.db"
+    # What no capture of the repository has: a chunk that was sent twice, and a cause.
+    packets = [sctp_packet(1), sctp_packet(1), sctp_packet(2, ABORT)]
+    mine = write_pcap(folder / "abort.pcap", packets)
+    subprocess.run([COMMAND, "export", "--to", path, *captures(), mine], check=True, capture_output=True)
+    connection = sqlite3.connect(path)
+    yield connection
+    connection.close()
+
+
+def numbered(database: sqlite3.Connection) -> list[tuple[int, str]]:
+    return database.execute("SELECT capture, file FROM captures ORDER BY capture").fetchall()
+
+
+def as_in_sql(table: pa.Table) -> list[tuple[Any, ...]]:
+    """SQLite has neither times nor booleans."""
+    columns = []
+    for column in table.columns:
+        is_number = pa.types.is_timestamp(column.type) or pa.types.is_boolean(column.type)
+        columns.append((column.cast(pa.int64()) if is_number else column).to_pylist())
+    return list(zip(*columns, strict=True))
+
+
+@pytest.mark.parametrize("table", TABLES)
+def test_parquet_has_the_rows_of_export(database: sqlite3.Connection, table: str, tmp_path: Path) -> None:
+    names = ", ".join(column.name for column in netfloor.columns(table))
+    rows = 0
+    for capture, path in numbered(database):
+        reader = pa.RecordBatchReader.from_stream(netfloor.scan(path, table))
+        with pa.parquet.ParquetWriter(tmp_path / "table.parquet", reader.schema) as out:
+            for batch in reader:
+                batch.validate(full=True)
+                out.write_batch(batch)
+        found = as_in_sql(pa.parquet.read_table(tmp_path / "table.parquet"))
+        assert found == database.execute(f"SELECT {names} FROM {table} WHERE capture = ? ORDER BY rowid", [capture]).fetchall()
+        rows += len(found)
+    assert rows > 0
+
+
+@pytest.fixture(scope="module")
+def scanned(database: sqlite3.Connection) -> Iterator[duckdb.DuckDBPyConnection]:
+    """The scanned captures in DuckDB, with what of export is no table of packets: names, files, views."""
+    connection = duckdb.connect()
+    connection.execute('CREATE TABLE value_names("column" TEXT, value BIGINT, name TEXT)')
+    connection.executemany("INSERT INTO value_names VALUES (?, ?, ?)", database.execute("SELECT * FROM value_names").fetchall())
+    connection.execute("CREATE TABLE captures(capture BIGINT, file TEXT)")
+    connection.executemany("INSERT INTO captures VALUES (?, ?)", numbered(database))
+    for table in TABLES:
+        # The views of export count in nanoseconds.
+        columns = "*" if table == "causes" else "* REPLACE (epoch_ns(time) AS time)"
+        for capture, path in numbered(database):
+            rows = netfloor.scan(path, table)
+            verb = f"CREATE TABLE {table} AS" if capture == 1 else f"INSERT INTO {table}"
+            connection.execute(f"{verb} SELECT {capture} AS capture, {columns} FROM rows")
+    for (view,) in database.execute("SELECT sql FROM sqlite_master WHERE type = 'view'").fetchall():
+        connection.execute(view)
+    yield connection
+    connection.close()
+
+
+# Those of the README, with an order that leaves no choice.
+QUESTIONS = [
+    "SELECT tunnel, outer_source, outer_destination, count(*) FROM tunnels GROUP BY 1, 2, 3 ORDER BY 4 DESC, 1, 2, 3",
+    """SELECT name, count(*) FROM chunks JOIN value_names ON "column" = 'sctp_chunk_type' AND value = sctp_chunk_type
+       GROUP BY 1 ORDER BY 2 DESC, 1""",
+    "SELECT sctp_tsn, times, nanoseconds FROM retransmissions ORDER BY first_packet",
+    "SELECT packet, ip_source, cause_code, cause_name FROM aborts ORDER BY capture, packet",
+    "SELECT file, packet, checks_damage FROM packets JOIN captures USING(capture) WHERE checks_damaged ORDER BY 1, 2",
+    "SELECT ip_source, source_port, ip_protocol, sum(packets) FROM flows GROUP BY 1, 2, 3 ORDER BY 4 DESC, 1, 2, 3 LIMIT 50",
+]
+
+
+@pytest.mark.parametrize("question", QUESTIONS)
+def test_duckdb_answers_as_the_database(
+    database: sqlite3.Connection, scanned: duckdb.DuckDBPyConnection, question: str
+) -> None:
+    answer = database.execute(question).fetchall()
+    assert answer
+    assert scanned.execute(question).fetchall() == answer
