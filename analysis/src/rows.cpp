@@ -334,18 +334,17 @@ void PacketRows::fill(Row &row, const Layer &layer) const {
     for (std::uint32_t rest = layer.present; rest != 0; rest &= rest - 1) {
         const auto place = static_cast<std::uint8_t>(std::countr_zero(rest));
         const std::size_t to = ofKind[place];
-        if (to != noColumn && !row.has(to)) {
-            row.set(to, valueOf(layer, {layer.kind, place}));
+        if (to == noColumn || row.has(to)) {
+            continue;
+        }
+        const LayerField field = {layer.kind, place};
+        const LayerValue kind = view_.valueKind(layer, field);
+        if (kind == LayerValue::number || kind == LayerValue::packetNumber) {
+            row.setNumber(to, view_.number(layer, field).value());
+        } else {
+            row.set(to, {0, {}, view_.octets(layer, field)});
         }
     }
-}
-
-Value PacketRows::valueOf(const Layer &layer, LayerField field) const {
-    const LayerValue kind = view_.valueKind(layer, field);
-    if (kind == LayerValue::number || kind == LayerValue::packetNumber) {
-        return number(view_.number(layer, field).value());
-    }
-    return {0, {}, view_.octets(layer, field)};
 }
 
 } // namespace netfloor

@@ -86,6 +86,11 @@ public:
         present_[column / 64] |= std::uint64_t{1} << column % 64;
         values_[column] = value;
     }
+    // Of a column that holds numbers only: in place, which is much faster than a whole Value.
+    void setNumber(std::size_t column, std::uint64_t number) {
+        present_[column / 64] |= std::uint64_t{1} << column % 64;
+        values_[column].number = number;
+    }
     void unset(std::size_t column) { present_[column / 64] &= ~(std::uint64_t{1} << column % 64); }
 
 private:
@@ -136,7 +141,6 @@ private:
     void readChunks(std::span<const Layer> layers, RowSink &sink);
     void readCauses(const Layer &chunk, RowSink &sink);
     void fill(Row &row, const Layer &layer) const;
-    [[nodiscard]] Value valueOf(const Layer &layer, LayerField field) const;
 
     LayerView view_;
     PacketChecks checks_;
