@@ -23,7 +23,9 @@ void Statement::Close::operator()(sqlite3_stmt *statement) const {
 
 Database::Database(const std::filesystem::path &path) : name_(path.string()) {
     sqlite3 *opened = nullptr;
-    const int result = sqlite3_open_v2(name_.c_str(), &opened, SQLITE_OPEN_READWRITE | SQLITE_OPEN_CREATE, nullptr);
+    // One thread uses it at a time, so that SQLite needs no locks of its own.
+    constexpr int flags = SQLITE_OPEN_READWRITE | SQLITE_OPEN_CREATE | SQLITE_OPEN_NOMUTEX;
+    const int result = sqlite3_open_v2(name_.c_str(), &opened, flags, nullptr);
     database_.reset(opened);
     if (opened == nullptr) {
         throw std::bad_alloc();
@@ -82,9 +84,9 @@ void Statement::bind(int place, std::string_view text) const {
     check(sqlite3_bind_text64(statement_.get(), place, text.data(), text.size(), SQLITE_STATIC, SQLITE_UTF8));
 }
 
-void Statement::bind(int place, std::span<const std::uint8_t> octets) const {
+void Statement::bindOctets(int place, std::string_view octets) const {
     // A null pointer would be a null, and no blob without octets.
-    const void *const data = octets.empty() ? "" : static_cast<const void *>(octets.data());
+    const void *const data = octets.empty() ? "" : octets.data();
     check(sqlite3_bind_blob64(statement_.get(), place, data, octets.size(), SQLITE_STATIC));
 }
 
@@ -94,7 +96,10 @@ void Statement::step() const {
         database_->fail();
     }
     check(sqlite3_reset(statement_.get()));
-    check(sqlite3_clear_bindings(statement_.get()));
+}
+
+void Statement::unbind(int place) const {
+    check(sqlite3_bind_null(statement_.get(), place));
 }
 
 } // namespace netfloor::cli

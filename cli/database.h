@@ -1,11 +1,10 @@
 // SPDX-License-Identifier: MIT
-// A SQLite file that is written to. All functions throw OutputError, with SQLite's own words.
+// A SQLite file that is written to, by one thread at a time. All functions throw OutputError, with SQLite's own words.
 #pragma once
 
 #include <cstdint>
 #include <filesystem>
 #include <memory>
-#include <span>
 #include <string>
 #include <string_view>
 
@@ -40,14 +39,15 @@ private:
     std::unique_ptr<sqlite3, Close> database_;
 };
 
-// Places of values are counted from 1. Texts and octets must live until `step`. Those that are not bound are null.
+// Places of values are counted from 1. Texts and octets must live until `step`. What is not bound is null.
 class Statement {
 public:
     void bind(int place, std::int64_t number) const;
     void bind(int place, std::string_view text) const;
-    void bind(int place, std::span<const std::uint8_t> octets) const;
+    void bindOctets(int place, std::string_view octets) const;
+    void unbind(int place) const;
 
-    // Runs it, and makes it ready to be run with other values.
+    // Runs it, and makes it ready to be run again. Values stay bound until others are.
     void step() const;
 
 private:

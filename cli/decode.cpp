@@ -56,6 +56,9 @@ public:
         if (!options_.write.empty()) {
             refuseToWriteWhatIsRead();
         }
+        if (options_.command == Command::exporting && !options_.append) {
+            refuseToWriteWhatIsThere();
+        }
         if (jobCount(options_) > 1) {
             jobs_.emplace(options_, wantsColour(asked.colour), library_);
         }
@@ -157,6 +160,14 @@ private:
         }
     }
 
+    void refuseToWriteWhatIsThere() const {
+        std::error_code error; // one that does not exist has no octets
+        if (std::filesystem::file_size(options_.to, error) != 0 && !error) {
+            throw UsageError("--to " + options_.to.string() +
+                             ": this file is there already. Name another one, or add to it with --append.");
+        }
+    }
+
     // The heading in front of what follows, as programs that show the starts of several files have it.
     void startPart(std::string_view name) {
         if (!hasSeveral() || !printer().hasHeadings()) {
@@ -200,7 +211,7 @@ private:
                     keep(packets[i], *block.kinds[i], tally);
                 }
             }
-            out_.writeThrough(block.text.view());
+            printer().write(block.text.view());
         });
         jobs_->giveCounts(printer());
     }

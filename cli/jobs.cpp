@@ -138,9 +138,8 @@ void Jobs::giveCounts(Printer &printer) {
 }
 
 unsigned jobCount(const Options &options) {
-    // Where the reading ends is known in order alone, a page names labels in the order in which they come, and one
-    // thread writes a database.
-    if (options.count || options.command == Command::html || options.command == Command::exporting) {
+    // Where the reading ends is known in order alone, and a page names labels in the order in which they come.
+    if (options.count || options.command == Command::html) {
         return 1;
     }
     return options.jobs.value_or(

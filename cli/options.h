@@ -70,7 +70,8 @@ struct Options {
 
     // Without --jobs: for rows and totals all cores, for what people look at one.
     [[nodiscard]] bool usesAllCores() const {
-        return command == Command::keys || command == Command::json || command == Command::verify;
+        return command == Command::keys || command == Command::json || command == Command::exporting ||
+               command == Command::verify;
     }
 };
 

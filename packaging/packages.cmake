@@ -20,6 +20,9 @@ set(CPACK_COMPONENT_RUNTIME_DESCRIPTION "plug-in that decodes the IP layers of a
 set(CPACK_DEBIAN_DEV_PACKAGE_NAME libnetfloor-dev)
 set(CPACK_DEBIAN_DEV_PACKAGE_SECTION libdevel)
 set(CPACK_DEBIAN_DEV_PACKAGE_DEPENDS "zlib1g-dev")
+if(NETFLOOR_ISAL) # the static host library has it
+    string(APPEND CPACK_DEBIAN_DEV_PACKAGE_DEPENDS ", libisal-dev")
+endif()
 set(CPACK_COMPONENT_DEV_DEPENDS runtime)
 set(CPACK_COMPONENT_DEV_DESCRIPTION "headers and libraries for programs that use netfloor")
 

@@ -45,6 +45,9 @@ for example in decode_packet c_host; do
 done
 in_root sh -c 'g++ -std=c++20 $(pkg-config --cflags netfloor-host) -DPLUGIN_PATH="\"$(pkg-config --variable=plugin netfloor-host)\"" /tmp/decode_packet/main.cpp $(pkg-config --libs netfloor-host) -o /tmp/by-pkg-config'
 in_root /tmp/by-pkg-config | diff "$top/examples/decode_packet/expected.txt" -
+cp -R "$top/examples/read_columns" "$top/tests/captures/icmp-types.pcapng" "$root/tmp/"
+in_root sh -c 'g++ -std=c++20 -DPLUGIN_PATH="\"$(pkg-config --variable=plugin netfloor-columns)\"" $(pkg-config --cflags netfloor-columns) /tmp/read_columns/main.cpp $(pkg-config --libs netfloor-columns) -o /tmp/columns-by-pkg-config'
+in_root /tmp/columns-by-pkg-config /tmp/icmp-types.pcapng | diff "$top/examples/read_columns/expected.txt" -
 
 echo "removal"
 in_root apt-get purge -y -q netfloor libnetfloor libnetfloor-dev >"$work/log" 2>&1

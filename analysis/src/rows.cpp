@@ -335,19 +335,19 @@ void PacketRows::fill(Row &row, const Layer &layer) const {
     for (std::uint32_t rest = layer.present; rest != 0; rest &= rest - 1) {
         const auto place = static_cast<std::uint8_t>(std::countr_zero(rest));
         const std::size_t to = ofKind[place];
-        if (to != noColumn && !row.has(to)) {
-            row.set(to, valueOf(layer, {layer.kind, place}, types[to].type));
+        if (to == noColumn || row.has(to)) {
+            continue;
+        }
+        const LayerField field = {layer.kind, place};
+        const LayerValue kind = view_.valueKind(layer, field);
+        if (kind == LayerValue::number || kind == LayerValue::packetNumber) {
+            const std::uint32_t value = view_.number(layer, field).value();
+            // A field may be an option's kind where the column tells whether there is one.
+            row.setNumber(to, types[to].type == ColumnType::boolean ? std::uint32_t{value != 0} : value);
+        } else {
+            row.set(to, {0, {}, view_.octets(layer, field)});
         }
     }
-}
-
-Value PacketRows::valueOf(const Layer &layer, LayerField field, ColumnType type) const {
-    const LayerValue kind = view_.valueKind(layer, field);
-    if (kind == LayerValue::number || kind == LayerValue::packetNumber) {
-        const std::uint32_t value = view_.number(layer, field).value();
-        return number(type == ColumnType::boolean ? std::uint32_t{value != 0} : value); // it may be an option's kind
-    }
-    return {0, {}, view_.octets(layer, field)};
 }
 
 } // namespace netfloor

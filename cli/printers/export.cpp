@@ -1,8 +1,6 @@
 // SPDX-License-Identifier: MIT
 // Rows into the tables of a SQLite file, in one transaction for each capture: it is there as a whole, or not at all.
-#include <array>
 #include <optional>
-#include <set>
 #include <string>
 #include <vector>
 
@@ -11,6 +9,7 @@
 #include "netfloor-analysis/rows.h"
 #include "netfloor-host/field_tables.h"
 #include "printers/export_schema.h"
+#include "printers/packed_rows.h"
 #include "printers/printer.h"
 
 namespace netfloor::cli {
@@ -21,33 +20,37 @@ namespace {
 class Table {
 public:
     Table(const Database &database, RowKind kind)
-        : columns_(columns(kind)), insert_(database.prepare(insertText(kind))), rooms_(columns_.size()) {}
+        : columns_(columns(kind)), insert_(database.prepare(insertText(kind))) {}
 
-    void add(std::int64_t capture, const Row &row) {
+    // A row of which the head has been taken.
+    void add(std::int64_t capture, const Row::Columns &present, PackedRows &values) {
         insert_.bind(1, capture);
-        row.forEach([&](std::size_t column, const Value &value) { bind(column, value); });
+        for (std::size_t word = 0; word < present.size(); ++word) {
+            before_[word] &= ~present[word];
+        }
+        Row::forEachColumn(before_, [&](std::size_t column) { insert_.unbind(place(column)); });
+        Row::forEachColumn(present, [&](std::size_t column) { bind(column, values); });
         insert_.step();
+        before_ = present;
     }
 
 private:
-    void bind(std::size_t column, const Value &value) {
-        const int place = static_cast<int>(column) + 2; // the capture is the first
-        switch (columns_[column].type) {
-        case ColumnType::boolean:
-        case ColumnType::u8:
-        case ColumnType::u16:
-        case ColumnType::u32:
-        case ColumnType::u64:
-        case ColumnType::time: insert_.bind(place, value.time()); break;
-        case ColumnType::text: insert_.bind(place, value.text); break;
-        case ColumnType::octets: insert_.bind(place, value.octets); break;
-        case ColumnType::address: insert_.bind(place, addressText(value.octets, rooms_[column])); break;
+    static int place(std::size_t column) { return static_cast<int>(column) + 2; } // the capture is the first
+
+    void bind(std::size_t column, PackedRows &values) const {
+        const ColumnType type = columns_[column].type;
+        const PackedValue value = values.takeValue(type);
+        switch (type) {
+        case ColumnType::text:
+        case ColumnType::address: insert_.bind(place(column), value.octets); break;
+        case ColumnType::octets: insert_.bindOctets(place(column), value.octets); break;
+        default: insert_.bind(place(column), value.number); break;
         }
     }
 
     std::span<const Column> columns_;
     Statement insert_;
-    std::vector<TextRoom> rooms_; // for addresses, until the row is written
+    Row::Columns before_ = {}; // what the row before had
 };
 
 // The file, from the first capture on.
@@ -61,14 +64,7 @@ struct Tables {
 
 class ExportPrinter final : public Printer, private RowSink {
 public:
-    ExportPrinter(const Options &options, Output &out, Host &host) : Printer(options, out, host), rows_(host) {
-        std::error_code error; // one that does not exist has no octets
-        const bool isThere = std::filesystem::file_size(options.to, error) != 0 && !error;
-        if (isThere && !options.append) {
-            throw UsageError("--to " + options.to.string() +
-                             ": this file is there already. Name another one, or add to it with --append.");
-        }
-    }
+    ExportPrinter(const Options &options, Output &out, Host &host) : Printer(options, out, host), rows_(host) {}
 
     void startCapture(std::string_view name) override {
         if (!file_) {
@@ -88,7 +84,23 @@ public:
         capture_ = file_->database.lastRow();
     }
 
-    void print(const PacketToPrint &packet) override { rows_.read(packet.input(), *this); }
+    // In a thread that has no captures, the rows are what it prints.
+    void print(const PacketToPrint &packet) override {
+        const Output::Mark start = out().mark();
+        rows_.read(packet.input(), *this);
+        if (isOpen_) {
+            write(out().since(start));
+            out().takeBack(start);
+        }
+    }
+
+    void write(std::string_view printed) override {
+        PackedRows rows(printed);
+        while (!rows.isEmpty()) {
+            const PackedRows::Head head = rows.takeHead();
+            file_->tables[static_cast<std::size_t>(head.kind)].add(capture_, head.present, rows);
+        }
+    }
 
     void endCapture(std::string_view problem) override {
         const Statement update = file_->database.prepare(
@@ -128,7 +140,7 @@ private:
         }
     }
 
-    void row(const Row &row) override { file_->tables[static_cast<std::size_t>(row.kind())].add(capture_, row); }
+    void row(const Row &row) override { packRow(out(), row); }
 
     PacketRows rows_;
     std::optional<Tables> file_;

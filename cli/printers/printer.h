@@ -69,6 +69,9 @@ public:
 
     virtual void print(const PacketToPrint &packet) = 0;
 
+    // What printers in other threads have printed, in the order of the packets.
+    virtual void write(std::string_view printed) { out_.writeThrough(printed); }
+
     // After the last one. `problem` is a sentence where packets are missing: the capture is damaged, or Ctrl-C came.
     virtual void endCapture(std::string_view /*problem*/) {}
 

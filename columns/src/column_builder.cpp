@@ -13,57 +13,35 @@
 namespace netfloor {
 namespace {
 
-// Zeros up to `octets` at least.
-void growTo(Buffer &buffer, std::size_t octets) {
-    if (buffer.size() < octets) {
-        buffer.resize(std::max(octets, 2 * buffer.size()));
-    }
-}
-
 std::size_t bitmapOctets(std::size_t bits) {
     return (bits + 7) / 8;
 }
 
-void setBit(Buffer &bitmap, std::size_t bit) {
-    growTo(bitmap, bit / 8 + 1);
-    bitmap[bit / 8] = static_cast<std::uint8_t>(bitmap[bit / 8] | 1U << bit % 8);
-}
-
-// A buffer of this size; the builder's own is empty again.
-Buffer takeBuffer(Buffer &buffer, std::size_t octets) {
-    buffer.resize(octets);
-    return std::exchange(buffer, {});
-}
-
-template <typename Number>
-void setNumber(Buffer &buffer, std::size_t place, Number number) {
-    growTo(buffer, (place + 1) * sizeof number);
-    std::memcpy(&buffer[place * sizeof number], &number, sizeof number);
-}
-
 class BooleanBuilder final : public ColumnBuilder {
-    void keep(std::size_t row, const Value &value) override {
+    void set(std::size_t row, const Value &value) override {
+        markPresent(row);
         if (value.number != 0) {
-            setBit(bits_, row);
+            bits_.setBit(row);
         }
     }
     void finishValues(std::size_t rows, ArrayParts &parts) override {
-        parts.buffers.push_back(takeBuffer(bits_, bitmapOctets(rows)));
+        parts.buffers.push_back(bits_.take(bitmapOctets(rows)));
     }
 
-    Buffer bits_;
+    GrowingBuffer bits_;
 };
 
 template <typename Number>
 class NumberBuilder final : public ColumnBuilder {
-    void keep(std::size_t row, const Value &value) override {
-        setNumber(numbers_, row, static_cast<Number>(value.number));
+    void set(std::size_t row, const Value &value) override {
+        markPresent(row);
+        numbers_.setNumber(row, static_cast<Number>(value.number));
     }
     void finishValues(std::size_t rows, ArrayParts &parts) override {
-        parts.buffers.push_back(takeBuffer(numbers_, rows * sizeof(Number)));
+        parts.buffers.push_back(numbers_.take(rows * sizeof(Number)));
     }
 
-    Buffer numbers_;
+    GrowingBuffer numbers_;
 };
 
 // Values of any length, one after the other, and where each begins.
@@ -77,7 +55,7 @@ public:
 
     void finish(std::size_t rows, ArrayParts &parts) {
         fillTo(rows);
-        parts.buffers.push_back(takeBuffer(offsets_, (rows + 1) * sizeof(std::int32_t)));
+        parts.buffers.push_back(offsets_.take((rows + 1) * sizeof(std::int32_t)));
         parts.buffers.push_back(std::exchange(octets_, {}));
         filled_ = 1;
     }
@@ -86,11 +64,11 @@ private:
     // Rows up to this one end here, those that have no value included. The first offset is 0.
     void fillTo(std::size_t row) {
         for (; filled_ <= row; ++filled_) {
-            setNumber(offsets_, filled_, static_cast<std::int32_t>(octets_.size()));
+            offsets_.setNumber(filled_, static_cast<std::int32_t>(octets_.size()));
         }
     }
 
-    Buffer offsets_;
+    GrowingBuffer offsets_;
     Buffer octets_;
     std::size_t filled_ = 1;
 };
@@ -100,14 +78,20 @@ std::span<const std::uint8_t> octetsOf(std::string_view text) {
 }
 
 class TextBuilder final : public ColumnBuilder {
-    void keep(std::size_t row, const Value &value) override { run_.add(row, octetsOf(value.text)); }
+    void set(std::size_t row, const Value &value) override {
+        markPresent(row);
+        run_.add(row, octetsOf(value.text));
+    }
     void finishValues(std::size_t rows, ArrayParts &parts) override { run_.finish(rows, parts); }
 
     OctetRun run_;
 };
 
 class OctetsBuilder final : public ColumnBuilder {
-    void keep(std::size_t row, const Value &value) override { run_.add(row, value.octets); }
+    void set(std::size_t row, const Value &value) override {
+        markPresent(row);
+        run_.add(row, value.octets);
+    }
     void finishValues(std::size_t rows, ArrayParts &parts) override { run_.finish(rows, parts); }
 
     OctetRun run_;
@@ -145,16 +129,17 @@ std::string_view addressText(std::span<const std::uint8_t> octets, TextRoom &roo
 
 // Numbers of addresses; their texts are made once a batch.
 class AddressBuilder final : public ColumnBuilder {
-    void keep(std::size_t row, const Value &value) override {
+    void set(std::size_t row, const Value &value) override {
+        markPresent(row);
         const auto [found, isNew] = numbers_.try_emplace(Address(value.octets), numbers_.size());
         if (isNew) {
             TextRoom room;
             texts_.add(found->second, octetsOf(addressText(value.octets, room)));
         }
-        setNumber(indices_, row, static_cast<std::int32_t>(found->second));
+        indices_.setNumber(row, static_cast<std::int32_t>(found->second));
     }
     void finishValues(std::size_t rows, ArrayParts &parts) override {
-        parts.buffers.push_back(takeBuffer(indices_, rows * sizeof(std::int32_t)));
+        parts.buffers.push_back(indices_.take(rows * sizeof(std::int32_t)));
         ArrayParts dictionary;
         dictionary.length = static_cast<std::int64_t>(numbers_.size());
         texts_.finish(numbers_.size(), dictionary);
@@ -164,7 +149,7 @@ class AddressBuilder final : public ColumnBuilder {
 
     std::unordered_map<Address, std::size_t, AddressHash> numbers_;
     OctetRun texts_;
-    Buffer indices_;
+    GrowingBuffer indices_;
 };
 
 std::string formatOf(ColumnType type, bool binaryAddresses) {
@@ -184,17 +169,11 @@ std::string formatOf(ColumnType type, bool binaryAddresses) {
 
 } // namespace
 
-void ColumnBuilder::set(std::size_t row, const Value &value) {
-    setBit(present_, row);
-    ++values_;
-    keep(row, value);
-}
-
 OwnedArray ColumnBuilder::finish(std::size_t rows) {
     ArrayParts parts;
     parts.length = static_cast<std::int64_t>(rows);
     parts.nulls = static_cast<std::int64_t>(rows - std::exchange(values_, 0));
-    parts.validity = takeBuffer(present_, parts.nulls == 0 ? 0 : bitmapOctets(rows));
+    parts.validity = present_.take(parts.nulls == 0 ? 0 : bitmapOctets(rows));
     finishValues(rows, parts);
     return makeArray(std::move(parts));
 }

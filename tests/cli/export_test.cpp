@@ -105,6 +105,24 @@ TEST(Export, keepsWhatIsThere) {
     });
 }
 
+// Of many blocks, with rows of all kinds, and an error in the middle of one.
+TEST(Export, isTheSameWithAnyNumberOfJobs) {
+    check({
+        {"netfloor --write once.pcapng $C/*.pcap* >out && netfloor --write many.pcapng once.pcapng{,,,} >out && "
+         "{ cat many.pcapng; head -c 50 once.pcapng; } >cut.pcapng && for jobs in 1 2 5; do "
+         "netfloor export --jobs $jobs --to $jobs.db many.pcapng once.pcapng cut.pcapng 2>$jobs.err; echo $?; done; "
+         "netfloor export --append --to 5.db once.pcapng; netfloor export --append --jobs 1 --to 1.db once.pcapng; "
+         "sql 1.db .dump >1.sql; sql 5.db .dump | cmp - 1.sql; cmp 1.err 2.err; cmp 1.err 5.err; "
+         "sql 1.db 'SELECT count(*) > 10000, count(DISTINCT capture) FROM layers'",
+         "4\n4\n4\n1|4\n"},
+        {"sql 2.db \"CREATE TRIGGER no_more BEFORE INSERT ON packets WHEN new.packet = 3000 BEGIN SELECT RAISE(ABORT, "
+         "'no more'); END\"; netfloor export --append --jobs 2 --to 2.db once.pcapng many.pcapng 2>2.err; echo $?; "
+         "grep -c 'no more' 2.err; sql 2.db 'SELECT count(*), count(DISTINCT capture) FROM captures JOIN packets "
+         "USING(capture)' >joined; sql 2.db 'SELECT sum(packets), count(*) FROM captures' | cmp - joined",
+         "6\n1\n"},
+    });
+}
+
 TEST(Export, tellsHowACaptureEnded) {
     check({
         {"head -c 1000 $C/tcp-md5-bgp.pcap >cut.pcap; netfloor export --to cut.db cut.pcap $C/icmp-types.pcapng; echo "
