@@ -277,7 +277,8 @@ bool checkPasses(const Plugin &plugin, const Input &input) {
     if (input.plan.byteAreaSize > 16) { // else the pass ends at an address
         xtr.requireSame(upToFirstStop(md.seenByAll()), upToFirstStop(xtr.seenByAll()), "XTR disagrees with MD");
     }
-    if (input.plan.cursor == 1 && input.plan.missingBits == 0) {
+    const bool hasBitsOutside = input.plan.cursor != 1 || input.plan.missingBits != 0;
+    if (!hasBitsOutside || input.plan.oddOwners) { // which may send the plug-in there
         return md.ranToItsEnd();
     }
     const Input other = withOtherBitsOutside(input);
