@@ -1,6 +1,7 @@
 #!/bin/bash
 # SPDX-License-Identifier: MIT
-# Fuzzes a target and keeps what it learns in build/fuzz-targets/inputs/TARGET, from where the next run goes on.
+# Fuzzes a target and keeps what it learns in build/fuzz-targets/inputs/TARGET, from where the next run goes on. The
+# executions of all runs add up in build/fuzz-targets/executions/TARGET.
 #
 #   scripts/fuzz.sh TARGET [SECONDS]    TARGET is passes, capture or command; SECONDS is 600
 #   scripts/fuzz.sh TARGET pack         fuzz/corpus/TARGET becomes the fewest inputs that reach all that was learned
@@ -13,13 +14,15 @@ target=${1:?passes, capture or command}
 build=build/fuzz-targets
 inputs=$build/inputs/$target
 findings=$build/findings
+executions=$build/executions/$target
 programs=$build/fuzz/targets
-# Octets of 0 in front of a packet: an ordinary host, or no options.
-case $target in passes) head=12 ;; command) head=4 ;; *) head=0 ;; esac
+# Octets of 0 in front of a packet: an ordinary host, or no options. The plug-in allocates nothing that could leak.
+head=0 leaks=1
+case $target in passes) head=12 leaks=0 ;; command) head=4 ;; esac
 
 cmake --preset fuzz -DNETFLOOR_TESTS=ON >/dev/null
 ninja -C $build "fuzz_$target" "replay_$target" write_packets | sed '/no work to do/d'
-mkdir -p "$inputs" "$findings"
+mkdir -p "$inputs" "$findings" "$build/executions"
 
 # pack: the fewest inputs
 if [ "${2:-}" = pack ]; then
@@ -42,8 +45,15 @@ else
     "$programs/replay_$target" --unpack "$packets" "$inputs" $head
 fi
 
+# A short history of allocations: with a long one, each takes longer, and memory is read anew.
+export ASAN_OPTIONS=malloc_context_size=1:quarantine_size_mb=16
 # -entropic=0: that schedule takes three quarters of the time, for the many edges that a grammar in templates has.
+status=0
 "$programs/fuzz_$target" -entropic=0 -max_total_time="${2:-600}" -max_len=1500 -timeout=20 -rss_limit_mb=2048 -print_final_stats=1 \
-    -artifact_prefix="$findings/$target-" "$inputs" 2>&1 | tee "$build/$target.log" |
+    -detect_leaks=$leaks -artifact_prefix="$findings/$target-" "$inputs" 2>&1 | tee "$build/$target.log" |
     grep -vE 'NEW  |REDUCE|pulse|RELOAD' || true
-! grep -qE 'FAULT|ERROR: |SUMMARY: ' "$build/$target.log"
+! grep -qE 'FAULT|ERROR: |SUMMARY: ' "$build/$target.log" || status=1
+
+sed -n 's/^stat::number_of_executed_units: *//p' "$build/$target.log" >>"$executions"
+echo "fuzz: $(awk '{ all += $1 } END { print all + 0 }' "$executions") executions of $target in $(wc -l <"$executions") runs"
+exit $status

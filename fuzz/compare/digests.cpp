@@ -14,12 +14,10 @@
 #include <stdexcept>
 #include <string>
 
-#include "inputs.h"
+#include "known_answers.h"
 
 namespace netfloor::compare {
 namespace {
-
-constexpr std::uint64_t packets = 40'000; // one half is drawn
 
 std::string line(const std::string &name, std::uint64_t digest) {
     char text[32];
@@ -27,35 +25,11 @@ std::string line(const std::string &name, std::uint64_t digest) {
     return name + text;
 }
 
-std::uint64_t digestOf(const Plugin &plugin, const Input &input, std::uint64_t before) {
-    static Trace trace;
-    const bool ownKeys = input.plan.keyStatus != 1;
-    if (ownKeys) {
-        plugin.setVariables(plugin.asLoaded);
-    }
-    std::uint64_t digest = before;
-    for (const Pass pass : {Pass::md, Pass::to, Pass::mv, Pass::xtr}) {
-        const bool good = run(plugin, pass, input, false, trace);
-        digest = trace.digest(digest ^ static_cast<std::uint64_t>(good));
-    }
-    if (ownKeys) {
-        plugin.setVariables(plugin.asLoaded);
-    }
-    return digest;
-}
-
 std::string digests(const Plugin &plugin) {
-    Trace exports;
-    traceExports(plugin, exports);
-    std::string text = line("exports", exports.digest(0));
+    std::string text = line("exports", exportsDigest(plugin));
     const Inputs inputs({NETFLOOR_CAPTURES}, 1);
-    for (std::uint64_t first = 0; first < packets; first += packetsTogether) {
-        plugin.setVariables(plugin.asLoaded);
-        std::uint64_t digest = 0;
-        for (std::uint64_t number = first; number < first + packetsTogether; ++number) {
-            digest = digestOf(plugin, inputs.input(number), digest);
-        }
-        text += line(std::to_string(first), digest);
+    for (std::uint64_t first = 0; first < answeredPackets; first += packetsTogether) {
+        text += line(std::to_string(first), groupDigest(plugin, inputs, first));
     }
     return text;
 }

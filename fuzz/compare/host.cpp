@@ -257,6 +257,14 @@ void moveStorage() {
     grow(state->layerFrames, state->layerCapacity);
 }
 
+// Changes a text. What stands past the end of an empty one, which passes leave as they like, does not come to light.
+void beginWithX(char *text) {
+    if (*text == '\0') {
+        text[1] = '\0';
+    }
+    *text = 'x';
+}
+
 // Leaves the packet as a next layer may leave it, or as none should.
 void leavePacket(Random random) {
     const std::uint32_t part = random.below(state->bitsLeft + std::uint64_t{1});
@@ -280,8 +288,8 @@ void leavePacket(Random random) {
         state->condition ^= 1;
         state->advance = static_cast<std::int32_t>(random.next());
         state->fieldRecord.rangeCount = random.below(3);
-        state->fieldRecord.fieldName[0] = 'x';
-        state->blockName[0] = 'x';
+        beginWithX(state->fieldRecord.fieldName);
+        beginWithX(state->blockName);
         state->scratch[random.below(32)] = random.below(1000);
     }
     if (random.oneIn(4) && !working.empty()) {
