@@ -1,6 +1,6 @@
 #!/bin/bash
 # SPDX-License-Identifier: MIT
-# Compares the joined outputs of shards with one run, on captures of OCTETS octets (default: 1 GiB): a pcap file of one
+# Compares the joined outputs of shards with one run, on captures of OCTETS octets at least (default: 1 GiB): a pcap file of one
 # capture many times over, and a pcapng file of as many sections.
 #
 #   scripts/check-shards.sh [OCTETS]

@@ -343,7 +343,7 @@ void PacketRows::fill(Row &row, const Layer &layer) const {
         if (kind == LayerValue::number || kind == LayerValue::packetNumber) {
             const std::uint32_t value = view_.number(layer, field).value();
             // A field may be an option's kind where the column tells whether there is one.
-            row.setNumber(to, types[to].type == ColumnType::boolean ? std::uint32_t{value != 0} : value);
+            row.setNumber(to, types[to].type == ColumnType::boolean ? std::min(value, 1U) : value);
         } else {
             row.set(to, {0, {}, view_.octets(layer, field)});
         }
