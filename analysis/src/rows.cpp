@@ -343,7 +343,8 @@ void PacketRows::fill(Row &row, const Layer &layer) const {
         if (kind == LayerValue::number || kind == LayerValue::packetNumber) {
             const std::uint32_t value = view_.number(layer, field).value();
             // A field may be an option's kind where the column tells whether there is one.
-            row.setNumber(to, types[to].type == ColumnType::boolean ? std::uint32_t{value != 0} : value);
+            const bool isTrue = types[to].type == ColumnType::boolean && value != 0;
+            row.setNumber(to, isTrue ? 1 : value);
         } else {
             row.set(to, {0, {}, view_.octets(layer, field)});
         }
