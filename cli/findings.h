@@ -47,7 +47,7 @@ struct Finding {
 // and in plain TCP packets that is always in the same place: for these, one such pass is enough.
 class FlagExplainer final : public Sink {
 public:
-    explicit FlagExplainer(const FieldTables &tables);
+    explicit FlagExplainer(const FieldTables &tables); // which are to live longer
 
     // Adds one finding for each flag, and gives these. The packet begins at `firstOctet` of the one around it.
     [[nodiscard]] std::span<const Finding> explain(std::uint32_t flags, Host &host,
@@ -85,7 +85,7 @@ private:
     [[nodiscard]] bool innerLengthsFit(std::size_t outer) const;
     [[nodiscard]] const LengthField *lengthByDesign() const;
 
-    FieldTables tables_;
+    const FieldTables &tables_;
     FieldKnowledge knowledge_;
     std::vector<std::string> flagNames_; // by bit
     std::vector<Finding> findings_;

@@ -6,6 +6,7 @@
 #include <array>
 #include <cerrno>
 #include <string>
+#include <utility>
 
 #include <unistd.h>
 
@@ -60,7 +61,9 @@ void Output::escaped(std::string_view text) {
 
 void Output::grow(std::size_t octets) {
     const std::size_t size = mark();
-    buffer_.resize(2 * buffer_.size() + octets);
+    Room larger(2 * buffer_.size() + octets);
+    std::copy_n(buffer_.data(), size, larger.data());
+    buffer_ = std::move(larger);
     next_ = buffer_.data() + size;
     limit_ = buffer_.data() + buffer_.size();
 }
@@ -105,8 +108,10 @@ void Output::writeThrough(std::string_view text) {
 
 void Output::exchange(Text &text) {
     text.octets = mark();
-    buffer_.swap(text.room);
-    buffer_.resize(std::max(buffer_.size(), firstRoom));
+    std::swap(buffer_, text.room);
+    if (buffer_.size() < firstRoom) {
+        buffer_ = Room(firstRoom);
+    }
     next_ = buffer_.data();
     limit_ = buffer_.data() + buffer_.size();
 }

@@ -6,9 +6,9 @@
 #include <cstddef>
 #include <cstdint>
 #include <cstring>
+#include <memory>
 #include <stdexcept>
 #include <string_view>
-#include <vector>
 
 namespace netfloor::cli {
 
@@ -113,9 +113,22 @@ public:
         }
     }
 
+    // Octets that are written before they are read: those that are not used take no memory.
+    class Room {
+    public:
+        Room() = default;
+        explicit Room(std::size_t size) : octets_(std::make_unique_for_overwrite<char[]>(size)), size_(size) {}
+        [[nodiscard]] char *data() const { return octets_.get(); }
+        [[nodiscard]] std::size_t size() const { return size_; }
+
+    private:
+        std::unique_ptr<char[]> octets_;
+        std::size_t size_ = 0;
+    };
+
     // Text that is written elsewhere or later.
     struct Text {
-        std::vector<char> room;
+        Room room;
         std::size_t octets = 0;
         [[nodiscard]] std::string_view view() const { return {room.data(), octets}; }
     };
@@ -200,7 +213,7 @@ private:
     bool colour_;
     bool eachPacket_;
     std::size_t flushAt_ = flushOctets;
-    std::vector<char> buffer_;
+    Room buffer_;
     char *next_ = nullptr; // the end of the text in it
     char *limit_ = nullptr;
 };

@@ -12,6 +12,7 @@ namespace {
 
 // Large enough that a packet's share of a system call is small, and small enough for the cache of one core.
 constexpr std::size_t bufferOctets = std::size_t{256} * 1024;
+constexpr std::size_t firstOctets = std::size_t{16} * 1024;
 
 } // namespace
 
@@ -49,7 +50,11 @@ std::size_t OctetStream::fill(std::size_t count) {
         if (end_ == size_) {
             grow(std::min(2 * size_, std::max(count, size_ + bufferOctets)));
         }
-        const std::span room(buffer_.get() + end_, size_ - end_);
+        std::span room(buffer_.get() + end_, size_ - end_);
+        if (isFirst_) { // who wants a few packets does not wait for many
+            room = room.first(std::min(room.size(), firstOctets));
+            isFirst_ = false;
+        }
         const std::size_t got = unpacker_ ? unpacker_->read(file_, room) : file_.read(room);
         if (got == 0) {
             return end_;

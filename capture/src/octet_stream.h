@@ -72,6 +72,7 @@ private:
     std::size_t begin_ = 0; // of what is unread in buffer_
     std::size_t end_ = 0;
     std::uint64_t position_ = 0;
+    bool isFirst_ = true; // nothing was read so far
 };
 
 } // namespace netfloor

@@ -55,11 +55,13 @@ std::string withoutMessage(std::string name) {
 std::vector<std::string> namesOf(const FieldDescription &field) {
     constexpr std::uint32_t mostValues = 256;
     std::vector<std::string> names;
-    for (std::uint32_t value = 0; value < mostValues; ++value) {
-        const NamedValue *const row = field.findValue(value);
-        if (row != nullptr && !row->isDefault() && !row->isRange()) {
-            names.resize(value + 1);
-            names[value] = withoutMessage(field.valueName(value));
+    for (const NamedValue &row : field.values) {
+        if (row.from != row.to || row.from >= mostValues) { // the names of many
+            continue;
+        }
+        names.resize(std::max<std::size_t>(names.size(), row.from + 1));
+        if (names[row.from].empty()) { // the first row counts
+            names[row.from] = withoutMessage(field.valueName(row.from));
         }
     }
     return names;
@@ -82,7 +84,7 @@ std::string inBrackets(const std::string &name) {
 } // namespace
 
 SummaryLine::SummaryLine(Output &out, Host &host) : out_(out), view_(host) {
-    const FieldTables tables(host.library());
+    const FieldTables &tables = host.fieldTables();
     constexpr std::uint32_t icmpv6Protocol = 58;
     protocols_ = namesOf(tables, "ip.protocol");
     protocols_.resize(std::max<std::size_t>(protocols_.size(), icmpv6Protocol + 1));

@@ -61,7 +61,7 @@ public:
 class VerifyPrinter final : public Printer {
 public:
     VerifyPrinter(const Options &options, Output &out, Host &host)
-        : Printer(options, out, host), explainer_(FieldTables(host.library())) {}
+        : Printer(options, out, host), explainer_(host.fieldTables()) {}
 
     void print(const PacketToPrint &packet) override {
         if (!packet.network.isIp()) {

@@ -40,6 +40,7 @@ public:
             return layout;
         }
         at_ += lengthOctets + headOctets;
+        layout.pieces.reserve(*at_);
         for (std::uint32_t pieces = *at_++; pieces > 0; --pieces) {
             layout.pieces.push_back(readSpan());
         }
@@ -115,6 +116,7 @@ FieldDescription describe(const Tables &tables, const FieldDescriptor &row) {
         field.width = row.width & widthMask;
     }
     field.format = tables.texts[row.displayIndex];
+    field.values.reserve(static_cast<std::size_t>(std::max(row.valueCount, 0)));
     for (std::int32_t i = 0; i < row.valueCount; ++i) {
         field.values.push_back(namedValue(tables, tables.values[row.valueStart + i]));
     }
@@ -211,6 +213,12 @@ std::vector<BitSpan> FieldDescription::layOut(std::uint32_t cursor, std::optiona
 
 FieldTables::FieldTables(PluginLibrary library) : library_(std::move(library)) {
     const Tables tables(library_);
+    std::size_t count = 0;
+    while (tables.rows[count].flags != NETFLOOR_NO_FIELD) {
+        ++count;
+    }
+    fields_.reserve(count);
+    places_.reserve(count);
     for (const FieldDescriptor *row = tables.rows; row->flags != NETFLOOR_NO_FIELD; ++row) {
         places_.try_emplace(row->fieldId, fields_.size());
         fields_.push_back(describe(tables, *row));

@@ -44,7 +44,7 @@ LayerKind layerKindOf(PlainPart transport) {
 } // namespace
 
 LayerView::LayerView(Host &host, LayerReading reading)
-    : host_(host), map_(FieldTables(host.library()).fields()), reading_(reading) {}
+    : host_(host), map_(host.fieldTables().fields()), reading_(reading) {}
 
 LayerView::~LayerView() = default;
 

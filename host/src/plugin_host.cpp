@@ -4,6 +4,7 @@
 #include <utility>
 #include <vector>
 
+#include "netfloor-host/field_tables.h"
 #include "packet_run.h"
 
 namespace netfloor {
@@ -51,6 +52,13 @@ Host::Host(PluginLibrary library) : library_(std::move(library)), runs_(std::mak
 Host::Host(Host &&other) noexcept = default;
 Host &Host::operator=(Host &&other) noexcept = default;
 Host::~Host() = default;
+
+const FieldTables &Host::fieldTables() {
+    if (!fieldTables_) {
+        fieldTables_ = std::make_unique<const FieldTables>(library_);
+    }
+    return *fieldTables_;
+}
 
 Ending Host::run(Pass pass, std::span<const std::uint8_t> packet, Sink &sink, const RunOptions &options) {
     return runs_->run(pass, packet, owners_, sink, options, nullptr);

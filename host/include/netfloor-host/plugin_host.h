@@ -41,6 +41,8 @@ struct TestRunOptions; // testing.h
 // A plug-in serves one packet at a time. `run` throws PluginBusy when another thread is running the same load of the
 // plug-in: each thread needs a Host of its own with a PluginLibrary::openCopy. In one thread an owner of a next layer
 // may run another packet, but a sink may not.
+class FieldTables;
+
 class Host {
 public:
     explicit Host(PluginLibrary library);
@@ -51,6 +53,8 @@ public:
     [[nodiscard]] const PluginLibrary &library() const { return library_; }
     [[nodiscard]] PluginLibrary &library() { return library_; }
     [[nodiscard]] OwnerRegistry &owners() { return owners_; }
+    // The fields of the plug-in, read with the first call. Throws PluginError.
+    [[nodiscard]] const FieldTables &fieldTables();
 
     // Runs one pass over one packet, which starts with an IP header at its first octet, and reports to `sink`. Throws
     // PluginBusy, what an owner or the sink throws, and std::invalid_argument for a packet of half a GiB or more.
@@ -69,6 +73,7 @@ private:
     PluginLibrary library_;
     OwnerRegistry owners_;
     std::unique_ptr<Runs> runs_;
+    std::unique_ptr<const FieldTables> fieldTables_;
 };
 
 } // namespace netfloor
