@@ -1,0 +1,52 @@
+#!/bin/bash
+# SPDX-License-Identifier: MIT
+# Changes the plug-in in some two thousand places, one at a time, and counts the changes that the known answers notice.
+# All changes are compiled into one plug-in, and one is chosen at run time. Names each that is not noticed, but those of
+# which tests/mutation/explained.txt says why. Fails where they are too many.
+#
+#   scripts/mutants.sh [EVERY [PACKETS]]    each EVERY-th change, 1, with the answers of so many packets, 40000
+set -euo pipefail
+cd "$(dirname "$0")/.."
+build=${NETFLOOR_BUILD:-build}
+work=build/mutants
+least=88 # of a hundred changes
+compile=(clang++ -std=c++20 -O0 -w -fPIC -fno-exceptions -fno-rtti -fno-threadsafe-statics -fvisibility=hidden
+    -DNETFLOOR_SANITIZED "-I$work/plugin" -Iinclude -Itests/mutation -c)
+sources=$(cat plugin/*/*.h plugin/*/*.cpp include/netfloor/*.h tests/mutation/{rewrite.py,mutant.h} | sha256sum)
+
+ninja -C "$build" netfloor netfloor_mutants run_mutants | sed '/no work to do/d'
+if [ "$(cat $work/sources 2>/dev/null)" != "$sources" ]; then
+    rm -rf $work
+    mkdir -p $work
+    /usr/bin/python3 tests/mutation/rewrite.py plugin include $work/plugin
+    printf '%s\0' md to mv xtr date_conv descriptors | xargs -0 -P 2 -I{} \
+        "${compile[@]}" -fconstexpr-steps=1000000000 -fbracket-depth=1024 $work/plugin/entries/{}.cpp -o $work/{}.o
+    clang -shared -Wl,--version-script=plugin/exports.map -o $work/libnetfloor.so $work/*.o \
+        -L"$build/tests/mutation" -lnetfloor_mutants -L"$build" -lhs_HostServices -lhd_HostDispatch -lhx_KeyOptions -Wl,-rpath,"$PWD/$build/tests/mutation:$PWD/$build"
+    objcopy --dump-section mutants=$work/present $work/libnetfloor.so
+    clang++ -std=c++20 -O1 -w -DNETFLOOR_SANITIZED -fconstexpr-steps=1000000000 -fbracket-depth=1024 "-I$work/plugin" -Iinclude \
+        -Itests/mutation -Itests tests/bits/bits_test.cpp -o $work/test_bits -lgtest_main -lgtest \
+        -L"$build/tests/mutation" -lnetfloor_mutants -Wl,-rpath,"$PWD/$build/tests/mutation"
+    echo "$sources" >$work/sources
+fi
+
+"$build/tests/mutation/run_mutants" $work/libnetfloor.so fuzz/compare/digests.txt $work/plugin/mutants.txt $work/present \
+    "${1:-1}" "${2:-40000}" >$work/report
+# What the answers do not notice in the readers of bits, the test of these may.
+awk -F'\t' '/^(not noticed|never run)/ && $3 ~ /^frame\/(bits|field_record|bit_order)\.h/ { print $2 }' $work/report |
+    xargs -I{} sh -c "NETFLOOR_MUTANT={} timeout 60 $work/test_bits >$work/log 2>&1 || echo {}" >$work/noticed
+
+# Of a mutant the number changes with the code: its file, its change and its text say which it is.
+awk -F'\t' -v least=$least '
+    FILENAME ~ /noticed$/ { by_bits[$1] = 1; next }
+    FILENAME ~ /explained.txt$/ { if ($0 !~ /^#/) explained[$1 "\t" $2 "\t" $3] = 1; next }
+    NF == 1 { split($0, words, " "); all = words[1]; print; next }
+    ($2 in by_bits) { bits++; next }
+    { place = $3; sub(/:[0-9]+$/, "", place) }
+    ((place "\t" $4 "\t" $5) in explained) { known++; next }
+    { open++; print }
+    END {
+        share = 100 * (all - open) / all
+        printf "%d more noticed by tests/bits, %d explained, %d open: %.1f %% noticed or explained, %d wanted\n", bits, known, open, share, least
+        exit share < least
+    }' $work/noticed tests/mutation/explained.txt $work/report
