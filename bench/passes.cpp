@@ -10,6 +10,7 @@
 
 #include <dlfcn.h>
 
+#include "exact_line.h"
 #include "figures.h"
 #include "hand_written.h"
 #include "packet_host.h"
@@ -21,6 +22,7 @@ namespace {
 using namespace netfloor::bench;
 
 constexpr const char *handWritten = "by hand";
+constexpr const char *exactLine = "exact line";
 
 [[noreturn]] void fail(const char *reason, const char *detail) {
     std::fprintf(stderr, "bench_passes: %s%s\n", reason, detail);
@@ -134,9 +136,15 @@ void printTable(const Figures &figures, Statistic statistic, const char *title) 
     const double lines = figure(handWritten, "MD");
     const double keys = figure(handWritten, "XTR");
     std::printf("%-38s%9s%9.1f%9s%9.1f\n", "the first row, written by hand", "-", keys, "-", lines);
+    std::printf("%-38s%9.1f%9.1f\n", "the same with all that a host sees", figure(exactLine, "MV"),
+                figure(exactLine, "XTR"));
     if (lines > 0 && keys > 0) {
         std::printf("MD / the same lines by hand: %.2f    XTR / the same keys by hand: %.2f\n\n",
                     figure(first, "MD") / lines, figure(first, "XTR") / keys);
+    }
+    if (figure(exactLine, "MV") > 0 && figure(exactLine, "XTR") > 0) {
+        std::printf("MV / its exact line: %.2f    XTR / its exact line: %.2f\n\n",
+                    figure(first, "MV") / figure(exactLine, "MV"), figure(first, "XTR") / figure(exactLine, "XTR"));
     }
 }
 
@@ -157,6 +165,8 @@ int main(int argc, char **argv) {
     Octets packet = plainUdp();
     measure(handWritten, "MD", 1, [&] { reportByHand(host.prepare(packet), packet.data()); });
     measure(handWritten, "XTR", 1, [&] { storeKeysByHand(host.prepareKeys(packet).keyRecord, packet.data()); });
+    measure(exactLine, "MV", 1, [&] { decodeByHand(host.prepare(packet)); });
+    measure(exactLine, "XTR", 1, [&] { extractByHand(host.prepareKeys(packet)); });
     Figures figures;
     if (!runAll(argc - 1, argv + 1, figures)) {
         return 1;

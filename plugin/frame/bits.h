@@ -166,6 +166,11 @@ inline void store64(std::uint8_t *octets, std::uint64_t value) {
     }
 }
 
+// Eight octets at once, the two nibbles of each exchanged.
+[[nodiscard]] constexpr std::uint64_t nibblesExchanged(std::uint64_t octets) {
+    return (octets & 0x0f0f0f0f0f0f0f0f) << 4 | (octets >> 4 & 0x0f0f0f0f0f0f0f0f);
+}
+
 // Copies octets with the bits of each reversed. The two may be the same octets.
 inline void copyWithBitsReversed(std::uint8_t *to, const std::uint8_t *from, std::uint32_t count) {
     std::uint32_t octet = 0;

@@ -10,39 +10,56 @@
 
 namespace netfloor::plugin {
 
-// So many blocks a run opens without a test of its own, as many as UDP and its hand-off have; more are tested one by
-// one.
-inline constexpr std::uint32_t mostRunBlocks = 4;
+// Whether a run can start at the cursor: on an octet border, with room for all that it opens and for any field of
+// fixed size. A run that is going on has found the room.
+template <class Pass>
+[[nodiscard]] NETFLOOR_INLINE inline bool canRun(const Reader<Pass> &reader) {
+    if (reader.writer.isInRun()) {
+        return onOctetBorder(reader.writer.bit());
+    }
+    const DecodeState &state = *reader.state;
+    return onOctetBorder(reader.cursor) && state.fieldRecord.rangeCapacity > mostFixedElements &&
+           state.blockStarts.capacity > reader.blockDepth + runBlocks &&
+           state.limits.capacity > reader.limitDepth + runLimits;
+}
+
+// In a run, after the bits from the start of `first` to the end of `last` were found to be left.
+template <const Field &first, const Field &last, class Pass>
+NETFLOOR_INLINE inline void expectFields(Reader<Pass> &reader) {
+    constexpr std::uint32_t bitCount = bitsFromTo<typename Pass::Fields>(first, last);
+    static_assert(bitCount != 0, "a checked run goes from a field of the catalogue to a later one");
+    reader.writer.checkBits(bitCount);
+    // For all fields at once: no host looks before the last of them is read.
+    constexpr std::uint32_t cleared = clearedFromTo<typename Pass::Fields>(first, last);
+    reader.writer.template clearInRun<cleared>(reader.state->fieldRecord);
+}
 
 // Runs a production that starts with the fields from `first` to `last`, all of fixed size. A pass that reports nothing
-// asks once whether they all fit, and then writes only what can be seen after them; the rare packet that is cut
-// short there is read field by field, out of line.
-template <const Field &first, const Field &last, auto production, class Pass>
+// asks once whether they all fit, and then writes only what can be seen after the production; the rare packet that is
+// cut short there is read field by field, by `slowly`, out of line. A run inside another one goes on with it.
+template <const Field &first, const Field &last, auto production, auto slowly = production, class Pass>
 NETFLOOR_INLINE inline void checkedRun(Reader<Pass> &reader) {
     if constexpr (!Pass::Writer::hasCheckedRuns) {
         production(reader);
     } else {
         constexpr std::uint32_t bitCount = bitsFromTo<typename Pass::Fields>(first, last);
-        static_assert(bitCount != 0, "a checked run goes from a field of the catalogue to a later one");
-        const DecodeState &state = *reader.state;
-        const bool holds = reader.live && reader.left >= bitCount && onOctetBorder(reader.cursor) &&
-                           state.fieldRecord.rangeCapacity > mostFixedElements &&
-                           state.blockStarts.capacity > reader.blockDepth + mostRunBlocks;
-        if (!holds) [[unlikely]] {
-            return runOutOfLine<production>(reader);
+        if (!reader.live || reader.left < bitCount || !canRun(reader)) [[unlikely]] {
+            return runOutOfLine<slowly>(reader);
         }
-        // The first field would make the verdict check, and no host looks before. The run of a live reader has not
-        // ended. Both are said again, so that the tests for them fall away.
-        reader.check();
-        reader.unchecked = false;
-        reader.outcome = Outcome::running;
-        reader.writer.startRun(bitCount, mostRunBlocks);
-        // For all fields of the run at once: no host looks before the last of them is read.
-        constexpr std::uint32_t cleared = clearedFromTo<typename Pass::Fields>(first, last);
-        reader.writer.template clearFlagWords<cleared>(reader.state->fieldRecord);
+        const bool isOutermost = !reader.writer.isInRun();
+        if (isOutermost) {
+            // The first field would make the verdict check, and no host looks before. The run of a live reader has not
+            // ended. Both are said again, so that the tests for them fall away.
+            reader.check();
+            reader.unchecked = false;
+            reader.outcome = Outcome::running;
+            reader.writer.startRun(reader.data + (reader.cursor - 1) / bitsPerOctet);
+        }
+        expectFields<first, last>(reader);
         production(reader);
-        reader.writer.flushRun(*reader.state);
-        reader.writer.endRun();
+        if (isOutermost) {
+            reader.leaveRun();
+        }
     }
 }
 

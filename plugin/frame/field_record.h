@@ -24,12 +24,24 @@ namespace netfloor::plugin {
     return place.isPieces() || place.shape == Shape::octets || place.shape == Shape::octetsBackward;
 }
 
+// Whether the pieces of a field are the octets at its start, in their order.
+[[nodiscard]] constexpr bool piecesAreOctets(const Place &place) {
+    for (std::uint32_t i = 0; i < place.count; ++i) {
+        if (place.pieces[i].low != i * bitsPerOctet || place.pieces[i].width() != bitsPerOctet) {
+            return false;
+        }
+    }
+    return true;
+}
+
 // The value of a field at `place`, counted from `cursor`, before it is scaled. Fields of one place share it.
 template <Place place>
 [[nodiscard]] NETFLOOR_INLINE inline std::uint32_t valueAt(const std::uint8_t *data, std::uint32_t cursor,
                                                            std::uint32_t units) {
     std::uint32_t value = 0;
-    if constexpr (place.isPieces()) {
+    if constexpr (place.isPieces() && piecesAreOctets(place)) {
+        value = octetsAt<place.count>(data, cursor);
+    } else if constexpr (place.isPieces()) {
         forEach<place.count>([&]<std::uint32_t i>() NETFLOOR_INLINE {
             constexpr Piece piece = place.pieces[i];
             value = joined(value, pieceAt<piece.low, piece.high>(data, cursor), piece.width());

@@ -3,7 +3,6 @@
 #pragma once
 
 #include <algorithm>
-#include <cassert>
 #include <cstdint>
 #include <optional>
 #include <type_traits>
@@ -46,22 +45,35 @@ template <const Field &field, class Pass>
     return reader.left >= needs;
 }
 
+// The value of a field where a variable or the pass takes it. It is read once: for compilers, what is stored in between
+// may change the packet.
+template <const Field &field, class Pass, class Store>
+[[nodiscard]] NETFLOOR_INLINE inline std::uint32_t valueFor(const std::uint8_t *data, std::uint32_t start,
+                                                            std::uint32_t units) {
+    if constexpr (!std::is_same_v<Store, Unstored> || Pass::template takesValue<field>) {
+        return valueAt<field.place>(data, start, units);
+    }
+    return 0;
+}
+
 // The step of a field whose bits a checked run has found to be left.
 template <const Field &field, class Pass, class Store>
 NETFLOOR_INLINE inline void stepInRun(Reader<Pass> &reader, Store into) {
     constexpr const Place &place = field.place;
-    if (!onOctetBorder(reader.cursor)) {
-        __builtin_unreachable(); // a run starts on one and moves in octets: reading across octets needs no code here
-    }
     reader.writer.nameBlock(reader, *reader.state);
     const std::uint32_t start = reader.cursor;
+    const std::uint32_t bit = reader.writer.bit();
+    if (!onOctetBorder(bit)) {
+        __builtin_unreachable(); // a run starts on one and moves in octets: reading across octets needs no code here
+    }
+    const std::uint32_t value = valueFor<field, Pass, Store>(reader.writer.octets(), bit, place.count);
     if constexpr (!std::is_same_v<Store, Unstored>) {
-        store(into, valueAt<field.place>(reader.data, start, place.count));
+        store(into, value);
     }
     reader.left -= place.advance;
     reader.cursor += place.advance;
     reader.writer.template writeFieldInRun<field>(*reader.state, start);
-    Pass::template output<field>(reader, start, place.count);
+    Pass::template output<field>(reader, reader.writer.octets(), bit, value);
 }
 
 // Whether a field can be part of a checked run: all of fixed size that move in whole octets.
@@ -93,8 +105,7 @@ NETFLOOR_INLINE inline void read(Reader<Pass> &reader, Store into = {}, std::uin
             return stepInRun<field>(reader, into);
         }
     }
-    reader.writer.flushRun(*reader.state);
-    reader.writer.leaveRun();
+    reader.leaveRun();
     if (!fits<field>(reader, units)) {
         reader.live = false;
         return;
@@ -110,8 +121,9 @@ NETFLOOR_INLINE inline void read(Reader<Pass> &reader, Store into = {}, std::uin
         return;
     }
     const std::uint32_t start = reader.cursor;
+    const std::uint32_t value = valueFor<field, Pass, Store>(reader.data, start, units);
     if constexpr (!std::is_same_v<Store, Unstored>) {
-        store(into, valueAt<field.place>(reader.data, start, units));
+        store(into, value);
     }
     reader.setAdvance(static_cast<std::int32_t>(moves));
     reader.left -= moves;
@@ -120,7 +132,7 @@ NETFLOOR_INLINE inline void read(Reader<Pass> &reader, Store into = {}, std::uin
     if constexpr (place.shape == Shape::reversedGroups) {
         finishReversedAddress(reader, start);
     }
-    Pass::template output<field>(reader, start, units);
+    Pass::template output<field>(reader, reader.data, start, value);
 }
 
 // Reads a field of as many units (octets, nibbles) as the packet tells. The number counts as unsigned in the
@@ -136,12 +148,12 @@ NETFLOOR_INLINE inline void readRun(Reader<Pass> &reader, std::int32_t units) {
 template <const Field &field, class Pass>
 [[nodiscard]] NETFLOOR_INLINE inline std::int32_t skipUnseen(Reader<Pass> &reader, std::int32_t most) {
     constexpr std::uint32_t bitCount = neededBits<field>;
-    assert(!reader.writer.isInRun()); // a run counts its bits by the fields that it reads
     static_assert(field.place.isTested() && bitCount == field.place.advance, "these fields must follow one another");
     const bool callsHost = Pass::reportsFields || reader.state->fieldRecord.rangeCapacity <= mostFixedElements;
     if (callsHost || most < 2 || reader.left < 2 * bitCount) {
         return 0;
     }
+    reader.leaveRun();
     const std::uint32_t skipped = std::min(static_cast<std::uint32_t>(most), reader.left / bitCount) - 1;
     reader.cursor += skipped * bitCount;
     reader.left -= skipped * bitCount;
@@ -173,17 +185,20 @@ NETFLOOR_INLINE inline void readCounted(Reader<Pass> &reader, std::int32_t count
 // are not all left or the run has ended. The field record keeps what was seen, under the name of the field before.
 template <class Pass>
 NETFLOOR_INLINE inline std::optional<std::uint32_t> peek(Reader<Pass> &reader, const Place &place) {
-    reader.writer.flushRun(*reader.state);
-    if (reader.ended() || reader.left < place.needs(place.count) || !reader.roomFor(place.count, nullptr)) {
+    if (reader.ended() || reader.left < place.needs(place.count)) {
+        return std::nullopt;
+    }
+    if (!reader.writer.isInRun() && !reader.roomFor(place.count, nullptr)) {
         return std::nullopt;
     }
     const bool whole = !place.isPieces();
+    const std::uint32_t low = whole ? 0 : place.pieces[0].low;
     const Peek found = {
-        .first = reader.cursor + (whole ? 0 : place.pieces[0].low),
+        .first = reader.cursor + low,
         .pieces = place.count,
         .width = whole ? bitsPerOctet : place.pieces[0].width(),
     };
-    return reader.writer.peek(reader.state->fieldRecord, reader.data, found);
+    return reader.writer.peek(reader.state->fieldRecord, reader.data, found, low);
 }
 
 // Moves the cursor back over `bitCount` bits, so that they can be read a second time.
@@ -193,7 +208,7 @@ NETFLOOR_INLINE inline void stepBack(Reader<Pass> &reader, std::uint32_t bitCoun
         return;
     }
     if (!reader.writer.stepBackInRun(bitCount)) {
-        reader.writer.leaveRun();
+        reader.leaveRun();
         reader.setAdvance(-static_cast<std::int32_t>(bitCount));
         if (!reader.live || reader.cursor < bitCount) {
             reader.live = false;

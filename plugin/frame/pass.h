@@ -26,8 +26,8 @@ struct AnyReader {};
 
 // clang-format off
 template <class Pass>
-concept DecodingPass = requires(typename Pass::Context &context, Flag flag, AnyReader &someReader, std::uint32_t start,
-                                std::uint32_t units) {
+concept DecodingPass = requires(typename Pass::Context &context, Flag flag, AnyReader &someReader, const std::uint8_t *data,
+                                std::uint32_t start, std::uint32_t value) {
     // The host's record for a run: it has a `decodeState`.
     { context.decodeState } -> std::convertible_to<DecodeState *>;
 
@@ -59,8 +59,12 @@ concept DecodingPass = requires(typename Pass::Context &context, Flag flag, AnyR
     // Gives control to the owner of the next layer, and says how the run goes on.
     { Pass::transfer(context) } -> std::same_as<Outcome>;
 
-    // Does with a field that was read what the pass is for. The field lies at bit `start` and is so many units long.
-    { Pass::template output<someField>(someReader, start, units) } -> std::same_as<void>;
+    // Whether `output` takes the value of a field.
+    { Pass::template takesValue<someField> } -> std::convertible_to<bool>;
+
+    // Does with a field that was read what the pass is for. The field lies at bit `start` of `data`. The
+    // value is not scaled.
+    { Pass::template output<someField>(someReader, data, start, value) } -> std::same_as<void>;
 };
 // clang-format on
 

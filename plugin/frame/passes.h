@@ -46,6 +46,9 @@ struct PreDecodePass {
 
     static constexpr bool reportsFields = mode != NETFLOOR_MODE_MV;
 
+    template <const Field &>
+    static constexpr bool takesValue = false;
+
     static inline constinit Variables variables{};
     static inline constinit std::uint32_t savedDecoderId = 0;
 
@@ -97,7 +100,7 @@ struct MdPass : PreDecodePass<Grammar, NETFLOOR_MODE_MD> {
     static inline constinit Line::Buffer buffer{};
 
     template <const Field &field, class Reader>
-    NETFLOOR_INLINE static void output(Reader &reader, std::uint32_t, std::uint32_t) {
+    NETFLOOR_INLINE static void output(Reader &reader, const std::uint8_t *, std::uint32_t, std::uint32_t) {
         report<field>(*reader.context, reader.state->fieldRecord, reader.bitOrder);
     }
 
@@ -127,7 +130,7 @@ struct ToPass : PreDecodePass<Grammar, NETFLOOR_MODE_TO> {
     static inline constinit Line::Buffer buffer{};
 
     template <const Field &field, class Reader>
-    NETFLOOR_INLINE static void output(Reader &reader, std::uint32_t, std::uint32_t) {
+    NETFLOOR_INLINE static void output(Reader &reader, const std::uint8_t *, std::uint32_t, std::uint32_t) {
         report<field>(*reader.context, reader.state->fieldRecord);
     }
 
@@ -148,7 +151,7 @@ struct MvPass : PreDecodePass<Grammar, NETFLOOR_MODE_MV> {
     using Writer = DeferredWriter<MvPass>;
 
     template <const Field &field, class Reader>
-    NETFLOOR_INLINE static void output(Reader &reader, std::uint32_t, std::uint32_t) {
+    NETFLOOR_INLINE static void output(Reader &reader, const std::uint8_t *, std::uint32_t, std::uint32_t) {
         reader.check();
     }
 };
@@ -162,6 +165,10 @@ struct XtrPass {
     using Fields = typename Grammar::Fields;
 
     static constexpr bool reportsFields = false;
+
+    template <const Field &field>
+    static constexpr bool takesValue =
+        Grammar::template keyRow<field> != Grammar::noKeyRow &&field.place.shape != Shape::addressNibbles;
 
     static inline constinit Variables variables{};
     static inline constinit std::int32_t keyFieldStatus = 0;
@@ -192,19 +199,19 @@ struct XtrPass {
     static Outcome transfer(XtrContext &) { return Outcome::stopped; }
 
     template <const Field &field, class Reader>
-    NETFLOOR_INLINE static void output(Reader &reader, std::uint32_t start, std::uint32_t units) {
+    NETFLOOR_INLINE static void output(Reader &reader, const std::uint8_t *data, std::uint32_t start,
+                                       std::uint32_t value) {
         constexpr std::uint32_t row = Grammar::template keyRow<field>;
         if constexpr (row != Grammar::noKeyRow) {
             const KeyFieldRow &key = Grammar::keyRows[row];
             std::uint8_t *const record = reader.context->keyRecord;
             setPresent(record, key);
             if constexpr (field.place.shape == Shape::addressNibbles) {
-                if (!storeAddress(*reader.context, key, reader.data, start)) {
-                    reader.giveState();
-                    reader.end(Outcome::cutOff);
+                if (!storeAddress(*reader.context, key, data, start)) {
+                    reader.cutOff();
                 }
             } else {
-                storeNumber<field>(record, key, reader.data, start, units);
+                storeNumber<field>(record, key, value);
             }
         }
     }
@@ -216,14 +223,13 @@ private:
     }
 
     template <const Field &field>
-    NETFLOOR_INLINE static void storeNumber(std::uint8_t *record, const KeyFieldRow &row, const std::uint8_t *data,
-                                            std::uint32_t start, std::uint32_t units) {
+    NETFLOOR_INLINE static void storeNumber(std::uint8_t *record, const KeyFieldRow &row, std::uint32_t value) {
         constexpr std::uint32_t width = field.place.width();
         static_assert(width > 0 && width <= 32, "a key field is a number of up to 32 bits, or an address");
         using Stored =
             std::conditional_t<width <= 8, std::uint8_t, std::conditional_t<width <= 16, std::uint16_t, std::uint32_t>>;
-        const auto value = static_cast<Stored>(valueAt<field.place>(data, start, units) * field.place.scale);
-        std::memcpy(record + row.valueOffset, &value, sizeof value);
+        const auto stored = static_cast<Stored>(value * field.place.scale);
+        std::memcpy(record + row.valueOffset, &stored, sizeof stored);
     }
 
     static constexpr std::uint32_t addressOctets = addressBits / bitsPerOctet;
@@ -232,9 +238,10 @@ private:
     NETFLOOR_INLINE static std::array<std::uint8_t, addressOctets> storedAddress(const std::uint8_t *data,
                                                                                  std::uint32_t start) {
         auto octets = octetArrayAt<addressOctets>(data, start);
-        for (std::uint8_t &octet : octets) {
-            octet = static_cast<std::uint8_t>(octet << nibbleBits | octet >> nibbleBits);
-        }
+        std::array<std::uint64_t, addressOctets / sizeof(std::uint64_t)> halves{};
+        std::memcpy(halves.data(), octets.data(), addressOctets);
+        halves = {nibblesExchanged(halves[0]), nibblesExchanged(halves[1])};
+        std::memcpy(octets.data(), halves.data(), addressOctets);
         return octets;
     }
 

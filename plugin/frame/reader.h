@@ -37,15 +37,9 @@ public:
     NETFLOOR_INLINE static typename Pass::Variables &variables() { return Pass::variables; }
 
     // The last condition of the grammar, and the bits of its last step. They live in the state.
-    NETFLOOR_INLINE void setCondition(bool holds) {
-        writer.flushRun(*state);
-        state->condition = holds ? 1 : 0;
-    }
+    NETFLOOR_INLINE void setCondition(bool holds) { writer.setCondition(*state, holds); }
 
-    NETFLOOR_INLINE void setAdvance(std::int32_t bitCount) {
-        writer.flushRun(*state);
-        state->advance = bitCount;
-    }
+    NETFLOOR_INLINE void setAdvance(std::int32_t bitCount) { writer.setAdvance(*state, bitCount); }
 
     // Keeps a condition of the grammar as the last one, and gives it back.
     NETFLOOR_INLINE bool test(bool holds) {
@@ -60,9 +54,9 @@ public:
         if (ended() || !Pass::raises(flag)) {
             return;
         }
-        state->flags |= flag == Flag::limitTooLong   ? NETFLOOR_FLAG_LIMIT_TOO_LONG
-                        : flag == Flag::bitsLeftOver ? NETFLOOR_FLAG_BITS_LEFT_OVER
-                                                     : NETFLOOR_FLAG_EXPECTATION;
+        writer.raise(*state, flag == Flag::limitTooLong   ? NETFLOOR_FLAG_LIMIT_TOO_LONG
+                             : flag == Flag::bitsLeftOver ? NETFLOOR_FLAG_BITS_LEFT_OVER
+                                                          : NETFLOOR_FLAG_EXPECTATION);
         unchecked = true;
     }
 
@@ -74,6 +68,13 @@ public:
             Pass::giveVerdict(*context);
             unchecked = false;
         }
+    }
+
+    // Ends the run where the host's storage does not suffice, with the state as it is there.
+    NETFLOOR_INLINE void cutOff() {
+        Reader copy = *this; // what is put off stays so, for those who read on: they have no effect
+        copy.giveState();
+        end(Outcome::cutOff);
     }
 
     // Ends the run: nothing has an effect from here on.
@@ -103,6 +104,12 @@ public:
         state->bitsLeft = left;
     }
 
+    // Ends a checked run: what follows is checked and written one by one.
+    NETFLOOR_INLINE void leaveRun() {
+        writer.flushRun(*state);
+        writer.endRun();
+    }
+
     // Goes on where a production that ran out of line left off.
     NETFLOOR_INLINE void resumeAt(const Position &position) {
         static_cast<Position &>(*this) = position.position();
@@ -127,27 +134,44 @@ public:
     NETFLOOR_INLINE void closeBlock() {
         check();
         --blockDepth;
-        writer.popped(state->blockStarts);
+        writer.poppedBlock();
+        writer.popped(state->blockStarts, 1);
+    }
+
+    // Closes so many blocks, before which the writer had room for `blockRoom`.
+    NETFLOOR_INLINE void closeBlocks(std::uint32_t count, std::uint32_t blockRoom) {
+        if (count > 0) {
+            check();
+        }
+        blockDepth -= count;
+        writer.setBlockRoom(blockRoom);
+        writer.popped(state->blockStarts, count);
     }
 
     // Opens a limit of so many bits. False where it reaches past the bits left, and so narrows nothing.
     NETFLOOR_INLINE bool openLimit(std::uint32_t bitCount) {
         const bool narrows = bitCount <= left;
-        writer.flushRun(*state);
-        writer.leaveRun();
+        writer.checkBits(0);
         setAdvance(static_cast<std::int32_t>(bitCount));
         if (narrows) {
             left = bitCount;
         } else {
             raise(Flag::limitTooLong);
         }
-        push(state->limits, limitDepth, cursor + left - 1);
+        const std::uint32_t lastBit = cursor + left - 1;
+        if (writer.pushedLimitInRun(*state, limitDepth + 1, lastBit)) {
+            ++limitDepth;
+        } else {
+            writer.flushRun(*state);
+            push(state->limits, limitDepth, lastBit);
+        }
         return narrows;
     }
 
     NETFLOOR_INLINE void closeLimit() {
         --limitDepth;
-        writer.popped(state->limits);
+        writer.poppedLimit();
+        writer.popped(state->limits, 1);
         left = state->limits.base[limitDepth] - cursor + 1;
     }
 
@@ -155,6 +179,7 @@ public:
     NETFLOOR_INLINE void skipRest() {
         if (left != 0) {
             cursor += left;
+            writer.skipped(left);
             left = 0;
             raise(Flag::bitsLeftOver);
         }

@@ -48,12 +48,24 @@ public:
     NETFLOOR_INLINE void reset() {}
     NETFLOOR_INLINE void endRun() {}
     NETFLOOR_INLINE void flushRun(DecodeState &) {}
+    NETFLOOR_INLINE static void setCondition(DecodeState &state, bool holds) { state.condition = holds ? 1 : 0; }
+    NETFLOOR_INLINE static void setAdvance(DecodeState &state, std::int32_t bitCount) { state.advance = bitCount; }
+    NETFLOOR_INLINE static void raise(DecodeState &state, std::uint32_t flag) { state.flags |= flag; }
     NETFLOOR_INLINE void flush(const Position &, DecodeState &, const std::uint8_t *) {}
     NETFLOOR_INLINE static void flushFlagWords(FieldRecord &) {}
 
     NETFLOOR_INLINE void pushed(BitStack &stack) { ++stack.top; }
-    NETFLOOR_INLINE void popped(BitStack &stack) { --stack.top; }
+    NETFLOOR_INLINE void popped(BitStack &stack, std::uint32_t count) { stack.top -= count; }
     NETFLOOR_INLINE bool pushedBlockInRun(DecodeState &, std::uint32_t, std::uint32_t) { return false; }
+    NETFLOOR_INLINE bool pushedLimitInRun(DecodeState &, std::uint32_t, std::uint32_t) { return false; }
+    [[nodiscard]] NETFLOOR_INLINE static std::uint32_t blockRoom() { return 0; }
+    NETFLOOR_INLINE void setBlockRoom(std::uint32_t) {}
+    NETFLOOR_INLINE void poppedBlock() {}
+    NETFLOOR_INLINE void poppedLimit() {}
+    NETFLOOR_INLINE void checkBits(std::uint32_t) {}
+    template <std::uint32_t>
+    NETFLOOR_INLINE void clearInRun(FieldRecord &) {}
+    NETFLOOR_INLINE void skipped(std::uint32_t) {}
 
     NETFLOOR_INLINE void nameBlock(Position &position, DecodeState &state) { position.block.copyTo(state.blockName); }
 
@@ -71,12 +83,11 @@ public:
         state.bitsLeft = position.left;
     }
 
-    NETFLOOR_INLINE std::uint32_t peek(FieldRecord &record, const std::uint8_t *data, const Peek &peek) {
+    NETFLOOR_INLINE std::uint32_t peek(FieldRecord &record, const std::uint8_t *data, const Peek &peek, std::uint32_t) {
         return writePeek(record, data, peek);
     }
 
     NETFLOOR_INLINE bool stepBackInRun(std::uint32_t) { return false; }
-    NETFLOOR_INLINE void leaveRun() {}
 };
 
 // What it takes to write a field into the record later on.
@@ -128,6 +139,11 @@ struct LastRead {
     std::uint32_t cleared = 0; // so many elements' flag words are cleared; those after the first four are still to be
 };
 
+// Room on the two stacks that a checked run asks for once: as much as an IPv4 packet with TCP and a few rounds
+// of options takes.
+inline constexpr std::uint32_t runBlocks = 12;
+inline constexpr std::uint32_t runLimits = 3;
+
 // Puts off what the host cannot see yet. In a checked run (see checked_run.h) it puts off more: what is known there
 // are constants where the compiler looks, and what has to be written after the run is kept in registers.
 template <class Pass>
@@ -135,19 +151,38 @@ class DeferredWriter {
 public:
     static constexpr bool hasCheckedRuns = true;
 
-    // Starts a run of so many bits and blocks: bits that are left, from an octet border on, for fields that the record
-    // has room for.
-    NETFLOOR_INLINE void startRun(std::uint32_t bitCount, std::uint32_t blockCount) {
+    // Starts a run at `octets` in the packet, whose stacks have the room of a run and whose record that of any field of
+    // fixed size.
+    NETFLOOR_INLINE void startRun(const std::uint8_t *octets) {
         inRun_ = true;
-        checkedBits_ = bitCount;
-        checkedBlocks_ = blockCount;
+        octets_ = octets;
+        offset_ = 0;
+        blockRoom_ = runBlocks;
+        limitRoom_ = runLimits;
+        cleared_ = 0;
+    }
+
+    // So many bits from the cursor on were found to be left.
+    NETFLOOR_INLINE void checkBits(std::uint32_t bitCount) { checkedBits_ = bitCount; }
+
+    // Clears the flag words of so many elements, for fields of the run. What it has cleared stays clear.
+    template <std::uint32_t elements>
+    NETFLOOR_INLINE void clearInRun(FieldRecord &record) {
+        forEach<std::min(elements, fewElements)>([&]<std::uint32_t i>() NETFLOOR_INLINE { clearInRun(record, i); });
+        if constexpr (elements > fewElements) {
+            last_.cleared = std::max(last_.cleared, elements);
+        }
     }
 
     [[nodiscard]] NETFLOOR_INLINE bool isInRun() const { return inRun_; }
     [[nodiscard]] NETFLOOR_INLINE std::uint32_t checkedBits() const { return checkedBits_; }
 
-    // What was checked does not hold from here on. What is put off stays so.
-    NETFLOOR_INLINE void leaveRun() { checkedBits_ = 0; }
+    // The cursor of a run: the octets at its start, and a bit number in them. Compilers know the latter.
+    [[nodiscard]] NETFLOOR_INLINE const std::uint8_t *octets() const { return octets_; }
+    [[nodiscard]] NETFLOOR_INLINE std::uint32_t bit() const { return offset_ + 1; }
+
+    // The cursor moved on without a field.
+    NETFLOOR_INLINE void skipped(std::uint32_t bitCount) { offset_ += bitCount; }
 
     // Nothing is put off: the state is as the host left it.
     NETFLOOR_INLINE void reset() {
@@ -163,65 +198,102 @@ public:
     NETFLOOR_INLINE void endRun() {
         inRun_ = false;
         checkedBits_ = 0;
-        checkedBlocks_ = 0;
-        field_ = {};
-        blocks_ = 0;
+        putOff_.clear();
     }
 
-    // Writes what the run has put off.
+    NETFLOOR_INLINE void setCondition(DecodeState &state, bool holds) {
+        if (!inRun_) {
+            state.condition = holds ? 1 : 0;
+            return;
+        }
+        putOff_.hasCondition = true;
+        putOff_.condition = holds;
+    }
+
+    NETFLOOR_INLINE void setAdvance(DecodeState &state, std::int32_t bitCount) {
+        if (!inRun_) {
+            state.advance = bitCount;
+            return;
+        }
+        putOff_.hasAdvance = true;
+        putOff_.advance = bitCount;
+    }
+
+    NETFLOOR_INLINE void raise(DecodeState &state, std::uint32_t flag) {
+        if (!inRun_) {
+            state.flags |= flag;
+            return;
+        }
+        putOff_.flags |= flag;
+    }
+
+    // Writes what the run has put off, or keeps it where it is kept outside of runs.
     NETFLOOR_INLINE void flushRun(DecodeState &state) {
         if (!inRun_) {
             return;
         }
-        if (field_.field != nullptr) {
-            state.condition = 1;
-            state.advance = field_.advance;
-            last_.field.field = field_.field;
-            last_.field.cursor = field_.cursor;
+        writeSteps(state);
+        if (putOff_.field != nullptr) {
+            last_.field.field = putOff_.field;
+            last_.field.cursor = putOff_.cursor;
             last_.peek.pieces = 0;
         }
-        if (blocks_ != 0) {
-            state.blockStarts.count = blocks_;
+        if (putOff_.peek.pieces != 0) {
+            last_.peek = putOff_.peek;
         }
-        field_ = {};
-        blocks_ = 0;
+        putOff_.clear();
     }
 
     // Writes all that was put off: before the host looks at the state, and before the working copy changes.
     NETFLOOR_INLINE void flush(const Position &position, DecodeState &state, const std::uint8_t *data) {
-        flushRun(state);
-        flushRecord(state.fieldRecord, data);
+        if (inRun_ && putOff_.field != nullptr) {
+            // Compilers know this field, where those of last_ are any.
+            writeSteps(state);
+            const FieldRead field{.field = putOff_.field, .cursor = putOff_.cursor};
+            writeRecord(state.fieldRecord, data, field, putOff_.peek);
+            putOff_.clear();
+        } else {
+            flushRun(state);
+            writeRecord(state.fieldRecord, data, last_.field, last_.peek);
+        }
+        last_.field.field = nullptr;
+        last_.peek.pieces = 0;
         if (position.fieldBlock.text != nullptr) {
             position.fieldBlock.copyTo(state.blockName);
         }
     }
 
-    NETFLOOR_INLINE void flushRecord(FieldRecord &record, const std::uint8_t *data) {
-        if (last_.field.field != nullptr) {
-            beginRecord(record, last_.field.field->name);
-            last_.field.writeElements(record, data);
-            record.fieldId = last_.field.field->id;
-        }
-        if (last_.peek.pieces != 0) {
-            writePeek(record, data, last_.peek);
-        }
-        last_.field.field = nullptr;
-        last_.peek.pieces = 0;
-    }
-
     NETFLOOR_INLINE void pushed(BitStack &) {}
-    NETFLOOR_INLINE void popped(BitStack &) {}
+    NETFLOOR_INLINE void popped(BitStack &, std::uint32_t) {}
 
     // Notes that the block at `depth` opened at `cursor`. False where the run has checked no room for it.
     NETFLOOR_INLINE bool pushedBlockInRun(DecodeState &state, std::uint32_t depth, std::uint32_t cursor) {
-        if (checkedBlocks_ == 0) {
+        if (!inRun_ || blockRoom_ == 0) {
             return false;
         }
-        --checkedBlocks_;
-        blocks_ = depth;
+        --blockRoom_;
+        putOff_.hasBlocks = true;
+        putOff_.blocks = depth;
         state.blockStarts.base[depth] = cursor;
         return true;
     }
+
+    // The same for a limit.
+    NETFLOOR_INLINE bool pushedLimitInRun(DecodeState &state, std::uint32_t depth, std::uint32_t lastBit) {
+        if (!inRun_ || limitRoom_ == 0) {
+            return false;
+        }
+        --limitRoom_;
+        putOff_.hasLimits = true;
+        putOff_.limits = depth;
+        state.limits.base[depth] = lastBit;
+        return true;
+    }
+
+    [[nodiscard]] NETFLOOR_INLINE std::uint32_t blockRoom() const { return blockRoom_; }
+    NETFLOOR_INLINE void setBlockRoom(std::uint32_t blocks) { blockRoom_ = blocks; }
+    NETFLOOR_INLINE void poppedBlock() { ++blockRoom_; }
+    NETFLOOR_INLINE void poppedLimit() { ++limitRoom_; }
 
     NETFLOOR_INLINE void nameBlock(Position &position, DecodeState &) { position.fieldBlock = position.block; }
 
@@ -259,22 +331,35 @@ public:
     template <const Field &field>
     NETFLOOR_INLINE void writeFieldInRun(DecodeState &state, std::uint32_t start) {
         checkedBits_ -= field.place.advance;
-        field_.field = &deferred<field>;
-        field_.cursor = start;
-        field_.advance = static_cast<std::int32_t>(field.place.advance);
+        offset_ += field.place.advance;
+        setCondition(state, true);
+        setAdvance(state, static_cast<std::int32_t>(field.place.advance));
+        putOff_.field = &deferred<field>;
+        putOff_.cursor = start;
+        putOff_.peek.pieces = 0;
         if constexpr (field.place.shape == Shape::addressNibbles) {
             remember(start, nibbleBits, mostFixedElements);
         }
         writeWide<field>(state.fieldRecord);
     }
 
-    NETFLOOR_INLINE std::uint32_t peek(FieldRecord &record, const std::uint8_t *data, const Peek &peek) {
-        last_.peek = peek;
-        for (std::uint32_t i = 0; i < peek.pieces; ++i) {
-            record.ranges[i].flagWord = 0;
+    // The peek lies `low` bits after the cursor.
+    NETFLOOR_INLINE std::uint32_t peek(FieldRecord &record, const std::uint8_t *data, const Peek &peek,
+                                       std::uint32_t low) {
+        if (inRun_) {
+            putOff_.peek.first = peek.first;
+            putOff_.peek.pieces = peek.pieces;
+            putOff_.peek.width = peek.width;
+        } else {
+            last_.peek = peek;
         }
-        return peek.width == bitsPerOctet ? octetsAt(data, peek.first, peek.pieces)
-                                          : bits(data, peek.first, peek.first + peek.width - 1);
+        for (std::uint32_t i = 0; i < peek.pieces; ++i) {
+            clearInRun(record, i);
+        }
+        const std::uint8_t *const from = inRun_ ? octets_ : data;
+        const std::uint32_t first = inRun_ ? bit() + low : peek.first;
+        return peek.width == bitsPerOctet ? octetsAt(from, first, peek.pieces)
+                                          : bits(from, first, first + peek.width - 1);
     }
 
     // Clears the flag words of so many elements. The plug-in writes nothing else to them, so that the first need not be
@@ -298,11 +383,12 @@ public:
     // Moves back over an address that the run has just read: inside a run its bits are there. False elsewhere, where
     // the last advance is 0.
     NETFLOOR_INLINE bool stepBackInRun(std::uint32_t bitCount) {
-        if (field_.advance != static_cast<std::int32_t>(bitCount)) {
+        if (!inRun_ || putOff_.field == nullptr || putOff_.advance != static_cast<std::int32_t>(bitCount)) {
             return false;
         }
-        field_.advance = -field_.advance;
+        putOff_.advance = -putOff_.advance;
         checkedBits_ += bitCount;
+        offset_ -= bitCount;
         return true;
     }
 
@@ -358,20 +444,82 @@ private:
         }
     }
 
-    // Of the run: its last field, and the blocks on the stack after its last push (0: there was none).
-    struct RunField {
-        const DeferredField *field = nullptr; // null: there was none
-        std::uint32_t cursor = 0;
+    NETFLOOR_INLINE void clearInRun(FieldRecord &record, std::uint32_t element) {
+        if (inRun_ && element < cleared_) {
+            return;
+        }
+        record.ranges[element].flagWord = 0;
+        cleared_ = element + 1;
+    }
+
+    NETFLOOR_INLINE static void writeRecord(FieldRecord &record, const std::uint8_t *data, const FieldRead &field,
+                                            const Peek &peek) {
+        if (field.field != nullptr) {
+            beginRecord(record, field.field->name);
+            field.writeElements(record, data);
+            record.fieldId = field.field->id;
+        }
+        if (peek.pieces != 0) {
+            writePeek(record, data, peek);
+        }
+    }
+
+    // What a run has put off.
+    struct PutOff {
+        const DeferredField *field = nullptr; // the last one; null: there was none
+        std::uint32_t cursor = 0;             // where it lies
+        Peek peek;                            // after that field
+        bool hasCondition = false;
+        bool condition = false;
+        bool hasAdvance = false;
         std::int32_t advance = 0;
+        bool hasBlocks = false;
+        std::uint32_t blocks = 0; // on the stack after the last push
+        bool hasLimits = false;
+        std::uint32_t limits = 0;
+        std::uint32_t flags = 0;
+
+        // One by one: as a whole it would be memory.
+        NETFLOOR_INLINE void clear() {
+            field = nullptr;
+            peek.pieces = 0;
+            hasCondition = false;
+            hasAdvance = false;
+            hasBlocks = false;
+            hasLimits = false;
+            flags = 0;
+        }
     };
+
+    // Writes all but the field and the peek.
+    NETFLOOR_INLINE void writeSteps(DecodeState &state) const {
+        if (putOff_.hasCondition) {
+            state.condition = putOff_.condition ? 1 : 0;
+        }
+        if (putOff_.hasAdvance) {
+            state.advance = putOff_.advance;
+        }
+        if (putOff_.hasBlocks) {
+            state.blockStarts.count = putOff_.blocks;
+        }
+        if (putOff_.hasLimits) {
+            state.limits.count = putOff_.limits;
+        }
+        if (putOff_.flags != 0) {
+            state.flags |= putOff_.flags;
+        }
+    }
 
     static inline constinit LastRead last_{};
 
     bool inRun_ = false;
+    const std::uint8_t *octets_ = nullptr;
+    std::uint32_t offset_ = 0;
     std::uint32_t checkedBits_ = 0;
-    std::uint32_t checkedBlocks_ = 0;
-    RunField field_ = {};
-    std::uint32_t blocks_ = 0;
+    std::uint32_t blockRoom_ = 0;
+    std::uint32_t limitRoom_ = 0;
+    std::uint32_t cleared_ = 0; // so many elements' flag words
+    PutOff putOff_ = {};
 };
 
 } // namespace netfloor::plugin

@@ -71,13 +71,40 @@ NETFLOOR_INLINE inline void fieldsAfterTotalLength(Reader<Pass> &reader) {
     read<destinationAddress>(reader);
 }
 
-// Reads a datagram; `payload` is the production of its payload.
+// The production of the payload is payload.template operator()<form>(reader).
+
+template <Form form, auto payload, class Pass>
+NETFLOOR_INLINE inline void afterHeader(Reader<Pass> &reader, std::int32_t areaOctets) {
+    auto &variables = reader.variables();
+    options(reader, areaOctets);
+    if (reader.live) {
+        variables.payloadOctets = static_cast<std::int32_t>(variables.ipTotalLength - variables.ipHeaderOctets);
+    }
+    payload.template operator()<form>(reader);
+}
+
 template <auto payload, class Pass>
+NETFLOOR_INLINE inline void afterHeaderWithOptions(Reader<Pass> &reader) {
+    afterHeader<Form::slow, payload>(reader, optionOctets(reader));
+}
+
+// Options go out of line with all that follows them, so that the run of a datagram without them goes on.
+template <Form form, auto payload, class Pass>
+NETFLOOR_INLINE inline void afterTotalLength(Reader<Pass> &reader) {
+    fieldsAfterTotalLength(reader);
+    const std::int32_t areaOctets = optionOctets(reader);
+    if (form == Form::slow || areaOctets >= 1) {
+        return runOutOfLine<afterHeaderWithOptions<payload, Pass>>(reader);
+    }
+    afterHeader<form, payload>(reader, areaOctets);
+}
+
+// Reads a datagram; `payload` is the production of its payload.
+template <Form form, auto payload, class Pass>
 NETFLOOR_INLINE inline void datagram(Reader<Pass> &reader) {
     auto &variables = reader.variables();
     const Block<Pass> header{reader, "IPv4 Header"};
-    checkedRun<headerLength, totalLength, fieldsUpToTotalLength<Pass>>(reader);
-
+    fieldsUpToTotalLength(reader);
     if (!reader.live) {
         return;
     }
@@ -88,12 +115,12 @@ NETFLOOR_INLINE inline void datagram(Reader<Pass> &reader) {
         return;
     }
     const LimitedBlock<Pass> extra{reader, "Extra", limit};
-    checkedRun<identification, destinationAddress, fieldsAfterTotalLength<Pass>>(reader);
-    options(reader);
-    if (reader.live) {
-        variables.payloadOctets = static_cast<std::int32_t>(variables.ipTotalLength - variables.ipHeaderOctets);
+    if constexpr (form == Form::slow) {
+        runOutOfLine<afterTotalLength<form, payload, Pass>>(reader);
+    } else {
+        checkedRun<identification, destinationAddress, afterTotalLength<form, payload, Pass>,
+                   afterTotalLength<Form::slow, payload, Pass>>(reader);
     }
-    payload(reader);
 }
 
 // clang-format off

@@ -237,10 +237,10 @@ NETFLOOR_INLINE inline void options(Reader<Pass> &reader, std::int32_t areaOctet
     }
 }
 
-// The options of the header whose length was read last.
+// The octets of the options of the header whose length was read last.
 template <class Pass>
-NETFLOOR_INLINE inline void options(Reader<Pass> &reader) {
-    options(reader, static_cast<std::int32_t>(reader.variables().ipHeaderOctets) - fixedHeaderOctets);
+[[nodiscard]] NETFLOOR_INLINE inline std::int32_t optionOctets(const Reader<Pass> &reader) {
+    return static_cast<std::int32_t>(reader.variables().ipHeaderOctets) - fixedHeaderOctets;
 }
 
 // clang-format off

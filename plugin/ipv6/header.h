@@ -83,26 +83,29 @@ NETFLOOR_INLINE inline void fieldsFromPayloadLength(Reader<Pass> &reader) {
     addressReadTwice<destinationGroups, destinationNibbles>(reader);
 }
 
-// Reads a fixed header, whose body stays open in `chain`. Returns whether the chain goes on after it.
-//
-// The test of the bits left counts from after the Payload Length, but the body starts at the Payload Length. So a
-// packet that is one or two octets too short passes the test, and is read up to its end.
+// The bits of a body of which the test of the bits left counts all but the Payload Length: it counts from after the
+// Payload Length, but the body starts there. So a packet that is one or two octets too short passes the test, and is
+// read up to its end. 0 where a packet does not pass it.
 template <class Pass>
-[[nodiscard]] NETFLOOR_INLINE inline bool fixedHeader(Reader<Pass> &reader, BlockChain<Pass> &chain) {
-    auto &variables = reader.variables();
-    chain.open("IPv6 Header");
-    checkedRun<trafficClass, payloadLengthAhead, fieldsUpToPayloadLength<Pass>>(reader);
+[[nodiscard]] NETFLOOR_INLINE inline std::uint32_t bodyBits(const Reader<Pass> &reader) {
+    const std::uint32_t restBits = reader.variables().ipv6PayloadLength * bitsPerOctet + bitsAfterLength;
+    return reader.live && restBits <= reader.left ? payloadLengthBits + restBits : 0;
+}
 
-    const std::uint32_t restBits = variables.ipv6PayloadLength * bitsPerOctet + bitsAfterLength;
-    if (!reader.live || restBits > reader.left) {
-        return false;
+// Reads the body of a fixed header, which stays open in `chain`.
+template <Form form, class Pass>
+NETFLOOR_INLINE inline void body(Reader<Pass> &reader, BlockChain<Pass> &chain, std::uint32_t bitCount) {
+    auto &variables = reader.variables();
+    chain.openLimited("IPv6 Body", bitCount);
+    if constexpr (form == Form::inRun) {
+        expectFields<payloadLength, destinationNibbles>(reader);
+        fieldsFromPayloadLength(reader);
+    } else {
+        checkedRun<payloadLength, destinationNibbles, fieldsFromPayloadLength<Pass>>(reader);
     }
-    chain.openLimited("IPv6 Body", payloadLengthBits + restBits);
-    checkedRun<payloadLength, destinationNibbles, fieldsFromPayloadLength<Pass>>(reader);
     if (reader.live) {
         variables.payloadOctets = static_cast<std::int32_t>(variables.ipv6PayloadLength);
     }
-    return true;
 }
 
 // clang-format off

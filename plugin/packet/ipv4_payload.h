@@ -17,7 +17,7 @@ namespace netfloor::plugin {
 
 // Runs the production of the payload, if the header was read to its end. A fragment other than the first one is data,
 // whatever its protocol. If DF is set, the fragment offset is ignored.
-template <class Pass>
+template <Form form, class Pass>
 NETFLOOR_INLINE inline void ipv4Payload(Reader<Pass> &reader) {
     if (!reader.live) {
         return;
@@ -32,11 +32,14 @@ NETFLOOR_INLINE inline void ipv4Payload(Reader<Pass> &reader) {
     case protocolMinimalEncapsulation: return runOutOfLine<tunnels<Pass>>(reader);
     case protocolGre: return runOutOfLine<gre::packet<Pass>>(reader);
     case protocolTcp: return runOutOfLine<tcp::segment<Pass>>(reader);
-    case protocolUdp: return udp::datagram(reader);
+    case protocolUdp: return runAs<form, udp::datagram<Pass>>(reader);
     case protocolIcmpv6: return runOutOfLine<icmpv6::message<Pass>>(reader);
     case protocolSctp: return runOutOfLine<sctp::packet<Pass>>(reader);
     default: return runOutOfLine<unknownData<Pass>>(reader);
     }
 }
+
+// The same as a value, for the header before it.
+inline constexpr auto ipv4Payloads = []<Form form>(auto &reader) NETFLOOR_INLINE { ipv4Payload<form>(reader); };
 
 } // namespace netfloor::plugin

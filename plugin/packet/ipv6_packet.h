@@ -6,6 +6,7 @@
 #include <cstdint>
 
 #include "frame/block.h"
+#include "frame/checked_run.h"
 #include "icmp/icmpv6.h"
 #include "ip/unknown_data.h"
 #include "ipv6/extension_headers.h"
@@ -19,13 +20,13 @@
 namespace netfloor::plugin {
 
 // Runs the production of the payload, which ends the chain. The tunnels through IPv4 are not followed from here.
-template <class Pass>
+template <Form form, class Pass>
 NETFLOOR_INLINE inline void ipv6Payload(Reader<Pass> &reader, std::uint32_t protocol) {
     switch (protocol) {
     case protocolIcmp:
     case protocolIcmpv6: return runOutOfLine<icmpv6::message<Pass>>(reader);
     case protocolTcp: return runOutOfLine<tcp::segment<Pass>>(reader);
-    case protocolUdp: return udp::datagram(reader);
+    case protocolUdp: return runAs<form, udp::datagram<Pass>>(reader);
     case protocolGre: return runOutOfLine<gre::packet<Pass>>(reader);
     case protocolSctp: return runOutOfLine<sctp::packet<Pass>>(reader);
     case protocolEsp: return runOutOfLine<ipv6::securityPayload<Pass>>(reader);
@@ -33,33 +34,90 @@ NETFLOOR_INLINE inline void ipv6Payload(Reader<Pass> &reader, std::uint32_t prot
     }
 }
 
+// Whether a protocol number stands for a link of the chain, not for its payload.
+[[nodiscard]] constexpr bool isLink(std::uint32_t protocol) {
+    return protocol == protocolHopByHop || protocol == protocolDestinationOptions || protocol == protocolIpv6 ||
+           protocol == protocolRouting || protocol == protocolFragment || protocol == protocolAuthentication;
+}
+
+// Reads a fixed header inside another. Returns whether the chain goes on after it.
 template <class Pass>
-[[nodiscard]] NETFLOOR_INLINE inline bool ipv6Header(Reader<Pass> &reader, BlockChain<Pass> &chain,
-                                                     std::uint32_t protocol) {
+[[nodiscard]] NETFLOOR_INLINE inline bool fixedHeader(Reader<Pass> &reader, BlockChain<Pass> &chain) {
+    chain.open("IPv6 Header");
+    checkedRun<ipv6::trafficClass, ipv6::payloadLengthAhead, ipv6::fieldsUpToPayloadLength<Pass>>(reader);
+    const std::uint32_t bitCount = ipv6::bodyBits(reader);
+    if (bitCount != 0) {
+        ipv6::body<Form::slow>(reader, chain, bitCount);
+    }
+    return bitCount != 0;
+}
+
+// Reads a link of the chain. Returns whether the chain goes on after it.
+template <class Pass>
+[[nodiscard]] NETFLOOR_INLINE inline bool link(Reader<Pass> &reader, BlockChain<Pass> &chain, std::uint32_t protocol) {
     switch (protocol) {
-    case protocolHopByHop:
-    case protocolDestinationOptions:
-        return ipv6::optionsHeader(reader, chain,
-                                   protocol == protocolHopByHop ? BlockName{"IPv6 Hop-by-Hop Header"}
-                                                                : BlockName{"Destination Option Header"});
-    case protocolIpv6: return ipv6::fixedHeader(reader, chain);
+    case protocolHopByHop: return ipv6::optionsHeader(reader, chain, "IPv6 Hop-by-Hop Header");
+    case protocolDestinationOptions: return ipv6::optionsHeader(reader, chain, "Destination Option Header");
     case protocolRouting: return ipv6::routingHeader(reader, chain);
     case protocolFragment: return ipv6::fragmentHeader(reader, chain);
     case protocolAuthentication: return ipv6::authenticationHeader(reader, chain);
-    default: ipv6Payload(reader, protocol); return false;
+    default: return fixedHeader(reader, chain);
     }
 }
 
-// Reads the chain of headers, and the payload.
+// Reads the rest of the chain from a link on, and the payload. Its blocks are inside those of the first header.
 template <class Pass>
-NETFLOOR_INLINE inline void ipv6Packet(Reader<Pass> &reader) {
+NETFLOOR_INLINE inline void moreLinks(Reader<Pass> &reader) {
     const auto &variables = reader.variables();
     BlockChain<Pass> chain{reader};
-    std::uint32_t next = protocolIpv6;
-    while (ipv6Header(reader, chain, next) && reader.live && variables.payloadOctets >= 1) {
+    while (link(reader, chain, variables.ipProtocol) && reader.live && variables.payloadOctets >= 1) {
         chain.open("Choose Protocol");
-        next = variables.ipProtocol;
+        if (!isLink(variables.ipProtocol)) {
+            return ipv6Payload<Form::slow>(reader, variables.ipProtocol);
+        }
     }
+}
+
+template <Form form, class Pass>
+NETFLOOR_INLINE inline void afterFirstHeader(Reader<Pass> &reader, BlockChain<Pass> &chain) {
+    const auto &variables = reader.variables();
+    if (!reader.live || variables.payloadOctets < 1) {
+        return;
+    }
+    chain.open("Choose Protocol");
+    if (isLink(variables.ipProtocol)) {
+        return runOutOfLine<moreLinks<Pass>>(reader);
+    }
+    ipv6Payload<form>(reader, variables.ipProtocol);
+}
+
+template <class Pass>
+NETFLOOR_INLINE inline void fromBody(Reader<Pass> &reader) {
+    BlockChain<Pass> chain{reader};
+    ipv6::body<Form::slow>(reader, chain, ipv6::bodyBits(reader));
+    afterFirstHeader<Form::slow>(reader, chain);
+}
+
+template <Form form, class Pass>
+NETFLOOR_INLINE inline void fromFirstHeader(Reader<Pass> &reader) {
+    BlockChain<Pass> chain{reader};
+    chain.open("IPv6 Header");
+    ipv6::fieldsUpToPayloadLength(reader);
+    const std::uint32_t bitCount = ipv6::bodyBits(reader);
+    if (bitCount == 0) {
+        return;
+    }
+    if (form == Form::slow || bitCount > reader.left) {
+        return runOutOfLine<fromBody<Pass>>(reader);
+    }
+    ipv6::body<form>(reader, chain, bitCount);
+    afterFirstHeader<form>(reader, chain);
+}
+
+template <class Pass>
+NETFLOOR_INLINE inline void ipv6Packet(Reader<Pass> &reader) {
+    checkedRun<ipv6::trafficClass, ipv6::payloadLengthAhead, fromFirstHeader<Form::inRun, Pass>,
+               fromFirstHeader<Form::slow, Pass>>(reader);
 }
 
 } // namespace netfloor::plugin

@@ -4,6 +4,7 @@
 
 #include "frame/bit_order.h"
 #include "frame/block.h"
+#include "frame/checked_run.h"
 #include "frame/field_step.h"
 #include "icmp/message_type.h"
 #include "ip/variables.h"
@@ -27,19 +28,25 @@ struct Variables : BitOrderVariables,
                    tcp::TcpVariables,
                    sctp::Variables {};
 
-// Reads one packet. After a version other than 4 and 6 nothing is read.
-template <class Pass>
-NETFLOOR_INLINE inline void packet(Reader<Pass> &reader) {
+template <Form form, class Pass>
+NETFLOOR_INLINE inline void versionAndHeaders(Reader<Pass> &reader) {
     auto &variables = reader.variables();
     const Block<Pass> ip{reader, "Ip"};
     reader.check();
     const Block<Pass> header{reader, "Ip Header"};
     read<version>(reader, &variables.ipVersion);
     if (variables.ipVersion == 4) {
-        ipv4::datagram<ipv4Payload<Pass>>(reader);
+        ipv4::datagram<form, ipv4Payloads>(reader);
     } else if (variables.ipVersion == 6) {
         runOutOfLine<ipv6Packet<Pass>>(reader);
     }
+}
+
+// Reads one packet. After a version other than 4 and 6 nothing is read.
+template <class Pass>
+NETFLOOR_INLINE inline void packet(Reader<Pass> &reader) {
+    checkedRun<version, ipv4::totalLength, versionAndHeaders<Form::inRun, Pass>, versionAndHeaders<Form::slow, Pass>>(
+        reader);
 }
 
 } // namespace netfloor::plugin

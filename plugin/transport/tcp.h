@@ -62,6 +62,7 @@ inline constexpr Field urgentPointer            {408, "Urgent Pointer",         
 
 struct TcpVariables : OptionVariables {
     std::uint32_t tcpLengthShort; // 1 once a header was longer than the payload of its datagram
+    std::int32_t tcpHeaderOctets; // of a header whose rest of the options is read out of line
 };
 
 inline constexpr std::int32_t fixedHeaderOctets = 20;
@@ -69,6 +70,9 @@ inline constexpr std::int32_t fixedHeaderOctets = 20;
 // The words of the header before its limited block.
 inline constexpr std::uint32_t wordsBeforeLimit = 3;
 inline constexpr std::uint32_t bitsPerWord = 32;
+inline constexpr std::uint32_t fixedHeaderWords = 5;
+
+inline constexpr BlockName segmentName{"Transmission Control Protocol"};
 
 // The fields in the limited block.
 template <class Pass>
@@ -90,17 +94,20 @@ NETFLOOR_INLINE inline void fieldsFromDataOffset(Reader<Pass> &reader) {
 // fixed header: then the result is 3 or 4 octets, and the payload starts after the block.
 template <class Pass>
 NETFLOOR_INLINE inline std::int32_t limitedPart(Reader<Pass> &reader) {
-    LimitedBlock<Pass> block{reader, "INLINE BLOCK"};
+    LimitedBlock<Pass> block{reader, limitedPartName};
     const std::uint32_t words = peek(reader, dataOffset.place).value_or(0);
     // For fewer than three words this wraps to a number larger than any packet.
     block.limit((words - wordsBeforeLimit) * bitsPerWord);
-    checkedRun<dataOffset, urgentPointer, fieldsFromDataOffset<Pass>>(reader);
+    fieldsFromDataOffset(reader);
     if (!reader.live) {
         return static_cast<std::int32_t>(words);
     }
     const auto headerOctets = static_cast<std::int32_t>(words * bitsPerWord / bitsPerOctet);
-    reader.variables().tcpOptions.octets = headerOctets - fixedHeaderOctets;
-    runOutOfLine<options<Pass>>(reader);
+    auto &variables = reader.variables();
+    variables.tcpOptions.octets = headerOctets - fixedHeaderOctets;
+    variables.tcpTurn = optionKinds.size();
+    variables.tcpRounds = 0;
+    runOutOfLine<restOfOptions<Pass>>(reader);
     return headerOctets;
 }
 
@@ -130,13 +137,7 @@ NETFLOOR_INLINE inline void fieldsUpToDataOffset(Reader<Pass> &reader) {
 }
 
 template <class Pass>
-NETFLOOR_INLINE inline void segment(Reader<Pass> &reader) {
-    const Block<Pass> header{reader, "Transmission Control Protocol"};
-    checkedRun<sourcePort, reservedBesideDataOffset, fieldsUpToDataOffset<Pass>>(reader);
-    if (!reader.live) {
-        return;
-    }
-    const std::int32_t headerOctets = limitedPart(reader);
+NETFLOOR_INLINE inline void afterHeader(Reader<Pass> &reader, std::int32_t headerOctets) {
     if (reader.live) {
         accountFor(reader, headerOctets);
         tellNextLayer(reader);
@@ -144,6 +145,68 @@ NETFLOOR_INLINE inline void segment(Reader<Pass> &reader) {
     if (reader.left > handOffAbove) {
         handOff(reader);
     }
+}
+
+template <class Pass>
+NETFLOOR_INLINE inline void fromDataOffset(Reader<Pass> &reader) {
+    afterHeader(reader, limitedPart(reader));
+}
+
+// Goes on where the usual options ended, and closes the limited block.
+template <class Pass>
+NETFLOOR_INLINE inline void fromRestOfOptions(Reader<Pass> &reader) {
+    {
+        const auto block = LimitedBlock<Pass>::reopened(reader, segmentName);
+        runOutOfLine<restOfOptions<Pass>>(reader);
+    }
+    afterHeader(reader, reader.variables().tcpHeaderOctets);
+}
+
+// The words of a header of which a checked run knows that it fits; 0 where there is none.
+template <class Pass>
+[[nodiscard]] NETFLOOR_INLINE inline std::uint32_t wordsInRun(const Reader<Pass> &reader) {
+    if (!reader.writer.isInRun()) {
+        return 0;
+    }
+    const auto words = valueAt<dataOffset.place>(reader.writer.octets(), reader.writer.bit(), dataOffset.place.count);
+    const bool fits = words >= fixedHeaderWords && (words - wordsBeforeLimit) * bitsPerWord <= reader.left;
+    return fits ? words : 0;
+}
+
+// The same as limitedPart and what follows it, in a checked run.
+template <class Pass>
+NETFLOOR_INLINE inline void fromDataOffsetInRun(Reader<Pass> &reader, std::uint32_t words) {
+    const auto headerOctets = static_cast<std::int32_t>(words * bitsPerWord / bitsPerOctet);
+    {
+        LimitedBlock<Pass> block{reader, limitedPartName, (words - wordsBeforeLimit) * bitsPerWord};
+        expectFields<dataOffset, urgentPointer>(reader);
+        fieldsFromDataOffset(reader);
+        if (!usualOptions(reader, headerOctets - fixedHeaderOctets)) {
+            reader.variables().tcpHeaderOctets = headerOctets;
+            block.release();
+            return runOutOfLine<fromRestOfOptions<Pass>>(reader);
+        }
+    }
+    afterHeader(reader, headerOctets);
+}
+
+template <class Pass>
+NETFLOOR_INLINE inline void headerAndPayload(Reader<Pass> &reader) {
+    const Block<Pass> header{reader, segmentName};
+    fieldsUpToDataOffset(reader);
+    if constexpr (Pass::Writer::hasCheckedRuns) {
+        if (const std::uint32_t words = wordsInRun(reader); words != 0) {
+            return fromDataOffsetInRun(reader, words);
+        }
+        runOutOfLine<fromDataOffset<Pass>>(reader);
+    } else if (reader.live) {
+        fromDataOffset(reader);
+    }
+}
+
+template <class Pass>
+NETFLOOR_INLINE inline void segment(Reader<Pass> &reader) {
+    checkedRun<sourcePort, urgentPointer, headerAndPayload<Pass>>(reader);
 }
 
 // clang-format off

@@ -19,6 +19,7 @@
 #include <cstddef>
 #include <cstdint>
 
+#include "frame/bits.h"
 #include "frame/block.h"
 #include "frame/checked_run.h"
 #include "frame/field.h"
@@ -70,28 +71,42 @@ inline constexpr std::int32_t windowScaleOctets = 3;
 inline constexpr std::int32_t sackPermittedOctets = 2;
 inline constexpr std::int32_t timestampsOctets = 10;
 
+// The block that holds the options.
+inline constexpr BlockName limitedPartName{"INLINE BLOCK"};
+
+// A round opens its own block, and one for an option at a time.
+inline constexpr std::uint32_t blocksOfRound = 2;
+
 struct OptionVariables {
-    OptionArea tcpOptions; // after the fixed header
+    OptionArea tcpOptions;   // after the fixed header
+    std::uint32_t tcpTurn;   // in the round that is open; the number of kinds if none is
+    std::uint32_t tcpRounds; // that are open
 };
 
+// The options of fixed size.
+
 template <class Pass>
-NETFLOOR_INLINE inline void maximumSegmentOption(Reader<Pass> &reader, OptionArea &area) {
-    const OptionBlock<Pass> option{reader, ""};
+NETFLOOR_INLINE inline void maximumSegmentFields(Reader<Pass> &reader, OptionArea &area) {
     optionHead<maximumSegment, maximumLength>(reader, area, maximumSegmentOctets);
     read<maximumSize>(reader);
 }
 
 template <class Pass>
-NETFLOOR_INLINE inline void windowScaleOption(Reader<Pass> &reader, OptionArea &area) {
-    const OptionBlock<Pass> option{reader, ""};
+NETFLOOR_INLINE inline void windowScaleFields(Reader<Pass> &reader, OptionArea &area) {
     optionHead<windowScale, windowScaleLength>(reader, area, windowScaleOctets);
     read<shiftCount>(reader);
 }
 
 template <class Pass>
-NETFLOOR_INLINE inline void sackPermittedOption(Reader<Pass> &reader, OptionArea &area) {
-    const OptionBlock<Pass> option{reader, ""};
+NETFLOOR_INLINE inline void sackPermittedFields(Reader<Pass> &reader, OptionArea &area) {
     optionHead<sackPermitted, permittedLength>(reader, area, sackPermittedOctets);
+}
+
+template <class Pass>
+NETFLOOR_INLINE inline void timestampsFields(Reader<Pass> &reader, OptionArea &area) {
+    optionHead<timestamps, timestampsLength>(reader, area, timestampsOctets);
+    read<timestampValue>(reader);
+    read<timestampEcho>(reader);
 }
 
 // The limit ends the list: at the first edge that does not fit.
@@ -106,21 +121,6 @@ NETFLOOR_INLINE inline void sackOption(Reader<Pass> &reader, OptionArea &area) {
     }
 }
 
-// The production of a checked run has no other parameter than the reader.
-template <class Pass>
-NETFLOOR_INLINE inline void timestampsFields(Reader<Pass> &reader) {
-    optionHead<timestamps, timestampsLength>(reader, reader.variables().tcpOptions, timestampsOctets);
-    read<timestampValue>(reader);
-    read<timestampEcho>(reader);
-}
-
-// The one option that nearly every segment carries.
-template <class Pass>
-NETFLOOR_INLINE inline void timestampsOption(Reader<Pass> &reader) {
-    const OptionBlock<Pass> option{reader, ""};
-    checkedRun<timestamps, timestampEcho, timestampsFields<Pass>>(reader);
-}
-
 // The digest is the rest of the option, but at least one octet: if nothing is left, the digest is cut short.
 template <class Pass>
 NETFLOOR_INLINE inline void md5SignatureOption(Reader<Pass> &reader, OptionArea &area) {
@@ -130,19 +130,53 @@ NETFLOOR_INLINE inline void md5SignatureOption(Reader<Pass> &reader, OptionArea 
     readRun<md5Digest>(reader, static_cast<std::int32_t>(digestOctets));
 }
 
-// Reads the option at the cursor, which is of a known kind.
-template <class Pass>
-NETFLOOR_INLINE inline void option(Reader<Pass> &reader, std::uint8_t kind, OptionArea &area) {
-    switch (kind) {
-    case 0: return optionOfOneOctet<endOfList>(reader, "", area);
-    case 1: return optionOfOneOctet<noOperation>(reader, "", area);
-    case 2: return maximumSegmentOption(reader, area);
-    case 3: return windowScaleOption(reader, area);
-    case 4: return sackPermittedOption(reader, area);
-    case 5: return sackOption(reader, area);
-    case 8: return timestampsOption(reader);
-    default: return md5SignatureOption(reader, area);
+// How options are read: any option, or in a checked run only those of fixed size whose length says so.
+enum class Options : std::uint8_t { any, usual };
+
+// Reads an option with the fields from `first` to `last`. False where it is not a usual one.
+template <Options which, const Field &first, const Field &last, auto fields, class Pass>
+[[nodiscard]] NETFLOOR_INLINE inline bool fixedOption(Reader<Pass> &reader, OptionArea &area) {
+    if constexpr (which == Options::any) {
+        const OptionBlock<Pass> option{reader, ""};
+        fields(reader, area);
+    } else {
+        constexpr std::uint32_t bitCount = bitsFromTo<typename Pass::Fields>(first, last);
+        if (reader.left < bitCount ||
+            octetAt(reader.writer.octets(), reader.writer.bit() + bitsPerOctet) != bitCount / bitsPerOctet) {
+            return false;
+        }
+        const LimitedBlock<Pass> option{reader, "", bitCount};
+        expectFields<first, last>(reader);
+        fields(reader, area);
     }
+    return true;
+}
+
+template <Options which, const Field &type, class Pass>
+[[nodiscard]] NETFLOOR_INLINE inline bool octetOption(Reader<Pass> &reader, OptionArea &area) {
+    if constexpr (which == Options::usual) {
+        expectFields<type, type>(reader); // its octet was peeked
+    }
+    optionOfOneOctet<type>(reader, "", area);
+    return true;
+}
+
+// Reads the option at the cursor, which is of a known kind. False where it is not a usual one.
+template <Options which, class Pass>
+[[nodiscard]] NETFLOOR_INLINE inline bool option(Reader<Pass> &reader, std::uint8_t kind, OptionArea &area) {
+    switch (kind) {
+    case 0: return octetOption<which, endOfList>(reader, area);
+    case 1: return octetOption<which, noOperation>(reader, area);
+    case 2: return fixedOption<which, maximumSegment, maximumSize, maximumSegmentFields<Pass>>(reader, area);
+    case 3: return fixedOption<which, windowScale, shiftCount, windowScaleFields<Pass>>(reader, area);
+    case 4: return fixedOption<which, sackPermitted, permittedLength, sackPermittedFields<Pass>>(reader, area);
+    case 8: return fixedOption<which, timestamps, timestampEcho, timestampsFields<Pass>>(reader, area);
+    default: break;
+    }
+    if constexpr (which == Options::any) {
+        kind == 5 ? sackOption(reader, area) : md5SignatureOption(reader, area);
+    }
+    return which == Options::any;
 }
 
 template <class Pass>
@@ -154,13 +188,12 @@ NETFLOOR_INLINE inline void padding(Reader<Pass> &reader, OptionArea &area) {
     }
 }
 
-// One turn for each kind, in order. No kind reads an option once the area is used up. If no kind read an option, the
-// rest is padding, which ends the list.
-template <class Pass>
-NETFLOOR_INLINE inline void optionRound(Reader<Pass> &reader, OptionArea &area) {
-    area.taken = false;
-    reader.check();
-    for (std::size_t turn = 0; reader.live && turn < optionKinds.size(); ++turn) {
+// The turns of a round from `turn` on, in order. No kind reads an option once the area is used up. If no kind read an
+// option, the rest is padding, which ends the list. Gives the turn of an option that is not a usual one, to go on from
+// there; else the number of kinds.
+template <Options which, class Pass>
+[[nodiscard]] NETFLOOR_INLINE inline std::size_t optionRound(Reader<Pass> &reader, OptionArea &area, std::size_t turn) {
+    for (; reader.live && turn < optionKinds.size(); ++turn) {
         std::size_t taker = nextTaker<optionKinds>(reader, turn);
         if (area.octets < 1) {
             taker = optionKinds.size();
@@ -169,30 +202,67 @@ NETFLOOR_INLINE inline void optionRound(Reader<Pass> &reader, OptionArea &area) 
             reader.raise(Flag::expectation);
         }
         turn = taker;
-        if (turn < optionKinds.size()) {
-            option(reader, optionKinds[turn], area);
+        if (turn < optionKinds.size() && !option<which>(reader, optionKinds[turn], area)) {
+            return turn;
         }
     }
     if (!reader.live) {
-        return;
+        return optionKinds.size();
     }
-    if (!area.taken && area.octets >= 1) {
-        padding(reader, area);
-    } else {
+    if (area.taken || area.octets < 1) {
         reader.raise(Flag::expectation);
+    } else if constexpr (which == Options::usual) {
+        return optionKinds.size() - 1; // no kind takes what is there
+    } else {
+        padding(reader, area);
     }
+    return optionKinds.size();
 }
 
 // The options lie in the block that the Data Offset limits, and use the live flag of that block. So an option that
 // reaches past the header ends the list, but not the segment. The payload starts at the Data Offset.
 template <class Pass>
-NETFLOOR_INLINE inline void options(Reader<Pass> &reader) {
-    OptionArea &area = reader.variables().tcpOptions;
+NETFLOOR_INLINE inline void restOfOptions(Reader<Pass> &reader) {
+    auto &variables = reader.variables();
+    OptionArea &area = variables.tcpOptions;
+    BlockChain<Pass> rounds{reader, limitedPartName, variables.tcpRounds};
+    std::size_t turn = variables.tcpTurn;
+    do {
+        if (turn == optionKinds.size()) {
+            rounds.open("options");
+            area.taken = false;
+            reader.check();
+            turn = 0;
+        }
+        turn = optionRound<Options::any>(reader, area, turn);
+    } while (reader.live && area.octets >= 1);
+}
+
+// Reads options in a checked run. False where it comes to one that is not usual: then restOfOptions goes on.
+template <class Pass>
+[[nodiscard]] NETFLOOR_INLINE inline bool usualOptions(Reader<Pass> &reader, std::int32_t octetCount) {
+    OptionArea area{octetCount};
+    std::size_t turn = optionKinds.size();
     BlockChain<Pass> rounds{reader};
     do {
+        if (reader.writer.blockRoom() < blocksOfRound) {
+            break;
+        }
         rounds.open("options");
-        optionRound(reader, area);
-    } while (reader.live && area.octets >= 1);
+        area.taken = false;
+        turn = optionRound<Options::usual>(reader, area, 0);
+        if (turn != optionKinds.size()) {
+            break;
+        }
+        if (area.octets < 1) {
+            return true;
+        }
+    } while (true);
+    auto &variables = reader.variables();
+    variables.tcpOptions = area;
+    variables.tcpTurn = static_cast<std::uint32_t>(turn);
+    variables.tcpRounds = rounds.release();
+    return false;
 }
 
 // clang-format off

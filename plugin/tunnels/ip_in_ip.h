@@ -57,7 +57,7 @@ NETFLOOR_INLINE inline void header(Reader<Pass> &reader) {
     read<headerChecksum>(reader);
     read<sourceAddress>(reader);
     read<destinationAddress>(reader);
-    ipv4::options(reader);
+    ipv4::options(reader, ipv4::optionOctets(reader));
     if (reader.live) {
         variables.payloadOctets = static_cast<std::int32_t>(variables.ipTotalLength - variables.ipHeaderOctets);
     }

@@ -79,6 +79,12 @@ TEST(TcpOptions, lengthsAndOrders) {
         // A length that reaches past the header: read as far as the header goes.
         {"02 08 05 b4", 8, "447=2 448=8 451=5b4"},
         {"01 13 ff 0a", 8, "444=1 474=13 475=ff 478=a"},
+        // After usual options one that is not: of another size, of another length, and in more rounds than there are
+        // in a usual header.
+        {"01 01 05 0a 00 00 00 01 00 00 00 02", 0, "444=1 444=1 461=5 462=a 466=1 467=2"},
+        {"01 01 08 0a 01 00 00 00 02 00 00 00 04 04 aa bb", 0x10, "444=1 444=1 468=8 469=a 472=1 473=2 457=4 458=4"},
+        {"01*9 02 04 05 b4 09 01 01", 0,
+         "444=1 444=1 444=1 444=1 444=1 444=1 444=1 444=1 444=1 447=2 448=4 451=5b4 439=90101"},
     };
     for (const OptionsCase &one : cases) {
         SCOPED_TRACE(one.octets);
