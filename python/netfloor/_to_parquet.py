@@ -59,7 +59,7 @@ def _write(session: SparkSession, options: argparse.Namespace) -> None:
         .option("columns", options.columns)
         .option("where", options.where)
         .option("shards", str(4 * options.workers))
-        .load([os.path.abspath(capture) if os.path.exists(capture) else capture for capture in options.captures])
+        .load(options.captures)
         .write.parquet(folder)
     )
     print(f"{options.to}: {session.read.parquet(folder).count()} rows", flush=True)

@@ -135,6 +135,7 @@ def _files(path: str) -> list[str]:
 
         files = [str(file.full_name) for file in fsspec.open_files(path)]
     else:
+        path = os.path.abspath(path)  # the workers run in other folders
         files = [path] if os.path.isfile(path) else glob.glob(os.path.join(path, "*") if os.path.isdir(path) else path)
     captures = sorted(file for file in files if not file.endswith(_PLAN))
     if not captures:

@@ -92,6 +92,12 @@ def test_types_and_filters(session: SparkSession, captures: Path) -> None:
     assert row.time.microsecond == 3000
 
 
+def test_paths_hold_in_the_folders_of_the_workers(monkeypatch: pytest.MonkeyPatch) -> None:
+    monkeypatch.chdir(CAPTURES)
+    reader = spark.NetfloorReader(spark._Options.of({"paths": '["sctp-over-ipv6.pcap", "./tcp-md5-bgp.*"]'}))
+    assert [part.path for part in reader.partitions()] == [f"{CAPTURES}/{name}" for name in ("sctp-over-ipv6.pcap", "tcp-md5-bgp.pcap")]
+
+
 def test_filters_reach_the_scan() -> None:
     options = spark._Options.of({"path": "x", "table": "chunks"})
     reader = spark.NetfloorReader(options)
