@@ -24,8 +24,11 @@ namespace netfloor::plugin {
     return place.isPieces() || place.shape == Shape::octets || place.shape == Shape::octetsBackward;
 }
 
-// Whether the pieces of a field are the octets at its start, in their order.
-[[nodiscard]] constexpr bool piecesAreOctets(const Place &place) {
+// Whether a field is a known number of octets from its start on, in network order, be they pieces or not.
+[[nodiscard]] constexpr bool isOctetsInOrder(const Place &place) {
+    if (!place.isPieces()) {
+        return place.shape == Shape::octets && !place.isRun();
+    }
     for (std::uint32_t i = 0; i < place.count; ++i) {
         if (place.pieces[i].low != i * bitsPerOctet || place.pieces[i].width() != bitsPerOctet) {
             return false;
@@ -39,15 +42,13 @@ template <Place place>
 [[nodiscard]] NETFLOOR_INLINE inline std::uint32_t valueAt(const std::uint8_t *data, std::uint32_t cursor,
                                                            std::uint32_t units) {
     std::uint32_t value = 0;
-    if constexpr (place.isPieces() && piecesAreOctets(place)) {
+    if constexpr (isOctetsInOrder(place)) {
         value = octetsAt<place.count>(data, cursor);
     } else if constexpr (place.isPieces()) {
         forEach<place.count>([&]<std::uint32_t i>() NETFLOOR_INLINE {
             constexpr Piece piece = place.pieces[i];
             value = joined(value, pieceAt<piece.low, piece.high>(data, cursor), piece.width());
         });
-    } else if constexpr (place.shape == Shape::octets && !place.isRun()) {
-        value = octetsAt<place.count>(data, cursor);
     } else if constexpr (place.shape == Shape::octets) {
         value = octetsAt(data, cursor, units);
     } else if constexpr (place.shape == Shape::octetsBackward) {
