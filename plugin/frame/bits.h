@@ -45,6 +45,11 @@ inline constexpr std::uint32_t bitsPerOctet = 8;
     return (bit - 1) % bitsPerOctet == 0;
 }
 
+// The octets from bit number `first` on, which lies on an octet border.
+[[nodiscard]] NETFLOOR_INLINE constexpr const std::uint8_t *octetsFrom(const std::uint8_t *data, std::uint32_t first) {
+    return data + (first - 1) / bitsPerOctet;
+}
+
 // Reads the bits `first` to `last` out of line: the form that need not be fast.
 [[nodiscard, gnu::cold, gnu::noinline]] constexpr std::uint32_t bitsAcross(const std::uint8_t *data,
                                                                            std::uint32_t first, std::uint32_t last) {
@@ -101,7 +106,7 @@ template <std::uint32_t low, std::uint32_t high>
     if (!onOctetBorder(first)) [[unlikely]] {
         return octetsAcross(data, first, count);
     }
-    const std::uint8_t *const from = data + (first - 1) / bitsPerOctet;
+    const std::uint8_t *const from = octetsFrom(data, first);
     std::uint32_t value = 0;
     for (std::uint32_t octet = 0; octet < count; ++octet) {
         value = value << bitsPerOctet | from[octet];
@@ -115,7 +120,7 @@ template <std::uint32_t count>
     if (!onOctetBorder(first)) [[unlikely]] {
         return octetsAcross(data, first, count);
     }
-    const std::uint8_t *const from = data + (first - 1) / bitsPerOctet;
+    const std::uint8_t *const from = octetsFrom(data, first);
     std::uint32_t value = 0;
     forEach<count>([&]<std::size_t octet>() NETFLOOR_INLINE { value = value << bitsPerOctet | from[octet]; });
     return value;
@@ -127,7 +132,7 @@ template <std::size_t count>
                                                                                   std::uint32_t first) {
     std::array<std::uint8_t, count> octets{};
     if (onOctetBorder(first)) [[likely]] {
-        std::memcpy(octets.data(), data + (first - 1) / bitsPerOctet, count);
+        std::memcpy(octets.data(), octetsFrom(data, first), count);
         return octets;
     }
     for (std::uint32_t octet = 0; octet < count; ++octet) {

@@ -53,7 +53,7 @@ NETFLOOR_INLINE inline void checkedRun(Reader<Pass> &reader) {
             reader.check();
             reader.unchecked = false;
             reader.outcome = Outcome::running;
-            reader.writer.startRun(reader.data + (reader.cursor - 1) / bitsPerOctet);
+            reader.writer.startRun(octetsFrom(reader.data, reader.cursor));
         }
         expectFields<first, last>(reader);
         production(reader);
