@@ -7,6 +7,8 @@
 #include <string_view>
 #include <vector>
 
+#include "netfloor-host/sink.h"
+
 namespace netfloor::cli {
 
 namespace {
