@@ -41,6 +41,7 @@ std::span<const Finding> FlagExplainer::explain(std::uint32_t flags, Host &host,
     }
     if (isPlain && findings_.back().kind == FindingKind::byDesign) {
         plainTcp_ = findings_.back();
+        plainTcp_->place = {}; // of this packet alone, and what is by design is told without it
     }
     return findings().subspan(before);
 }
