@@ -124,7 +124,7 @@ std::string tablesText(Host &host) {
         text += tableText(static_cast<RowKind>(kind));
     }
     text += views;
-    return text + valueNamesText(FieldTables(host.library()).fields());
+    return text + valueNamesText(host.fieldTables().fields());
 }
 
 std::string indexesText() {

@@ -5,8 +5,6 @@
 #include <set>
 #include <string_view>
 
-#include "netfloor-host/field_tables.h"
-
 namespace netfloor::cli {
 
 namespace {
@@ -16,8 +14,7 @@ constexpr std::uint32_t mostIds = 65536;
 
 } // namespace
 
-FieldNames::FieldNames(const PluginLibrary &library) : names_(1) {
-    const FieldTables tables(library);
+FieldNames::FieldNames(const FieldTables &tables) : names_(1) {
     // A display id stands for all fields of one name, and any of them may be the one with the key.
     std::set<std::string_view> keyNames;
     std::uint32_t lastId = 0;

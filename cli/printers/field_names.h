@@ -6,7 +6,7 @@
 #include <string>
 #include <vector>
 
-#include "netfloor-host/plugin_library.h"
+#include "netfloor-host/field_tables.h"
 
 namespace netfloor::cli {
 
@@ -17,8 +17,7 @@ struct DisplayName {
 
 class FieldNames {
 public:
-    // Throws PluginError when the plug-in does not give its tables.
-    explicit FieldNames(const PluginLibrary &library);
+    explicit FieldNames(const FieldTables &tables);
 
     // What an owner of a next layer says, whose id is 0, counts like a key field.
     [[nodiscard]] const DisplayName &find(std::uint32_t displayId) const {

@@ -16,7 +16,7 @@ namespace netfloor::cli {
 
 class JsonFields final : private Sink {
 public:
-    JsonFields(Host &host, Output &out) : host_(host), tables_(host.library()), out_(out) {}
+    JsonFields(Host &host, Output &out) : host_(host), tables_(host.fieldTables()), out_(out) {}
 
     // Objects with commas between them, also of the packets inside the packet; nothing without IP.
     void write(const PacketInput &packet);
@@ -42,7 +42,7 @@ private:
     void writeBits(std::span<const BitRange> ranges);
 
     Host &host_;
-    FieldTables tables_;
+    const FieldTables &tables_;
     Output &out_;
     std::span<const std::uint8_t> packet_; // of the current pass
     std::uint32_t offset_ = 0;             // of it in the outermost packet

@@ -43,7 +43,7 @@ bool isBareNumber(std::string_view text) {
 // also without a text, and data come octet by octet.
 class TextLine final : public Sink {
 public:
-    TextLine(Output &out, const PluginLibrary &library) : out_(out), names_(library) {}
+    TextLine(Output &out, const FieldTables &tables) : out_(out), names_(tables) {}
 
     void begin(Pass /*pass*/, std::span<const std::uint8_t> /*packet*/) override {
         isFirst_ = true;
@@ -109,7 +109,7 @@ class SummaryPrinter final : public Printer {
 public:
     SummaryPrinter(const Options &options, Output &out, Host &host) : Printer(options, out, host), width_(lineWidth()) {
         if (options.all) {
-            texts_.emplace(out, host.library());
+            texts_.emplace(out, host.fieldTables());
         } else {
             line_.emplace(out, host);
         }
