@@ -22,9 +22,13 @@ struct Grammar {
     template <const Field &field>
     static constexpr std::uint32_t keyRow = keyRowOf(field);
 
-    template <class Pass>
+    static constexpr auto &startForms = plugin::startForms;
+
+    [[nodiscard]] NETFLOOR_INLINE static Form likelyForm(const DecodeState &state) { return plugin::likelyForm(state); }
+
+    template <Form form, class Pass>
     NETFLOOR_INLINE static void packet(Reader<Pass> &reader) {
-        plugin::packet(reader);
+        plugin::packet<form>(reader);
     }
 };
 

@@ -7,5 +7,5 @@
 
 extern "C" NETFLOOR_EXPORT std::uint8_t NETFLOOR_CDECL vex_PreDecodeMV(PreDecodeContext *context) {
     using namespace netfloor::plugin;
-    return runPass<MvPass<Grammar>, Grammar>(*context) == Outcome::cutOff ? 0 : 1;
+    return runPass<MvPass<Grammar>, Grammar>(*context);
 }

@@ -7,5 +7,5 @@
 
 extern "C" NETFLOOR_EXPORT std::uint8_t NETFLOOR_CDECL vex_PreDecodeTO(PreDecodeContext *context) {
     using namespace netfloor::plugin;
-    return runPass<ToPass<Grammar>, Grammar>(*context) == Outcome::cutOff ? 0 : 1;
+    return runPass<ToPass<Grammar>, Grammar>(*context);
 }

@@ -7,10 +7,5 @@
 
 extern "C" NETFLOOR_EXPORT std::int32_t NETFLOOR_CDECL XTR_netfloor(XtrContext *context) {
     using namespace netfloor::plugin;
-    using Pass = XtrPass<Grammar>;
-    const std::optional<Outcome> outcome = runPass<Pass, Grammar>(*context);
-    if (!outcome) {
-        return Pass::keyFieldStatus;
-    }
-    return *outcome == Outcome::cutOff ? 0 : 1;
+    return runPass<XtrPass<Grammar>, Grammar>(*context);
 }

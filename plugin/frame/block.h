@@ -63,18 +63,7 @@ public:
         }
     }
 
-    // The block of that kind that is innermost, which a production out of line is to close.
-    [[nodiscard]] NETFLOOR_INLINE static LimitedBlock reopened(Reader<Pass> &reader, BlockName outer) {
-        return LimitedBlock(reader, outer, Reopened{});
-    }
-
-    // Leaves the block to a production out of line.
-    NETFLOOR_INLINE void release() { released_ = true; }
-
     NETFLOOR_INLINE ~LimitedBlock() {
-        if (released_) {
-            return;
-        }
         reader_.block = outer_;
         if (reader_.ended()) {
             return;
@@ -89,14 +78,9 @@ public:
     LimitedBlock &operator=(const LimitedBlock &) = delete;
 
 private:
-    struct Reopened {};
-    NETFLOOR_INLINE LimitedBlock(Reader<Pass> &reader, BlockName outer, Reopened)
-        : reader_(reader), outer_(outer), outerLive_(true) {}
-
     Reader<Pass> &reader_;
     BlockName outer_;
     bool outerLive_;
-    bool released_ = false;
 };
 
 // The blocks of a chain, in which each link stands inside the one before: they stay open until the chain is
@@ -105,17 +89,8 @@ private:
 template <class Pass>
 class [[nodiscard]] BlockChain {
 public:
-    NETFLOOR_INLINE explicit BlockChain(Reader<Pass> &reader) : BlockChain(reader, reader.block, 0) {}
-
-    // Goes on with a chain whose last so many blocks are open, for a production out of line that is to close them.
-    NETFLOOR_INLINE BlockChain(Reader<Pass> &reader, BlockName outer, std::uint32_t blocks)
-        : reader_(reader), outer_(outer), blocks_(blocks), outerRoom_(reader.writer.blockRoom()) {}
-
-    // Leaves the blocks to a production out of line, and gives their number.
-    NETFLOOR_INLINE std::uint32_t release() {
-        released_ = true;
-        return blocks_;
-    }
+    NETFLOOR_INLINE explicit BlockChain(Reader<Pass> &reader)
+        : reader_(reader), outer_(reader.block), outerRoom_(reader.writer.blockRoom()) {}
 
     // Opens the next block, inside the others.
     NETFLOOR_INLINE void open(BlockName name) {
@@ -139,9 +114,6 @@ public:
     // Closing a block touches neither cursor nor limit, so that it does not matter which blocks a limit stands
     // between: what the limits leave is skipped first, the innermost limit first.
     NETFLOOR_INLINE ~BlockChain() {
-        if (released_) {
-            return;
-        }
         for (; limits_ > 0 && !reader_.ended(); --limits_) {
             reader_.skipRest();
             reader_.closeLimit();
@@ -158,15 +130,10 @@ public:
 private:
     Reader<Pass> &reader_;
     BlockName outer_;
-    std::uint32_t blocks_;
     std::uint32_t outerRoom_;
+    std::uint32_t blocks_ = 0;
     std::uint32_t limits_ = 0;
-    bool released_ = false;
 };
-
-// Whether a production is part of a checked run where the pass has them. The other form of it is the one for packets
-// that are cut short, or that have something rare before it: it calls what is large out of line.
-enum class Form : std::uint8_t { inRun, slow };
 
 // Runs a production out of line, on a reader of its own: the caller's is not touched by the call, and so both
 // can stay in registers. What it calls by itself is inlined, so that its reader has no address. A reader that is not
@@ -192,10 +159,10 @@ NETFLOOR_INLINE inline void runOutOfLine(Reader<Pass> &reader) {
     reader.resumeAt(position);
 }
 
-// Runs a production in line in the one form, out of line in the other.
-template <Form form, auto production, class Pass>
-NETFLOOR_INLINE inline void runAs(Reader<Pass> &reader) {
-    if constexpr (form == Form::inRun) {
+// Runs a production in line or out of line.
+template <bool inLine, auto production, class Pass>
+NETFLOOR_INLINE inline void runInLineIf(Reader<Pass> &reader) {
+    if constexpr (inLine) {
         production(reader);
     } else {
         runOutOfLine<production>(reader);

@@ -17,7 +17,7 @@ namespace netfloor::plugin {
 
 // Makes room for one layer frame more and opens it. The first layer of a packet has the frame 0; a plug-in that
 // starts anywhere else takes the next one.
-[[nodiscard]] inline bool openLayerFrame(DecodeState &state) {
+[[nodiscard]] NETFLOOR_INLINE inline bool openLayerFrame(DecodeState &state) {
     const std::uint32_t wanted = state.layerIndex + 1;
     while (wanted >= state.layerCapacity) {
         const std::uint32_t capacity = state.layerCapacity * 2;
@@ -51,25 +51,48 @@ NETFLOOR_INLINE inline void clear(Variables &variables) {
     });
 }
 
-// Runs one pass over one layer. Nothing when the pass is refused before it starts.
-template <class Pass, class Grammar>
-NETFLOOR_INLINE inline std::optional<Outcome> runPass(typename Pass::Context &context) {
+// Runs one pass over one layer, in one form of the grammar.
+template <class Pass, class Grammar, auto form>
+[[gnu::noinline]] typename Pass::Result runForm(typename Pass::Context &context) {
     DecodeState &state = *context.decodeState;
     clear(Pass::variables);
     if (!Pass::enter(context)) {
-        return std::nullopt;
+        return Pass::resultOf(std::nullopt);
     }
     if (!openLayerFrame(state)) {
-        return Outcome::cutOff;
+        return Pass::resultOf(Outcome::cutOff);
     }
     Reader<Pass> reader(context);
-    Grammar::template packet<Pass>(reader);
+    Grammar::template packet<form>(reader);
     if (!reader.ended()) {
         reader.giveState();
         Pass::leave(context);
         context.bitsLeft = reader.left;
     }
-    return reader.outcome;
+    return Pass::resultOf(reader.outcome);
+}
+
+// Runs the chosen form of the grammar, one of those from number `first` on. Each is a function of its own: in one that
+// had them all, compilers would find fewer values that are constant.
+template <class Pass, class Grammar, std::size_t first = 0>
+NETFLOOR_INLINE inline typename Pass::Result runLikelyForm(typename Pass::Context &context, auto chosen) {
+    constexpr auto form = Grammar::startForms[first];
+    if constexpr (first + 1 < Grammar::startForms.size()) {
+        if (chosen != form) {
+            return runLikelyForm<Pass, Grammar, first + 1>(context, chosen);
+        }
+    }
+    return runForm<Pass, Grammar, form>(context);
+}
+
+// Runs one pass over one layer, and gives its result.
+template <class Pass, class Grammar>
+NETFLOOR_INLINE inline typename Pass::Result runPass(typename Pass::Context &context) {
+    if constexpr (!Pass::Writer::hasCheckedRuns) {
+        return runForm<Pass, Grammar, Grammar::startForms.front()>(context);
+    } else {
+        return runLikelyForm<Pass, Grammar>(context, Grammar::likelyForm(*context.decodeState));
+    }
 }
 
 } // namespace netfloor::plugin

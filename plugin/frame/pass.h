@@ -5,6 +5,7 @@
 
 #include <concepts>
 #include <cstdint>
+#include <optional>
 
 #include "frame/field.h"
 #include "frame/position.h"
@@ -55,6 +56,9 @@ concept DecodingPass = requires(typename Pass::Context &context, Flag flag, AnyR
 
     // Ends a run that was not cut off.
     { Pass::leave(context) };
+
+    // What the entry of the pass returns after a run, of which nothing is said where the host refused it.
+    { Pass::resultOf(std::optional<Outcome>{}) } -> std::same_as<typename Pass::Result>;
 
     // Gives control to the owner of the next layer, and says how the run goes on.
     { Pass::transfer(context) } -> std::same_as<Outcome>;

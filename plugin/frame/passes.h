@@ -8,6 +8,7 @@
 #include <array>
 #include <cstdint>
 #include <cstring>
+#include <optional>
 #include <type_traits>
 
 #include "frame/pass.h"
@@ -60,12 +61,18 @@ struct PreDecodePass {
         }
     }
 
-    static bool enter(PreDecodeContext &context) {
+    NETFLOOR_INLINE static bool enter(PreDecodeContext &context) {
         if constexpr (reportsFields) {
             openLayerInfo(context, context.decoderId);
         }
         savedDecoderId = context.decoderId;
         return true;
+    }
+
+    // 0 where the run was cut off. No host can refuse it.
+    using Result = std::uint8_t;
+    NETFLOOR_INLINE static Result resultOf(std::optional<Outcome> outcome) {
+        return outcome == Outcome::cutOff ? 0 : 1;
     }
 
     static void leave(PreDecodeContext &context) {
@@ -76,7 +83,7 @@ struct PreDecodePass {
 
     // Runs the owner of the next layer. A nested run of this pass leaves its own
     // decoder id; that is the one put back.
-    static Outcome transfer(PreDecodeContext &context) {
+    NETFLOOR_INLINE static Outcome transfer(PreDecodeContext &context) {
         if constexpr (reportsFields) {
             closeLayerInfo(context);
         }
@@ -179,7 +186,7 @@ struct XtrPass {
     static void giveVerdict(XtrContext &) {}
 
     // Sets the key fields up until the host says they are, once and for all. False when it refuses.
-    static bool enter(XtrContext &context) {
+    NETFLOOR_INLINE static bool enter(XtrContext &context) {
         if (keyFieldStatus == 0) {
             keyFieldStatus = hx_InitialiseOptXTR(Grammar::keyRows.data(),
                                                  static_cast<std::uint32_t>(Grammar::keyRows.size()), &presenceRow);
@@ -193,10 +200,19 @@ struct XtrPass {
         return true;
     }
 
+    // 0 where the run was cut off. Nothing: the host refused the key fields, and its answer is the result.
+    using Result = std::int32_t;
+    NETFLOOR_INLINE static Result resultOf(std::optional<Outcome> outcome) {
+        if (!outcome) {
+            return keyFieldStatus;
+        }
+        return *outcome == Outcome::cutOff ? 0 : 1;
+    }
+
     static void leave(XtrContext &) {}
 
     // The pass ends at a hand-off: the host goes on by itself.
-    static Outcome transfer(XtrContext &) { return Outcome::stopped; }
+    NETFLOOR_INLINE static Outcome transfer(XtrContext &) { return Outcome::stopped; }
 
     template <const Field &field, class Reader>
     NETFLOOR_INLINE static void output(Reader &reader, const std::uint8_t *data, std::uint32_t start,

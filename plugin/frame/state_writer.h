@@ -103,7 +103,7 @@ struct FieldRead {
     std::uint32_t cursor = 0;             // where it lies
     std::uint32_t units = 0;              // of a run of octets or nibbles
 
-    void writeElements(FieldRecord &record, const std::uint8_t *data) const {
+    NETFLOOR_INLINE void writeElements(FieldRecord &record, const std::uint8_t *data) const {
         field->writeElements(record, data, cursor, units);
     }
 };

@@ -6,6 +6,7 @@
 
 #include "frame/block.h"
 #include "frame/hand_off.h"
+#include "frame/inline.h"
 #include "frame/reader.h"
 #include "netfloor/records.h"
 
@@ -21,9 +22,11 @@ inline constexpr std::uint32_t serverPorts = 9000;
 // The port of control-plane signalling, as a source port preferred too. Its hand-off does not write the protocol.
 inline constexpr std::uint32_t signallingPort = 3452;
 
-[[nodiscard]] constexpr NextLayer chooseNextLayer(std::uint32_t source, std::uint32_t destination,
-                                                  std::uint32_t protocol) {
-    const auto byPort = [](std::uint32_t port) { return NextLayer{port, port, true, port != signallingPort}; };
+[[nodiscard]] NETFLOOR_INLINE constexpr NextLayer chooseNextLayer(std::uint32_t source, std::uint32_t destination,
+                                                                  std::uint32_t protocol) {
+    const auto byPort = [](std::uint32_t port) NETFLOOR_INLINE {
+        return NextLayer{port, port, true, port != signallingPort};
+    };
     if (source < wellKnownPorts || source == signallingPort) {
         return byPort(source);
     }

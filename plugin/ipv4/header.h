@@ -25,6 +25,7 @@
 #include "frame/field.h"
 #include "frame/field_list.h"
 #include "frame/field_step.h"
+#include "ip/form.h"
 #include "ipv4/options.h"
 #include "ipv4/service_and_fragment.h"
 #include "names/ip_protocols.h"
@@ -85,7 +86,7 @@ NETFLOOR_INLINE inline void afterHeader(Reader<Pass> &reader, std::int32_t areaO
 
 template <auto payload, class Pass>
 NETFLOOR_INLINE inline void afterHeaderWithOptions(Reader<Pass> &reader) {
-    afterHeader<Form::slow, payload>(reader, optionOctets(reader));
+    afterHeader<Form::outOfLine, payload>(reader, optionOctets(reader));
 }
 
 // Options go out of line with all that follows them, so that the run of a datagram without them goes on.
@@ -93,7 +94,7 @@ template <Form form, auto payload, class Pass>
 NETFLOOR_INLINE inline void afterTotalLength(Reader<Pass> &reader) {
     fieldsAfterTotalLength(reader);
     const std::int32_t areaOctets = optionOctets(reader);
-    if (form == Form::slow || areaOctets >= 1) {
+    if (form == Form::outOfLine || areaOctets >= 1) {
         return runOutOfLine<afterHeaderWithOptions<payload, Pass>>(reader);
     }
     afterHeader<form, payload>(reader, areaOctets);
@@ -115,11 +116,11 @@ NETFLOOR_INLINE inline void datagram(Reader<Pass> &reader) {
         return;
     }
     const LimitedBlock<Pass> extra{reader, "Extra", limit};
-    if constexpr (form == Form::slow) {
+    if constexpr (form == Form::outOfLine) {
         runOutOfLine<afterTotalLength<form, payload, Pass>>(reader);
     } else {
         checkedRun<identification, destinationAddress, afterTotalLength<form, payload, Pass>,
-                   afterTotalLength<Form::slow, payload, Pass>>(reader);
+                   afterTotalLength<Form::outOfLine, payload, Pass>>(reader);
     }
 }
 

@@ -97,7 +97,7 @@ template <Form form, class Pass>
 NETFLOOR_INLINE inline void body(Reader<Pass> &reader, BlockChain<Pass> &chain, std::uint32_t bitCount) {
     auto &variables = reader.variables();
     chain.openLimited("IPv6 Body", bitCount);
-    if constexpr (form == Form::inRun) {
+    if constexpr (form != Form::outOfLine) {
         expectFields<payloadLength, destinationNibbles>(reader);
         fieldsFromPayloadLength(reader);
     } else {

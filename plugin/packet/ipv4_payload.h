@@ -5,6 +5,7 @@
 #include "frame/block.h"
 #include "icmp/icmp.h"
 #include "icmp/icmpv6.h"
+#include "ip/form.h"
 #include "ip/unknown_data.h"
 #include "names/ip_protocols.h"
 #include "packet/tunnels.h"
@@ -31,8 +32,8 @@ NETFLOOR_INLINE inline void ipv4Payload(Reader<Pass> &reader) {
     case protocolIpInIp:
     case protocolMinimalEncapsulation: return runOutOfLine<tunnels<Pass>>(reader);
     case protocolGre: return runOutOfLine<gre::packet<Pass>>(reader);
-    case protocolTcp: return runOutOfLine<tcp::segment<Pass>>(reader);
-    case protocolUdp: return runAs<form, udp::datagram<Pass>>(reader);
+    case protocolTcp: return runInLineIf<form == Form::ipv4Tcp, tcp::segment<Pass>>(reader);
+    case protocolUdp: return runInLineIf<form == Form::ipv4Udp, udp::datagram<Pass>>(reader);
     case protocolIcmpv6: return runOutOfLine<icmpv6::message<Pass>>(reader);
     case protocolSctp: return runOutOfLine<sctp::packet<Pass>>(reader);
     default: return runOutOfLine<unknownData<Pass>>(reader);

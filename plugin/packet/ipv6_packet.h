@@ -8,6 +8,7 @@
 #include "frame/block.h"
 #include "frame/checked_run.h"
 #include "icmp/icmpv6.h"
+#include "ip/form.h"
 #include "ip/unknown_data.h"
 #include "ipv6/extension_headers.h"
 #include "ipv6/header.h"
@@ -26,7 +27,7 @@ NETFLOOR_INLINE inline void ipv6Payload(Reader<Pass> &reader, std::uint32_t prot
     case protocolIcmp:
     case protocolIcmpv6: return runOutOfLine<icmpv6::message<Pass>>(reader);
     case protocolTcp: return runOutOfLine<tcp::segment<Pass>>(reader);
-    case protocolUdp: return runAs<form, udp::datagram<Pass>>(reader);
+    case protocolUdp: return runInLineIf<form == Form::ipv6Udp, udp::datagram<Pass>>(reader);
     case protocolGre: return runOutOfLine<gre::packet<Pass>>(reader);
     case protocolSctp: return runOutOfLine<sctp::packet<Pass>>(reader);
     case protocolEsp: return runOutOfLine<ipv6::securityPayload<Pass>>(reader);
@@ -47,7 +48,7 @@ template <class Pass>
     checkedRun<ipv6::trafficClass, ipv6::payloadLengthAhead, ipv6::fieldsUpToPayloadLength<Pass>>(reader);
     const std::uint32_t bitCount = ipv6::bodyBits(reader);
     if (bitCount != 0) {
-        ipv6::body<Form::slow>(reader, chain, bitCount);
+        ipv6::body<Form::outOfLine>(reader, chain, bitCount);
     }
     return bitCount != 0;
 }
@@ -73,7 +74,7 @@ NETFLOOR_INLINE inline void moreLinks(Reader<Pass> &reader) {
     while (link(reader, chain, variables.ipProtocol) && reader.live && variables.payloadOctets >= 1) {
         chain.open("Choose Protocol");
         if (!isLink(variables.ipProtocol)) {
-            return ipv6Payload<Form::slow>(reader, variables.ipProtocol);
+            return ipv6Payload<Form::outOfLine>(reader, variables.ipProtocol);
         }
     }
 }
@@ -94,8 +95,8 @@ NETFLOOR_INLINE inline void afterFirstHeader(Reader<Pass> &reader, BlockChain<Pa
 template <class Pass>
 NETFLOOR_INLINE inline void fromBody(Reader<Pass> &reader) {
     BlockChain<Pass> chain{reader};
-    ipv6::body<Form::slow>(reader, chain, ipv6::bodyBits(reader));
-    afterFirstHeader<Form::slow>(reader, chain);
+    ipv6::body<Form::outOfLine>(reader, chain, ipv6::bodyBits(reader));
+    afterFirstHeader<Form::outOfLine>(reader, chain);
 }
 
 template <Form form, class Pass>
@@ -107,17 +108,17 @@ NETFLOOR_INLINE inline void fromFirstHeader(Reader<Pass> &reader) {
     if (bitCount == 0) {
         return;
     }
-    if (form == Form::slow || bitCount > reader.left) {
+    if (form == Form::outOfLine || bitCount > reader.left) {
         return runOutOfLine<fromBody<Pass>>(reader);
     }
     ipv6::body<form>(reader, chain, bitCount);
     afterFirstHeader<form>(reader, chain);
 }
 
-template <class Pass>
+template <Form form, class Pass>
 NETFLOOR_INLINE inline void ipv6Packet(Reader<Pass> &reader) {
-    checkedRun<ipv6::trafficClass, ipv6::payloadLengthAhead, fromFirstHeader<Form::inRun, Pass>,
-               fromFirstHeader<Form::slow, Pass>>(reader);
+    checkedRun<ipv6::trafficClass, ipv6::payloadLengthAhead, fromFirstHeader<form, Pass>,
+               fromFirstHeader<Form::outOfLine, Pass>>(reader);
 }
 
 } // namespace netfloor::plugin

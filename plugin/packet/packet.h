@@ -7,6 +7,7 @@
 #include "frame/checked_run.h"
 #include "frame/field_step.h"
 #include "icmp/message_type.h"
+#include "ip/form.h"
 #include "ip/variables.h"
 #include "ip/version.h"
 #include "ipv4/header.h"
@@ -36,16 +37,16 @@ NETFLOOR_INLINE inline void versionAndHeaders(Reader<Pass> &reader) {
     const Block<Pass> header{reader, "Ip Header"};
     read<version>(reader, &variables.ipVersion);
     if (variables.ipVersion == 4) {
-        ipv4::datagram<form, ipv4Payloads>(reader);
+        runInLineIf<ipv4Form(form) == form, ipv4::datagram<ipv4Form(form), ipv4Payloads, Pass>>(reader);
     } else if (variables.ipVersion == 6) {
-        runOutOfLine<ipv6Packet<Pass>>(reader);
+        runInLineIf<form == Form::ipv6Udp, ipv6Packet<ipv6Form(form), Pass>>(reader);
     }
 }
 
 // Reads one packet. After a version other than 4 and 6 nothing is read.
-template <class Pass>
+template <Form form, class Pass>
 NETFLOOR_INLINE inline void packet(Reader<Pass> &reader) {
-    checkedRun<version, ipv4::totalLength, versionAndHeaders<Form::inRun, Pass>, versionAndHeaders<Form::slow, Pass>>(
+    checkedRun<version, ipv4::totalLength, versionAndHeaders<form, Pass>, versionAndHeaders<Form::outOfLine, Pass>>(
         reader);
 }
 

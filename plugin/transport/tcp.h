@@ -62,7 +62,6 @@ inline constexpr Field urgentPointer            {408, "Urgent Pointer",         
 
 struct TcpVariables : OptionVariables {
     std::uint32_t tcpLengthShort; // 1 once a header was longer than the payload of its datagram
-    std::int32_t tcpHeaderOctets; // of a header whose rest of the options is read out of line
 };
 
 inline constexpr std::int32_t fixedHeaderOctets = 20;
@@ -70,7 +69,7 @@ inline constexpr std::int32_t fixedHeaderOctets = 20;
 // The words of the header before its limited block.
 inline constexpr std::uint32_t wordsBeforeLimit = 3;
 inline constexpr std::uint32_t bitsPerWord = 32;
-inline constexpr std::uint32_t fixedHeaderWords = 5;
+inline constexpr std::uint32_t bitsBeforeLimit = wordsBeforeLimit * bitsPerWord;
 
 inline constexpr BlockName segmentName{"Transmission Control Protocol"};
 
@@ -103,11 +102,8 @@ NETFLOOR_INLINE inline std::int32_t limitedPart(Reader<Pass> &reader) {
         return static_cast<std::int32_t>(words);
     }
     const auto headerOctets = static_cast<std::int32_t>(words * bitsPerWord / bitsPerOctet);
-    auto &variables = reader.variables();
-    variables.tcpOptions.octets = headerOctets - fixedHeaderOctets;
-    variables.tcpTurn = optionKinds.size();
-    variables.tcpRounds = 0;
-    runOutOfLine<restOfOptions<Pass>>(reader);
+    reader.variables().tcpOptions.octets = headerOctets - fixedHeaderOctets;
+    runOutOfLine<options<Pass>>(reader);
     return headerOctets;
 }
 
@@ -152,42 +148,28 @@ NETFLOOR_INLINE inline void fromDataOffset(Reader<Pass> &reader) {
     afterHeader(reader, limitedPart(reader));
 }
 
-// Goes on where the usual options ended, and closes the limited block.
-template <class Pass>
-NETFLOOR_INLINE inline void fromRestOfOptions(Reader<Pass> &reader) {
+// The same in a checked run, for a header with a usual list of options.
+template <const auto &kinds, class Pass>
+NETFLOOR_INLINE inline void fromDataOffsetInRun(Reader<Pass> &reader) {
+    constexpr std::uint32_t headerOctets = fixedHeaderOctets + octetsOfList<kinds>;
     {
-        const auto block = LimitedBlock<Pass>::reopened(reader, segmentName);
-        runOutOfLine<restOfOptions<Pass>>(reader);
-    }
-    afterHeader(reader, reader.variables().tcpHeaderOctets);
-}
-
-// The words of a header of which a checked run knows that it fits; 0 where there is none.
-template <class Pass>
-[[nodiscard]] NETFLOOR_INLINE inline std::uint32_t wordsInRun(const Reader<Pass> &reader) {
-    if (!reader.writer.isInRun()) {
-        return 0;
-    }
-    const auto words = valueAt<dataOffset.place>(reader.writer.octets(), reader.writer.bit(), dataOffset.place.count);
-    const bool fits = words >= fixedHeaderWords && (words - wordsBeforeLimit) * bitsPerWord <= reader.left;
-    return fits ? words : 0;
-}
-
-// The same as limitedPart and what follows it, in a checked run.
-template <class Pass>
-NETFLOOR_INLINE inline void fromDataOffsetInRun(Reader<Pass> &reader, std::uint32_t words) {
-    const auto headerOctets = static_cast<std::int32_t>(words * bitsPerWord / bitsPerOctet);
-    {
-        LimitedBlock<Pass> block{reader, limitedPartName, (words - wordsBeforeLimit) * bitsPerWord};
+        const LimitedBlock<Pass> block{reader, limitedPartName, headerOctets * bitsPerOctet - bitsBeforeLimit};
         expectFields<dataOffset, urgentPointer>(reader);
         fieldsFromDataOffset(reader);
-        if (!usualOptions(reader, headerOctets - fixedHeaderOctets)) {
-            reader.variables().tcpHeaderOctets = headerOctets;
-            block.release();
-            return runOutOfLine<fromRestOfOptions<Pass>>(reader);
-        }
+        listInRun<kinds>(reader);
     }
     afterHeader(reader, headerOctets);
+}
+
+// Whether a checked run that has come to the Data Offset can go on with such a header.
+template <const auto &kinds, class Pass>
+[[nodiscard]] NETFLOOR_INLINE inline bool hasList(const Reader<Pass> &reader) {
+    constexpr std::uint32_t headerBits = (fixedHeaderOctets + octetsOfList<kinds>)*bitsPerOctet;
+    const auto &writer = reader.writer;
+    return writer.isInRun() && reader.left >= headerBits - bitsBeforeLimit &&
+           valueAt<dataOffset.place>(writer.octets(), writer.bit(), dataOffset.place.count) ==
+               headerBits / bitsPerWord &&
+           isList<kinds>(writer.octets(), writer.bit() + fixedHeaderOctets * bitsPerOctet - bitsBeforeLimit);
 }
 
 template <class Pass>
@@ -195,8 +177,11 @@ NETFLOOR_INLINE inline void headerAndPayload(Reader<Pass> &reader) {
     const Block<Pass> header{reader, segmentName};
     fieldsUpToDataOffset(reader);
     if constexpr (Pass::Writer::hasCheckedRuns) {
-        if (const std::uint32_t words = wordsInRun(reader); words != 0) {
-            return fromDataOffsetInRun(reader, words);
+        if (hasList<timestampsAligned>(reader)) {
+            return fromDataOffsetInRun<timestampsAligned>(reader);
+        }
+        if (hasList<noOptions>(reader)) {
+            return fromDataOffsetInRun<noOptions>(reader);
         }
         runOutOfLine<fromDataOffset<Pass>>(reader);
     } else if (reader.live) {

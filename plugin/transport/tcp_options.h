@@ -74,16 +74,17 @@ inline constexpr std::int32_t timestampsOctets = 10;
 // The block that holds the options.
 inline constexpr BlockName limitedPartName{"INLINE BLOCK"};
 
-// A round opens its own block, and one for an option at a time.
-inline constexpr std::uint32_t blocksOfRound = 2;
-
 struct OptionVariables {
-    OptionArea tcpOptions;   // after the fixed header
-    std::uint32_t tcpTurn;   // in the round that is open; the number of kinds if none is
-    std::uint32_t tcpRounds; // that are open
+    OptionArea tcpOptions; // after the fixed header
 };
 
 // The options of fixed size.
+
+template <auto fields, class Pass>
+NETFLOOR_INLINE inline void fixedOption(Reader<Pass> &reader, OptionArea &area) {
+    const OptionBlock<Pass> option{reader, ""};
+    fields(reader, area);
+}
 
 template <class Pass>
 NETFLOOR_INLINE inline void maximumSegmentFields(Reader<Pass> &reader, OptionArea &area) {
@@ -130,53 +131,19 @@ NETFLOOR_INLINE inline void md5SignatureOption(Reader<Pass> &reader, OptionArea 
     readRun<md5Digest>(reader, static_cast<std::int32_t>(digestOctets));
 }
 
-// How options are read: any option, or in a checked run only those of fixed size whose length says so.
-enum class Options : std::uint8_t { any, usual };
-
-// Reads an option with the fields from `first` to `last`. False where it is not a usual one.
-template <Options which, const Field &first, const Field &last, auto fields, class Pass>
-[[nodiscard]] NETFLOOR_INLINE inline bool fixedOption(Reader<Pass> &reader, OptionArea &area) {
-    if constexpr (which == Options::any) {
-        const OptionBlock<Pass> option{reader, ""};
-        fields(reader, area);
-    } else {
-        constexpr std::uint32_t bitCount = bitsFromTo<typename Pass::Fields>(first, last);
-        if (reader.left < bitCount ||
-            octetAt(reader.writer.octets(), reader.writer.bit() + bitsPerOctet) != bitCount / bitsPerOctet) {
-            return false;
-        }
-        const LimitedBlock<Pass> option{reader, "", bitCount};
-        expectFields<first, last>(reader);
-        fields(reader, area);
-    }
-    return true;
-}
-
-template <Options which, const Field &type, class Pass>
-[[nodiscard]] NETFLOOR_INLINE inline bool octetOption(Reader<Pass> &reader, OptionArea &area) {
-    if constexpr (which == Options::usual) {
-        expectFields<type, type>(reader); // its octet was peeked
-    }
-    optionOfOneOctet<type>(reader, "", area);
-    return true;
-}
-
-// Reads the option at the cursor, which is of a known kind. False where it is not a usual one.
-template <Options which, class Pass>
-[[nodiscard]] NETFLOOR_INLINE inline bool option(Reader<Pass> &reader, std::uint8_t kind, OptionArea &area) {
+// Reads the option at the cursor, which is of a known kind.
+template <class Pass>
+NETFLOOR_INLINE inline void option(Reader<Pass> &reader, std::uint8_t kind, OptionArea &area) {
     switch (kind) {
-    case 0: return octetOption<which, endOfList>(reader, area);
-    case 1: return octetOption<which, noOperation>(reader, area);
-    case 2: return fixedOption<which, maximumSegment, maximumSize, maximumSegmentFields<Pass>>(reader, area);
-    case 3: return fixedOption<which, windowScale, shiftCount, windowScaleFields<Pass>>(reader, area);
-    case 4: return fixedOption<which, sackPermitted, permittedLength, sackPermittedFields<Pass>>(reader, area);
-    case 8: return fixedOption<which, timestamps, timestampEcho, timestampsFields<Pass>>(reader, area);
-    default: break;
+    case 0: return optionOfOneOctet<endOfList>(reader, "", area);
+    case 1: return optionOfOneOctet<noOperation>(reader, "", area);
+    case 2: return fixedOption<maximumSegmentFields<Pass>>(reader, area);
+    case 3: return fixedOption<windowScaleFields<Pass>>(reader, area);
+    case 4: return fixedOption<sackPermittedFields<Pass>>(reader, area);
+    case 5: return sackOption(reader, area);
+    case 8: return fixedOption<timestampsFields<Pass>>(reader, area);
+    default: return md5SignatureOption(reader, area);
     }
-    if constexpr (which == Options::any) {
-        kind == 5 ? sackOption(reader, area) : md5SignatureOption(reader, area);
-    }
-    return which == Options::any;
 }
 
 template <class Pass>
@@ -188,12 +155,11 @@ NETFLOOR_INLINE inline void padding(Reader<Pass> &reader, OptionArea &area) {
     }
 }
 
-// The turns of a round from `turn` on, in order. No kind reads an option once the area is used up. If no kind read an
-// option, the rest is padding, which ends the list. Gives the turn of an option that is not a usual one, to go on from
-// there; else the number of kinds.
-template <Options which, class Pass>
-[[nodiscard]] NETFLOOR_INLINE inline std::size_t optionRound(Reader<Pass> &reader, OptionArea &area, std::size_t turn) {
-    for (; reader.live && turn < optionKinds.size(); ++turn) {
+// The turns of a round, in order. No kind reads an option once the area is used up. If no kind read an option, the rest
+// is padding, which ends the list.
+template <class Pass>
+NETFLOOR_INLINE inline void optionRound(Reader<Pass> &reader, OptionArea &area) {
+    for (std::size_t turn = 0; reader.live && turn < optionKinds.size(); ++turn) {
         std::size_t taker = nextTaker<optionKinds>(reader, turn);
         if (area.octets < 1) {
             taker = optionKinds.size();
@@ -202,67 +168,110 @@ template <Options which, class Pass>
             reader.raise(Flag::expectation);
         }
         turn = taker;
-        if (turn < optionKinds.size() && !option<which>(reader, optionKinds[turn], area)) {
-            return turn;
+        if (turn < optionKinds.size()) {
+            option(reader, optionKinds[turn], area);
         }
     }
     if (!reader.live) {
-        return optionKinds.size();
+        return;
     }
     if (area.taken || area.octets < 1) {
         reader.raise(Flag::expectation);
-    } else if constexpr (which == Options::usual) {
-        return optionKinds.size() - 1; // no kind takes what is there
     } else {
         padding(reader, area);
     }
-    return optionKinds.size();
 }
 
 // The options lie in the block that the Data Offset limits, and use the live flag of that block. So an option that
 // reaches past the header ends the list, but not the segment. The payload starts at the Data Offset.
 template <class Pass>
-NETFLOOR_INLINE inline void restOfOptions(Reader<Pass> &reader) {
-    auto &variables = reader.variables();
-    OptionArea &area = variables.tcpOptions;
-    BlockChain<Pass> rounds{reader, limitedPartName, variables.tcpRounds};
-    std::size_t turn = variables.tcpTurn;
+NETFLOOR_INLINE inline void options(Reader<Pass> &reader) {
+    OptionArea &area = reader.variables().tcpOptions;
+    BlockChain<Pass> rounds{reader};
     do {
-        if (turn == optionKinds.size()) {
-            rounds.open("options");
-            area.taken = false;
-            reader.check();
-            turn = 0;
-        }
-        turn = optionRound<Options::any>(reader, area, turn);
+        rounds.open("options");
+        area.taken = false;
+        reader.check();
+        optionRound(reader, area);
     } while (reader.live && area.octets >= 1);
 }
 
-// Reads options in a checked run. False where it comes to one that is not usual: then restOfOptions goes on.
-template <class Pass>
-[[nodiscard]] NETFLOOR_INLINE inline bool usualOptions(Reader<Pass> &reader, std::int32_t octetCount) {
-    OptionArea area{octetCount};
-    std::size_t turn = optionKinds.size();
-    BlockChain<Pass> rounds{reader};
-    do {
-        if (reader.writer.blockRoom() < blocksOfRound) {
-            break;
-        }
+// Usual option lists: their kinds, in their order.
+inline constexpr std::array<std::uint8_t, 0> noOptions{};
+inline constexpr std::array<std::uint8_t, 3> timestampsAligned = {1, 1, 8};
+
+[[nodiscard]] constexpr std::uint32_t octetsOfKind(std::uint8_t kind) {
+    switch (kind) {
+    case 1: return 1;
+    case 8: return timestampsOctets;
+    default: return 0;
+    }
+}
+
+template <const auto &kinds>
+inline constexpr std::uint32_t octetsOfList = [] {
+    std::uint32_t octets = 0;
+    for (const std::uint8_t kind : kinds) {
+        octets += octetsOfKind(kind);
+    }
+    return octets;
+}();
+
+// Whether the options at an octet border are such a list, each of its proper length.
+template <const auto &kinds>
+[[nodiscard]] NETFLOOR_INLINE inline bool isList(const std::uint8_t *data, std::uint32_t first) {
+    bool is = true;
+    forEach<kinds.size()>([&]<std::size_t i>() NETFLOOR_INLINE {
+        is = is && octetAt(data, first) == kinds[i] &&
+             (octetsOfKind(kinds[i]) == 1 || octetAt(data, first + bitsPerOctet) == octetsOfKind(kinds[i]));
+        first += octetsOfKind(kinds[i]) * bitsPerOctet;
+    });
+    return is;
+}
+
+// Reads an option of such a list in a checked run.
+template <std::uint8_t kind, class Pass>
+NETFLOOR_INLINE inline void optionInRun(Reader<Pass> &reader, OptionArea &area) {
+    if constexpr (kind == 1) {
+        expectFields<noOperation, noOperation>(reader);
+        optionOfOneOctet<noOperation>(reader, "", area);
+    } else {
+        const LimitedBlock<Pass> option{reader, "", octetsOfKind(kind) * bitsPerOctet};
+        expectFields<timestamps, timestampEcho>(reader);
+        timestampsFields(reader, area);
+    }
+}
+
+// Reads such a list in a checked run, from the option `next` and the turn of a round on: the same as options(), but the
+// compiler knows which kind has which turn.
+template <const auto &kinds, std::size_t next, std::size_t turn, class Pass>
+NETFLOOR_INLINE inline void listInRun(Reader<Pass> &reader, BlockChain<Pass> &rounds, OptionArea &area) {
+    if constexpr (turn == 0) {
         rounds.open("options");
-        area.taken = false;
-        turn = optionRound<Options::usual>(reader, area, 0);
-        if (turn != optionKinds.size()) {
-            break;
+    }
+    constexpr std::size_t taker = [] {
+        const std::size_t wanted = next < kinds.size() ? turnOf<optionKinds>[kinds[next]] : optionKinds.size();
+        return wanted < turn ? optionKinds.size() : wanted;
+    }();
+    if constexpr (turn < optionKinds.size() && taker != turn) {
+        reader.raise(Flag::expectation);
+    }
+    if constexpr (taker < optionKinds.size()) {
+        optionInRun<kinds[next]>(reader, area);
+        return listInRun<kinds, next + 1, taker + 1>(reader, rounds, area);
+    } else {
+        reader.raise(Flag::expectation); // that the rest is padding
+        if constexpr (next < kinds.size()) {
+            listInRun<kinds, next, 0>(reader, rounds, area);
         }
-        if (area.octets < 1) {
-            return true;
-        }
-    } while (true);
-    auto &variables = reader.variables();
-    variables.tcpOptions = area;
-    variables.tcpTurn = static_cast<std::uint32_t>(turn);
-    variables.tcpRounds = rounds.release();
-    return false;
+    }
+}
+
+template <const auto &kinds, class Pass>
+NETFLOOR_INLINE inline void listInRun(Reader<Pass> &reader) {
+    OptionArea area{octetsOfList<kinds>};
+    BlockChain<Pass> rounds{reader};
+    listInRun<kinds, 0, 0>(reader, rounds, area);
 }
 
 // clang-format off
