@@ -59,6 +59,12 @@ void Output::escaped(std::string_view text) {
     }
 }
 
+void Output::untrustedWithRoom(std::string_view text, std::size_t blanksBefore) {
+    blanks(blanksBefore);
+    (void)room(usualBlanks + text.size());
+    untrusted(text);
+}
+
 void Output::grow(std::size_t octets) {
     const std::size_t size = mark();
     Room larger(2 * buffer_.size() + octets);

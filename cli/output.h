@@ -2,6 +2,7 @@
 // Results on standard output: buffered, coloured on a terminal, and quiet when the reader goes away.
 #pragma once
 
+#include <array>
 #include <charconv>
 #include <cstddef>
 #include <cstdint>
@@ -41,7 +42,7 @@ public:
         next_ = to + text.size();
         return *this;
     }
-    Output &operator<<(char character) {
+    [[gnu::always_inline]] Output &operator<<(char character) {
         char *const to = room(1);
         *to = character;
         next_ = to + 1;
@@ -71,10 +72,13 @@ public:
 
     // Text that came out of a packet, after blanks: what a terminal would not just print is shown as \x1b.
     void untrusted(std::string_view text, std::size_t blanksBefore = 0) {
-        char *const to = roomAfterBlanks(blanksBefore, text.size());
-        next_ = to;
-        if (copyPrintable(text, to)) {
-            next_ = to + text.size();
+        if (blanksBefore > usualBlanks || roomLeft() < usualBlanks + text.size()) {
+            return untrustedWithRoom(text, blanksBefore);
+        }
+        std::memset(next_, ' ', usualBlanks); // of a known size, which is one or two instructions
+        next_ += blanksBefore;
+        if (copyPrintable(text, next_)) {
+            next_ += text.size();
         } else {
             escaped(text);
         }
@@ -88,7 +92,7 @@ public:
     // Blanks up to `width`, then the text or the number.
     void rightAligned(std::string_view text, std::size_t width);
     void rightAligned(std::uint64_t number, std::size_t width);
-    void blanks(std::size_t count) { repeated(' ', count); }
+    void blanks(std::size_t count) { next_ = roomAfterBlanks(count, 0); }
     void repeated(char character, std::size_t count) {
         char *const to = room(count);
         std::memset(to, character, count);
@@ -148,47 +152,68 @@ private:
     static constexpr std::size_t firstRoom = flushOctets + std::size_t{64} * 1024;
     static constexpr std::size_t mostDigits = 24;
     static constexpr std::size_t usualBlanks = 32;
-    static constexpr std::size_t wordOctets = 8;
 
-    [[nodiscard]] static std::uint64_t loadWord(const char *text) {
-        std::uint64_t word = 0;
-        std::memcpy(&word, text, sizeof word);
-        return word;
-    }
+    // As many characters as a register of nearly all machines holds, and half of them.
+    using Characters [[gnu::vector_size(16)]] = unsigned char;
+    using SignedCharacters [[gnu::vector_size(16)]] = signed char;
+    using Word = std::uint64_t;
+
     // Has the top bit of an octet set if one of the characters is not printable: below a blank, DEL, or with its own
     // top bit set. A borrow or a carry goes only to octets above one for which the answer is known already.
-    [[nodiscard]] static constexpr std::uint64_t unprintableIn(std::uint64_t word) {
-        constexpr std::uint64_t ones = 0x0101010101010101;
+    [[nodiscard]] static constexpr Word unprintableIn(Word word) {
+        constexpr Word ones = 0x0101010101010101;
         return (word | (word - ones * 0x20) | (word + ones)) & ones * 0x80;
+    }
+    // The same. One more than a printable character is a positive number above a blank; one more than any other is not.
+    [[nodiscard]] static constexpr Characters unprintableIn(Characters characters) {
+        return Characters(SignedCharacters(characters + 1) <= ' ');
     }
     [[nodiscard]] static constexpr bool isPrintable(unsigned char octet) { return octet >= 0x20 && octet < 0x7f; }
 
-    // Copies a text and tells whether all of it is printable, in one go.
+    [[nodiscard]] static bool isAnySet(Word word) { return word != 0; }
+    [[nodiscard]] static bool isAnySet(Characters characters) {
+        std::array<Word, 2> words;
+        std::memcpy(words.data(), &characters, sizeof characters);
+        return (words[0] | words[1]) != 0;
+    }
+
+    // Copies a text of at least one piece and tells whether all of it is printable, in one go.
+    template <typename Piece>
+    [[nodiscard]] static bool copyPieces(std::string_view text, char *to) {
+        const auto copyPiece = [&](std::size_t at) {
+            Piece piece;
+            std::memcpy(&piece, text.data() + at, sizeof piece);
+            std::memcpy(to + at, &piece, sizeof piece);
+            return unprintableIn(piece);
+        };
+        const std::size_t last = text.size() - sizeof(Piece); // overlaps the piece before
+        Piece found = copyPiece(last);
+        for (std::size_t at = 0; at < last; at += sizeof(Piece)) {
+            found |= copyPiece(at);
+        }
+        return !isAnySet(found);
+    }
     [[nodiscard]] static bool copyPrintable(std::string_view text, char *to) {
-        if (text.size() < wordOctets) {
-            bool all = true;
-            for (std::size_t i = 0; i < text.size(); ++i) {
-                all &= isPrintable(static_cast<unsigned char>(text[i]));
-                to[i] = text[i];
-            }
-            return all;
+        if (text.size() >= sizeof(Characters)) {
+            return copyPieces<Characters>(text, to);
         }
-        const std::size_t last = text.size() - wordOctets; // overlaps the word before
-        std::uint64_t word = loadWord(text.data() + last);
-        std::uint64_t found = unprintableIn(word);
-        std::memcpy(to + last, &word, sizeof word);
-        for (std::size_t i = 0; i < last; i += wordOctets) {
-            word = loadWord(text.data() + i);
-            found |= unprintableIn(word);
-            std::memcpy(to + i, &word, sizeof word);
+        if (text.size() >= sizeof(Word)) {
+            return copyPieces<Word>(text, to);
         }
-        return found == 0;
+        bool all = true;
+        for (std::size_t i = 0; i < text.size(); ++i) {
+            all &= isPrintable(static_cast<unsigned char>(text[i]));
+            to[i] = text[i];
+        }
+        return all;
     }
     void escaped(std::string_view text);
+    void untrustedWithRoom(std::string_view text, std::size_t blanksBefore);
 
+    [[nodiscard]] std::size_t roomLeft() const { return static_cast<std::size_t>(limit_ - next_); }
     // The end of the text, with room for so many octets.
     [[nodiscard]] char *room(std::size_t octets) {
-        if (static_cast<std::size_t>(limit_ - next_) < octets) {
+        if (roomLeft() < octets) {
             grow(octets);
         }
         return next_;
@@ -199,7 +224,7 @@ private:
         if (blanks > usualBlanks) {
             std::memset(to, ' ', blanks);
         } else {
-            std::memset(to, ' ', usualBlanks); // of a known size, which is one or two instructions
+            std::memset(to, ' ', usualBlanks); // as above
         }
         return to + blanks;
     }

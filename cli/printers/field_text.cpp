@@ -8,31 +8,6 @@
 
 namespace netfloor::cli {
 
-namespace {
-
-// Whether the text is the number in hexadecimal, or ends with "(number)".
-bool showsNumber(std::string_view text, std::uint32_t number) {
-    std::array<char, 12> room;
-    const auto digitsOf = [&](int base) {
-        return std::string_view(room.data(), std::to_chars(room.data(), room.data() + room.size(), number, base).ptr);
-    };
-    if (text == digitsOf(16)) {
-        return true;
-    }
-    if (!text.ends_with(')')) {
-        return false;
-    }
-    text.remove_suffix(1);
-    const std::string_view digits = digitsOf(10);
-    return text.ends_with(digits) && text.substr(0, text.size() - digits.size()).ends_with('(');
-}
-
-bool isLetter(char character) {
-    return (character >= 'a' && character <= 'z') || (character >= 'A' && character <= 'Z');
-}
-
-} // namespace
-
 void writeBits(Output &out, std::span<const BitRange> ranges, std::uint32_t bitsBefore) {
     for (std::size_t i = 0; i < ranges.size();) {
         const std::uint32_t first = ranges[i].firstBit;
@@ -66,15 +41,20 @@ std::optional<OctetSpan> unshownOctets(const FieldView &field, std::uint32_t bit
     return isWhole ? std::optional(octets) : std::nullopt;
 }
 
-bool showsItsNumber(std::string_view text, std::uint32_t number) {
-    const auto equals = text.find('=');
-    if (equals == std::string_view::npos) {
+bool isOrNamesNumber(std::string_view shown, std::uint32_t number) {
+    std::array<char, 12> room;
+    const auto digitsOf = [&](int base) {
+        return std::string_view(room.data(), std::to_chars(room.data(), room.data() + room.size(), number, base).ptr);
+    };
+    if (shown == digitsOf(16)) {
         return true;
     }
-    // A text that starts with a digit is a number; a single letter is an octet of text.
-    const std::string_view shown = text.substr(equals + 1);
-    const bool isName = shown.empty() || (shown.size() > 1 && isLetter(shown.front()));
-    return !isName || showsNumber(shown, number);
+    if (!shown.ends_with(')')) {
+        return false;
+    }
+    shown.remove_suffix(1);
+    const std::string_view digits = digitsOf(10);
+    return shown.ends_with(digits) && shown.substr(0, shown.size() - digits.size()).ends_with('(');
 }
 
 } // namespace netfloor::cli

@@ -25,6 +25,10 @@ void writeOctetNumbers(Output &out, OctetSpan octets);
     return field.name.empty() ? "(without a name)" : field.name;
 }
 
+[[nodiscard]] inline bool isLetter(char character) {
+    return (character >= 'a' && character <= 'z') || (character >= 'A' && character <= 'Z');
+}
+
 [[nodiscard]] inline std::uint32_t bitCount(std::span<const BitRange> ranges) {
     std::uint32_t bits = 0;
     for (const BitRange &range : ranges) {
@@ -37,7 +41,19 @@ void writeOctetNumbers(Output &out, OctetSpan octets);
 // the zeros in front and may be cut. None for other fields.
 [[nodiscard]] std::optional<OctetSpan> unshownOctets(const FieldView &field, std::uint32_t bits, std::string_view text);
 
+// Whether what a text shows as a value is the number in hexadecimal, or ends with "(number)".
+[[nodiscard]] bool isOrNamesNumber(std::string_view shown, std::uint32_t number);
+
 // Whether the text tells the number. It does not where it has the name of the value, or nothing, in its place.
-[[nodiscard]] bool showsItsNumber(std::string_view text, std::uint32_t number);
+[[nodiscard]] inline bool showsItsNumber(std::string_view text, std::uint32_t number) {
+    const auto equals = text.find('=');
+    if (equals == std::string_view::npos) {
+        return true;
+    }
+    // A text that starts with a digit is a number; a single letter is an octet of text.
+    const std::string_view shown = text.substr(equals + 1);
+    const bool isName = shown.empty() || (shown.size() > 1 && isLetter(shown.front()));
+    return !isName || isOrNamesNumber(shown, number);
+}
 
 } // namespace netfloor::cli

@@ -59,7 +59,7 @@ private:
     // A field of octets that hold the packet that was opened.
     void writeOpened(const FieldView &field, OctetSpan octets);
     void writeField(const FieldView &field, std::uint32_t bits, std::string_view text);
-    void writeText(const FieldView &field, std::string_view text) {
+    [[gnu::always_inline]] void writeText(const FieldView &field, std::string_view text) {
         const std::string_view shown = withoutLeadingBlanks(text);
         depth_ = field.depth;
         out_.untrusted(shown.empty() ? nameOf(field) : shown, indent(field.depth));
@@ -87,8 +87,8 @@ private:
     std::uint32_t firstOctet_ = 0;
     std::optional<std::uint32_t> opened_;
     bool isOpenedShown_ = false;
-    std::string_view addressName_; // of the field before, if it is an IPv6 address
-    std::uint32_t addressBit_ = 0;
+    std::uint32_t addressBit_ = 0; // where the field before begins, if it is an IPv6 address
+    std::string_view addressName_; // of that one
 };
 
 } // namespace netfloor::cli
