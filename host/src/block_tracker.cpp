@@ -3,6 +3,7 @@
 
 #include <algorithm>
 #include <cstring>
+#include <utility>
 
 #include "netfloor-host/testing.h"
 
@@ -19,49 +20,13 @@ void BlockTracker::reset() {
     nextNumber_ = 0;
 }
 
-void BlockTracker::change(const DecodeState &state, std::uint32_t depth, NamedField &field, Sink &sink) {
-    const std::uint32_t before = depth_;
-    const std::uint32_t kept = levelsKept(state, depth);
-    depth_ = kept;
-    while (depth_ < depth) {
-        open(state.blockStarts.base[depth_ + 1], depthOf(state.limits));
-    }
-    if (depth == 0) {
-        return closeAll(sink);
-    }
-    if (levels_[depth - 1].hasField) {
-        if (std::strcmp(views_[depth - 1].name.data(), state.blockName) == 0) {
-            return kept == before ? void() : show(sink);
-        }
-        --depth_;
-        open(state.blockStarts.base[depth], depthOf(state.limits));
-    }
-    name(names_.blockName(field, state.blockName));
-    show(sink);
-}
-
-// How many of the known blocks are still open: see isKnown.
-std::uint32_t BlockTracker::levelsKept(const DecodeState &state, std::uint32_t depth) const {
-    std::uint32_t kept = std::min(depth, depth_);
-    for (std::uint32_t level = kept; level-- > 0;) {
-        const std::uint32_t firstBit = state.blockStarts.base[level + 1];
-        if (views_[level].firstBit != firstBit) {
-            kept = level;
-        } else if (firstBit < lastCursor_) {
-            break;
-        }
-    }
-    return kept;
-}
-
-void BlockTracker::open(std::uint32_t firstBit, std::uint32_t limitDepth) {
+[[gnu::always_inline]] inline void BlockTracker::open(std::uint32_t firstBit, std::uint32_t limitDepth) {
     if (depth_ == room_) {
         room_ *= 2;
         views_.resize(room_);
         levels_.resize(room_);
     }
-    Level &level = levels_[depth_];
-    level = {};
+    Level level;
     level.limitDepth = limitDepth;
     if (depth_ != 0) {
         const std::uint32_t parent = depth_ - 1;
@@ -77,8 +42,42 @@ void BlockTracker::open(std::uint32_t firstBit, std::uint32_t limitDepth) {
             level.shownParent = level.chainParent;
         }
     }
+    levels_[depth_] = level;
     views_[depth_] = {{}, nextNumber_++, firstBit, depthUnder(level.shownParent), false};
     ++depth_;
+}
+
+void BlockTracker::change(const DecodeState &state, std::uint32_t depth, NamedField &field, Sink &sink) {
+    if (depth == 0) {
+        depth_ = 0;
+        return closeAll(sink);
+    }
+    std::uint32_t kept = levelsKept(state, depth);
+    if (kept == depth && levels_[depth - 1].hasField) {
+        if (isOld(state.blockStarts.base[depth]) || std::strcmp(views_[depth - 1].name.data(), state.blockName) == 0) {
+            return std::exchange(depth_, depth) == depth ? void() : show(sink);
+        }
+        --kept; // another block, which begins at the same bit
+    }
+    for (depth_ = kept; depth_ < depth;) {
+        open(state.blockStarts.base[depth_ + 1], depthOf(state.limits));
+    }
+    name(names_.blockName(field, state.blockName));
+    show(sink);
+}
+
+// How many of the known blocks are still open.
+std::uint32_t BlockTracker::levelsKept(const DecodeState &state, std::uint32_t depth) const {
+    std::uint32_t kept = std::min(depth, depth_);
+    for (std::uint32_t level = kept; level-- > 0;) {
+        const std::uint32_t firstBit = state.blockStarts.base[level + 1];
+        if (views_[level].firstBit != firstBit) {
+            kept = level;
+        } else if (isOld(firstBit)) {
+            break;
+        }
+    }
+    return kept;
 }
 
 // A block that begins where the block shown around it begins is part of that block, and no later link.
@@ -88,7 +87,7 @@ bool BlockTracker::beginsWithItsParent(std::uint32_t level) const {
 }
 
 // Gives the innermost block its name. Where a block of that name is shown around it, it takes the place of that one.
-void BlockTracker::name(std::string_view name) {
+inline void BlockTracker::name(std::string_view name) {
     Level &innermost = levels_[depth_ - 1];
     BlockView &view = views_[depth_ - 1];
     innermost.hasField = true;
@@ -123,7 +122,7 @@ void BlockTracker::show(Sink &sink) {
     openInSink(target, sink);
 }
 
-void BlockTracker::openInSink(std::uint32_t level, Sink &sink) {
+inline void BlockTracker::openInSink(std::uint32_t level, Sink &sink) {
     if (shownDepth_ == shownRoom_) {
         shownRoom_ *= 2;
         shown_.resize(shownRoom_);

@@ -26,17 +26,18 @@ public:
     // Before a packet.
     void reset();
 
-    // Moves to the block of the field that is being reported. The sink gets the blocks that are closed and opened for
-    // that. The cost grows with the number of blocks that changed.
-    void moveTo(const DecodeState &state, NamedField &field, Sink &sink) {
+    // Moves to the block of the field that is being reported, and tells whether another one may be open now. The sink
+    // gets the blocks that are closed and opened for that. The cost grows with the number of blocks that changed.
+    [[nodiscard]] bool moveTo(const DecodeState &state, NamedField &field, Sink &sink) {
         const auto depth = static_cast<std::uint32_t>(state.blockStarts.top - state.blockStarts.base);
-        if (!isKnown(depth, *state.blockStarts.top)) {
+        const std::uint32_t firstBit = *state.blockStarts.top;
+        const bool isSame = depth == depth_ && firstBit == firstBit_ && isOld(firstBit);
+        if (!isSame) {
             change(state, depth, field, sink);
-        } else if (depth != depth_) {
-            depth_ = depth;
-            show(sink);
+            firstBit_ = firstBit;
         }
         lastCursor_ = state.cursor;
+        return !isSame;
     }
 
     // After the last field.
@@ -58,13 +59,9 @@ private:
         std::uint32_t chainParent = none;
     };
 
-    // Whether the block at this depth, which begins at this bit, is one in which a field was read before. What is
-    // opened after a field begins at or after the cursor of that call. So a block that begins before that cursor is the
-    // same as then, and so are all around it.
-    [[nodiscard]] bool isKnown(std::uint32_t depth, std::uint32_t firstBit) const {
-        return depth != 0 && depth <= depth_ && firstBit < lastCursor_ && views_[depth - 1].firstBit == firstBit &&
-               levels_[depth - 1].hasField;
-    }
+    // Whether a block that begins at this bit was open when the field before was reported, and all around it: what is
+    // opened after a field begins at or after the cursor of that call.
+    [[nodiscard]] bool isOld(std::uint32_t firstBit) const { return firstBit < lastCursor_; }
 
     void change(const DecodeState &state, std::uint32_t depth, NamedField &field, Sink &sink);
     [[nodiscard]] std::uint32_t levelsKept(const DecodeState &state, std::uint32_t depth) const;
@@ -99,6 +96,8 @@ private:
     std::uint32_t shownDepth_ = 0;
 
     std::vector<std::uint32_t> toOpen_;
+    // Of the field before: where its block begins, and the cursor.
+    std::uint32_t firstBit_ = 0;
     std::uint32_t lastCursor_ = 0;
     std::uint32_t nextNumber_ = 0;
 };

@@ -21,17 +21,17 @@ FieldNames::FieldNames(NetfloorGetTable getTable) : fields_(1) {
             continue;
         }
         fields_.resize(std::max<std::size_t>(fields_.size(), row->fieldId + 1));
-        fields_[row->fieldId] = {row->name, "", row->keyIndex != 0, true};
+        fields_[row->fieldId] = {row->name, "", 0, row->keyIndex != 0, true};
     }
 }
 
-const char *FieldNames::findBlockName(NamedField &field, std::string_view name) {
+void FieldNames::findBlockName(NamedField &field, std::string_view name) {
     auto found = blockNames_.find(name);
     if (found == blockNames_.end()) {
         found = blockNames_.emplace(name).first;
     }
     field.lastBlock = found->c_str();
-    return field.lastBlock;
+    field.lastBlockSize = static_cast<std::uint32_t>(found->size());
 }
 
 } // namespace netfloor

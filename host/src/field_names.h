@@ -19,6 +19,7 @@ namespace netfloor {
 struct alignas(32) NamedField {
     std::string_view name;
     const char *lastBlock = ""; // the name of the block in which the field was last read
+    std::uint32_t lastBlockSize = 0;
     bool isKey = false;
     bool isKnown = false;
 };
@@ -33,12 +34,15 @@ public:
 
     // The stored text that equals `name`. A field is usually read in the same block as before, so that one comparison
     // is enough.
-    [[nodiscard]] const char *blockName(NamedField &field, const char *name) {
-        return std::strcmp(field.lastBlock, name) == 0 ? field.lastBlock : findBlockName(field, name);
+    [[nodiscard]] std::string_view blockName(NamedField &field, const char *name) {
+        if (std::strcmp(field.lastBlock, name) != 0) {
+            findBlockName(field, name);
+        }
+        return {field.lastBlock, field.lastBlockSize};
     }
 
 private:
-    [[nodiscard]] const char *findBlockName(NamedField &field, std::string_view name);
+    void findBlockName(NamedField &field, std::string_view name);
 
     std::vector<NamedField> fields_; // by id; all unknown ids share the first
     std::set<std::string, std::less<>> blockNames_;

@@ -91,6 +91,9 @@ std::int32_t PacketRun::runPass(Pass pass, Sink &sink, const TestRunOptions *tes
     withBlocks_ = pass == Pass::md && sink.wantsBlocks();
     withBlockNames_ = sink.wantsBlockNames();
     wantedFields_ = withBlocks_ ? std::span<const std::uint8_t>() : sink.wantedFields();
+    view_.depth = 0;
+    view_.blocks = {};
+    view_.blockName = {};
     prepare(test);
     sink.begin(pass, packet_);
     const std::int32_t result = enter();
@@ -249,26 +252,27 @@ HandOff PacketRun::describeHandOff() const {
     view_.flags = state.flags;
     view_.cursor = state.cursor;
     if (withBlocks_) {
-        blocks_.moveTo(state, field, *sink_);
-        view_.depth = blocks_.shownDepth();
-        view_.blocks = blocks_.open();
-        view_.blockName = LazyText(view_.blocks.empty() ? std::string_view() : view_.blocks.back().name);
-    } else {
-        view_.depth = 0;
-        view_.blocks = {};
-        view_.blockName = withBlockNames_ ? LazyText(names_.blockName(field, state.blockName)) : LazyText();
+        if (blocks_.moveTo(state, field, *sink_)) {
+            view_.depth = blocks_.shownDepth();
+            view_.blocks = blocks_.open();
+            view_.blockName = LazyText(view_.blocks.empty() ? std::string_view() : view_.blocks.back().name);
+        }
+    } else if (withBlockNames_) {
+        view_.blockName = LazyText(names_.blockName(field, state.blockName));
     }
     sink_->field(view_);
 }
 
-void PacketRun::addField(std::uint32_t outputRangeCount, const BitRange *ranges, const char *display,
-                         const char *fieldName, std::uint32_t fieldId, std::uint32_t bitOrder) noexcept {
+std::int32_t PacketRun::addField(std::uint32_t outputRangeCount, const BitRange *ranges, const char *display,
+                                 std::uint32_t /*zero*/, const char *fieldName, std::uint32_t fieldId,
+                                 std::uint32_t /*otherZero*/, std::uint32_t bitOrder) noexcept {
     if (exception_) {
-        return;
+        return 0;
     }
     const bool isWanted = this->isWanted(fieldId);
     if (!isWanted && !cut_.isCut()) { // in a packet that is cut each field is compared between two runs
-        return fillFieldRecordHead();
+        fillFieldRecordHead();
+        return 0;
     }
     try {
         NamedField &field = names_.find(fieldId);
@@ -290,6 +294,7 @@ void PacketRun::addField(std::uint32_t outputRangeCount, const BitRange *ranges,
     } catch (...) {
         keepException();
     }
+    return 0;
 }
 
 void PacketRun::addDisplay(const char *display, std::uint32_t displayId) noexcept {

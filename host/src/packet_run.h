@@ -35,8 +35,9 @@ public:
 
     // The calls of the plug-in, which come through the stand-ins. No exception may pass through the plug-in, so the
     // first one is kept until the plug-in has returned. Nothing is reported after it.
-    void addField(std::uint32_t outputRangeCount, const BitRange *ranges, const char *display, const char *fieldName,
-                  std::uint32_t fieldId, std::uint32_t bitOrder) noexcept override;
+    std::int32_t addField(std::uint32_t outputRangeCount, const BitRange *ranges, const char *display,
+                          std::uint32_t zero, const char *fieldName, std::uint32_t fieldId, std::uint32_t otherZero,
+                          std::uint32_t bitOrder) noexcept override;
     void addDisplay(const char *display, std::uint32_t displayId) noexcept override;
     void growLayerInfo() noexcept override;
     std::int32_t preDecode(std::uint32_t mode) noexcept override;

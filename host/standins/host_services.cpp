@@ -30,12 +30,11 @@ NETFLOOR_STANDIN std::int32_t hs_CreateNewLayerInfo(PreDecodeContext *context) {
 }
 
 NETFLOOR_STANDIN std::int32_t hs_AddDecodedFieldsData(PreDecodeContext *context, std::uint32_t outputRangeCount,
-                                                      const BitRange *ranges, const char *display,
-                                                      std::uint32_t /*zero*/, const char *fieldName,
-                                                      std::uint32_t fieldId, std::uint32_t /*zero*/,
-                                                      std::uint32_t bitOrder) {
-    operationsOf(context).addField(outputRangeCount, ranges, display, fieldName, fieldId, bitOrder);
-    return 0;
+                                                      const BitRange *ranges, const char *display, std::uint32_t zero,
+                                                      const char *fieldName, std::uint32_t fieldId,
+                                                      std::uint32_t otherZero, std::uint32_t bitOrder) {
+    return operationsOf(context).addField(outputRangeCount, ranges, display, zero, fieldName, fieldId, otherZero,
+                                          bitOrder);
 }
 
 NETFLOOR_STANDIN std::int32_t hs_AddFieldsToDisplayData(PreDecodeContext *context, const char *display,

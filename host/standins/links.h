@@ -33,8 +33,10 @@ protected:
 // One run of the MD, TO or MV pass.
 class RunOperations {
 public:
-    virtual void addField(std::uint32_t outputRangeCount, const BitRange *ranges, const char *display,
-                          const char *fieldName, std::uint32_t fieldId, std::uint32_t bitOrder) noexcept = 0;
+    // With the arguments and the result of hs_AddDecodedFieldsData, so that it is passed on by a jump.
+    virtual std::int32_t addField(std::uint32_t outputRangeCount, const BitRange *ranges, const char *display,
+                                  std::uint32_t zero, const char *fieldName, std::uint32_t fieldId,
+                                  std::uint32_t otherZero, std::uint32_t bitOrder) noexcept = 0;
     virtual void addDisplay(const char *display, std::uint32_t displayId) noexcept = 0;
     virtual void growLayerInfo() noexcept = 0;
     virtual std::int32_t preDecode(std::uint32_t mode) noexcept = 0;

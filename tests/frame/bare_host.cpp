@@ -142,16 +142,18 @@ std::int32_t BareRun::take(std::uint32_t bits) {
     return 0;
 }
 
-void BareRun::addField(std::uint32_t outputRangeCount, const BitRange *ranges, const char *display,
-                       const char *fieldName, std::uint32_t fieldId, std::uint32_t bitOrder) noexcept {
+std::int32_t BareRun::addField(std::uint32_t outputRangeCount, const BitRange *ranges, const char *display,
+                               std::uint32_t zero, const char *fieldName, std::uint32_t fieldId,
+                               std::uint32_t otherZero, std::uint32_t bitOrder) noexcept {
     seen.push_back({fieldId, display, describe(state()), bitOrder});
     const FieldRecord &record = state().fieldRecord;
     if (outputRangeCount != record.outputRangeCount || ranges != record.ranges || fieldId != record.fieldId ||
-        fieldName != std::string_view(record.fieldName)) {
+        zero != 0 || otherZero != 0 || fieldName != std::string_view(record.fieldName)) {
         seen.back().state += " (the arguments are not those of the field record)";
     }
     context().fieldRecordCount = (context().fieldRecordCount + 1) % fieldRecordCount;
     afterCall();
+    return 0;
 }
 
 void BareRun::addDisplay(const char *display, std::uint32_t displayId) noexcept {

@@ -98,8 +98,9 @@ public:
 
     std::int32_t take(std::uint32_t bits); // as an owner does; returns 0
 
-    void addField(std::uint32_t outputRangeCount, const BitRange *ranges, const char *display, const char *fieldName,
-                  std::uint32_t fieldId, std::uint32_t bitOrder) noexcept override;
+    std::int32_t addField(std::uint32_t outputRangeCount, const BitRange *ranges, const char *display,
+                          std::uint32_t zero, const char *fieldName, std::uint32_t fieldId, std::uint32_t otherZero,
+                          std::uint32_t bitOrder) noexcept override;
     void addDisplay(const char *display, std::uint32_t displayId) noexcept override;
     void growLayerInfo() noexcept override;
     std::int32_t preDecode(std::uint32_t mode) noexcept override;

@@ -45,7 +45,7 @@ public:
     explicit LazyText(const char *zeroTerminated) : start_(zeroTerminated) {}
     explicit LazyText(std::string_view text) : start_(text.data()), size_(text.size()) {}
 
-    [[nodiscard]] std::string_view view() const {
+    [[nodiscard, gnu::always_inline]] std::string_view view() const {
         if (start_ == nullptr) {
             return {};
         }
