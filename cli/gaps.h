@@ -31,7 +31,7 @@ struct FieldExtent {
     OctetSpan octets;
     std::uint32_t bits = 0;
 };
-[[nodiscard]] inline FieldExtent extentOf(const FieldView &field) {
+[[nodiscard, gnu::always_inline]] inline FieldExtent extentOf(const FieldView &field) {
     if (field.ranges.empty()) {
         return {};
     }

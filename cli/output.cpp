@@ -41,6 +41,10 @@ void writeOut(std::string_view text) {
 
 } // namespace
 
+Output &Output::operator<<(std::string_view text) {
+    return append(text);
+}
+
 void Output::octet(std::uint8_t octet) {
     char *const to = room(2);
     to[0] = hexDigits[octet >> 4U];

@@ -34,13 +34,11 @@ public:
     // `eachPacket`: flush after each packet, for who waits in front of a live capture.
     Output(bool colour, bool eachPacket) : colour_(colour), eachPacket_(eachPacket) { grow(firstRoom); }
 
-    Output &operator<<(std::string_view text) {
-        char *const to = room(text.size());
-        if (!text.empty()) { // which may have no address, and memcpy wants one
-            std::memcpy(to, text.data(), text.size());
-        }
-        next_ = to + text.size();
-        return *this;
+    Output &operator<<(std::string_view text);
+    // A literal is copied in place, by an instruction or two.
+    template <std::size_t Size>
+    [[gnu::always_inline]] Output &operator<<(const char (&literal)[Size]) {
+        return append({literal, Size - 1});
     }
     [[gnu::always_inline]] Output &operator<<(char character) {
         char *const to = room(1);
@@ -227,6 +225,13 @@ private:
             std::memset(to, ' ', usualBlanks); // as above
         }
         return to + blanks;
+    }
+    [[gnu::always_inline]] Output &append(std::string_view text) {
+        char *const to = room(text.size());
+        if (!text.empty()) { // which may have no address, and memcpy wants one
+            std::memcpy(to, text.data(), text.size());
+        }
+        return advanceTo(to + text.size());
     }
     Output &advanceTo(char *end) {
         next_ = end;

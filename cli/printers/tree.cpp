@@ -61,14 +61,14 @@ void Tree::field(const FieldView &field) {
     if (bits != 0) {
         gaps_.cover(octets);
         if (opened_ && octets.end > *opened_) {
-            return writeOpened(field, octets);
+            return writeOpened(field);
         }
     }
     const std::string_view text = field.text.view();
     if (text.empty() && isReadAgain(field)) {
         return;
     }
-    if (!all_) {
+    if (bits == bitsPerOctet && !all_) {
         run_.begin(field, out_.mark());
     }
     writeField(field, bits, text);
@@ -110,8 +110,8 @@ void Tree::writePlace(OctetSpan octets) {
     writeOctetNumbers(out_, {firstOctet_ + octets.first, firstOctet_ + octets.end});
 }
 
-void Tree::writeOpened(const FieldView &field, OctetSpan octets) {
-    if (octets.first < *opened_) { // it begins with the header of the tunnel
+void Tree::writeOpened(const FieldView &field) {
+    if (extentOf(field).octets.first < *opened_) { // it begins with the header of the tunnel
         const std::string_view text = withoutLeadingBlanks(field.text.view());
         newLine(field.depth);
         out_.untrusted(text.empty() ? nameOf(field) : text);

@@ -57,7 +57,7 @@ private:
     void writeGaps(std::uint32_t octet, std::uint32_t depth);
     void writePlace(OctetSpan octets);
     // A field of octets that hold the packet that was opened.
-    void writeOpened(const FieldView &field, OctetSpan octets);
+    void writeOpened(const FieldView &field);
     void writeField(const FieldView &field, std::uint32_t bits, std::string_view text);
     [[gnu::always_inline]] void writeText(const FieldView &field, std::string_view text) {
         const std::string_view shown = withoutLeadingBlanks(text);

@@ -20,6 +20,43 @@ void BlockTracker::reset() {
     nextNumber_ = 0;
 }
 
+void BlockTracker::change(const DecodeState &state, std::uint32_t depth, NamedField &field, Sink &sink) {
+    if (depth == 0) {
+        depth_ = 0;
+        return closeAll(sink);
+    }
+    const std::uint32_t kept = levelsKept(state, depth);
+    const bool isThere = kept == depth && levels_[depth - 1].hasField;
+    const auto hasItsName = [&] { return std::strcmp(views_[depth - 1].name.data(), state.blockName) == 0; };
+    if (isThere && (isOld(state.blockStarts.base[depth]) || hasItsName())) {
+        if (std::exchange(depth_, depth) == depth) {
+            return;
+        }
+    } else {
+        // What is there has another name: another block, which begins at the same bit.
+        for (depth_ = isThere ? kept - 1 : kept; depth_ < depth;) {
+            open(state.blockStarts.base[depth_ + 1], depthOf(state.limits));
+        }
+        name(names_.blockName(field, state.blockName));
+    }
+    show(sink);
+}
+
+// How many of the known blocks are still open.
+std::uint32_t BlockTracker::levelsKept(const DecodeState &state, std::uint32_t depth) const {
+    std::uint32_t kept = std::min(depth, depth_);
+    for (std::uint32_t level = kept; level-- > 0;) {
+        const std::uint32_t firstBit = state.blockStarts.base[level + 1];
+        if (views_[level].firstBit != firstBit) {
+            kept = level;
+        } else if (isOld(firstBit)) {
+            break;
+        }
+    }
+    return kept;
+}
+
+// Inside its caller, as the others: one of two fields opens a block.
 [[gnu::always_inline]] inline void BlockTracker::open(std::uint32_t firstBit, std::uint32_t limitDepth) {
     if (depth_ == room_) {
         room_ *= 2;
@@ -45,39 +82,6 @@ void BlockTracker::reset() {
     levels_[depth_] = level;
     views_[depth_] = {{}, nextNumber_++, firstBit, depthUnder(level.shownParent), false};
     ++depth_;
-}
-
-void BlockTracker::change(const DecodeState &state, std::uint32_t depth, NamedField &field, Sink &sink) {
-    if (depth == 0) {
-        depth_ = 0;
-        return closeAll(sink);
-    }
-    std::uint32_t kept = levelsKept(state, depth);
-    if (kept == depth && levels_[depth - 1].hasField) {
-        if (isOld(state.blockStarts.base[depth]) || std::strcmp(views_[depth - 1].name.data(), state.blockName) == 0) {
-            return std::exchange(depth_, depth) == depth ? void() : show(sink);
-        }
-        --kept; // another block, which begins at the same bit
-    }
-    for (depth_ = kept; depth_ < depth;) {
-        open(state.blockStarts.base[depth_ + 1], depthOf(state.limits));
-    }
-    name(names_.blockName(field, state.blockName));
-    show(sink);
-}
-
-// How many of the known blocks are still open.
-std::uint32_t BlockTracker::levelsKept(const DecodeState &state, std::uint32_t depth) const {
-    std::uint32_t kept = std::min(depth, depth_);
-    for (std::uint32_t level = kept; level-- > 0;) {
-        const std::uint32_t firstBit = state.blockStarts.base[level + 1];
-        if (views_[level].firstBit != firstBit) {
-            kept = level;
-        } else if (isOld(firstBit)) {
-            break;
-        }
-    }
-    return kept;
 }
 
 // A block that begins where the block shown around it begins is part of that block, and no later link.
@@ -106,7 +110,7 @@ inline void BlockTracker::name(std::string_view name) {
 }
 
 // Opens the innermost block in the sink, and the blocks around it that are not open there.
-void BlockTracker::show(Sink &sink) {
+[[gnu::always_inline]] inline void BlockTracker::show(Sink &sink) {
     const std::uint32_t target = isShown(depth_ - 1) ? depth_ - 1 : levels_[depth_ - 1].shownParent;
     if (target == none || isOpenInSink(target)) {
         return closeDownTo(depthUnder(target), sink);
