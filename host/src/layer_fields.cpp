@@ -2,19 +2,25 @@
 #include "netfloor-host/layer_fields.h"
 
 #include <algorithm>
+#include <map>
 
 namespace netfloor {
 
 LayerFieldMap::LayerFieldMap(std::span<const FieldDescription> fields) : entries_(1) {
+    std::multimap<std::string_view, const FieldDescription *> byName;
+    for (const FieldDescription &field : fields) {
+        byName.emplace(field.name, &field);
+    }
     for (const LayerFieldSource &row : layerFieldSources()) {
-        const auto fits = [&row](const FieldDescription &field) { return row.field.fits(field); };
-        const auto found = std::ranges::find_if(fields, fits);
-        if (found == fields.end() || std::any_of(found + 1, fields.end(), fits)) {
+        const auto fits = [&row](const auto &named) { return row.field.fits(*named.second); };
+        const auto [first, last] = byName.equal_range(row.field.name);
+        const auto fitting = std::find_if(first, last, fits);
+        if (std::count_if(first, last, fits) != 1) {
             mismatches_.push_back(std::string(row.name) + ": '" + std::string(row.field.name) + "' is " +
-                                  (found == fields.end() ? "no field" : "the name of several fields") +
-                                  " of the plug-in");
+                                  (fitting == last ? "no field" : "the name of several fields") + " of the plug-in");
             continue;
         }
+        const FieldDescription *const found = fitting->second;
         if (found->id >= entries_.size()) {
             entries_.resize(found->id + 1);
         }
