@@ -28,6 +28,7 @@ set(CPACK_COMPONENT_DEV_DESCRIPTION "headers and libraries for programs that use
 
 set(CPACK_DEBIAN_COMMAND_PACKAGE_NAME netfloor)
 set(CPACK_DEBIAN_COMMAND_PACKAGE_SECTION net)
+set(CPACK_DEBIAN_COMMAND_PACKAGE_DEPENDS libsqlite3-0) # for `export`, which loads it
 set(CPACK_DEBIAN_COMMAND_PACKAGE_RECOMMENDS libpcap0.8) # for --filter
 set(CPACK_COMPONENT_COMMAND_DEPENDS runtime)
 set(CPACK_COMPONENT_COMMAND_DESCRIPTION "command that shows the packets of a capture file")
