@@ -145,6 +145,9 @@ std::span<const PacketSet> worstPackets() {
         {"8,190 extension headers",
          {ipv6({.nextHeader = 60, .payload = repeated(hex("3c 00 01 04 00*4"), 8190)})},
          false},
+        {"16,375 chunks of four fields",
+         {ipv4({.protocol = sctpNumber, .payload = hex("0b 59 0b 59 00*8") + repeated(hex("06 00 00 04"), 16375)})},
+         false},
         {"65,515 octets of unknown data", {ipv4({.protocol = 253, .payload = Octets(65515, 0x61)})}, false},
     };
     return sets;
