@@ -1,10 +1,11 @@
 #!/bin/bash
 # SPDX-License-Identifier: MIT
-# Changes the plug-in in some two thousand places, one at a time, and counts the changes that the known answers notice.
-# All changes are compiled into one plug-in, and one is chosen at run time. Names each that is not noticed, but those of
-# which tests/mutation/explained.txt says why. Fails where they are too many.
+# Changes the plug-in in some two thousand places, one at a time, and counts the changes that are noticed: by the known
+# answers, else by the tests of the frame and of the protocol. Names each that is not noticed, but those of which
+# tests/mutation/explained.txt says why. Fails where they are too many.
+# All changes are compiled into one plug-in, and one is chosen at run time.
 #
-#   scripts/mutants.sh [EVERY [PACKETS]]    each EVERY-th change, 1, with the answers of so many packets, 40000
+#   scripts/mutants.sh [EVERY [PACKETS]]    each EVERY-th change, 1, with the answers of so many packets, 10000
 set -euo pipefail
 cd "$(dirname "$0")/.."
 build=${NETFLOOR_BUILD:-build}
@@ -14,7 +15,7 @@ compile=(clang++ -std=c++20 -O0 -w -fPIC -fno-exceptions -fno-rtti -fno-threadsa
     -DNETFLOOR_SANITIZED "-I$work/plugin" -Iinclude -Itests/mutation -c)
 sources=$(cat plugin/*/*.h plugin/*/*.cpp include/netfloor/*.h tests/mutation/{rewrite.py,mutant.h} | sha256sum)
 
-ninja -C "$build" netfloor netfloor_mutants run_mutants | sed '/no work to do/d'
+ninja -C "$build" netfloor netfloor_mutants run_mutants test_{frame,ipv4,ipv6,icmp,sctp,transport,tunnels} | sed '/no work to do/d'
 if [ "$(cat $work/sources 2>/dev/null)" != "$sources" ]; then
     rm -rf $work
     mkdir -p $work
@@ -24,29 +25,35 @@ if [ "$(cat $work/sources 2>/dev/null)" != "$sources" ]; then
     clang -shared -Wl,--version-script=plugin/exports.map -o $work/libnetfloor.so $work/*.o \
         -L"$build/tests/mutation" -lnetfloor_mutants -L"$build" -lhs_HostServices -lhd_HostDispatch -lhx_KeyOptions -Wl,-rpath,"$PWD/$build/tests/mutation:$PWD/$build"
     objcopy --dump-section mutants=$work/present $work/libnetfloor.so
+    echo "$sources" >$work/sources
+fi
+# With the changed readers of bits inside; the others load the changed plug-in.
+if [ ! $work/test_bits -nt tests/bits/bits_test.cpp ]; then
     clang++ -std=c++20 -O1 -w -DNETFLOOR_SANITIZED -fconstexpr-steps=1000000000 -fbracket-depth=1024 "-I$work/plugin" -Iinclude \
         -Itests/mutation -Itests tests/bits/bits_test.cpp -o $work/test_bits -lgtest_main -lgtest \
         -L"$build/tests/mutation" -lnetfloor_mutants -Wl,-rpath,"$PWD/$build/tests/mutation"
-    echo "$sources" >$work/sources
 fi
 
+export NETFLOOR_TEST_PLUGIN=$PWD/$work/libnetfloor.so
+unchanged=$(tests/mutation/ask_tests.sh "$build" -1 frame/bits.h)
+[ -z "$unchanged" ] || { echo "without a change, a test fails: $unchanged" && exit 2; }
+
 "$build/tests/mutation/run_mutants" $work/libnetfloor.so fuzz/compare/digests.txt $work/plugin/mutants.txt $work/present \
-    "${1:-1}" "${2:-40000}" >$work/report
-# What the answers do not notice in the readers of bits, the test of these may.
-awk -F'\t' '/^(not noticed|never run)/ && $3 ~ /^frame\/(bits|field_record|bit_order)\.h/ { print $2 }' $work/report |
-    xargs -I{} sh -c "NETFLOOR_MUTANT={} timeout 60 $work/test_bits >$work/log 2>&1 || echo {}" >$work/noticed
+    "${1:-1}" "${2:-10000}" >$work/report
+awk -F'\t' '/^(not noticed|never run)/ { sub(/:.*/, "", $3); print $2, $3 }' $work/report |
+    xargs -r -P 2 -L 1 tests/mutation/ask_tests.sh "$build" >$work/noticed
 
 # Of a mutant the number changes with the code: its file, its change and its text say which it is.
 awk -F'\t' -v least=$least '
-    FILENAME ~ /noticed$/ { by_bits[$1] = 1; next }
+    FILENAME ~ /noticed$/ { tests[$1] = 1; next }
     FILENAME ~ /explained.txt$/ { if ($0 !~ /^#/) explained[$1 "\t" $2 "\t" $3] = 1; next }
     NF == 1 { split($0, words, " "); all = words[1]; print; next }
-    ($2 in by_bits) { bits++; next }
+    ($2 in tests) { by_tests++; next }
     { place = $3; sub(/:[0-9]+$/, "", place) }
     ((place "\t" $4 "\t" $5) in explained) { known++; next }
     { open++; print }
     END {
         share = 100 * (all - open) / all
-        printf "%d more noticed by tests/bits, %d explained, %d open: %.1f %% noticed or explained, %d wanted\n", bits, known, open, share, least
+        printf "%d more noticed by tests, %d explained, %d open: %.1f %% noticed or explained, %d wanted\n", by_tests, known, open, share, least
         exit share < least
     }' $work/noticed tests/mutation/explained.txt $work/report

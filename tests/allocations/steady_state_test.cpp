@@ -60,7 +60,7 @@ public:
 
 TEST(SteadyState, allocatesNothing) {
     const std::vector<Octets> packets = packetsOfAllFields();
-    Host host(PluginLibrary::open(NETFLOOR_PLUGIN));
+    Host host(PluginLibrary::open(pluginPath()));
     Counter sink;
     for (const Pass pass : {Pass::md, Pass::to, Pass::mv, Pass::xtr}) {
         const auto runPackets = [&] {
@@ -84,7 +84,7 @@ TEST(SteadyState, allocatesNothing) {
 
 TEST(SteadyState, ofLayersAllocatesNothing) {
     const std::vector<Octets> packets = packetsOfAllFields();
-    Host host(PluginLibrary::open(NETFLOOR_PLUGIN));
+    Host host(PluginLibrary::open(pluginPath()));
     LayerView view(host);
     const auto readPackets = [&] {
         const std::size_t before = allocations;

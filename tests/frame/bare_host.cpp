@@ -6,6 +6,8 @@
 #include <sstream>
 #include <utility>
 
+#include "support/runs.h"
+
 namespace netfloor::test {
 namespace {
 
@@ -25,7 +27,7 @@ StateOptions guarded(StateOptions options, const GuardedOctets &working) {
 } // namespace
 
 BarePlugin::BarePlugin(std::vector<std::int32_t> results, std::uint16_t presenceRow)
-    : library(PluginLibrary::openCopy(NETFLOOR_PLUGIN)), results_(std::move(results)), presenceRow_(presenceRow) {}
+    : library(PluginLibrary::openCopy(pluginPath())), results_(std::move(results)), presenceRow_(presenceRow) {}
 
 // Fills the table whatever the result is. Only the low octet of the mask counts.
 std::int32_t BarePlugin::initialise(KeyFieldRow *table, std::uint32_t count, std::uint16_t *presenceRow) noexcept {

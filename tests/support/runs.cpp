@@ -2,6 +2,7 @@
 #include "support/runs.h"
 
 #include <algorithm>
+#include <cstdlib>
 #include <optional>
 #include <sstream>
 
@@ -180,13 +181,18 @@ bool plainEnd(const Report &report) {
 
 } // namespace
 
+const char *pluginPath() {
+    const char *const other = std::getenv("NETFLOOR_TEST_PLUGIN");
+    return other != nullptr ? other : NETFLOOR_PLUGIN;
+}
+
 Host &sharedHost() {
-    static Host host(PluginLibrary::open(NETFLOOR_PLUGIN));
+    static Host host(PluginLibrary::open(pluginPath()));
     return host;
 }
 
 Host freshHost() {
-    return Host(PluginLibrary::openCopy(NETFLOOR_PLUGIN));
+    return Host(PluginLibrary::openCopy(pluginPath()));
 }
 
 Report runPass(Pass pass, std::span<const std::uint8_t> packet, const TestRunOptions &options, Host &host) {

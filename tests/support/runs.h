@@ -34,6 +34,9 @@
 
 namespace netfloor::test {
 
+// The plug-in under test: the one of this build, or the one that the variable NETFLOOR_TEST_PLUGIN names.
+[[nodiscard]] const char *pluginPath();
+
 // The plug-in under test, loaded once, with the owners that come with the host: they take all as data.
 [[nodiscard]] Host &sharedHost();
 

@@ -6,6 +6,7 @@
 #include <gtest/gtest.h>
 
 #include "netfloor-host/field_tables.h"
+#include "support/runs.h"
 #include "tables/catalogue.h"
 
 namespace netfloor::test {
@@ -24,7 +25,7 @@ std::string listOfFields() {
 }
 
 TEST(NewOutput, isOneFileOverTheCatalogue) {
-    const FieldTables published(PluginLibrary::open(NETFLOOR_PLUGIN));
+    const FieldTables published(PluginLibrary::open(pluginPath()));
     std::string expected;
     for (const FieldDescription &field : published.fields()) {
         expected += line(field.id, field.shortName, field.format);

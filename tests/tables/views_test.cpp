@@ -16,7 +16,7 @@ namespace netfloor::test {
 namespace {
 
 const FieldTables &tables() {
-    static const FieldTables all(PluginLibrary::open(NETFLOOR_PLUGIN));
+    static const FieldTables all(PluginLibrary::open(pluginPath()));
     return all;
 }
 
