@@ -1,0 +1,139 @@
+// SPDX-License-Identifier: MIT
+// MV and XTR put off what they write. Wherever the host looks it sees what MD, which writes at once, shows there.
+#include <algorithm>
+#include <cstddef>
+#include <string>
+#include <vector>
+
+#include <gtest/gtest.h>
+
+#include "frame/bare_host.h"
+#include "frame/example.h"
+
+namespace netfloor::test {
+namespace {
+
+constexpr std::uint32_t sentinel = 0xdeadbeef;
+
+// Room on the two stacks. There is more, up to an element that must not be written.
+struct Room {
+    std::uint32_t blocks = 60;
+    std::uint32_t limits = 30;
+};
+
+// A run, and all that the host can see where storage grows, at each hand-off and at the end.
+class Looks {
+public:
+    Looks(Pass pass, const Octets &packet, const Room &room) : run_(packet, options(room)) {
+        run_.xtr.byteAreaOffset = offsetof(KeyRoom, addresses);
+        run_.xtr.byteAreaSize = sizeof run_.keys.addresses;
+        run_.nextLayer = [this] {
+            look("hand-off");
+            refill(run_.state()); // another layer uses the same elements
+            return run_.take(std::min(run_.state().bitsLeft, 32u));
+        };
+        run_.enter(pass);
+        look(run_.state().layerHandedOff == 1 && pass == Pass::xtr ? "hand-off" : "end");
+    }
+
+    std::vector<std::string> seen;
+
+private:
+    StateOptions options(const Room &room) {
+        StateOptions options;
+        options.blockCapacity = room.blocks + 1;
+        options.limitCapacity = room.limits + 1;
+        options.prepare = [this](DecodeState &state) {
+            for (BitStack *const stack : {&state.blockStarts, &state.limits}) {
+                stack->base[--stack->capacity] = sentinel;
+            }
+            refill(state);
+        };
+        options.allowGrowth = [this](std::size_t octets) {
+            look("growth to " + std::to_string(octets));
+            grown_ = true;
+            return true;
+        };
+        return options;
+    }
+
+    static void refill(DecodeState &state) {
+        std::for_each_n(state.fieldRecord.ranges, state.fieldRecord.rangeCapacity,
+                        [](BitRange &range) { range.flagWord = 90; });
+        state.fieldRecord.rangeCount = 0;
+    }
+
+    void look(const std::string &when) {
+        const DecodeState &state = run_.state();
+        std::string text = when + ": " + describe(state);
+        for (const BitStack *const stack : {&state.blockStarts, &state.limits}) {
+            const bool kept = grown_ || stack->base[stack->capacity] == sentinel;
+            text += " | " + (depthOf(*stack) < stack->capacity ? stackText(*stack) : "full") + " of " +
+                    std::to_string(stack->count) + (kept ? "" : ", written past its end");
+        }
+        seen.push_back(text);
+    }
+
+    bool grown_ = false;
+    BareRun run_;
+};
+
+void compare(const Octets &packet, const Room &room = {}) {
+    const Looks md(Pass::md, packet, room);
+    const Looks mv(Pass::mv, packet, room);
+    const Looks xtr(Pass::xtr, packet, room);
+    const auto isStop = [](const std::string &text) { return text.starts_with("hand-off") || text.starts_with("end"); };
+    const auto stop = std::ranges::find_if(md.seen, isStop);
+    EXPECT_EQ(mv.seen, md.seen) << "MV over " << hexText(packet);
+    EXPECT_EQ(xtr.seen, std::vector<std::string>(md.seen.begin(), stop + 1)) << "XTR over " << hexText(packet);
+}
+
+Octets tcp(const Octets &options) {
+    return ipv4({.protocol = 6,
+                 .payload = hex("0035 9c40 01020304 05060708") +
+                            Octets{static_cast<std::uint8_t>((5 + options.size() / 4) << 4)} +
+                            hex("12 7210 beef 0007") + options + hex("61*8")});
+}
+
+// Any of them comes after a layer that has changed the elements.
+std::vector<Octets> packetsAfterAnOwner() {
+    std::vector<Octets> packets;
+    for (const char *const chunk : {
+             "04 07 000c 0002 0008 01020304", // information of an unknown type, of which only the type is peeked
+             "05 07 000c 0001 0008 01020304",
+             "03 07 001c 00000001 00010000 0001 0001 0002 0003 00000005",
+             "02 07 0028 00000001 00010000 0002 0003 00000004 0006 0014 20010db8 00*11 01",
+             "06 ff 000c 0001 0008 0007 0000",
+             "0a 07 0008 01020304",
+         }) {
+        packets.push_back(
+            ipv4({.protocol = 132,
+                  .payload = hex("0035 9c40 00*8  00 03 0014 00000001 0002 0003 0000000a 61626364") + hex(chunk)}));
+    }
+    return packets;
+}
+
+TEST(DeferredWriter, showsWhatMdShowsAfterAnOwner) {
+    for (const Octets &packet : packetsAfterAnOwner()) {
+        compare(packet);
+        compare(shortened(packet, packet.size() - 2));
+    }
+}
+
+// A run asks for its room once. It takes no more than that, and all that it has where it needs it.
+TEST(DeferredWriter, keepsToTheRoomOnTheStacks) {
+    for (const Octets &packet :
+         {tcp(hex("01*20")), tcp(hex("01 00*3 01 00*3 01 00*7")), tcp(hex("02 04 05b4 01*12")), examplePacket(),
+          ipv6({.nextHeader = 6, .payload = hex("0035 9c40 00*8 a0 12 00*6 01*20")}),
+          ipv6({.nextHeader = 17, .payload = udp(53, 53, hex("61*12"))})}) {
+        for (std::uint32_t blocks = 1; blocks < 34; ++blocks) {
+            compare(packet, {.blocks = blocks});
+        }
+        for (std::uint32_t limits = 1; limits < 12; ++limits) {
+            compare(packet, {.limits = limits});
+        }
+    }
+}
+
+} // namespace
+} // namespace netfloor::test
