@@ -102,7 +102,8 @@ std::vector<Octets> packetsAfterAnOwner() {
              "04 07 000c 0002 0008 01020304", // information of an unknown type, of which only the type is peeked
              "05 07 000c 0001 0008 01020304",
              "03 07 001c 00000001 00010000 0001 0001 0002 0003 00000005",
-             "02 07 0028 00000001 00010000 0002 0003 00000004 0006 0014 20010db8 00*11 01",
+             "02 07 0034 00000001 00010000 0002 0003 00000004 0006 0014 20010db8 00*11 01 000b 000c 61*8", // a row
+                                                                                                           // after it
              "06 ff 000c 0001 0008 0007 0000",
              "0a 07 0008 01020304",
          }) {
@@ -118,6 +119,14 @@ TEST(DeferredWriter, showsWhatMdShowsAfterAnOwner) {
         compare(packet);
         compare(shortened(packet, packet.size() - 2));
     }
+}
+
+// An address that lies past the limit is shown, and not kept: the step back over it is the last one.
+TEST(DeferredWriter, showsTheStepBackOverAnAddress) {
+    compare(ipv6({.nextHeader = 41,
+                  .payload = ipv6({.nextHeader = 43, .payload = hex("3b 02 00 01 00*4 61*8")}),
+                  .payloadLength = std::uint16_t{56}}) +
+            hex("62*8"));
 }
 
 // A run asks for its room once. It takes no more than that, and all that it has where it needs it.

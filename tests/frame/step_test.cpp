@@ -188,6 +188,29 @@ TEST(FieldStep, reversedAddressRestoresTheWorkingCopy) {
     }
 }
 
+// Where an address of reversed bits ends inside the last octet, of which the packet has only some bits, that octet is
+// not reversed: so the address shows it reversed.
+TEST(FieldStep, reversedAddressThatEndsInsideAnOctet) {
+    const Octets packet = ipv4({.protocol = 132, .payload = hex(R"(
+        0b 59 0b 5a 00*8 01 00 00 28 00*16
+        00 06 00 14 30*15 35
+    )")});
+    for (const Pass pass : allPasses) {
+        for (unsigned shift = 0; shift < 8; ++shift) {
+            StateOptions options;
+            options.cursor = 1 + shift;
+            options.totalBits = shift + 8 * static_cast<std::uint32_t>(packet.size());
+            const Octets moved = shift == 0 ? packet : shifted(packet, shift);
+            BareRun run(moved, options);
+            EXPECT_EQ(run.enter(pass), 1);
+            EXPECT_EQ(run.state().fieldRecord.fieldId, 856u);
+            EXPECT_EQ(run.state().fieldRecord.value, shift == 0 ? 0x30303035u : 0x303030acu) << passName(pass) << shift;
+            EXPECT_EQ(run.state().fieldRecord.ranges[7].value, shift == 0 ? 0x3035u : 0x30acu) << passName(pass);
+            EXPECT_EQ(hexText({run.state().data, moved.size()}), hexText(moved));
+        }
+    }
+}
+
 struct CutCase {
     std::uint32_t bits;
     std::size_t fields;
