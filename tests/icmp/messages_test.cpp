@@ -256,5 +256,14 @@ TEST(Icmp, countsOfOctetsAndEntries) {
     }
 }
 
+// The length in a tunnel's header is no limit: where it has no room for the type, the count of octets is wrong.
+TEST(Icmp, lengthOfTheTunnelAndAReservedType) {
+    for (const std::uint16_t octets : {std::uint16_t{20}, std::uint16_t{21}}) {
+        const Octets inner = ipv4({.protocol = 1, .payload = hex("2a 01 02"), .totalLength = octets});
+        const Runs runs = runAll(ipv4({.protocol = 4, .payload = inner}));
+        EXPECT_EQ((runs.mv.flags & NETFLOOR_FLAG_EXPECTATION) != 0, octets == 20) << octets;
+    }
+}
+
 } // namespace
 } // namespace netfloor::test

@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: MIT
 // ICMPv6 (RFC 4443), over IPv6 and over IPv4.
+#include <algorithm>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include <gtest/gtest.h>
@@ -112,6 +114,14 @@ TEST(Icmpv6, lengths) {
         checkCase(one);
     }
     cutEverywhere(ipv6({.nextHeader = 58, .payload = hex("04 00 00 00 00 00 00 06 60*9")}));
+}
+
+TEST(Icmpv6, theUndefinedTypesHaveData) {
+    for (const auto &[type, octets] : {std::pair(4, 0), std::pair(5, 3), std::pair(127, 3), std::pair(130, 0)}) {
+        const Runs runs =
+            runAll(ipv6({.nextHeader = 58, .payload = Octets{static_cast<std::uint8_t>(type)} + hex("61*3")}));
+        EXPECT_EQ(std::ranges::count(runs.md.fields, 285u, &FieldReport::id), octets) << type;
+    }
 }
 
 } // namespace
