@@ -110,14 +110,14 @@ private:
         field.value = seen.entry.value;
         field.octet = static_cast<std::uint8_t>(octet);
         if (field.value != LayerValue::ipv6Address) {
-            const std::int32_t wordOctet = static_cast<std::int32_t>(std::min(octet + wordOctets, header.octets)) -
-                                           static_cast<std::int32_t>(wordOctets);
-            const std::uint32_t wordEnd = (first + wordOctets) * bitsPerOctet + wordOctet * bitsPerOctet;
+            const std::uint32_t pastWord = std::min(octet + wordOctets, header.octets);
+            const std::uint32_t wordEnd = (first + pastWord) * bitsPerOctet;
             if (seen.bits != seen.lastBit - seen.firstBit + 1 || seen.bits > wordBits || seen.lastBit >= wordEnd) {
                 isUsable_ = false;
                 return;
             }
-            field.wordOctet = static_cast<std::int8_t>(wordOctet);
+            field.wordOctet =
+                static_cast<std::int8_t>(static_cast<std::int32_t>(pastWord) - static_cast<std::int32_t>(wordOctets));
             field.shift = static_cast<std::uint8_t>(wordEnd - 1 - seen.lastBit);
             field.mask = ~std::uint32_t{0} >> (wordBits - seen.bits);
             const std::uint32_t number = field.read(packet_.data() + first);
