@@ -109,9 +109,10 @@ void PacketWalk::ipv4(std::size_t at, std::size_t end) {
 
     const std::uint32_t fragment = u16(at + 6);
     const std::size_t offset = std::size_t{fragment & 0x1fffU} * 8;
-    if (offset + total - headerOctets > mostPayload) {
+    constexpr std::size_t mostWithHeader = mostPayload - ipv4Octets; // the total length counts the header, too
+    if (offset + total - headerOctets > mostWithHeader) {
         damage("IPv4", "the fragment ends at octet # of its datagram, and # is the most", at + 6,
-               offset + total - headerOctets, mostPayload);
+               offset + total - headerOctets, mostWithHeader);
     }
     if (offset != 0) {
         return; // no header of what it carries

@@ -134,6 +134,13 @@ TEST_F(Command, chooses) {
         {"netfloor --packet 6 $T/five.pcap", 2, {}, {"has only 5 packets"}, {}},
         {"netfloor --packet 1 -f arp $T/five.pcap", 2, {}, {"does not match the filter"}, {}},
         {"netfloor -f 'no such' $T/five.pcap", 2, {}, {"pcap-filter"}, {}},
+        {"netfloor --where 'ip.ttl <' $T/five.pcap", 2, {}, {"--where: ", "\n    ip.ttl <\n            ^"}, {}},
+        {"netfloor --where $'ip.no\\e' $T/five.pcap", 2, {}, {"--where: ", "^"}, {"\x1b"}},
+        {"mkdir -p $T/apart; cp $N $T/apart; LD_LIBRARY_PATH=$(dirname $N)/.. $T/apart/netfloor $T/five.pcap",
+         5,
+         {},
+         {"the plug-in was not found at ", "--plugin PATH"},
+         {}},
         {"netfloor keys --column Nothing $T/five.pcap", 2, {}, {"'Nothing'", "'ip.ttl' (Time to Live)"}, {}},
         {"netfloor --packet 0 $T/five.pcap", 2, {}, {"'0' is no list of packet numbers", "--help"}, {}},
         {"netfloor --count -1 $T/five.pcap", 2, {}, {"'-1' is no whole number"}, {}},
@@ -490,6 +497,10 @@ TEST_F(Command, readsPcapngWithInterfacesOfDifferentTypes) {
     const Octets linkTypes = pcapngSection() + pcapngInterface(147, {}) + pcapngInterface(228, {});
     writeFile("private.pcapng", linkTypes + pcapngPacket(0, 0, udpPacket));
     writeFile("mixed.pcapng", linkTypes + pcapngPacket(0, 0, udpPacket) + pcapngPacket(1, 0, udpPacket));
+    const auto octets = static_cast<std::uint32_t>(udpPacket.size());
+    writeFile("noted.pcapng", pcapngSection() + pcapngInterface(228, {}) +
+                                  pcapngBlock(6, hex("00*12") + be32(octets) + be32(octets) + udpPacket +
+                                                     hex("0001 0002 68690000 0000 0000")));
 
     check({
         {"netfloor keys --column ip.source $T/good.pcapng",
@@ -499,6 +510,24 @@ TEST_F(Command, readsPcapngWithInterfacesOfDifferentTypes) {
          {},
          {},
          6},
+        {"netfloor keys --column ip.source --where 'ip.ttl == 63' $T/good.pcapng",
+         0,
+         {"ip.source\n"},
+         {},
+         {"10.0."},
+         1},
+        {"netfloor keys --where 'ip.ttl == 64' $T/good.pcapng", 0, {"10.0.0.1"}, {}, {}, 6},
+        {"cp $T/good.pcapng $T/'a\"b'; netfloor keys $T/'a\"b' $T/mixed.pcapng",
+         0,
+         {"/a\"\"b\",1,5.000000000,"},
+         {},
+         {}},
+        {"netfloor detail --jobs 2 $T/noted.pcapng", 0, {"Comment: hi\n"}, {}, {}},
+        {"netfloor --jobs 2 --write $T/kept.pcapng $T/noted.pcapng; netfloor detail $T/kept.pcapng",
+         0,
+         {"Comment: hi\n"},
+         {},
+         {}},
         {"netfloor -f 'udp port 53' $T/good.pcapng", 0, {"    5  "}, {}, {}, 5},
         // A link type that libpcap does not know costs its own packets, and no others.
         {"netfloor -f udp $T/mixed.pcapng", 0, {"    2  "}, {"1 packet of link type 147 ("}, {"    1  "}, 1},

@@ -77,6 +77,11 @@ TEST(PlannedShards, areToldWhenTheyAreWrong) {
         {"netfloor keys --shard $T/one.json:1 --count 2", 2, "--count cannot be kept across shards"},
         {"netfloor keys --shard $T/one.json:1 $T/one.pcap", 2, "the plan names the captures"},
         {"netfloor verify --shard $T/one.json:1", 2, "--shard"},
+        {"netfloor --shard $T/none.json:1", 2, "Make a plan: netfloor plan --shards 8"},
+        {"sed -E 's/(\"plan_version\": )[0-9]+/\\199/' $T/one.json > $T/new.json; netfloor --shard $T/new.json:1", 2,
+         "a plan of another version"},
+        {"sed 's/\"capture\":0/\"capture\":7/' $T/one.json > $T/no.json; netfloor --shard $T/no.json:1", 2,
+         "a shard is of no capture"},
         {"sed 's/\"end\":[0-9]*,\"first_packet\":1,/\"end\":1000,\"first_packet\":1,/' $T/one.json > $T/wrong.json; "
          "netfloor --shard $T/wrong.json:1",
          4, "has changed since it was planned. By its plan"},
