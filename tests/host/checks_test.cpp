@@ -107,6 +107,7 @@ std::string faultsOf(const Octets &packet, std::size_t wireOctets = 0) {
 }
 
 const Octets udp4 = sealed(ipv4({.protocol = 17, .payload = udp(1, 2, hex("6162"))}));
+const Octets udp6 = sealed(ipv6({.nextHeader = 17, .payload = udp(1, 2, hex("616263"))}));
 const Octets tcpPlain = tcp4(hex("020405b4 01 030307"), hex("61*9"));
 const Octets init = hex("01 00 0014 00000001 00010000 000a 000a 00000001");
 
@@ -114,7 +115,7 @@ TEST(Checks, findNothingInSoundPackets) {
     const std::vector<Octets> sound = {
         udp4,
         tcpPlain,
-        sealed(ipv6({.nextHeader = 17, .payload = udp(1, 2, hex("616263"))})),
+        udp6,
         icmp6(hex("87 00 0000 00000000 fe80 00*13 01 0101 020202020202")),
         sctp4(init),
         sctp4(hex("03 00 0014 00000001 00010000 0001 0000 0002 0003")),
@@ -122,6 +123,11 @@ TEST(Checks, findNothingInSoundPackets) {
         sealed(ipv4({.protocol = 4, .payload = udp4})),
         sealed(ipv4({.protocol = 47, .payload = hex("0000 0800") + tcpPlain})),
         sealed(ipv4({.protocol = 17, .payload = hex("00*24"), .fragment = 0x0010})), // a later fragment
+        // The extension of an ICMP message has a checksum, and what a routing header leads to is in that of UDP.
+        sealed(ipv4({.protocol = 1, .payload = hex("0b 00 0000 00080000") + udp4 + hex("00*2 2000 defa 0004 0101")})),
+        ipv6({.nextHeader = 43,
+              .payload = hex("11 02 00 01 00*4 20010db8 00*11 02") + Octets(udp6.begin() + 40, udp6.end()),
+              .destination = {0x20, 0x01}}),
     };
     for (const Octets &packet : sound) {
         EXPECT_EQ(faultsOf(packet), "") << hexText(packet);
@@ -226,6 +232,8 @@ TEST(Checks, nameEachFault) {
          "damage IPv6: a hop-by-hop header is not the first one, at octet 48"},
         {sealed(ipv6({.nextHeader = 43, .payload = hex("3b 01 00 00 00*12")})),
          "damage IPv6: the routing header has 16 octets, which hold no whole addresses, at octet 41"},
+        {with(ipv6({.nextHeader = 43, .payload = hex("11 02 03 01 00*20") + udp(1, 2)}), 71, 1),
+         "note UDP: the checksum is not checked, as the routing header does not tell the last address, at octet 70"},
         {sctp4(hex("01 00 0008 00*4")),
          "damage SCTP: chunk 1 has a length of 8, which is too short for its fields, at octet 32"},
         {sctp4(hex("03 00 0018 00000001 00010000 0002 0000 0002 0003 0003 0004")),
