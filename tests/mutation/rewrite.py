@@ -229,7 +229,8 @@ class Rewriter:
         entries.append((at, rank, order if opens else -end, text, 0))
 
     def write(self):
-        shutil.copytree(self.plugin, self.copy, dirs_exist_ok=True)
+        if self.copy != self.plugin:
+            shutil.copytree(self.plugin, self.copy, dirs_exist_ok=True)
         for file, insertions in self.insertions.items():
             text = self.text(file).decode("latin-1")
             pieces, at = [], 0
@@ -253,4 +254,5 @@ def main():
     print(f"{len(rewriter.mutants)} mutants in {len(rewriter.insertions)} files")
 
 
-main()
+if __name__ == "__main__":
+    main()
