@@ -318,10 +318,6 @@ std::string_view tunnelName(Tunnel tunnel) {
     return names[static_cast<std::size_t>(tunnel)];
 }
 
-std::optional<InnerPacket> findInGtpU(std::span<const std::uint8_t> message, std::size_t wireOctets) {
-    return inGtpU({message, wireOctets});
-}
-
 std::optional<InnerPacket> findInGre(std::span<const std::uint8_t> packet, std::size_t wireOctets) {
     return inGre({packet, wireOctets});
 }

@@ -36,10 +36,7 @@ struct InnerPacket {
 [[nodiscard]] std::optional<InnerPacket> findInnerPacket(std::span<const std::uint8_t> packet,
                                                          std::size_t wireOctets = 0);
 
-// The IP packet that a GTP-U message carries (TS 29.281), as octets of `message`. None where it carries no packet.
-[[nodiscard]] std::optional<InnerPacket> findInGtpU(std::span<const std::uint8_t> message, std::size_t wireOctets = 0);
-
-// The same of a GRE header and of a UDP header, and of what follows it.
+// The same of a GRE header and of a UDP header, and of what follows it. GTP-U is that of TS 29.281.
 [[nodiscard]] std::optional<InnerPacket> findInGre(std::span<const std::uint8_t> packet, std::size_t wireOctets = 0);
 [[nodiscard]] std::optional<InnerPacket> findInUdp(std::span<const std::uint8_t> datagram, std::size_t wireOctets = 0);
 
