@@ -144,7 +144,6 @@ template <auto production, class Pass>
     reader.live = true; // runOutOfLine has asked; the run of a live reader has not ended
     reader.outcome = Outcome::running;
     production(reader);
-    reader.writer.flushRun(*reader.state);
     position = reader.position();
 }
 

@@ -148,8 +148,6 @@ NETFLOOR_INLINE inline void writeElements(FieldRecord &record, const std::uint8_
         }
     } else {
         value = valueAt<place>(data, cursor, units);
-        elements = 0;
-        outputElements = 0;
     }
     value *= place.scale;
     record.value = value;

@@ -188,7 +188,8 @@ NETFLOOR_INLINE inline std::optional<std::uint32_t> peek(Reader<Pass> &reader, c
     if (reader.ended() || reader.left < place.needs(place.count)) {
         return std::nullopt;
     }
-    if (!reader.writer.isInRun() && !reader.roomFor(place.count, nullptr)) {
+    reader.leaveRun();
+    if (!reader.roomFor(place.count, nullptr)) {
         return std::nullopt;
     }
     const bool whole = !place.isPieces();
@@ -198,7 +199,7 @@ NETFLOOR_INLINE inline std::optional<std::uint32_t> peek(Reader<Pass> &reader, c
         .pieces = place.count,
         .width = whole ? bitsPerOctet : place.pieces[0].width(),
     };
-    return reader.writer.peek(reader.state->fieldRecord, reader.data, found, low);
+    return reader.writer.peek(reader.state->fieldRecord, reader.data, found);
 }
 
 // Moves the cursor back over `bitCount` bits, so that they can be read a second time.

@@ -83,7 +83,7 @@ public:
         state.bitsLeft = position.left;
     }
 
-    NETFLOOR_INLINE std::uint32_t peek(FieldRecord &record, const std::uint8_t *data, const Peek &peek, std::uint32_t) {
+    NETFLOOR_INLINE std::uint32_t peek(FieldRecord &record, const std::uint8_t *data, const Peek &peek) {
         return writePeek(record, data, peek);
     }
 
@@ -238,9 +238,6 @@ public:
             last_.field.cursor = putOff_.cursor;
             last_.peek.pieces = 0;
         }
-        if (putOff_.peek.pieces != 0) {
-            last_.peek = putOff_.peek;
-        }
         putOff_.clear();
     }
 
@@ -250,7 +247,7 @@ public:
             // Compilers know this field, where those of last_ are any.
             writeSteps(state);
             const FieldRead field{.field = putOff_.field, .cursor = putOff_.cursor};
-            writeRecord(state.fieldRecord, data, field, putOff_.peek);
+            writeRecord(state.fieldRecord, data, field, {});
             putOff_.clear();
         } else {
             flushRun(state);
@@ -336,30 +333,19 @@ public:
         setAdvance(state, static_cast<std::int32_t>(field.place.advance));
         putOff_.field = &deferred<field>;
         putOff_.cursor = start;
-        putOff_.peek.pieces = 0;
         if constexpr (field.place.shape == Shape::addressNibbles) {
             remember(start, nibbleBits, mostFixedElements);
         }
         writeWide<field>(state.fieldRecord);
     }
 
-    // The peek lies `low` bits after the cursor.
-    NETFLOOR_INLINE std::uint32_t peek(FieldRecord &record, const std::uint8_t *data, const Peek &peek,
-                                       std::uint32_t low) {
-        if (inRun_) {
-            putOff_.peek.first = peek.first;
-            putOff_.peek.pieces = peek.pieces;
-            putOff_.peek.width = peek.width;
-        } else {
-            last_.peek = peek;
-        }
+    NETFLOOR_INLINE std::uint32_t peek(FieldRecord &record, const std::uint8_t *data, const Peek &peek) {
+        last_.peek = peek;
         for (std::uint32_t i = 0; i < peek.pieces; ++i) {
-            clearInRun(record, i);
+            record.ranges[i].flagWord = 0;
         }
-        const std::uint8_t *const from = inRun_ ? octets_ : data;
-        const std::uint32_t first = inRun_ ? bit() + low : peek.first;
-        return peek.width == bitsPerOctet ? octetsAt(from, first, peek.pieces)
-                                          : bits(from, first, first + peek.width - 1);
+        return peek.width == bitsPerOctet ? octetsAt(data, peek.first, peek.pieces)
+                                          : bits(data, peek.first, peek.first + peek.width - 1);
     }
 
     // Clears the flag words of so many elements. The plug-in writes nothing else to them, so that the first need not be
@@ -445,7 +431,7 @@ private:
     }
 
     NETFLOOR_INLINE void clearInRun(FieldRecord &record, std::uint32_t element) {
-        if (inRun_ && element < cleared_) {
+        if (element < cleared_) {
             return;
         }
         record.ranges[element].flagWord = 0;
@@ -468,7 +454,6 @@ private:
     struct PutOff {
         const DeferredField *field = nullptr; // the last one; null: there was none
         std::uint32_t cursor = 0;             // where it lies
-        Peek peek;                            // after that field
         bool hasCondition = false;
         bool condition = false;
         bool hasAdvance = false;
@@ -482,7 +467,6 @@ private:
         // One by one: as a whole it would be memory.
         NETFLOOR_INLINE void clear() {
             field = nullptr;
-            peek.pieces = 0;
             hasCondition = false;
             hasAdvance = false;
             hasBlocks = false;
