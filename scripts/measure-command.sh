@@ -89,6 +89,7 @@ declare -A best # seconds, by program
 measure() {     # PROGRAM
     local time status=0
     TIMEFORMAT='%3U %3S'
+    rm -f "$folder/out" # to empty what the program before has written takes long
     { time "$1" >"$folder/out" 2>"$folder/err"; } 2>"$folder/time" || status=$?
     # verify ends with 1 when it has found damage.
     if [ $status -gt 1 ] || { [ $status -eq 1 ] && [ "$1" != verify ]; }; then
@@ -130,6 +131,7 @@ for line in "${rows[@]}"; do
 done
 
 starts=20
+rm -f "$folder/out"
 TIMEFORMAT='%3U %3S'
 { time for ((start = 0; start < starts; ++start)); do
     "$netfloor" --count 3 "$capture" >"$folder/out"
