@@ -12,6 +12,7 @@ import sys
 
 import clang.cindex
 from clang.cindex import CursorKind as Kind
+from clang.cindex import TypeKind
 
 from rewrite import Rewriter
 
@@ -68,10 +69,14 @@ class HostRewriter(Rewriter):
                     self.wrap(file, start, end, "(mutants::on<{0}>() != static_cast<bool>(", "))", "negated")
         return super().change(file, cursor, parent, children)
 
-    # mutant.h takes copies, and an atomic has none.
+    # mutant.h takes copies, and an atomic has none; and it has no vectors.
     def operation(self, file, operator, left, right, start, end):
-        if not any("atomic" in part.type.spelling for side in (left, right) for part in side.walk_preorder()):
+        if not any(self.is_special(part.type) for side in (left, right) for part in side.walk_preorder()):
             super().operation(file, operator, left, right, start, end)
+
+    @staticmethod
+    def is_special(of):
+        return "atomic" in of.spelling or of.get_canonical().kind == TypeKind.VECTOR
 
     @staticmethod
     def names_enumerator(cursor):
