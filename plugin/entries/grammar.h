@@ -22,6 +22,9 @@ struct Grammar {
     template <const Field &field>
     static constexpr std::uint32_t keyRow = keyRowOf(field);
 
+    // The form is chosen by the octet of the IPv4 protocol.
+    static_assert(protocolBit == bitsFromTo<CatalogueFields>(version, ipv4::timeToLive) + 1);
+    static_assert(leastHeaderBits == bitsFromTo<CatalogueFields>(version, ipv4::destinationAddress));
     static constexpr auto &startForms = plugin::startForms;
 
     [[nodiscard]] NETFLOOR_INLINE static Form likelyForm(const DecodeState &state) { return plugin::likelyForm(state); }

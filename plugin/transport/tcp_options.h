@@ -236,6 +236,7 @@ NETFLOOR_INLINE inline void optionInRun(Reader<Pass> &reader, OptionArea &area) 
         expectFields<noOperation, noOperation>(reader);
         optionOfOneOctet<noOperation>(reader, "", area);
     } else {
+        static_assert(kind == 8, "a kind in a usual list needs its octets in octetsOfKind, and its fields here");
         const LimitedBlock<Pass> option{reader, "", octetsOfKind(kind) * bitsPerOctet};
         expectFields<timestamps, timestampEcho>(reader);
         timestampsFields(reader, area);
