@@ -49,31 +49,10 @@ Seen::Event eventOf(std::string_view name) {
                                              : Seen::Event::handOff;
 }
 
-class Digest {
-public:
-    void words(const void *from, std::size_t octets) {
-        const auto *at = static_cast<const std::uint8_t *>(from);
-        for (; octets >= sizeof(std::uint64_t); octets -= sizeof(std::uint64_t), at += sizeof(std::uint64_t)) {
-            std::uint64_t word = 0;
-            std::memcpy(&word, at, sizeof word);
-            number(word);
-        }
-        std::uint64_t rest = octets;
-        for (; octets > 0; --octets) {
-            rest = rest << 8 | *at++;
-        }
-        number(rest);
-    }
-    void number(std::uint64_t value) {
-        value_ = (value_ ^ value) * 0x100000001b3;
-        value_ ^= value_ >> 29;
-    }
-    void text(const char *text, std::size_t room) { words(text, strnlen(text, room)); }
-    [[nodiscard]] std::uint64_t value() const { return value_; }
-
-private:
-    std::uint64_t value_ = 0xcbf29ce484222325;
-};
+// A number that follows from the octets, on top of the one before.
+std::uint64_t digest(std::uint64_t before, const void *from, std::size_t octets) {
+    return before * 31 + std::hash<std::string_view>()({static_cast<const char *>(from), octets});
+}
 
 std::span<const std::uint32_t> elementsOf(const BitStack &stack) {
     const auto depth = static_cast<std::uint32_t>(stack.top - stack.base);
@@ -86,7 +65,7 @@ public:
     CheckedRun(const Plugin &plugin, Pass pass, const Input &input) : input_(input), pass_(pass) {
         seen_.reserve(256); // allocations are slow under a sanitizer
         static Trace none(Trace::Keeps::nothing);
-        const bool ended = run(plugin, pass, input, false, none, [this](const Moment &moment) { look(moment); });
+        const bool ended = run(plugin, pass, input, none, [this](const Moment &moment) { look(moment); });
         require(ended, "the pass does not end, or wrote outside its storage");
     }
 
@@ -149,35 +128,26 @@ private:
     }
 
     static std::uint64_t stacksOf(const DecodeState &state) {
-        Digest digest;
+        std::uint64_t stacks = digest(0, state.blockName, strnlen(state.blockName, 64));
         for (const BitStack &stack : {state.blockStarts, state.limits}) {
             const std::span<const std::uint32_t> elements = elementsOf(stack);
-            digest.words(elements.data(), elements.size_bytes());
+            stacks = digest(stacks, elements.data(), elements.size_bytes());
         }
-        digest.text(state.blockName, 64);
-        return digest.value();
+        return stacks;
     }
 
     // An owner that changes the count of elements shows old ones, which passes need not leave alike.
     [[nodiscard]] std::uint64_t recordOf(const FieldRecord &record) const {
-        Digest digest;
-        digest.text(record.fieldName, 255);
-        digest.number(record.value);
-        digest.number(record.outputRangeCount);
-        if (input_.plan.oddOwners) {
-            return digest.value();
-        }
-        digest.words(record.ranges, std::min(record.rangeCount, record.rangeCapacity) * sizeof(BitRange));
-        return digest.value();
+        const std::uint32_t elements = std::min(record.rangeCount, record.rangeCapacity);
+        const std::uint64_t name = digest(0, record.fieldName, strnlen(record.fieldName, 255));
+        const std::uint64_t ranges =
+            digest(name, record.ranges, input_.plan.oddOwners ? 0 : elements * sizeof(BitRange));
+        return ranges ^ (std::uint64_t{record.value} << 32 | record.outputRangeCount);
     }
 
     static std::uint64_t layersOf(const DecodeState &state) {
-        Digest digest;
-        digest.words(state.scratch, sizeof state.scratch);
-        digest.words(state.layerFrames,
-                     std::min(state.layerIndex + std::uint64_t{1}, std::uint64_t{state.layerCapacity}) *
-                         sizeof(LayerFrame));
-        return digest.value();
+        const std::uint64_t frames = std::min(state.layerIndex + std::uint64_t{1}, std::uint64_t{state.layerCapacity});
+        return digest(digest(0, state.scratch, sizeof state.scratch), state.layerFrames, frames * sizeof(LayerFrame));
     }
 
     void checkRecord(const FieldRecord &record) const {
@@ -296,7 +266,7 @@ bool checkPasses(const Plugin &plugin, const Input &input) {
 
 void setKeyFieldsUp(const Plugin &plugin) {
     Trace none(Trace::Keeps::nothing);
-    run(plugin, Pass::xtr, {{0x45}, {}, "first"}, false, none);
+    run(plugin, Pass::xtr, {{0x45}, {}, "first"}, none);
 }
 
 } // namespace netfloor::compare

@@ -1,138 +1,105 @@
 // SPDX-License-Identifier: MIT
-// Compares two builds of the plug-in: whether a host sees the same of both, call by call.
-//
-//     compare_plugins OLD.so NEW.so [--packets N] [--first N] [--seed S] [--captures DIR]... [--strict]
+// Compares two builds of the plug-in: whether a host sees the same of both, call by call. The first run in which it
+// does not is shown by diff.
 //
 // The exit code is 0 when it does, 1 when it does not, 2 when the comparison could not be made.
-#include <chrono>
+#include <algorithm>
+#include <array>
 #include <cstdio>
+#include <cstdlib>
 #include <exception>
+#include <fstream>
 #include <stdexcept>
 
 #include <CLI/CLI.hpp>
 
-#include "inputs.h"
+#include "known_answers.h"
+#include "support/temporary_folder.h"
 
 namespace netfloor::compare {
 namespace {
 
-constexpr const char *passNames[] = {"TO", "MD", "MV", "XTR"};
+constexpr std::array passNames = {"TO", "MD", "MV", "XTR"};
 
 struct Options {
     std::string oldPath, newPath;
     std::uint64_t packets = 100'000;
-    std::uint64_t first = 0;
     std::uint64_t seed = 1;
     std::vector<std::string> captures = {NETFLOOR_CAPTURES};
-    bool strict = false;
 };
 
-class Comparison {
-public:
-    explicit Comparison(const Options &options)
-        : options_(options), old_(options.oldPath), new_(options.newPath), inputs_(options.captures, options.seed) {
-        if (old_.handle == new_.handle) {
-            throw std::runtime_error("both are the same file");
-        }
+// The first lines that differ, with those before them and the call that they belong to.
+void show(const std::string &old, const std::string &now) {
+    const test::TemporaryFolder folder;
+    std::ofstream(folder.path() / "old") << old;
+    std::ofstream(folder.path() / "new") << now;
+    const std::string command =
+        "cd " + folder.path().string() + " && diff -U 6 -F '^event' --label old --label new old new | head -n 60";
+    std::fflush(stdout);
+    if (std::system(command.c_str()) != 0) {
+        throw std::runtime_error("diff cannot be run");
     }
+}
 
-    // False at the first difference, which is then shown.
-    bool run() {
-        if (!sameExports()) {
-            return false;
-        }
-        const auto start = std::chrono::steady_clock::now();
-        const std::uint64_t from = options_.first / packetsTogether * packetsTogether;
-        for (std::uint64_t number = from; number < options_.first + options_.packets; ++number) {
-            if (!sameRuns(number)) {
-                return false;
-            }
-        }
-        const std::chrono::duration<double> took = std::chrono::steady_clock::now() - start;
-        std::printf("no difference: %llu packets in four passes, %llu host calls and results, %zu fields, %.1f s\n",
-                    static_cast<unsigned long long>(options_.packets), static_cast<unsigned long long>(events_),
-                    fieldsSeen().count(), took.count());
-        return true;
+std::string exportsText(const Plugin &plugin) {
+    Trace trace(Trace::Keeps::texts);
+    traceExports(plugin, trace);
+    return trace.text();
+}
+
+// The digest of each run of the group.
+std::vector<std::uint64_t> runDigests(Plugin &plugin, const Inputs &inputs, std::uint64_t first) {
+    std::vector<std::uint64_t> digests;
+    runGroup(plugin, inputs, first, Trace::Keeps::octets,
+             [&](std::uint64_t, const Input &, Pass, const Trace &trace, bool good) {
+                 digests.push_back(trace.digest(static_cast<std::uint64_t>(good)));
+             });
+    return digests;
+}
+
+// One run of the group as text, of which the packet and how it ended are printed.
+std::string runText(Plugin &plugin, const Inputs &inputs, std::uint64_t first, std::ptrdiff_t wanted) {
+    std::string text;
+    runGroup(plugin, inputs, first, Trace::Keeps::texts,
+             [&](std::uint64_t packet, const Input &input, Pass pass, const Trace &trace, bool good) {
+                 if (wanted-- == 0) {
+                     std::printf("%s: packet %llu (%s): %s: %s pass%s\n", plugin.path.c_str(),
+                                 static_cast<unsigned long long>(packet), input.origin,
+                                 test::hexText(input.packet).c_str(), passNames[static_cast<std::size_t>(pass)],
+                                 good ? "" : ", FAILED");
+                     text = trace.text();
+                 }
+             });
+    return text;
+}
+
+bool areSame(const Options &options) {
+    Plugin old(options.oldPath);
+    Plugin now(options.newPath);
+    if (old.handle == now.handle) {
+        throw std::runtime_error("both are the same file");
     }
-
-private:
-    [[nodiscard]] bool sameExports() const {
-        Trace olds(Trace::Keeps::texts);
-        Trace news(Trace::Keeps::texts);
-        traceExports(old_, olds);
-        traceExports(new_, news);
-        if (!(olds == news)) {
-            std::printf("DIFFERENCE in the exports\n%s", Trace::firstDifference(olds, news).c_str());
-        }
-        return olds == news;
-    }
-
-    void setAsLoaded() const {
-        old_.setVariables(old_.asLoaded);
-        new_.setVariables(new_.asLoaded);
-    }
-
-    bool sameRuns(std::uint64_t number) {
-        const Input input = inputs_.input(number);
-        const bool ownKeys = input.plan.keyStatus != 1;
-        if (ownKeys || number % packetsTogether == 0) {
-            setAsLoaded();
-        }
-        for (const Pass pass : {Pass::md, Pass::to, Pass::mv, Pass::xtr}) {
-            if (!samePass(number, input, pass)) {
-                return false;
-            }
-        }
-        if (ownKeys) {
-            setAsLoaded();
-        }
-        return true;
-    }
-
-    bool samePass(std::uint64_t number, const Input &input, Pass pass) {
-        const Variables olds = old_.variables();
-        const Variables news = new_.variables();
-        const bool oldGood = netfloor::compare::run(old_, pass, input, options_.strict, oldTrace_);
-        const bool newGood = netfloor::compare::run(new_, pass, input, options_.strict, newTrace_);
-        events_ += oldTrace_.events();
-        if (oldGood && newGood && oldTrace_ == newTrace_) {
-            return true;
-        }
-        old_.setVariables(olds);
-        new_.setVariables(news);
-        show(number, input, pass);
+    if (exportsText(old) != exportsText(now)) {
+        std::puts("DIFFERENCE in the exports");
+        show(exportsText(old), exportsText(now));
         return false;
     }
-
-    // Runs both once more, with texts.
-    void show(std::uint64_t number, const Input &input, Pass pass) const {
-        Trace olds(Trace::Keeps::texts);
-        Trace news(Trace::Keeps::texts);
-        const bool oldGood = netfloor::compare::run(old_, pass, input, options_.strict, olds);
-        const bool newGood = netfloor::compare::run(new_, pass, input, options_.strict, news);
-        const Plan &plan = input.plan;
-        std::printf("DIFFERENCE in packet %llu, %s pass%s%s\n%s", static_cast<unsigned long long>(number),
-                    passNames[static_cast<std::size_t>(pass)], oldGood ? "" : ", old FAILED",
-                    newGood ? "" : ", new FAILED", Trace::firstDifference(olds, news).c_str());
-        std::printf("packet (%s): %s\n", input.origin, test::hexText(input.packet).c_str());
-        std::printf(
-            "host: capacities of blocks %u, limits %u, layers %u, ranges %u, layer infos %u; refused growth %u; "
-            "odd owners %d; key status %d; byte area %u; cursor %u; bits missing %u, outside %u; flags 0x%x; "
-            "layer index %u; source mask 0x%x\n",
-            plan.blockCapacity, plan.limitCapacity, plan.layerCapacity, plan.rangeCapacity, plan.layerInfoCapacity,
-            plan.refusedGrowth, plan.oddOwners, plan.keyStatus, plan.byteAreaSize, plan.cursor, plan.missingBits,
-            plan.outerBits, plan.flags, plan.layerIndex, plan.sourceMask);
-        std::printf("again: --seed %llu --first %llu --packets 1%s, and the same captures\n",
-                    static_cast<unsigned long long>(options_.seed), static_cast<unsigned long long>(number),
-                    options_.strict ? " --strict" : "");
+    const Inputs inputs(options.captures, options.seed);
+    std::size_t runs = 0;
+    for (std::uint64_t first = 0; first < options.packets; first += packetsTogether) {
+        const std::vector<std::uint64_t> olds = runDigests(old, inputs, first);
+        const std::vector<std::uint64_t> news = runDigests(now, inputs, first);
+        runs += olds.size();
+        if (olds != news) {
+            const auto run = std::ranges::mismatch(olds, news).in1 - olds.begin();
+            std::puts("DIFFERENCE");
+            show(runText(old, inputs, first, run), runText(now, inputs, first, run));
+            return false;
+        }
     }
-
-    const Options &options_;
-    const Plugin old_, new_;
-    const Inputs inputs_;
-    Trace oldTrace_, newTrace_;
-    std::uint64_t events_ = 0;
-};
+    std::printf("no difference in %zu runs\n", runs);
+    return true;
+}
 
 } // namespace
 } // namespace netfloor::compare
@@ -143,14 +110,11 @@ int main(int argumentCount, char **arguments) {
     app.add_option("OLD", options.oldPath, "the plug-in as it was")->required();
     app.add_option("NEW", options.newPath, "the plug-in as it is")->required();
     app.add_option("--packets", options.packets, "how many packets")->capture_default_str();
-    app.add_option("--first", options.first, "number of the first one");
     app.add_option("--seed", options.seed, "of what is drawn")->capture_default_str();
     app.add_option("--captures", options.captures, "folders with captures, in place of those of the tests");
-    app.add_flag("--strict", options.strict, "compare also what has no meaning: all storage, used or not");
     CLI11_PARSE(app, argumentCount, arguments);
-    netfloor::compare::catchSignals();
     try {
-        return netfloor::compare::Comparison(options).run() ? 0 : 1;
+        return netfloor::compare::areSame(options) ? 0 : 1;
     } catch (const std::exception &error) {
         std::fprintf(stderr, "compare_plugins: %s\n", error.what());
         return 2;

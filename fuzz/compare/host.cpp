@@ -2,9 +2,6 @@
 #include "host.h"
 
 #include <csetjmp>
-#include <csignal>
-
-#include <unistd.h>
 
 #include "arena.h"
 #include "random.h"
@@ -30,13 +27,11 @@ constexpr std::size_t byteArea = presenceOctets + std::size_t{4} * keyRows;
 constexpr std::size_t mostEvents = 200'000;
 constexpr std::uint32_t mostHandOffs = 48;
 constexpr std::uint32_t mostDepth = 3;
-constexpr unsigned mostSeconds = 20;
 
 // All of the run that is going on; the operations have no argument in which it could stand.
 const Plugin *plugin;
 const Input *input;
 Pass pass;
-bool strict;
 Trace *trace;
 const Observer *observer;
 Arena arena;
@@ -47,16 +42,8 @@ XtrContext *keyContext;    // null in the others
 std::size_t keyRecordOctets;
 std::uint32_t growths, handOffs, depth;
 std::int32_t lastResult;
-std::bitset<1024> seen;
-
-sigjmp_buf beforeRun;
-constexpr int endless = 1000; // no number of a signal
-bool signalsAreCaught = false;
-
-// Signals come from the plug-in, which keeps nothing that would have to be unwound.
-extern "C" void leaveRun(int signal) {
-    siglongjmp(beforeRun, signal);
-}
+// The plug-in keeps nothing that would have to be unwound.
+jmp_buf beforeRun;
 
 // What can be seen, in groups. Pointers are places in the storage, or in the packet.
 
@@ -96,8 +83,7 @@ void traceFieldRecord(const FieldRecord &record) {
     tracePointer("ranges", record.ranges);
     trace->words("rangeCapacity wideStart wideBits untouched1 untouched1 rawFlag untouched2 untouched2",
                  &record.rangeCapacity, 8 * sizeof record.rangeCapacity);
-    const std::size_t shown = strict ? record.rangeCapacity : std::min(record.rangeCount, record.rangeCapacity);
-    trace->words("range", record.ranges, shown * sizeof(BitRange));
+    trace->words("range", record.ranges, std::min(record.rangeCount, record.rangeCapacity) * sizeof(BitRange));
 }
 
 void traceState() {
@@ -141,7 +127,7 @@ void traceContext() {
 
 void event(const char *name) {
     if (trace->events() > mostEvents) {
-        siglongjmp(beforeRun, endless);
+        longjmp(beforeRun, 1);
     }
     trace->event(name);
     if (*observer) {
@@ -349,24 +335,8 @@ std::int32_t unusedResult() {
 
 } // namespace
 
-void catchSignals() {
-    static std::uint8_t ownStack[1 << 16];
-    stack_t stack{};
-    stack.ss_sp = ownStack;
-    stack.ss_size = sizeof ownStack;
-    sigaltstack(&stack, nullptr);
-    struct sigaction action {};
-    action.sa_handler = leaveRun;
-    action.sa_flags = SA_ONSTACK | SA_NODEFER;
-    for (const int signal : {SIGSEGV, SIGBUS, SIGILL, SIGFPE, SIGABRT, SIGALRM}) {
-        sigaction(signal, &action, nullptr);
-    }
-    signalsAreCaught = true;
-}
-
-bool run(const Plugin &thePlugin, Pass thePass, const Input &theInput, bool isStrict, Trace &theTrace,
-         const Observer &theObserver) {
-    plugin = &thePlugin, pass = thePass, input = &theInput, strict = isStrict, trace = &theTrace;
+bool run(const Plugin &thePlugin, Pass thePass, const Input &theInput, Trace &theTrace, const Observer &theObserver) {
+    plugin = &thePlugin, pass = thePass, input = &theInput, trace = &theTrace;
     observer = &theObserver;
     growths = handOffs = depth = 0, lastResult = 0;
     arena.clear();
@@ -374,27 +344,15 @@ bool run(const Plugin &thePlugin, Pass thePass, const Input &theInput, bool isSt
     setUpPacket();
     setUpState(input->plan);
     pass == Pass::xtr ? setUpKeyContext(input->plan) : setUpContext(input->plan);
-    if (signalsAreCaught) {
-        alarm(mostSeconds);
-    }
-    const int signal = sigsetjmp(beforeRun, 0);
-    if (signal == 0) {
+    const bool ended = setjmp(beforeRun) == 0;
+    if (ended) {
         pass == Pass::xtr ? extractLayers() : enter();
     } else {
-        trace->event(signal == endless ? "no end" : "crash"); // what can be seen may be broken
-        trace->number("signal", signal);
-    }
-    if (signalsAreCaught) {
-        alarm(0);
+        trace->event("no end"); // what can be seen may be broken
     }
     const bool overrun = arena.overrun();
     trace->number("overrun", overrun);
-    trace->octets("storage", arena.used().data(), strict ? arena.used().size() : 0);
-    return signal == 0 && !overrun;
-}
-
-const std::bitset<1024> &fieldsSeen() {
-    return seen;
+    return ended && !overrun;
 }
 
 } // namespace netfloor::compare
@@ -434,7 +392,6 @@ std::int32_t hs_AddDecodedFieldsData(PreDecodeContext *of, std::uint32_t outputR
     trace->number("fieldId", fieldId);
     trace->number("zero2", zero2);
     trace->number("bitOrder", bitOrder);
-    seen.set(fieldId % seen.size());
     of->fieldRecordCount = (of->fieldRecordCount + 1) % decodedFields;
     return unusedResult();
 }

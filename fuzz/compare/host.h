@@ -3,7 +3,6 @@
 // of them with all that can be seen at that moment.
 #pragma once
 
-#include <bitset>
 #include <cstdint>
 #include <functional>
 #include <span>
@@ -52,15 +51,7 @@ struct Moment {
 };
 using Observer = std::function<void(const Moment &)>;
 
-// A plug-in that crashes or does not end makes `run` return false, in place of ending the process. A sanitizer tells
-// more of a crash where this is not asked for.
-void catchSignals();
-
-// One pass over one packet. With `strict` also what has no meaning is traced: elements past the counts, texts past
-// their end. False when the plug-in did not end or wrote outside its storage.
-bool run(const Plugin &plugin, Pass pass, const Input &input, bool strict, Trace &trace, const Observer &observer = {});
-
-// Ids that the MD pass has reported so far.
-[[nodiscard]] const std::bitset<1024> &fieldsSeen();
+// One pass over one packet. False when the plug-in did not end or wrote outside its storage.
+bool run(const Plugin &plugin, Pass pass, const Input &input, Trace &trace, const Observer &observer = {});
 
 } // namespace netfloor::compare

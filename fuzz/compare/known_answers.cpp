@@ -2,33 +2,33 @@
 #include "known_answers.h"
 
 namespace netfloor::compare {
-namespace {
 
-std::uint64_t digestOf(const Plugin &plugin, const Input &input, std::uint64_t before) {
-    static Trace trace;
-    const bool ownKeys = input.plan.keyStatus != 1;
-    if (ownKeys) {
-        plugin.setVariables(plugin.asLoaded);
+void runGroup(Plugin &plugin, const Inputs &inputs, std::uint64_t first, Trace::Keeps keeps, const Ran &ran) {
+    Trace trace(keeps);
+    bool isAsLoaded = false;
+    for (std::uint64_t number = first; number < first + packetsTogether; ++number) {
+        const Input input = inputs.input(number);
+        const bool ownKeys = input.plan.keyStatus != 1;
+        if (number == first || (ownKeys && !isAsLoaded)) {
+            plugin.loadAnew();
+        }
+        for (const Pass pass : {Pass::md, Pass::to, Pass::mv, Pass::xtr}) {
+            const bool good = run(plugin, pass, input, trace);
+            ran(number, input, pass, trace, good);
+        }
+        isAsLoaded = ownKeys;
+        if (ownKeys) {
+            plugin.loadAnew();
+        }
     }
-    std::uint64_t digest = before;
-    for (const Pass pass : {Pass::md, Pass::to, Pass::mv, Pass::xtr}) {
-        const bool good = run(plugin, pass, input, false, trace);
-        digest = trace.digest(digest ^ static_cast<std::uint64_t>(good));
-    }
-    if (ownKeys) {
-        plugin.setVariables(plugin.asLoaded);
-    }
-    return digest;
 }
 
-} // namespace
-
-std::uint64_t groupDigest(const Plugin &plugin, const Inputs &inputs, std::uint64_t first) {
-    plugin.setVariables(plugin.asLoaded);
+std::uint64_t groupDigest(Plugin &plugin, const Inputs &inputs, std::uint64_t first) {
     std::uint64_t digest = 0;
-    for (std::uint64_t number = first; number < first + packetsTogether; ++number) {
-        digest = digestOf(plugin, inputs.input(number), digest);
-    }
+    runGroup(plugin, inputs, first, Trace::Keeps::octets,
+             [&](std::uint64_t, const Input &, Pass, const Trace &trace, bool good) {
+                 digest = trace.digest(digest ^ static_cast<std::uint64_t>(good));
+             });
     return digest;
 }
 

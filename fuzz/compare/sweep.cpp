@@ -79,7 +79,7 @@ std::vector<Space> spaces() {
 
 class Sweep {
 public:
-    Sweep(const char *path, bool all) : plugin_(path, Plugin::Start::lost), all_(all), inputs_({NETFLOOR_CAPTURES}, 1) {
+    Sweep(const char *path, bool all) : plugin_(path), all_(all), inputs_({NETFLOOR_CAPTURES}, 1) {
         setKeyFieldsUp(plugin_);
     }
 

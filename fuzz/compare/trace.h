@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
-// What a host saw during a run, as octets: two runs are the same if their traces are. A trace that keeps
-// texts says in addition what each of them is.
+// What a host saw during a run, as octets: two runs are the same if their digests are. A trace that keeps texts says in
+// addition what each of them is.
 #pragma once
 
 #include <concepts>
@@ -37,24 +37,13 @@ public:
     // A number that follows from all octets, on top of the one of the traces before.
     [[nodiscard]] std::uint64_t digest(std::uint64_t before) const;
 
-    [[nodiscard]] bool operator==(const Trace &other) const { return octets_ == other.octets_; }
-
-    // Of two traces that keep texts: the first event that differs, and the events before it.
-    [[nodiscard]] static std::string firstDifference(const Trace &old, const Trace &now);
+    // A line for each of them, where texts are kept.
+    [[nodiscard]] const std::string &text() const { return text_; }
 
 private:
-    struct Line {
-        std::size_t event; // from 1
-        std::string label;
-        std::string value;
-        bool operator==(const Line &) const = default;
-    };
-    [[nodiscard]] std::string eventText(std::size_t event) const;
-    [[nodiscard]] std::vector<Line> linesOf(std::size_t event) const;
-
     Keeps keeps_;
     std::vector<std::uint8_t> octets_;
-    std::vector<Line> lines_;
+    std::string text_;
     std::size_t events_ = 0;
 };
 

@@ -51,7 +51,7 @@ Input inputFrom(std::span<const std::uint8_t> octets) {
 
 const Plugin &loadedPlugin() {
     static const Plugin plugin = [] {
-        Plugin loaded(NETFLOOR_PLUGIN, Plugin::Start::lost);
+        Plugin loaded(NETFLOOR_PLUGIN);
         setKeyFieldsUp(loaded);
         return loaded;
     }();

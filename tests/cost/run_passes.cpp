@@ -68,8 +68,8 @@ void count(compare::Pass pass, const char *passName, const PacketSet &set) {
     for (const Octets &packet : set.packets) {
         const compare::Input input{packet, {}, "cost"};
         compare::Trace none(compare::Trace::Keeps::nothing);
-        run(*plugin, pass, input, false, none);
-        run(counted, pass, input, false, none);
+        run(*plugin, pass, input, none);
+        run(counted, pass, input, none);
     }
 }
 

@@ -59,7 +59,7 @@ std::vector<std::uint64_t> answersOf(const char *path) {
     return answers;
 }
 
-bool givesAnswers(const Plugin &plugin, const Inputs &inputs, const std::vector<std::uint64_t> &answers,
+bool givesAnswers(Plugin &plugin, const Inputs &inputs, const std::vector<std::uint64_t> &answers,
                   std::uint64_t packets) {
     std::size_t at = 0;
     if (answers.size() != 1 + answeredPackets / packetsTogether || exportsDigest(plugin) != answers[at++]) {
@@ -135,7 +135,7 @@ private:
         running_.erase(child);
     }
 
-    const Plugin plugin_;
+    Plugin plugin_;
     const Inputs inputs_{{NETFLOOR_CAPTURES}, 1};
     const std::vector<std::uint64_t> answers_;
     const std::vector<Mutant> mutants_;
