@@ -4,10 +4,10 @@
 # executions of all runs add up in build/fuzz-targets/executions/TARGET.
 #
 #   scripts/fuzz.sh TARGET [SECONDS]    TARGET is passes, capture or command; SECONDS is 600
-#   scripts/fuzz.sh TARGET pack         fuzz/corpus/TARGET becomes the fewest inputs that reach all that was learned
+#   scripts/fuzz.sh TARGET pack         fuzz/corpus/TARGET.tar.gz becomes the fewest inputs that reach all that was learned
 #
-# The exit code is not 0 when there was a finding. Its input is in build/fuzz-targets/findings; replay_TARGET --input
-# FILE repeats it, in any build.
+# The exit code is not 0 when there was a finding. Its input is in build/fuzz-targets/findings; replay_TARGET FILE
+# repeats it, in any build.
 set -eu
 cd "$(dirname "$0")/.."
 target=${1:?passes, capture or command}
@@ -16,12 +16,12 @@ inputs=$build/inputs/$target
 findings=$build/findings
 executions=$build/executions/$target
 programs=$build/fuzz/targets
-# Octets of 0 in front of a packet: an ordinary host, or no options. The plug-in allocates nothing that could leak.
-head=0 leaks=1
-case $target in passes) head=12 leaks=0 ;; command) head=4 ;; esac
+packed=fuzz/corpus/$target.tar.gz
+leaks=1
+[ "$target" != passes ] || leaks=0 # the plug-in allocates nothing that could leak
 
 cmake --preset fuzz -DNETFLOOR_TESTS=ON >/dev/null
-ninja -C $build "fuzz_$target" "replay_$target" write_packets | sed '/no work to do/d'
+ninja -C $build "fuzz_$target" "replay_$target" | sed '/no work to do/d'
 mkdir -p "$inputs" "$findings" "$build/executions"
 
 # pack: the fewest inputs
@@ -29,21 +29,15 @@ if [ "${2:-}" = pack ]; then
     fewest=$(mktemp -d)
     trap 'rm -rf "$fewest"' EXIT
     "$programs/fuzz_$target" -merge=1 "$fewest" "$inputs" 2>&1 | grep -E 'MERGE-OUTER: .* (new files|inputs)' || true
-    "$programs/replay_$target" --pack "fuzz/corpus/$target" "$fewest"
-    echo "fuzz: fuzz/corpus/$target has $(find "$fewest" -type f | wc -l) inputs, $(stat -c %s "fuzz/corpus/$target") octets"
+    # The same octets for the same inputs.
+    tar --sort=name --owner=0 --group=0 --numeric-owner --mtime=@0 --mode=a=rX,u+w -C "$fewest" -cf - . | gzip -9n >"$packed"
+    echo "fuzz: $packed has $(find "$fewest" -type f | wc -l) inputs, $(stat -c %s "$packed") octets"
     exit
 fi
 
-# seeds: what is known, and the captures
-[ ! -f "fuzz/corpus/$target" ] || "$programs/replay_$target" --unpack "fuzz/corpus/$target" "$inputs"
-if [ "$target" = capture ]; then
-    cp tests/captures/*.pcap* "$inputs"
-else
-    packets=$(mktemp)
-    trap 'rm -f "$packets"' EXIT
-    $build/tests/golden/write_packets "$packets" tests/captures/*.pcap*
-    "$programs/replay_$target" --unpack "$packets" "$inputs" $head
-fi
+# seeds: what is known, which holds what the captures reach
+[ ! -f "$packed" ] || tar -xzf "$packed" -C "$inputs"
+[ "$target" != capture ] || cp tests/captures/*.pcap* "$inputs"
 
 # A short history of allocations: with a long one, each takes longer, and memory is read anew.
 export ASAN_OPTIONS=malloc_context_size=1:quarantine_size_mb=16

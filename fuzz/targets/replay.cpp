@@ -1,22 +1,12 @@
 // SPDX-License-Identifier: MIT
-// Runs a fuzz target over inputs that are known, without a fuzzer, and moves them between the two forms they have: one
-// file in the repository, and a folder with a file each for the fuzzer.
+// Runs a fuzz target over inputs that are known, without a fuzzer:
 //
-//     replay_TARGET FILE             runs the target over all inputs of the file
-//     replay_TARGET --input FILE     runs it over one input, which is the whole file
-//     replay_TARGET --unpack FILE FOLDER [ZEROS]    ZEROS octets of 0 in front of each, where FILE holds packets
-//     replay_TARGET --pack FILE FOLDER
-//
-// In the one file, each input comes after its number of octets in four octets, the first the highest.
+//     replay_TARGET PATH...    a PATH is a file with one input, or a folder of such files
 #include <cstdint>
 #include <cstdio>
-#include <cstring>
-#include <exception>
 #include <filesystem>
 #include <fstream>
 #include <iterator>
-#include <set>
-#include <stdexcept>
 #include <string>
 #include <vector>
 
@@ -29,100 +19,38 @@ extern "C" std::size_t LLVMFuzzerMutate(std::uint8_t *, std::size_t size, std::s
 
 namespace {
 
-using Octets = std::vector<std::uint8_t>;
+namespace fs = std::filesystem;
 
-Octets content(const std::filesystem::path &path) {
+std::vector<fs::path> filesOf(const fs::path &path) {
+    if (!fs::is_directory(path)) {
+        return {path};
+    }
+    const fs::directory_iterator listed(path);
+    return {begin(listed), end(listed)};
+}
+
+bool runOne(const fs::path &path) {
     std::ifstream file(path, std::ios::binary);
-    if (!file) {
-        throw std::runtime_error(path.string() + " cannot be read");
-    }
+    // In memory of their own size, so that a sanitizer sees a read past them.
     const std::string octets((std::istreambuf_iterator<char>(file)), std::istreambuf_iterator<char>());
-    return {octets.begin(), octets.end()};
-}
-
-std::vector<Octets> packedInputs(const std::filesystem::path &path) {
-    const Octets octets = content(path);
-    std::vector<Octets> inputs;
-    for (std::size_t at = 0; at < octets.size();) {
-        std::size_t size = 0;
-        for (const std::size_t end = at + 4; at < end; ++at) {
-            size = size << 8 | octets.at(at);
-        }
-        if (size > octets.size() - at) {
-            throw std::runtime_error(path.string() + " is no file of inputs");
-        }
-        const auto from = octets.begin() + static_cast<std::ptrdiff_t>(at);
-        inputs.emplace_back(from, from + static_cast<std::ptrdiff_t>(size));
-        at += size;
-    }
-    return inputs;
-}
-
-void write(std::ofstream &file, const Octets &octets) {
-    file.write(reinterpret_cast<const char *>(octets.data()), static_cast<std::streamsize>(octets.size()));
-}
-
-void unpack(const std::filesystem::path &path, const std::filesystem::path &folder, std::size_t zeros) {
-    std::filesystem::create_directories(folder);
-    for (std::size_t number = 0; const Octets &input : packedInputs(path)) {
-        std::ofstream file(folder / (path.stem().string() + '-' + std::to_string(number++)), std::ios::binary);
-        write(file, Octets(zeros));
-        write(file, input);
-    }
-}
-
-void pack(const std::filesystem::path &path, const std::filesystem::path &folder) {
-    const std::filesystem::directory_iterator listed(folder);
-    std::ofstream file(path, std::ios::binary);
-    std::set<Octets> inputs;
-    for (const auto &one : listed) {
-        inputs.insert(content(one.path()));
-    }
-    for (const Octets &input : inputs) {
-        for (int shift = 24; shift >= 0; shift -= 8) {
-            file.put(static_cast<char>(input.size() >> shift & 0xff));
-        }
-        write(file, input);
-    }
-    if (!file.flush()) {
-        throw std::runtime_error(path.string() + " cannot be written");
-    }
-}
-
-// The octets in memory of their own, so that a sanitizer sees a read past them.
-void runOne(const Octets &input) {
-    const Octets own(input);
-    LLVMFuzzerTestOneInput(own.data(), own.size());
-}
-
-void runAll(const std::filesystem::path &path) {
-    const std::vector<Octets> inputs = packedInputs(path);
-    for (const Octets &input : inputs) {
-        runOne(input);
-    }
-    std::printf("%zu inputs\n", inputs.size());
+    const std::vector<std::uint8_t> input(octets.begin(), octets.end());
+    LLVMFuzzerTestOneInput(input.data(), input.size());
+    return file.good() || file.eof();
 }
 
 } // namespace
 
 int main(int count, char **arguments) {
-    try {
-        const std::vector<std::string> words(arguments + 1, arguments + count);
-        if (words.size() == 1) {
-            runAll(words[0]);
-        } else if (words.size() == 2 && words[0] == "--input") {
-            runOne(content(words[1]));
-        } else if (words.size() >= 3 && words[0] == "--unpack") {
-            unpack(words[1], words[2], words.size() > 3 ? std::stoul(words[3]) : 0);
-        } else if (words.size() == 3 && words[0] == "--pack") {
-            pack(words[1], words[2]);
-        } else {
-            throw std::runtime_error(
-                "usage: replay FILE | --input FILE | --unpack FILE FOLDER [ZEROS] | --pack FILE FOLDER");
+    std::size_t inputs = 0;
+    for (int i = 1; i < count; ++i) {
+        for (const fs::path &file : filesOf(arguments[i])) {
+            if (!runOne(file)) {
+                std::fprintf(stderr, "replay: %s cannot be read\n", file.c_str());
+                return 2;
+            }
+            ++inputs;
         }
-        return 0;
-    } catch (const std::exception &error) {
-        std::fprintf(stderr, "replay: %s\n", error.what());
-        return 2;
     }
+    std::printf("%zu inputs\n", inputs);
+    return inputs > 0 ? 0 : 2;
 }
