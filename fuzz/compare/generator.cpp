@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-#include "inputs.h"
+#include "generator.h"
 
 #include <algorithm>
 #include <cctype>

@@ -11,7 +11,7 @@
 
 #include "decode.h"
 #include "exit_code.h"
-#include "inputs.h"
+#include "generator.h"
 #include "memory_file.h"
 #include "options.h"
 #include "packet_mutator.h"

@@ -3,7 +3,7 @@
 
 #include <algorithm>
 
-#include "inputs.h"
+#include "generator.h"
 
 extern "C" std::size_t LLVMFuzzerMutate(std::uint8_t *data, std::size_t size, std::size_t mostOctets);
 
