@@ -53,13 +53,10 @@ struct Runs {
 [[nodiscard]] Report runPass(Pass pass, std::span<const std::uint8_t> packet, const TestRunOptions &options = {},
                              Host &host = sharedHost());
 
-// The four passes, each over octets that end at an inaccessible page. Fails the test where they disagree.
+// The four passes, each over octets that end at an inaccessible page. Fails the test where they disagree: cursor, bits
+// left, depth of the stacks, layers, hand-offs, number of fields and texts, the flags that all passes raise, the
+// verdict, and for each key field a field of that name and value in MD.
 Runs runAll(std::span<const std::uint8_t> packet, const TestRunOptions &options = {}, Host &host = sharedHost());
-
-// A line for each difference between the four passes, empty when they agree: cursor, bits left, depth of the stacks,
-// layers, hand-offs, number of fields and texts, the flags that all passes raise, the verdict, and
-// for each key field a field of that name and value in MD.
-[[nodiscard]] std::string disagreements(const Runs &runs);
 
 // runAll for the first n octets of the packet, for every n, and once more with n in the packet's length field.
 // `check`, if there is one, gets n and the runs with the length field unchanged.
