@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: MIT
 #include "peers/complaints.h"
 
-#include <array>
 #include <cstdio>
 #include <string_view>
 
@@ -11,102 +10,60 @@ namespace netfloor::test {
 
 namespace {
 
-struct Row {
-    std::string_view text; // tshark's field, or what tcpdump writes
-    std::string_view protocol;
-    bool isChecksum = false;
-};
+using Texts = std::map<std::string, std::vector<std::string_view>>; // by protocol
 
-constexpr std::array expertFields = {
-    Row{"ip.bogus_ip_version", "IP"},
-    Row{"ip.bogus_header_length", "IP"},
-    Row{"ip.bogus_ip_length", "IP"},
-    Row{"ip.checksum_bad.expert", "IP", true},
-    Row{"ip.opt.len.invalid", "IP"},
-    Row{"ip.opt.ptr.before_address", "IP"},
-    Row{"ip.opt.ptr.middle_address", "IP"},
-    Row{"ip.subopt_too_long", "IP"},
-    Row{"ip.cipso.malformed", "IP"},
-    Row{"ipv6.bogus_ipv6_version", "IP"},
-    Row{"ipv6.invalid_header", "IP"},
-    Row{"ipv6.plen_exceeds_framing", "IP"},
-    Row{"ipv6.plen_zero", "IP"},
-    Row{"ipv6.opt.invalid_len", "IP"},
-    Row{"ipv6.opt.header_mismatch", "IP"},
-    Row{"ipv6.opt.jumbo.missing", "IP"},
-    Row{"ipv6.opt.jumbo.prohibited", "IP"},
-    Row{"ipv6.opt.jumbo.truncated", "IP"},
-    Row{"ipv6.opt.jumbo.fragment", "IP"},
-    Row{"icmp.checksum_bad", "ICMP", true},
-    Row{"icmp.ext.checksum_bad", "ICMP", true},
-    Row{"icmpv6.checksum_bad.expert", "ICMPv6", true},
-    Row{"icmpv6.invalid_option_length", "ICMPv6"},
-    Row{"tcp.bogus_header_length", "TCP"},
-    Row{"tcp.short_segment", "TCP"},
-    Row{"tcp.checksum_bad.expert", "TCP", true},
-    Row{"tcp.checksum.ffff", "TCP", true},
-    Row{"tcp.option.len.invalid", "TCP"},
-    Row{"tcp.suboption_malformed", "TCP"},
-    Row{"tcp.options.wscale.shift.invalid", "TCP"},
-    Row{"tcp.non_zero_bytes_after_eol", "TCP"},
-    Row{"tcp.ack.nonzero", "TCP"},
-    Row{"tcp.urgent_pointer.non_zero", "TCP"},
-    Row{"udp.length.bad", "UDP"},
-    Row{"udp.length.bad_zero", "UDP"},
-    Row{"udp.checksum.zero", "UDP", true},
-    Row{"udp.checksum.bad", "UDP", true},
-    Row{"sctp.checksum_bad.expert", "SCTP", true},
-    Row{"sctp.chunk_length.bad", "SCTP"},
-    Row{"sctp.parameter_length.bad", "SCTP"},
-    Row{"sctp.sack_gap_block_malformed", "SCTP"},
-    Row{"sctp.sack_gap_block_out_of_order", "SCTP"},
-    Row{"gre.checksum.incorrect", "GRE", true},
-};
+const Texts expertFields = {
+    {"IP",
+     {"ip.bogus_ip_version", "ip.bogus_header_length", "ip.bogus_ip_length", "ip.checksum_bad.expert",
+      "ip.opt.len.invalid", "ip.opt.ptr.before_address", "ip.opt.ptr.middle_address", "ip.subopt_too_long",
+      "ip.cipso.malformed", "ipv6.bogus_ipv6_version", "ipv6.invalid_header", "ipv6.plen_exceeds_framing",
+      "ipv6.plen_zero", "ipv6.opt.invalid_len", "ipv6.opt.header_mismatch", "ipv6.opt.jumbo.missing",
+      "ipv6.opt.jumbo.prohibited", "ipv6.opt.jumbo.truncated", "ipv6.opt.jumbo.fragment"}},
+    {"ICMP", {"icmp.checksum_bad", "icmp.ext.checksum_bad"}},
+    {"ICMPv6", {"icmpv6.checksum_bad.expert", "icmpv6.invalid_option_length"}},
+    {"TCP",
+     {"tcp.bogus_header_length", "tcp.short_segment", "tcp.checksum_bad.expert", "tcp.checksum.ffff",
+      "tcp.option.len.invalid", "tcp.suboption_malformed", "tcp.options.wscale.shift.invalid",
+      "tcp.non_zero_bytes_after_eol", "tcp.ack.nonzero", "tcp.urgent_pointer.non_zero"}},
+    {"UDP", {"udp.length.bad", "udp.length.bad_zero", "udp.checksum.zero", "udp.checksum.bad"}},
+    {"SCTP",
+     {"sctp.checksum_bad.expert", "sctp.chunk_length.bad", "sctp.parameter_length.bad", "sctp.sack_gap_block_malformed",
+      "sctp.sack_gap_block_out_of_order"}},
+    {"GRE", {"gre.checksum.incorrect"}}};
 
 // "[Malformed Packet: TCP]", in which tshark ran out of octets.
-constexpr std::array malformedNames = {
-    Row{"IPv4]", "IP"}, Row{"IPv6", "IP"},   Row{"ICMP]", "ICMP"}, Row{"ICMPv6", "ICMPv6"}, Row{"TCP", "TCP"},
-    Row{"UDP", "UDP"},  Row{"SCTP", "SCTP"}, Row{"GRE", "GRE"},    Row{"AH]", "IP"},
-};
+const Texts malformedNames = {{"IP", {"IPv4]", "IPv6", "AH]"}},
+                              {"ICMP", {"ICMP]"}},
+                              {"ICMPv6", {"ICMPv6"}},
+                              {"TCP", {"TCP"}},
+                              {"UDP", {"UDP"}},
+                              {"SCTP", {"SCTP"}},
+                              {"GRE", {"GRE"}}};
 
-constexpr std::array tcpdumpTexts = {
-    Row{"bad cksum", "IP", true},
-    Row{"unknown ip ", "IP"},
-    Row{"bad-hlen", "IP"},
-    Row{"bad-len", "IP"},
-    Row{"truncated-ip", "IP"},
-    Row{"[bad length", "IP"},
-    Row{"[bad ptr", "IP"},
-    Row{"[truncated-option]", "IP"},
-    Row{"[|ip", "IP"},
-    Row{"[|hbhopt]", "IP"},
-    Row{"[|dstopt]", "IP"},
-    Row{"[|srcrt]", "IP"},
-    Row{"[|frag]", "IP"},
-    Row{"(rtalert: invalid len", "IP"},
-    Row{"(homeaddr: invalid len", "IP"},
-    Row{"(jumbo: invalid len", "IP"},
-    Row{"[|tcp]", "TCP"},
-    Row{"[bad hdr length", "TCP"},
-    Row{"[bad opt]", "TCP"},
-    Row{"(incorrect", "TCP", true},
-    Row{"[|udp]", "UDP"},
-    Row{"truncated-udp", "UDP"},
-    Row{"bad udp cksum", "UDP", true},
-    Row{"wrong icmp cksum", "ICMP", true},
-    Row{"[|icmp]", "ICMP"},
-    Row{"[bad icmp6 cksum", "ICMPv6", true},
-    Row{"[|icmp6]", "ICMPv6"},
-    Row{"[|gre]", "GRE"},
-    Row{"[|sctp]", "SCTP"},
-    Row{"truncated-sctp", "SCTP"},
-    Row{"bogus chunk length", "SCTP"},
-    Row{"[Bad chunk length", "SCTP"},
-    Row{"[chunk descriptor cut off", "SCTP"},
-};
+const Texts tcpdumpTexts = {
+    {"IP",
+     {"bad cksum", "unknown ip ", "bad-hlen", "bad-len", "truncated-ip", "[bad length", "[bad ptr",
+      "[truncated-option]", "[|ip", "[|hbhopt]", "[|dstopt]", "[|srcrt]", "[|frag]", "(rtalert: invalid len",
+      "(homeaddr: invalid len", "(jumbo: invalid len"}},
+    {"TCP", {"[|tcp]", "[bad hdr length", "[bad opt]", "(incorrect"}},
+    {"UDP", {"[|udp]", "truncated-udp", "bad udp cksum"}},
+    {"ICMP", {"wrong icmp cksum", "[|icmp]"}},
+    {"ICMPv6", {"[bad icmp6 cksum", "[|icmp6]"}},
+    {"GRE", {"[|gre]"}},
+    {"SCTP", {"[|sctp]", "truncated-sctp", "bogus chunk length", "[Bad chunk length", "[chunk descriptor cut off"}}};
 
-void add(Complaints &complaints, std::uint64_t packet, const Row &row, std::string_view text) {
-    complaints[packet].push_back({std::string(row.protocol), row.isChecksum, std::string(text)});
+// Those of the texts of which the test holds.
+template <class Test>
+void addTexts(std::vector<Complaint> &complaints, const std::string &program, const Texts &texts, Test holds) {
+    for (const auto &[protocol, ofProtocol] : texts) {
+        for (const std::string_view text : ofProtocol) {
+            if (holds(text)) {
+                const bool isChecksum =
+                    text.find("checksum") != text.npos || text.find("cksum") != text.npos || text == "(incorrect";
+                complaints.push_back({protocol, isChecksum, program + ' ' + std::string(text)});
+            }
+        }
+    }
 }
 
 } // namespace
@@ -119,22 +76,19 @@ void addTsharkComplaints(const std::string &capture, Complaints &complaints) {
     }
     command += " -o ip.check_checksum:TRUE -o tcp.check_checksum:TRUE -o udp.check_checksum:TRUE"
                " -o 'sctp.checksum:CRC 32c'";
-    for (const Row &row : expertFields) {
-        command += " -e " + std::string(row.text);
+    for (const auto &[protocol, fields] : expertFields) {
+        for (const std::string_view field : fields) {
+            command.append(" -e ").append(field);
+        }
     }
     for (const std::string &line : linesOf(command + " 2>/dev/null")) {
         const std::vector<std::string> cells = split(line, '\t');
-        const std::uint64_t packet = std::stoull(cells.at(0));
-        for (std::size_t i = 0; i < expertFields.size(); ++i) {
-            if (!cells.at(i + 2).empty()) {
-                add(complaints, packet, expertFields[i], "tshark " + std::string(expertFields[i].text));
-            }
-        }
-        for (const Row &row : malformedNames) {
-            if (cells[1].find("[Malformed Packet: " + std::string(row.text)) != std::string::npos) {
-                add(complaints, packet, row, "tshark malformed " + std::string(row.text));
-            }
-        }
+        std::vector<Complaint> &ofPacket = complaints[std::stoull(cells.at(0))];
+        std::size_t cell = 2;
+        addTexts(ofPacket, "tshark", expertFields, [&](std::string_view) { return !cells.at(cell++).empty(); });
+        addTexts(ofPacket, "tshark malformed", malformedNames, [&](std::string_view name) {
+            return cells[1].find("[Malformed Packet: " + std::string(name)) != std::string::npos;
+        });
     }
 }
 
@@ -147,11 +101,8 @@ void addTcpdumpComplaints(const std::string &capture, Complaints &complaints) {
         if (std::sscanf(line.c_str(), "%llu %*2u:%*2u:%2u.", &number, &seconds) == 2) {
             packet = number;
         }
-        for (const Row &row : tcpdumpTexts) {
-            if (line.find(row.text) != std::string::npos) {
-                add(complaints, packet, row, "tcpdump " + std::string(row.text));
-            }
-        }
+        addTexts(complaints[packet], "tcpdump", tcpdumpTexts,
+                 [&](std::string_view text) { return line.find(text) != std::string::npos; });
     }
 }
 

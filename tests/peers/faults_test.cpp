@@ -159,14 +159,16 @@ TEST(Faults, areThoseThatOthersName) {
     Differences found;
     PacketChecks checks;
     std::size_t faults = 0;
+    std::size_t said = 0;
     for (std::size_t i = 0; i < packets.all.size(); ++i) {
         const PcapPacket &packet = packets.all[i];
         const auto ours = checks.check(packet.octets, packet.wireOctets);
         faults += ours.size();
+        said += complaints[i + 1].size();
         compare(complaints[i + 1], ours, packet, found);
     }
     EXPECT_EQ(found, Differences()) << packets.all.size() << " packets";
-    EXPECT_GT(complaints.size(), packets.samples.size()); // the others said something, and so did the checks
+    EXPECT_GT(said, packets.samples.size()); // the others said something, and so did the checks
     EXPECT_GT(faults, packets.samples.size());
 }
 
