@@ -3,7 +3,15 @@
 
 #include <cstddef>
 
-#ifdef __SANITIZE_ADDRESS__
+#ifdef __has_feature // clang; g++ has macros for them
+#if __has_feature(address_sanitizer) || __has_feature(thread_sanitizer)
+#define NETFLOOR_OTHER_HEAP
+#endif
+#elif defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
+#define NETFLOOR_OTHER_HEAP
+#endif
+
+#ifdef NETFLOOR_OTHER_HEAP
 
 std::optional<std::uint64_t> netfloor::test::allocations() {
     return std::nullopt;

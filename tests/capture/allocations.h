@@ -7,7 +7,7 @@
 
 namespace netfloor::test {
 
-// Blocks that this thread has been given so far; none under the address sanitizer, which has an allocator of its own.
+// Blocks that this thread has been given so far; none under a sanitizer, which has an allocator of its own.
 [[nodiscard]] std::optional<std::uint64_t> allocations();
 
 } // namespace netfloor::test
