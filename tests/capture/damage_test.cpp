@@ -30,7 +30,7 @@ struct Ending {
     std::string sentence;
 };
 
-Ending readAll(const std::string &path) {
+Ending endingOf(const std::string &path) {
     Ending ending;
     try {
         CaptureFile capture(path);
@@ -77,7 +77,7 @@ TEST(Damage, isReportedWithItsPlaceAfterThePacketsBeforeIt) {
     };
     for (const Row &row : rows) {
         SCOPED_TRACE(row.reason);
-        const Ending ending = readAll(writeFile("damaged", row.file));
+        const Ending ending = endingOf(writeFile("damaged", row.file));
         EXPECT_EQ(ending.packets, 1U);
         EXPECT_EQ(ending.lost, 2U);
         EXPECT_EQ(ending.position, row.position);
@@ -90,9 +90,9 @@ TEST(Damage, isReportedWithItsPlaceAfterThePacketsBeforeIt) {
 TEST(Damage, isNoLargePacket) {
     const std::uint32_t size = std::uint32_t{3} << 20;
     const Octets file = Numbers{true}.pcapHead(0xa1b2c3d4, 4 << 20, 1) + pcapRecord(size, Octets(size, 7));
-    EXPECT_EQ(readAll(writeFile("large", file)).packets, 1U);
+    EXPECT_EQ(endingOf(writeFile("large", file)).packets, 1U);
     const Octets blocks = pcapngSection() + pcapngInterface(1, {}) + pcapngPacket(0, 1, Octets(size, 7));
-    EXPECT_EQ(readAll(writeFile("large", blocks)).packets, 1U);
+    EXPECT_EQ(endingOf(writeFile("large", blocks)).packets, 1U);
 }
 
 // Of the process, by its name in /proc/self/status.
@@ -152,7 +152,7 @@ TEST(Memory, staysBounded) {
             GTEST_SKIP() << "this system does not measure the peak of memory";
         }
         const long before = statusKiB("VmRSS");
-        const Ending ending = readAll(row.path);
+        const Ending ending = endingOf(row.path);
         EXPECT_LT(statusKiB("VmHWM") - before, mostKiB);
         EXPECT_EQ(ending.packets, row.packets);
         EXPECT_NE(ending.sentence.find(row.sentence), std::string::npos) << ending.sentence;

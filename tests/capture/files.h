@@ -5,9 +5,11 @@
 #include <algorithm>
 #include <cstdint>
 #include <string>
+#include <vector>
 
 #include <zlib.h>
 
+#include "netfloor-capture/capture_file.h"
 #include "support/captures.h"
 
 namespace netfloor::test {
@@ -45,5 +47,11 @@ inline std::string writePacked(const std::string &name, const Octets &start, con
     gzclose(file);
     return path;
 }
+
+// What a capture says of a packet. Another capture may have the packet at another place.
+[[nodiscard]] std::string told(const CapturedPacket &packet, bool withPlace = false);
+
+// All packets, and what ends them if it is not the end.
+[[nodiscard]] std::vector<std::string> readAll(CaptureFile capture, bool withPlaces = false);
 
 } // namespace netfloor::test

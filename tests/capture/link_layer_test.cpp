@@ -13,12 +13,22 @@ namespace {
 
 constexpr int null = 0;
 constexpr int ethernet = 1;
+constexpr int ppp = 9;
 constexpr int pppSerial = 50;
+constexpr int pppOverEthernet = 51;
+constexpr int raw = 101;
 constexpr int ciscoHdlc = 104;
 constexpr int frameRelay = 107;
+constexpr int loopback = 108;
+constexpr int linuxCooked = 113;
+constexpr int pppWithDirectionInFront = 166;
+constexpr int pppWithDirection = 204;
 constexpr int ciscoHdlcWithDirection = 205;
 constexpr int frameRelayWithDirection = 206;
 constexpr int mpls = 219;
+constexpr int rawIpv4 = 228;
+constexpr int rawIpv6 = 229;
+constexpr int linuxCooked2 = 276;
 
 const Octets addresses = hex("ff*6 02*6");
 
@@ -54,6 +64,31 @@ TEST(LinkLayer, endsAtTheIpHeader) {
         {frameRelay, hex("1841 03cf 0021")},
         {frameRelay, hex("1841 0800")},
         {frameRelayWithDirection, hex("00 1841 03cc")},
+        {ethernet, addresses + hex("0800")},
+        {ethernet, addresses + hex("88a8 0001 8100 0002 8100 0003 0800")},
+        {ethernet, addresses + hex("8864 11 00 0001 0026 0021")},
+        {ethernet, addresses + hex("8100 0001 8864 11 00 0001 0026 0021")},
+        {ethernet, addresses + hex("002c aaaa03 000000 0800")}, // SNAP
+        {linuxCooked, hex("0000 0001 0006 02*6 0000 0800")},
+        {linuxCooked, hex("0000 0001 0006 02*6 0000 8100 0001 0800")},
+        {linuxCooked2, hex("0800 0000 00000001 0001 00 06 02*8")},
+        {raw, {}},
+        {12, {}},
+        {14, {}},
+        {rawIpv4, {}},
+        {rawIpv6, {}, "60*40"},
+        {null, hex("02000000")},
+        {null, hex("00000002")},
+        {null, hex("1e000000"), "60*40"},
+        {loopback, hex("00000002")},
+        {loopback, hex("0000001c"), "60*40"},
+        {ppp, hex("ff03 0021")},
+        {ppp, hex("0021")},
+        {ppp, hex("21")},
+        {pppSerial, hex("ff03 0021")},
+        {pppOverEthernet, hex("11 00 0001 0026 0021")},
+        {pppWithDirectionInFront, hex("00 03 0021")},
+        {pppWithDirection, hex("00 ff03 0021")},
     };
     for (const Row &row : rows) {
         SCOPED_TRACE(std::to_string(row.linkType) + ": " + hexText(row.head));
@@ -86,6 +121,17 @@ TEST(LinkLayer, saysWhatIsNoIp) {
         {frameRelay, hex("1841 0380 0000"), "cut inside the SNAP header"},
         {null, hex("07000000 00*8"), "address family 7"},
         {null, hex("78563412 00*8"), "address family 2018915346"},
+        {ethernet, addresses + hex("8864 11 00 0001 0026 c021"), "PPP LCP"},
+        {ethernet, addresses + hex("8863"), "PPPoE discovery"},
+        {ethernet, addresses + hex("0026 4242 03"), "spanning tree"},
+        {ethernet, addresses + hex("0026 e0e0 03"), "802.3 frame"},
+        {ethernet, addresses + hex("1234"), "EtherType 0x1234"},
+        {linuxCooked, hex("0000 0001 0006 02*6 0000 0806"), "ARP"},
+        {linuxCooked2, hex("88cc 0000 00000001 0001 00 06 02*8"), "LLDP"},
+        {ppp, hex("ff03 8021"), "PPP IPCP"},
+        {pppSerial, hex("ff03 8057"), "PPP IPv6CP"},
+        {pppWithDirectionInFront, hex("01 03 c023"), "PPP PAP"},
+        {147, {}, "link type 147"}, // for private use
     };
     for (const Row &row : rows) {
         SCOPED_TRACE(hexText(row.packet));

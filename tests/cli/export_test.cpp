@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: MIT
 // The database, as a user of sqlite3 meets it.
 #include <string>
+#include <vector>
 
 #include <gtest/gtest.h>
 
@@ -10,16 +11,9 @@ using namespace netfloor::test;
 
 namespace {
 
-struct Case {
-    const char *line;
-    const char *out;
-};
-
-template <std::size_t count>
-void check(const Case (&cases)[count]) {
+void checkSql(const std::vector<ExactCase> &cases) {
     for (const auto &[line, out] : cases) {
-        const Outcome outcome = shell(std::string("cd $T; sql() { sqlite3 \"$@\"; }; ") + line);
-        EXPECT_EQ(outcome.out, out) << line << '\n' << outcome.err;
+        checkExact({{"cd $T; sql() { sqlite3 \"$@\"; }; " + line, out}});
     }
 }
 
@@ -61,7 +55,7 @@ TEST(Export, givesViewsAndNames) {
                                            {ipv4({.protocol = 132, .payload = abort})},
                                            {ipv4({.protocol = 132, .payload = data})},
                                            {ipv4({.protocol = 17, .payload = udp(2152, 2152, gtp)})}}));
-    check({
+    checkSql({
         {"netfloor export --to views.db views.pcap; sql views.db 'SELECT packet, ip_source, cause_code, cause_name, "
          "cause_value FROM aborts'",
          "2|10.0.0.1|9|No User Data|aaaaaaaa\n"},
@@ -75,7 +69,7 @@ TEST(Export, givesViewsAndNames) {
 }
 
 TEST(Export, keepsWhatIsThere) {
-    check({
+    checkSql({
         {"netfloor export --to kept.db $C/icmp-types.pcapng; netfloor export --to kept.db $C/icmp-types.pcapng; echo "
          "$?",
          "2\n"},
@@ -107,7 +101,7 @@ TEST(Export, keepsWhatIsThere) {
 
 // Of many blocks, with rows of all kinds, and an error in the middle of one.
 TEST(Export, isTheSameWithAnyNumberOfJobs) {
-    check({
+    checkSql({
         {"netfloor --write once.pcapng $C/*.pcap* >out && netfloor --write many.pcapng once.pcapng{,,,} >out && "
          "{ cat many.pcapng; head -c 50 once.pcapng; } >cut.pcapng && for jobs in 1 2 5; do "
          "netfloor export --jobs $jobs --to $jobs.db many.pcapng once.pcapng cut.pcapng 2>$jobs.err; echo $?; done; "
@@ -124,7 +118,7 @@ TEST(Export, isTheSameWithAnyNumberOfJobs) {
 }
 
 TEST(Export, tellsHowACaptureEnded) {
-    check({
+    checkSql({
         {"head -c 1000 $C/tcp-md5-bgp.pcap >cut.pcap; netfloor export --to cut.db cut.pcap $C/icmp-types.pcapng; echo "
          "$?; "
          "sql cut.db 'SELECT packets, problem IS NULL FROM captures'",

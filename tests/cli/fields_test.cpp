@@ -15,10 +15,7 @@ namespace netfloor::test {
 namespace {
 
 TEST(Fields, showWhatAFieldIs) {
-    const struct {
-        const char *line;
-        const char *out;
-    } cases[] = {
+    checkExact({
         // By name, in any case: fields that differ in their ids alone stand together.
         {"netfloor fields VERSION | head -n 14",
          R"(Version
@@ -100,12 +97,7 @@ unkown option type, discard packet
 2 fields, 2 key fields among them
 40 fields, 10 key fields among them
 )"},
-    };
-    for (const auto &[line, out] : cases) {
-        const Outcome outcome = shell(line);
-        EXPECT_EQ(outcome.out, out) << line;
-        EXPECT_EQ(outcome.err, "") << line;
-    }
+    });
 }
 
 TEST(Fields, areListedInEachForm) {
@@ -127,29 +119,17 @@ TEST(Fields, areListedInEachForm) {
     EXPECT_EQ(protocol[0]["values"].back(), nlohmann::json({{"from", 138}, {"to", 252}, {"name", "Unassigned"}}));
     EXPECT_EQ(protocol[0]["layout"], nlohmann::json({{"pieces", {{1, 8}}}, {"count", 1}, {"step", 8}}));
 
-    const struct {
-        const char *line;
-        int exitCode;
-        const char *err;
-    } refused[] = {
-        {"netfloor fields 'No Such Field'", 2, "no field of that name or id"},
-        {"netfloor fields 151", 2, "no field of that name or id"},
-        {"netfloor fields --json --markdown", 2, "excludes"},
-        {"netfloor fields --plugin $T/absent.so", 5, "no such file"},
-    };
-    for (const auto &[line, exitCode, err] : refused) {
-        const Outcome outcome = shell(line);
-        EXPECT_EQ(outcome.exitCode, exitCode) << line;
-        EXPECT_NE(outcome.err.find(err), std::string::npos) << outcome.err;
-        EXPECT_EQ(outcome.out, "") << line;
-    }
+    check({
+        {"netfloor fields 'No Such Field'", 2, "", "no field of that name or id"},
+        {"netfloor fields 151", 2, "", "no field of that name or id"},
+        {"netfloor fields --json --markdown", 2, "", "excludes"},
+        {"netfloor fields --plugin $T/absent.so", 5, "", "no such file"},
+    });
 }
 
 TEST(Fields, pagesOfReferenceAreCurrent) {
-    for (const char *const line : {"netfloor fields --markdown | cmp - $C/../../docs/fields.md || echo write it anew",
-                                   "netfloor fields --tables | cmp - $C/../../docs/columns.md || echo write it anew"}) {
-        EXPECT_EQ(shell(line).out, "") << line;
-    }
+    checkExact({{"netfloor fields --markdown | cmp - $C/../../docs/fields.md || echo write it anew", ""},
+                {"netfloor fields --tables | cmp - $C/../../docs/columns.md || echo write it anew", ""}});
 }
 
 } // namespace

@@ -55,10 +55,7 @@ TEST(Json, holdsWhateverPacketsHold) {
 }
 
 TEST(Json, endsInGoodOrder) {
-    const struct {
-        const char *line;
-        const char *out;
-    } cases[] = {
+    checkExact({
         {"netfloor json --packet 2 --where icmp $C/icmp-types.pcapng | jq -c '[.packet, .file]'", "[2,null]\n"},
         {"netfloor json --count 1 $C/icmp-types.pcapng $C/tcp-md5-bgp.pcap | jq -c '.file | split(\"/\") | last'",
          "\"icmp-types.pcapng\"\n\"tcp-md5-bgp.pcap\"\n"},
@@ -68,11 +65,7 @@ TEST(Json, endsInGoodOrder) {
         {"netfloor json $C/icmp-types.pcapng >/dev/full; echo $?", "6\n"},
         {"netfloor json --schema | jq .properties.schema.const", "1\n"},
         {"netfloor json; echo $?", "2\n"},
-    };
-    for (const auto &[line, out] : cases) {
-        const Outcome outcome = shell(line);
-        EXPECT_EQ(outcome.out, out) << line << '\n' << outcome.err;
-    }
+    });
 }
 
 } // namespace

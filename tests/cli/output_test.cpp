@@ -26,7 +26,7 @@ std::string shown(const std::string &text) {
 }
 
 TEST(UntrustedText, isShownByItsCharactersAtEachPlaceOfEachLength) {
-    for (const std::size_t blanks : {0, 32, 33}) {
+    for (const std::size_t blanks : {0U, 32U, 33U}) {
         for (std::size_t size = 1; size <= 50; ++size) {
             for (std::size_t place = 0; place < size; ++place) {
                 for (const char character : {'\0', '\x1f', ' ', '~', '\x7f', '\x80', '\xa0', '\xff'}) {

@@ -26,14 +26,6 @@ struct Page {
     [[nodiscard]] const json &last(char letter) const { return lines[letters.rfind(letter)]; }
 };
 
-std::size_t countOf(const std::string &text, const std::string &part) {
-    std::size_t count = 0;
-    for (std::size_t at = text.find(part); at != std::string::npos; at = text.find(part, at + 1)) {
-        ++count;
-    }
-    return count;
-}
-
 Page pageOf(const std::string &text) {
     const std::string start = "<script type=\"text/plain\" id=\"data\">\n";
     Page page;
@@ -73,11 +65,8 @@ void checkItems(const json &items, const json &row, std::size_t octets, std::siz
 }
 
 TEST(Page, holdsEveryPacketOfEveryCapture) {
-    for (const auto &entry : std::filesystem::directory_iterator(NETFLOOR_CAPTURES)) {
-        const std::string name = entry.path().filename();
-        if (entry.path().extension() == ".md") {
-            continue;
-        }
+    for (const std::string &path : testCaptures()) {
+        const std::string name = std::filesystem::path(path).filename();
         SCOPED_TRACE(name);
         const Outcome outcome = shell("netfloor html $C/" + name);
         const Page page = pageOf(outcome.out);

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: MIT
 // Packets inside packets, and payloads that are known by name, as the command shows them.
+#include <algorithm>
 #include <string>
 
 #include <gtest/gtest.h>
@@ -23,48 +24,34 @@ Octets gtpU(const Octets &inner) {
 
 const Octets inner = ipv4({.protocol = 17, .payload = udp(7, 9, hex("61*20"))});
 
-std::string run(const std::string &command, const std::vector<PcapPacket> &packets) {
-    return shell("netfloor " + command + " " + writeFile("tunnel.pcap", pcapFile(linkTypeRaw, packets))).out;
-}
-
-std::size_t count(const std::string &text, const std::string &part) {
-    std::size_t found = 0;
-    for (std::size_t at = text.find(part); at != std::string::npos; at = text.find(part, at + 1)) {
-        ++found;
-    }
-    return found;
+void writeTunnel(const Octets &packet, std::size_t captured = std::string::npos) {
+    const Octets start(packet.begin(), packet.begin() + static_cast<std::ptrdiff_t>(std::min(captured, packet.size())));
+    writeFile("tunnel.pcap", pcapFile(linkTypeRaw, {{start, static_cast<std::uint32_t>(packet.size())}}));
 }
 
 TEST(Tunnels, openInDetail) {
-    const std::string text = run("detail", {{gtpU(inner)}});
-    EXPECT_NE(text.find("GTP-U: G-PDU, 48 octets, TEID 0x1b2c\n"), std::string::npos) << text;
-    EXPECT_NE(text.find("[shown below: octets 36 to 83]\n"), std::string::npos) << text;
-    EXPECT_NE(text.find("  Inside GTP-U 0x1b2c, from octet 36 on\n"), std::string::npos) << text;
-    EXPECT_NE(text.find("[layer 1, octets 36 to "), std::string::npos) << text;
-    EXPECT_EQ(count(text, "UDP Source Port"), 2U) << text;
-    EXPECT_EQ(count(text, "Data=20 octets\n"), 1U) << text;
+    writeTunnel(gtpU(inner));
+    check(
+        {{"netfloor detail $T/tunnel.pcap", 0,
+          "UDP Source Port...GTP-U: G-PDU, 48 octets, TEID 0x1b2c\n...[shown below: octets 36 to 83]\n..."
+          "  Inside GTP-U 0x1b2c, from octet 36 on\n...UDP Source Port...Data=20 octets\n...[layer 1, octets 36 to "}});
 }
 
 TEST(Tunnels, openAsFarAsTheyWereCaptured) {
-    Octets cut = gtpU(inner);
-    const auto wireOctets = static_cast<std::uint32_t>(cut.size());
-    cut.resize(36 + 22); // two octets of the inner UDP header
-    const std::string text = run("detail", {{cut, wireOctets}});
-    EXPECT_NE(text.find("Inside GTP-U 0x1b2c"), std::string::npos) << text;
-    EXPECT_EQ(count(text, "UDP Source Port"), 2U) << text;
-    EXPECT_EQ(count(text, "UDP Destination Port="), 1U) << text;
-    EXPECT_NE(text.find("cut by the snap length"), std::string::npos) << text;
+    writeTunnel(gtpU(inner), 36 + 22); // two octets of the inner UDP header
+    check({{"netfloor detail $T/tunnel.pcap", 0,
+            "UDP Destination Port=...Inside GTP-U 0x1b2c...UDP Source Port...cut by the snap length"},
+           {"netfloor detail $T/tunnel.pcap | grep -c 'UDP Destination Port='", 0, "1\n"}});
 }
 
 TEST(Tunnels, haveTheirFaultsNamedWithTheirOctets) {
     Octets wrong = inner;
     wrong[25] = 0xff; // the length of UDP
-    const std::string text = run("verify", {{gtpU(wrong)}});
-    EXPECT_NE(text.find("UDP: the length is 255 octets, and the datagram has 28, at octet 60"), std::string::npos)
-        << text;
-    const Octets cut = ipv4({.protocol = 17, .payload = hex("0001 0002 00")});
-    const std::string ofPlugin = run("verify", {{gtpU(cut)}});
-    EXPECT_NE(ofPlugin.find("1 octet after 'UDP Destination Port' at octet 59"), std::string::npos) << ofPlugin;
+    writeTunnel(gtpU(wrong));
+    check(
+        {{"netfloor verify $T/tunnel.pcap", 1, "UDP: the length is 255 octets, and the datagram has 28, at octet 60"}});
+    writeTunnel(gtpU(ipv4({.protocol = 17, .payload = hex("0001 0002 00")})));
+    check({{"netfloor verify $T/tunnel.pcap", 1, "1 octet after 'UDP Destination Port' at octet 59"}});
 }
 
 TEST(Payloads, thatAreKnownHaveALine) {
@@ -82,8 +69,8 @@ TEST(Payloads, thatAreKnownHaveALine) {
         {inUdp(2152, hex("00*8")), "Data=8 octets\n"}, // no version of GTP
     };
     for (const auto &[packet, line] : rows) {
-        const std::string text = run("detail", {{packet}});
-        EXPECT_NE(text.find(line), std::string::npos) << line << text;
+        writeTunnel(packet);
+        check({{"netfloor detail $T/tunnel.pcap", 0, line}});
     }
 }
 

@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: MIT
 // A capture as Arrow record batches, as a strict consumer reads them.
 #include <array>
-#include <filesystem>
 #include <stdexcept>
 #include <thread>
 
@@ -86,11 +85,7 @@ std::string readRows(const std::string &path, TextRows &texts) {
 
 TEST(Columns, haveTheRowsOfAllCaptures) {
     std::size_t rows = 0;
-    for (const auto &entry : std::filesystem::directory_iterator(NETFLOOR_CAPTURES)) {
-        const std::string path = entry.path().string();
-        if (entry.path().extension() == ".md") {
-            continue;
-        }
+    for (const std::string &path : testCaptures()) {
         SCOPED_TRACE(path);
         TextRows wanted;
         const std::string error = readRows(path, wanted);

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: MIT
 #include "support/captures.h"
 
+#include <filesystem>
 #include <fstream>
 #include <utility>
 
@@ -28,6 +29,16 @@ std::string writeFile(const std::string &name, const Octets &octets) {
     std::ofstream(path, std::ios::binary)
         .write(reinterpret_cast<const char *>(octets.data()), static_cast<std::streamsize>(octets.size()));
     return path;
+}
+
+std::vector<std::string> testCaptures() {
+    std::vector<std::string> paths;
+    for (const auto &entry : std::filesystem::directory_iterator(NETFLOOR_CAPTURES)) {
+        if (entry.path().extension() != ".md") {
+            paths.push_back(entry.path().string());
+        }
+    }
+    return paths;
 }
 
 Octets pcapFile(std::uint32_t linkType, const std::vector<PcapPacket> &packets) {
