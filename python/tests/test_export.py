@@ -7,7 +7,6 @@ from collections.abc import Iterator
 from pathlib import Path
 from typing import Any
 
-import duckdb
 import netfloor
 import pyarrow as pa
 import pyarrow.parquet
@@ -59,44 +58,3 @@ def test_parquet_has_the_rows_of_export(database: sqlite3.Connection, table: str
         rows += len(found)
     assert rows > 0
 
-
-@pytest.fixture(scope="module")
-def scanned(database: sqlite3.Connection) -> Iterator[duckdb.DuckDBPyConnection]:
-    """The scanned captures in DuckDB, with what of export is no table of packets: names, files, views."""
-    connection = duckdb.connect()
-    connection.execute('CREATE TABLE value_names("column" TEXT, value BIGINT, name TEXT)')
-    connection.executemany("INSERT INTO value_names VALUES (?, ?, ?)", database.execute("SELECT * FROM value_names").fetchall())
-    connection.execute("CREATE TABLE captures(capture BIGINT, file TEXT)")
-    connection.executemany("INSERT INTO captures VALUES (?, ?)", numbered(database))
-    for table in TABLES:
-        # The views of export count in nanoseconds.
-        columns = "*" if table == "causes" else "* REPLACE (epoch_ns(time) AS time)"
-        for capture, path in numbered(database):
-            rows = netfloor.scan(path, table)
-            verb = f"CREATE TABLE {table} AS" if capture == 1 else f"INSERT INTO {table}"
-            connection.execute(f"{verb} SELECT {capture} AS capture, {columns} FROM rows")
-    for (view,) in database.execute("SELECT sql FROM sqlite_master WHERE type = 'view'").fetchall():
-        connection.execute(view)
-    yield connection
-    connection.close()
-
-
-# Those of the README, with an order that leaves no choice.
-QUESTIONS = [
-    "SELECT tunnel, outer_source, outer_destination, count(*) FROM tunnels GROUP BY 1, 2, 3 ORDER BY 4 DESC, 1, 2, 3",
-    """SELECT name, count(*) FROM chunks JOIN value_names ON "column" = 'sctp_chunk_type' AND value = sctp_chunk_type
-       GROUP BY 1 ORDER BY 2 DESC, 1""",
-    "SELECT sctp_tsn, times, nanoseconds FROM retransmissions ORDER BY first_packet",
-    "SELECT packet, ip_source, cause_code, cause_name FROM aborts ORDER BY capture, packet",
-    "SELECT file, packet, checks_damage FROM packets JOIN captures USING(capture) WHERE checks_damaged ORDER BY 1, 2",
-    "SELECT ip_source, source_port, ip_protocol, sum(packets) FROM flows GROUP BY 1, 2, 3 ORDER BY 4 DESC, 1, 2, 3 LIMIT 50",
-]
-
-
-@pytest.mark.parametrize("question", QUESTIONS)
-def test_duckdb_answers_as_the_database(
-    database: sqlite3.Connection, scanned: duckdb.DuckDBPyConnection, question: str
-) -> None:
-    answer = database.execute(question).fetchall()
-    assert answer
-    assert scanned.execute(question).fetchall() == answer

@@ -1,8 +1,7 @@
 # SPDX-License-Identifier: MIT
-"""Shards in this process, under Dask and under GNU parallel."""
+"""Shards in this process and under Dask."""
 
 import pickle
-import subprocess
 from pathlib import Path
 
 import dask.dataframe
@@ -11,7 +10,7 @@ import pandas
 import pyarrow as pa
 import pytest
 
-from conftest import CAPTURES, COMMAND, write_plan
+from conftest import CAPTURES, write_plan
 
 
 def rows(shard: netfloor.Shard) -> pandas.DataFrame:
@@ -43,15 +42,6 @@ def test_dask_reads_a_shard_a_partition(sctp_capture: Path) -> None:
     frame = dask.dataframe.from_map(rows, netfloor.plan(sctp_capture, 7))
     assert frame.npartitions == 7
     assert frame["sctp_tsn"].sum().compute(scheduler="processes", num_workers=2) == sum(range(1000))
-
-
-def test_gnu_parallel_reads_a_shard_a_process(sctp_capture: Path, tmp_path: Path) -> None:
-    plan = write_plan(sctp_capture, 7)
-    keys = f"{COMMAND} keys --per chunk"
-    parts = subprocess.run(f"seq 7 | parallel -k -j2 {keys} --shard {plan}:{{}}", shell=True, check=True, capture_output=True)
-    whole = subprocess.run(f"{keys} {sctp_capture}", shell=True, check=True, capture_output=True)
-    assert whole.stdout.count(b"\n") == 1001
-    assert parts.stdout == whole.stdout
 
 
 def test_a_plan_of_the_command_has_the_same_shards(tmp_path: Path) -> None:
