@@ -108,16 +108,8 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t *data, std::size_t size
 
 extern "C" std::size_t LLVMFuzzerCustomMutator(std::uint8_t *data, std::size_t size, std::size_t mostOctets,
                                                unsigned seed) {
-    using namespace netfloor;
-    if (size < fuzz::headOctets || mostOctets <= fuzz::headOctets) {
-        std::fill_n(data, std::min(fuzz::headOctets, mostOctets), std::uint8_t{0});
-        return std::min(fuzz::headOctets, mostOctets);
-    }
-    compare::Random random(seed);
-    if (random.oneIn(4)) { // other options
-        data[random.below(fuzz::headOctets)] = random.oneIn(3) ? 0 : random.octet();
-        return size;
-    }
-    return fuzz::headOctets + compare::mutatePacket({data + fuzz::headOctets, mostOctets - fuzz::headOctets},
-                                                    size - fuzz::headOctets, random.next());
+    const auto changeHead = [](std::span<std::uint8_t> head, netfloor::compare::Random &random) {
+        head[random.below(head.size())] = random.oneIn(3) ? 0 : random.octet();
+    };
+    return netfloor::compare::mutateInput({data, mostOctets}, size, netfloor::fuzz::headOctets, seed, changeHead);
 }

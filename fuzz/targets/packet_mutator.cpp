@@ -44,10 +44,7 @@ std::size_t insertPart(Span room, std::size_t size, Random &random) {
     return assign(room, packet);
 }
 
-} // namespace
-
-std::size_t mutatePacket(std::span<std::uint8_t> room, std::size_t size, std::uint64_t seed) {
-    Random random(seed);
+std::size_t mutatePacket(Span room, std::size_t size, Random &random) {
     switch (random.below(8)) {
     case 0: size = assign(room, generatedPacket(random)); break;
     case 1:
@@ -59,6 +56,23 @@ std::size_t mutatePacket(std::span<std::uint8_t> room, std::size_t size, std::ui
         fitLength(room.first(size));
     }
     return size;
+}
+
+} // namespace
+
+std::size_t mutateInput(std::span<std::uint8_t> room, std::size_t size, std::size_t headOctets, unsigned seed,
+                        void (*changeHead)(std::span<std::uint8_t> head, Random &random)) {
+    if (size < headOctets || room.size() <= headOctets) {
+        const auto head = room.first(std::min(headOctets, room.size()));
+        std::ranges::fill(head, std::uint8_t{0});
+        return head.size();
+    }
+    Random random(seed);
+    if (random.oneIn(5)) {
+        changeHead(room.first(headOctets), random);
+        return size;
+    }
+    return headOctets + mutatePacket(room.subspan(headOctets), size - headOctets, random);
 }
 
 } // namespace netfloor::compare

@@ -6,9 +6,13 @@
 #include <cstdint>
 #include <span>
 
+#include "random.h"
+
 namespace netfloor::compare {
 
-// Changes the packet that fills the first `size` octets of `room`. Gives its new size.
-std::size_t mutatePacket(std::span<std::uint8_t> room, std::size_t size, std::uint64_t seed);
+// Changes an input, which fills the first `size` octets of `room`: its head, by `changeHead`, or the packet after that.
+// Gives the new size.
+std::size_t mutateInput(std::span<std::uint8_t> room, std::size_t size, std::size_t headOctets, unsigned seed,
+                        void (*changeHead)(std::span<std::uint8_t> head, Random &random));
 
 } // namespace netfloor::compare

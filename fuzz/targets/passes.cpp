@@ -72,16 +72,9 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t *data, std::size_t size
 
 extern "C" std::size_t LLVMFuzzerCustomMutator(std::uint8_t *data, std::size_t size, std::size_t mostOctets,
                                                unsigned seed) {
-    using namespace netfloor::compare;
-    if (size < planOctets || mostOctets <= planOctets) {
-        std::fill_n(data, std::min(planOctets, mostOctets), std::uint8_t{0});
-        return std::min(planOctets, mostOctets);
-    }
-    Random random(seed);
-    if (random.oneIn(6)) { // another host
-        data[0] = random.oneIn(4) ? 0 : static_cast<std::uint8_t>(random.octet() & random.octet());
-        std::generate_n(data + 1, planOctets - 1, [&random] { return random.octet(); });
-        return size;
-    }
-    return planOctets + mutatePacket({data + planOctets, mostOctets - planOctets}, size - planOctets, random.next());
+    const auto changeHead = [](std::span<std::uint8_t> head, netfloor::compare::Random &random) {
+        std::ranges::generate(head, [&random] { return random.octet(); });
+        head[0] = random.oneIn(4) ? 0 : static_cast<std::uint8_t>(random.octet() & random.octet());
+    };
+    return netfloor::compare::mutateInput({data, mostOctets}, size, netfloor::compare::planOctets, seed, changeHead);
 }
