@@ -13,7 +13,7 @@ work=$(mktemp -d)
 trap 'rm -rf "$work"' EXIT
 command -v abidiff >/dev/null || { echo "abidiff is missing (abigail-tools)"; exit 77; }
 
-# The plug-in has no debug information, so that its types come from the headers, and its exports from its file.
+# The plug-in has no debug information, so that its types come from the headers.
 {
     for header in "$include"/netfloor/*.h; do echo "#include <netfloor/${header##*/}>"; done
     echo 'int netfloorBoundaryNumber[NETFLOOR_BOUNDARY_ABI];'
