@@ -6,7 +6,6 @@
 //     NETFLOOR_PEER_CAPTURES=FOLDER build/tests/test_peers --gtest_filter='Faults.*'
 #include <algorithm>
 #include <cstdlib>
-#include <filesystem>
 #include <map>
 #include <set>
 #include <string>
@@ -142,10 +141,8 @@ TEST(Faults, areThoseThatOthersName) {
     }
     const char *const other = std::getenv("NETFLOOR_PEER_CAPTURES");
     Packets packets;
-    for (const auto &entry : std::filesystem::directory_iterator(other == nullptr ? NETFLOOR_CAPTURES : other)) {
-        if (entry.path().extension() != ".md") {
-            packets.addCapture(entry.path());
-        }
+    for (const std::string &file : other == nullptr ? testCaptures() : testCaptures(other)) {
+        packets.addCapture(file);
     }
     ASSERT_FALSE(packets.samples.empty());
     for (const Octets &packet : packets.samples) {

@@ -24,14 +24,11 @@ struct Packet {
         return std::any_of(md.fields.begin(), md.fields.end(), test);
     }
 
-    [[nodiscard]] bool has(std::uint32_t id) const {
-        return any([id](const FieldReport &field) { return field.id == id; });
-    }
+    [[nodiscard]] bool has(std::uint32_t id) const { return value(id).has_value(); }
 
     // Of the first field of that id.
     [[nodiscard]] std::optional<std::uint32_t> value(std::uint32_t id) const {
-        const auto found =
-            std::find_if(md.fields.begin(), md.fields.end(), [id](const FieldReport &field) { return field.id == id; });
+        const auto found = std::ranges::find(md.fields, id, &FieldReport::id);
         return found == md.fields.end() ? std::nullopt : std::optional(found->value);
     }
 };

@@ -5,7 +5,6 @@
 //     NETFLOOR_PEER_CAPTURES=FOLDER build/tests/test_peers
 #include <algorithm>
 #include <cstdlib>
-#include <filesystem>
 #include <set>
 #include <string>
 #include <string_view>
@@ -20,6 +19,7 @@
 #include "peers/packet.h"
 #include "peers/pairs.h"
 #include "peers/peer_output.h"
+#include "support/captures.h"
 #include "support/runs.h"
 
 namespace netfloor::test {
@@ -164,10 +164,8 @@ TEST(Tshark, agreesOnRealCaptures) {
     }
     const char *const other = std::getenv("NETFLOOR_PEER_CAPTURES");
     Comparison comparison;
-    for (const auto &entry : std::filesystem::directory_iterator(other == nullptr ? NETFLOOR_CAPTURES : other)) {
-        if (entry.path().extension() != ".md") {
-            comparison.addCapture(entry.path());
-        }
+    for (const std::string &file : other == nullptr ? testCaptures() : testCaptures(other)) {
+        comparison.addCapture(file);
     }
     if (other == nullptr) {
         comparison.expectAllUsed();

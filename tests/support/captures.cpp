@@ -31,9 +31,9 @@ std::string writeFile(const std::string &name, const Octets &octets) {
     return path;
 }
 
-std::vector<std::string> testCaptures() {
+std::vector<std::string> testCaptures(const char *where) {
     std::vector<std::string> paths;
-    for (const auto &entry : std::filesystem::directory_iterator(NETFLOOR_CAPTURES)) {
+    for (const auto &entry : std::filesystem::directory_iterator(where)) {
         if (entry.path().extension() != ".md") {
             paths.push_back(entry.path().string());
         }

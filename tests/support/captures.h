@@ -16,8 +16,8 @@ namespace netfloor::test {
 // Writes a file into folder(), and gives its path.
 std::string writeFile(const std::string &name, const Octets &octets);
 
-// The paths of the captures in tests/captures.
-[[nodiscard]] std::vector<std::string> testCaptures();
+// The paths of the captures in tests/captures, or in another folder.
+[[nodiscard]] std::vector<std::string> testCaptures(const char *where = NETFLOOR_CAPTURES);
 
 // A pcap file, in microseconds and the byte order of most machines, with packets one second apart. A packet whose
 // `wireOctets` is more than it has was cut by the snap length.
