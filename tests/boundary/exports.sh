@@ -9,9 +9,8 @@ work=$(mktemp -d)
 trap 'rm -rf "$work"' EXIT
 
 # plugin.h and descriptors.h declare exports, host.h declares imports.
-for header in plugin.h descriptors.h; do
-    [ ! -f "$include/netfloor/$header" ] || cat "$include/netfloor/$header"
-done | sed -n 's/^[a-z][a-z0-9_ *]*NETFLOOR_CDECL \([A-Za-z_]*\)(.*/\1/p' | sort >"$work/declared"
+sed -n 's/^[a-z][a-z0-9_ *]*NETFLOOR_CDECL \([A-Za-z_]*\)(.*/\1/p' "$include/netfloor/plugin.h" \
+    "$include/netfloor/descriptors.h" | sort >"$work/declared"
 nm -D --defined-only "$plugin" | awk '{print $3}' | sort >"$work/exported"
 [ -s "$work/declared" ] || { echo "no declarations found" >&2; exit 1; }
 diff "$work/declared" "$work/exported" || { echo "declared (<) and exported (>) names differ" >&2; exit 1; }
