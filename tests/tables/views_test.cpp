@@ -3,7 +3,6 @@
 #include <algorithm>
 #include <map>
 #include <optional>
-#include <ranges>
 #include <set>
 #include <string>
 #include <string_view>
@@ -73,16 +72,18 @@ Order orderOf(const std::vector<ReportedRange> &ranges, const FieldDescription &
     const std::uint32_t start = std::ranges::min(known.layOut(1, 1), {}, &BitSpan::first).first;
     const std::uint32_t cursor =
         ranges.empty() ? 1 : std::ranges::min(ranges, {}, &ReportedRange::firstBit).firstBit - start + 1;
-    const std::vector<BitSpan> spans = known.layOut(cursor, repeats);
+    std::vector<BitSpan> spans = known.layOut(cursor, repeats);
     const auto isSame = [](const ReportedRange &range, const BitSpan &span) {
         return range.firstBit == span.first && range.lastBit == span.last;
     };
-    const bool fits =
-        repeats >= known.layout.leastCount && (known.layout.mostCount == 0 || repeats <= known.layout.mostCount);
-    return !fits                                                            ? Order::none
-           : std::ranges::equal(ranges, spans, isSame)                      ? Order::same
-           : std::ranges::equal(ranges, std::views::reverse(spans), isSame) ? Order::reverse
-                                                                            : Order::none;
+    if (repeats < known.layout.leastCount || (known.layout.mostCount != 0 && repeats > known.layout.mostCount)) {
+        return Order::none;
+    }
+    if (std::ranges::equal(ranges, spans, isSame)) {
+        return Order::same;
+    }
+    std::ranges::reverse(spans);
+    return std::ranges::equal(ranges, spans, isSame) ? Order::reverse : Order::none;
 }
 
 // What of a report is not as the tables say; empty where all is.
@@ -199,7 +200,7 @@ TEST(Views, agreeOnEveryField) {
     }
     EXPECT_EQ(all.reversed, backward);
     // All ports of one field were tried; the other fields have the same names.
-    for (const std::uint32_t id : {384, 387, 391, 393, 482, 486, 488}) {
+    for (const std::uint32_t id : {384U, 387U, 391U, 393U, 482U, 486U, 488U}) {
         EXPECT_TRUE(std::ranges::equal(tables().find(id)->values, tables().find(479)->values)) << id;
     }
 }
