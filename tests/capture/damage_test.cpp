@@ -86,6 +86,40 @@ TEST(Damage, isReportedWithItsPlaceAfterThePacketsBeforeIt) {
     }
 }
 
+// Wherever a file ends, the packets in front are given, and the end is damage unless a record ends there.
+TEST(Damage, isWhereverAFileIsCut) {
+    const Octets blocks = pcapngSection() + pcapngInterface(1, hex("0002 0003 61626300 0000 0000")) +
+                          pcapngPacket(0, 1, ethernet) + pcapngBlock(5, hex("00*8")) + // statistics
+                          pcapngBlock(3, be32(50) + ethernet) +
+                          pcapngBlock(2, hex("00*12") + be32(5) + be32(5) + hex("0102030405")) +
+                          pcapngInterface(1, {}) + pcapngSection();
+    const Octets records = Numbers{true}.pcapHead(0xa1b2c3d4, 65535, 1) + pcapRecord(50, ethernet) + pcapRecord(0, {});
+    struct Row {
+        Octets file;
+        std::size_t wholeAt; // as many places
+        std::uint64_t packets;
+    };
+    for (const Row &row : std::vector<Row>{{blocks, 8, 3}, {records, 3, 2}}) {
+        std::size_t whole = 0;
+        std::uint64_t before = 0;
+        for (std::size_t size = 0; size <= row.file.size(); ++size) {
+            SCOPED_TRACE(size);
+            const Octets cut(row.file.begin(), row.file.begin() + static_cast<std::ptrdiff_t>(size));
+            const Ending ending = endingOf(writeFile("cut", cut));
+            EXPECT_TRUE(ending.packets == before || ending.packets == before + 1) << ending.packets;
+            before = ending.packets;
+            whole += ending.sentence.empty() ? 1 : 0;
+            if (ending.lost != 0) {
+                EXPECT_EQ(ending.lost, before + 1);
+                EXPECT_NE(ending.sentence.find("cut off at octet " + std::to_string(size)), std::string::npos)
+                    << ending.sentence;
+            }
+        }
+        EXPECT_EQ(before, row.packets);
+        EXPECT_EQ(whole, row.wholeAt);
+    }
+}
+
 // A packet that is as large as its capture allows is no damage.
 TEST(Damage, isNoLargePacket) {
     const std::uint32_t size = std::uint32_t{3} << 20;
@@ -194,6 +228,8 @@ TEST(Filter, leavesOutOnlyWhatItCannotFilter) {
     EXPECT_EQ(some.refused, 2U);
     EXPECT_FALSE(some.refusedAll);
 
+    EXPECT_EQ(filterAll("ether dst ff:ff:ff:ff:ff:ff", mixed).packets,
+              std::vector<std::uint64_t>{2}); // of one type alone
     EXPECT_TRUE(filterAll("udp", interfaces + pcapngPacket(0, 1, ip)).refusedAll);
     EXPECT_THROW((void)filterAll("no such", mixed), FilterError);
     EXPECT_THROW((void)filterAll("udp port", interfaces + pcapngPacket(1, 1, ethernet)), FilterError);

@@ -30,6 +30,8 @@ protected:
         writeFile("empty.pcap", {});
         writeFile("foreign.txt", hex("48*300"));
         writeFile("other.zst", hex("28b52ffd 00*20"));
+        writeFile("tiny.pcap", pcapFile(228, {{hex("45*10")}, {hex("05*10")}}));
+        writeFile("long.pcap", pcapFile(228, std::vector<PcapPacket>(3000, {udpPacket})));
         writeFile("cut.pcap", pcapFile(228, {{udpPacket}, {{udpPacket.begin(), udpPacket.begin() + 24}, 36}}));
         writeFile("withTail.pcap", file + hex("00*3"));
         const Outcome packed = shell("gzip -k $T/five.pcap && head -c -20 $T/five.pcap.gz > $T/half.pcap.gz");
@@ -63,6 +65,10 @@ TEST_F(Command, shows) {
         {"netfloor -r $T/five.pcap --packet 2-3,5", 0, "no IP: ARP...3 packets: 1 with IP", "", "LLDP", 4},
         {"netfloor help detail", 0, "--bits"},
         {"netfloor help", 0, "Exit codes"},
+        {"netfloor verify --color always $C/sctp-too-small.pcap", 1, "\x1b[31mDAMAGED"},
+        {"netfloor $T/tiny.pcap", 0, "the header ends before the addresses...no whole IP header", "", "", 2},
+        {"netfloor keys $T/tiny.pcap", 0, ",no whole IP header,", "", "", 3},
+        {"netfloor keys --utc --count 1 $T/five.pcap", 0, "\n1,2001-09-09T01:46:40.000000Z,50"},
         {"netfloor verify --bad $T/five.pcap", 0, "5 packets", "", "no IP: ARP", 3},
         {"netfloor keys --column ip.source --column udp.destination_port $T/five.pcap", 0,
          "packet,time,length,layer,tunnel,note,ip.source,udp.destination_port\n1,1000000000.000000000,50,1,,,10.0.0.1,"
@@ -93,6 +99,7 @@ TEST_F(Command, chooses) {
         {"netfloor detial $T/five.pcap", 2, "", "'detial' is neither a command nor a file"},
         {"netfloor detail", 2, "", "file is required"},
         {"netfloor --help", 0, "Exit codes:"},
+        {"netfloor", 0, "Usage: netfloor"},
     });
 }
 
@@ -103,6 +110,7 @@ TEST_F(Command, readsAnyWay) {
         {"netfloor - < $T/five.pcap.gz", 0, "5 packets", "", "", 6},
         {"cat <(head -c 100 $T/five.pcap | gzip) <(tail -c +101 $T/five.pcap | gzip) | netfloor -", 0, "5 packets", "",
          "", 6},
+        {"cat $T/five.pcap | netfloor keys --jobs 2 -", 0, "\n5,", "", "", 6},
         // A live source shows each packet as it comes.
         {"{ head -c 90 $T/five.pcap; sleep 5; } | netfloor - | { read -t 3 line; echo \"$line\"; }", 0, "10.0.0.1", "",
          "", 1},
@@ -122,6 +130,7 @@ TEST_F(Command, readsSeveralFiles) {
          "64 packets: 61 with IP, 3 without (2 ARP, 1 LLDP)\nplug-in: 2 good, 57 good with flags by design, 2 "
          "damaged\nchecks:  54 good, 7 damaged\n"},
         {"netfloor verify --bad $C/tcp-urgent-loopback.pcap $T/five.pcap", 1, "all 2"},
+        {"netfloor detail $T/five.pcap $T/cut.pcap", 0, "==> all 2 captures <==\n7 packets"},
         {"netfloor $T/inPacket.pcap $T/missing.pcap $T/five.pcap", 3, "    1  ...5 packets...all 3",
          "cut off at octet 116...No such file", "missing.pcap <=="},
         {"netfloor $T/inPacket.pcap $T/five.pcap", 4, "all 2", "cut off at octet 116"},
@@ -145,11 +154,15 @@ TEST_F(Command, endsWithACodeAndASentence) {
         {"netfloor $T/withTail.pcap", 4, "5 packets", "in packet 6", "", 6},
         {"netfloor $T/half.pcap.gz", 4, "    1  ", "packed data end in the middle...of the unpacked capture"},
         {"cat $T/half.pcap.gz | netfloor -", 4, "    1  ", "packed data end in the middle"},
+        {"{ head -c 40 $T/five.pcap.gz; head -c 99 /dev/zero; } | netfloor -", 4, "", "the packed data are damaged ("},
         // Files that are no captures.
         {"netfloor $T/inFileHead.pcap", 3, "", "no usable capture header"},
         {"netfloor $T/missing.pcap", 3, "", "No such file...Check the path"},
         {"netfloor $T/empty.pcap", 3, "", "is empty"},
         {"netfloor - < /dev/null", 3, "", "standard input is empty"},
+        {"netfloor /proc/self/mem", 3, "", "Input/output error"},
+        {"printf '\\xd4\\xc3\\xb2\\xa1\\1\\0\\0\\0%016d' 0 | netfloor -", 3, "",
+         "version 1.0 of the format has no known form"},
         {"netfloor $T/foreign.txt", 3, "", "neither a pcap nor a pcapng...editcap"},
         {"netfloor $T/other.zst", 3, "", "zstd -dc FILE | netfloor -"},
         {"netfloor $T", 3, "", "is a folder"},
@@ -158,6 +171,10 @@ TEST_F(Command, endsWithACodeAndASentence) {
         {"netfloor --plugin $T/none.so $T/five.pcap", 5, "", "none.so"},
         {"netfloor --plugin $T/foreign.txt $T/five.pcap", 5, "", "foreign.txt"},
         {"netfloor $T/five.pcap > /dev/full", 6, "", "No space left"},
+        {"mkdir $T/bare; touch $T/bare/lib{pcap.so.0.8,pcap.so.1,sqlite3.so.0}; export LD_LIBRARY_PATH=$T/bare; "
+         "netfloor -f udp $T/five.pcap",
+         2, "", "A filter needs libpcap"},
+        {"LD_LIBRARY_PATH=$T/bare netfloor export --to $T/no.db $T/five.pcap", 6, "", "needs SQLite"},
         // Nobody foresaw a current folder that is gone.
         {"ln -s $P $T/link.so; mkdir $T/gone; cd $T/gone; rmdir $T/gone; netfloor --plugin ../link.so $T/five.pcap", 7,
          "", "a fault of netfloor itself...Please report it"},
@@ -197,6 +214,23 @@ TEST_F(Command, tellsWhatBecameOfItsAnswer) {
     });
 }
 
+// On a terminal: colours unless they are not wanted, lines of its width, and how far a long reading is.
+TEST_F(Command, knowsATerminal) {
+    const std::string coloured = "\x1b[2mno IP: ARP";
+    const auto onTerminal = [](const std::string &line) { return " script -qec \"" + line + "\" /dev/null"; };
+    check({
+        {"env -u TERM -u NO_COLOR" + onTerminal("$N $T/five.pcap"), 0, coloured.c_str()},
+        {"TERM=xterm NO_COLOR=" + onTerminal("$N $T/five.pcap"), 0, coloured.c_str()},
+        {"TERM=xterm NO_COLOR=1" + onTerminal("$N $T/five.pcap"), 0, "no IP: ARP", "", "\x1b"},
+        {"TERM=dumb" + onTerminal("$N $T/five.pcap"), 0, "no IP: ARP", "", "\x1b"},
+        {onTerminal("stty cols 70; $N --color never $C/tcp-md5-bgp.pcap") + " | tr -d '\\r' | wc -L", 0, "70\n"},
+        {onTerminal("$N detail --color never $T/long.pcap | (sleep 0.8; wc -l)"), 0,
+         "\r[#... %  ... packets...\r\x1b[K"},
+        {onTerminal("cat $T/five.pcap | $N keys - | wc -l"), 0, "6\r\n"},
+        {onTerminal("$N -"), 3, "is a terminal"},
+    });
+}
+
 // Ctrl-C: the totals of what was read, and then the end that the shell expects.
 TEST_F(Command, endsWithTotalsWhenInterrupted) {
     const std::string start = "mkfifo $T/live; $N verify - < $T/live > $T/out & pid=$!; exec 3> $T/live; "
@@ -216,6 +250,7 @@ TEST_F(Command, tellsFlagsByDesignFromDamage) {
     const Octets tcpHead = hex("0050 9c40 00000001 00000000");
     const Octets sctpHead = hex("0b59 0b59 00000000 00000000");
     const Octets init = sctpHead + hex("01 00 0014 00000001 00010000 000a 000a 00000001");
+    const Octets padded = hex("01 00 0022 00000001 00010000 000a 000a 00000001 0005 0008 0a000001 000c 0006 0005 0000");
     Octets longInit = init;
     longInit[15] = 0x20; // the length says 12 octets more
     struct Row {
@@ -236,6 +271,8 @@ TEST_F(Command, tellsFlagsByDesignFromDamage) {
          "0x10 bits left over inside a length: 1 octet after 'UDP Destination Port' at octet 23 (User "
          "Datagram Protocol)",
          1},
+        {ipv4({.protocol = 132, .payload = sctpHead + padded}), 0, "unread", // padding, and fields after it
+         "octet after 'Address Type' at octet", 0},
         {ipv4({.protocol = 6, .payload = tcpHead + hex("f002 0100 0000 0000")}), 0, "DAMAGED", "0x2 every TCP header",
          1},
         {ipv4({.protocol = 132, .payload = longInit}), 0, "DAMAGED", "0x8 length reaches past the bits left", 1},
@@ -324,6 +361,12 @@ TEST_F(Command, readsPcapngWithInterfacesOfDifferentTypes) {
     const Octets linkTypes = pcapngSection() + pcapngInterface(147, {}) + pcapngInterface(228, {});
     writeFile("private.pcapng", linkTypes + pcapngPacket(0, 0, udpPacket));
     writeFile("mixed.pcapng", linkTypes + pcapngPacket(0, 0, udpPacket) + pcapngPacket(1, 0, udpPacket));
+    Octets manyTypes = pcapngSection();
+    for (std::uint16_t i = 0; i < 5; ++i) { // for private use
+        manyTypes = manyTypes + pcapngInterface(147 + i, {}) + pcapngPacket(i, 0, udpPacket);
+    }
+    writeFile("types.pcapng", manyTypes);
+    writeFile("odd.pcapng", first + hex("00000bad 0000000f 010203 00 0000000f") + pcapngPacket(1, 0, udpPacket));
     const auto octets = static_cast<std::uint32_t>(udpPacket.size());
     writeFile("noted.pcapng", pcapngSection() + pcapngInterface(228, {}) +
                                   pcapngBlock(6, hex("00*12") + be32(octets) + be32(octets) + udpPacket +
@@ -344,6 +387,8 @@ TEST_F(Command, readsPcapngWithInterfacesOfDifferentTypes) {
         // A link type that libpcap does not know costs its own packets, and no others.
         {"netfloor -f udp $T/mixed.pcapng", 0, "    2  ", "1 packet of link type 147 (", "    1  ", 1},
         {"netfloor -f udp $T/private.pcapng", 2, "", "1 packet of link type 147...leave the filter out"},
+        {"netfloor -f udp $T/types.pcapng", 2, "", "1 packet of link type 149 (...and packets of 2 more link types."},
+        {"netfloor $T/odd.pcapng", 0, "    1  ", "are no multiple of four", "", 1},
         {"netfloor $T/cut.pcapng", 4, "    3  ", "in packet 4...the 3 packets in front of it are whole", "    4  ", 3},
         {"netfloor $T/unknown.pcapng", 4, "    4  ", "an interface that is not described in packet 5", "", 4},
         {"netfloor $T/broken.pcapng", 4, "    3  ", "two lengths differ in packet 4", "", 3},

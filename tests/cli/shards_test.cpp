@@ -67,6 +67,7 @@ TEST(PlannedShards, areToldWhenTheyAreWrong) {
         {"gzip -k $T/one.pcap; netfloor plan --shards 2 $T/one.pcap.gz", 0, "\"packed\":true", "it is one shard"},
         {"head -c 500 $T/one.pcap > $T/cut.pcap; netfloor plan --shards 2 $T/cut.pcap", 4, "cut off",
          "cut off at octet 500"},
+        {"cp $T/one.pcap $T/$'\\xff'; netfloor plan --shards 1 $T/$'\\xff'", 2, "", "is no UTF-8"},
         {"netfloor keys --shard $T/one.json:0", 2, "", "not of the form PLAN.json:3"},
         {"netfloor keys --shard $T/one.json:999", 2, "", "the plan has only "},
         {"netfloor keys --shard $T/one.pcap:1", 2, "", "is no plan"},
