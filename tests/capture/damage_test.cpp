@@ -71,6 +71,7 @@ TEST(Damage, isReportedWithItsPlaceAfterThePacketsBeforeIt) {
         {pcapng + pcapngRecord(0, (2 << 20) + 32), blockEnd, "with 2097152 octets of options"},
         {pcapng + oversized, blockEnd, "an interface description of 1048596 octets"},
         {pcapng + hex("00000001 00000010 00000000 00000010"), blockEnd, "description that is too short"},
+        {pcapng + pcapngPacket(9, 0, {}), blockEnd, "an interface that is not described"},
         {pcapng + hex("00000005 fffffffc 00*20"), blockEnd, "a block of 4294967292 octets"},
         {pcapng + hex("00000005 00000010 00*4 00000014"), blockEnd, "two lengths differ"},
         {pcapng + hex("0a0d0d0a 0000001c 11111111"), blockEnd, "a section header without a byte order"},
