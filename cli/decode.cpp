@@ -23,13 +23,17 @@ namespace netfloor::cli {
 
 namespace {
 
+bool isTerminal() {
+    return ::isatty(STDOUT_FILENO) == 1;
+}
+
 bool wantsColour(Colour colour) {
     if (colour != Colour::automatic) {
         return colour == Colour::always;
     }
     const char *const noColour = std::getenv("NO_COLOR"); // see no-color.org
     const char *const terminal = std::getenv("TERM");
-    return ::isatty(STDOUT_FILENO) == 1 && (noColour == nullptr || *noColour == '\0') &&
+    return isTerminal() && (noColour == nullptr || *noColour == '\0') &&
            (terminal == nullptr || std::string_view(terminal) != "dumb");
 }
 
@@ -50,7 +54,7 @@ public:
         : shard_(asked.shard.empty() ? std::nullopt : std::optional(chooseShard(asked.shard))),
           options_(withFiles(asked, shard_)),
           isFirstPart_(!shard_ || (shard_->capture == 0 && shard_->shard == 0)),
-          out_(wantsColour(asked.colour), ::isatty(STDOUT_FILENO) == 1),
+          out_(wantsColour(asked.colour), isTerminal()),
           library_(PluginLibrary::open(findPlugin(asked.plugin))),
           decoder_(options_, library_, out_) {
         if (!options_.write.empty()) {

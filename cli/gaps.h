@@ -5,7 +5,6 @@
 #include <algorithm>
 #include <cstdint>
 #include <optional>
-#include <vector>
 
 #include "netfloor-host/sink.h"
 
@@ -52,37 +51,29 @@ struct FieldExtent {
     return extent.bits == 0 ? std::nullopt : std::optional(extent.octets);
 }
 
-// A pass reads forwards, but it looks ahead now and then. So an octet is in no field when the cursor is past it and no
-// field before has covered it.
+// A pass reads forwards, and what is looked at ahead has no bits. So an octet is in no field when what comes next
+// begins after it and no field before has covered it.
 class GapFinder {
 public:
-    void reset() {
-        covered_ = 0;
-        ahead_.clear();
-    }
+    void reset() { covered_ = 0; }
 
     // Whether there is none in front of this octet.
     [[nodiscard]] bool isCovered(std::uint32_t octet) const { return octet <= covered_; }
 
-    // What begins at `octet` comes next, and the cursor is there or past it. Gives the gap in front of it; there may be
-    // another one after that.
+    // What begins at `octet` comes next, and the cursor is there or past it. Gives the gap in front of it.
     [[nodiscard]] std::optional<Gap> before(std::uint32_t octet) {
-        return isCovered(octet) ? std::nullopt : nextGap(octet);
+        if (isCovered(octet)) {
+            return std::nullopt;
+        }
+        const Gap gap = {covered_, octet - covered_};
+        covered_ = octet;
+        return gap;
     }
 
-    void cover(OctetSpan octets) {
-        if (octets.first <= covered_) {
-            covered_ = std::max(covered_, octets.end);
-        } else {
-            ahead_.push_back(octets);
-        }
-    }
+    void cover(OctetSpan octets) { covered_ = std::max(covered_, octets.end); }
 
 private:
-    [[nodiscard]] std::optional<Gap> nextGap(std::uint32_t end);
-
     std::uint32_t covered_ = 0; // all octets up to this one are in fields, or in gaps that were told
-    std::vector<OctetSpan> ahead_;
 };
 
 } // namespace netfloor::cli

@@ -64,9 +64,6 @@ PrintableErrors::~PrintableErrors() {
 }
 
 PrintableErrors::int_type PrintableErrors::overflow(int_type character) {
-    if (traits_type::eq_int_type(character, traits_type::eof())) {
-        return traits_type::not_eof(character);
-    }
     const char one = traits_type::to_char_type(character);
     return xsputn(&one, 1) == 1 ? character : traits_type::eof();
 }

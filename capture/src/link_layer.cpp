@@ -308,10 +308,8 @@ private:
         return organisation == 0 ? afterEtherType(number) : other(NotIp(NotIp::Kind::name, "SNAP"));
     }
 
+    // At two octets that are there.
     NetworkPart etherType() {
-        if (!has(2)) {
-            return tooShort("Ethernet");
-        }
         const std::uint16_t type = u16(0);
         skip(2);
         return afterEtherType(type);
@@ -422,7 +420,7 @@ constexpr std::array linkTypeNames = {
 
 std::string NotIp::text() const {
     switch (kind_) {
-    case Kind::ip: return {};
+    case Kind::ip: break;
     case Kind::name: return std::string(name_);
     case Kind::cutHeader: return "cut inside the " + std::string(name_) + " header";
     case Kind::etherType: return hexText("EtherType", number_);

@@ -97,11 +97,12 @@ void showFields(const Options &options) {
     }
     const FieldTables tables(PluginLibrary::open(findPlugin(options.plugin)));
     const auto [fields, isList] = choose(listFields(tables), options.field);
-    switch (options.form) {
-    case FieldsForm::json: out << jsonText(fields); break;
-    case FieldsForm::markdown: out << referenceText(fields); break;
-    case FieldsForm::tables: break;
-    case FieldsForm::text: out << (isList ? listText(fields) : detailsText(fields)); break;
+    if (options.form == FieldsForm::json) {
+        out << jsonText(fields);
+    } else if (options.form == FieldsForm::markdown) {
+        out << referenceText(fields);
+    } else {
+        out << (isList ? listText(fields) : detailsText(fields));
     }
     out.flush();
 }

@@ -68,6 +68,9 @@ TEST(CaptureWriter, saysThatAFileCannotBeWritten) {
             writer.finish();
         },
         CaptureWriteError);
+    const Octets octets(60000, 0); // which no buffer holds
+    CaptureWriter other("/dev/full");
+    EXPECT_THROW(other.write({.linkType = 101, .octets = octets}), CaptureWriteError);
 }
 
 // A pcap file has more bits for the link type than a pcapng file.

@@ -71,6 +71,7 @@ TEST(Damage, isReportedWithItsPlaceAfterThePacketsBeforeIt) {
         {pcapng + pcapngRecord(0, (2 << 20) + 32), blockEnd, "with 2097152 octets of options"},
         {pcapng + oversized, blockEnd, "an interface description of 1048596 octets"},
         {pcapng + hex("00000001 00000010 00000000 00000010"), blockEnd, "description that is too short"},
+        {pcapng + pcapngPacket(9, 0, {}), blockEnd, "an interface that is not described"},
         {pcapng + hex("00000005 fffffffc 00*20"), blockEnd, "a block of 4294967292 octets"},
         {pcapng + hex("00000005 00000010 00*4 00000014"), blockEnd, "two lengths differ"},
         {pcapng + hex("0a0d0d0a 0000001c 11111111"), blockEnd, "a section header without a byte order"},
@@ -83,6 +84,40 @@ TEST(Damage, isReportedWithItsPlaceAfterThePacketsBeforeIt) {
         EXPECT_EQ(ending.position, row.position);
         EXPECT_NE(ending.sentence.find(row.reason), std::string::npos) << ending.sentence;
         EXPECT_NE(ending.sentence.find("the 1 packet in front of it is whole. Copy or take"), std::string::npos);
+    }
+}
+
+// Wherever a file ends, the packets in front are given, and the end is damage unless a record ends there.
+TEST(Damage, isWhereverAFileIsCut) {
+    const Octets blocks = pcapngSection() + pcapngInterface(1, hex("0002 0003 61626300 0000 0000")) +
+                          pcapngPacket(0, 1, ethernet) + pcapngBlock(5, hex("00*8")) + // statistics
+                          pcapngBlock(3, be32(50) + ethernet) +
+                          pcapngBlock(2, hex("00*12") + be32(5) + be32(5) + hex("0102030405")) +
+                          pcapngInterface(1, {}) + pcapngSection();
+    const Octets records = Numbers{true}.pcapHead(0xa1b2c3d4, 65535, 1) + pcapRecord(50, ethernet) + pcapRecord(0, {});
+    struct Row {
+        Octets file;
+        std::size_t wholeAt; // as many places
+        std::uint64_t packets;
+    };
+    for (const Row &row : std::vector<Row>{{blocks, 8, 3}, {records, 3, 2}}) {
+        std::size_t whole = 0;
+        std::uint64_t before = 0;
+        for (std::size_t size = 0; size <= row.file.size(); ++size) {
+            SCOPED_TRACE(size);
+            const Octets cut(row.file.begin(), row.file.begin() + static_cast<std::ptrdiff_t>(size));
+            const Ending ending = endingOf(writeFile("cut", cut));
+            EXPECT_TRUE(ending.packets == before || ending.packets == before + 1) << ending.packets;
+            before = ending.packets;
+            whole += ending.sentence.empty() ? 1 : 0;
+            if (ending.lost != 0) {
+                EXPECT_EQ(ending.lost, before + 1);
+                EXPECT_NE(ending.sentence.find("cut off at octet " + std::to_string(size)), std::string::npos)
+                    << ending.sentence;
+            }
+        }
+        EXPECT_EQ(before, row.packets);
+        EXPECT_EQ(whole, row.wholeAt);
     }
 }
 
@@ -194,6 +229,8 @@ TEST(Filter, leavesOutOnlyWhatItCannotFilter) {
     EXPECT_EQ(some.refused, 2U);
     EXPECT_FALSE(some.refusedAll);
 
+    EXPECT_EQ(filterAll("ether dst ff:ff:ff:ff:ff:ff", mixed).packets,
+              std::vector<std::uint64_t>{2}); // of one type alone
     EXPECT_TRUE(filterAll("udp", interfaces + pcapngPacket(0, 1, ip)).refusedAll);
     EXPECT_THROW((void)filterAll("no such", mixed), FilterError);
     EXPECT_THROW((void)filterAll("udp port", interfaces + pcapngPacket(1, 1, ethernet)), FilterError);

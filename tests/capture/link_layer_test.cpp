@@ -41,6 +41,7 @@ TEST(LinkLayer, endsAtTheIpHeader) {
     const std::vector<Row> rows = {
         {mpls, hex("00010140")},
         {mpls, hex("00010040 00020140"), "60*40"},
+        {mpls, hex("00010140"), "4f*60"},
         {mpls, hex("00010140 00000000") + addresses + hex("0800")}, // a pseudowire with its control word
         {mpls, hex("00010140") + addresses + hex("8100 0005 86dd"), "60*40"},
         {ethernet, addresses + hex("8847 00010140")},
@@ -132,6 +133,8 @@ TEST(LinkLayer, saysWhatIsNoIp) {
         {pppSerial, hex("ff03 8057"), "PPP IPv6CP"},
         {pppWithDirectionInFront, hex("01 03 c023"), "PPP PAP"},
         {147, {}, "link type 147"}, // for private use
+        {ethernet, addresses + hex("0800"), "no octets after the link layer"},
+        {ppp, hex("ff03 4021 00*4"), "PPP protocol 0x4021"},
     };
     for (const Row &row : rows) {
         SCOPED_TRACE(hexText(row.packet));

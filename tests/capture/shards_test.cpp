@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <filesystem>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include <gtest/gtest.h>
@@ -86,6 +87,12 @@ TEST(Shards, areRefusedWhereTheFileHasChanged) {
     second.packets -= 1;
     EXPECT_NE(reason(1).find("has changed since it was planned"), std::string::npos) << reason(1);
 
+    second = sound;
+    const std::uint64_t last =
+        std::exchange(plan.shards[3].begin.position, std::uint64_t{1} << 63U); // no file is so long
+    EXPECT_NE(reason(3).find("Invalid argument"), std::string::npos) << reason(3);
+    plan.shards[3].begin.position = last;
+
     plan.file.modified -= 1;
     EXPECT_NE(reason(0).find("another time of change"), std::string::npos) << reason(0);
     Octets other = octets;
@@ -94,6 +101,10 @@ TEST(Shards, areRefusedWhereTheFileHasChanged) {
     EXPECT_NE(reason(0).find("begins with other octets"), std::string::npos) << reason(0);
     writeFile("planned.pcap", octets + hex("00"));
     EXPECT_NE(reason(3).find("octets and has " + std::to_string(octets.size() + 1)), std::string::npos) << reason(3);
+
+    CapturePlan sections = planShards(std::string(NETFLOOR_CAPTURES) + "/icmp-types.pcapng", 500);
+    sections.sections.front().interfaces.front() += 4;
+    EXPECT_THROW((void)CaptureFile(sections, 1), CaptureError);
 
     const CapturePlan packed = planShards(writePacked("packed.gz", octets), 100);
     EXPECT_TRUE(packed.isPacked);

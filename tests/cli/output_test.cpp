@@ -41,6 +41,16 @@ TEST(UntrustedText, isShownByItsCharactersAtEachPlaceOfEachLength) {
     }
 }
 
+TEST(UntrustedText, hasTheNumberOfEachOctet) {
+    std::string all;
+    for (int octet = 0; octet < 256; ++octet) {
+        all += static_cast<char>(octet);
+    }
+    Output out(false, false);
+    out.untrusted(all);
+    EXPECT_EQ(out.since(0), shown(all));
+}
+
 TEST(UntrustedText, makesTheBufferGrow) {
     Output out(false, false);
     std::string expected;

@@ -90,6 +90,14 @@ TEST(Page, holdsEveryPacketOfEveryCapture) {
     }
 }
 
+// The number of a type or a code, of one octet or two; and the length of a packet that was cut.
+TEST(Page, tellsNumbersBesideTheirNames) {
+    const Octets gre =
+        ipv4({.protocol = 47, .payload = hex("0000 0800") + ipv4({.protocol = 17, .payload = udp(7, 9)})});
+    writeFile("numbers.pcap", pcapFile(228, {{gre, 60}}));
+    check({{"netfloor html $T/numbers.pcap", 0, "cut by the snap length to 52...\"GRE (47)...\"IP (2048)"}});
+}
+
 TEST(Page, letsNothingBecomeMarkup) {
     const std::string hostile = "</script><script>alert(1)</script><!--\"\\\x1b\xff\xc3\xa9";
     const auto option = [](std::uint16_t code, const std::string &text) {

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
 // Packets inside packets, and payloads that are known by name, as the command shows them.
-#include <algorithm>
 #include <string>
+#include <vector>
 
 #include <gtest/gtest.h>
 
@@ -24,53 +24,44 @@ Octets gtpU(const Octets &inner) {
 
 const Octets inner = ipv4({.protocol = 17, .payload = udp(7, 9, hex("61*20"))});
 
-void writeTunnel(const Octets &packet, std::size_t captured = std::string::npos) {
-    const Octets start(packet.begin(), packet.begin() + static_cast<std::ptrdiff_t>(std::min(captured, packet.size())));
-    writeFile("tunnel.pcap", pcapFile(linkTypeRaw, {{start, static_cast<std::uint32_t>(packet.size())}}));
-}
-
-TEST(Tunnels, openInDetail) {
-    writeTunnel(gtpU(inner));
-    check(
-        {{"netfloor detail $T/tunnel.pcap", 0,
-          "UDP Source Port...GTP-U: G-PDU, 48 octets, TEID 0x1b2c\n...[shown below: octets 36 to 83]\n..."
-          "  Inside GTP-U 0x1b2c, from octet 36 on\n...UDP Source Port...Data=20 octets\n...[layer 1, octets 36 to "}});
-}
-
-TEST(Tunnels, openAsFarAsTheyWereCaptured) {
-    writeTunnel(gtpU(inner), 36 + 22); // two octets of the inner UDP header
-    check({{"netfloor detail $T/tunnel.pcap", 0,
-            "UDP Destination Port=...Inside GTP-U 0x1b2c...UDP Source Port...cut by the snap length"},
-           {"netfloor detail $T/tunnel.pcap | grep -c 'UDP Destination Port='", 0, "1\n"}});
-}
-
-TEST(Tunnels, haveTheirFaultsNamedWithTheirOctets) {
+TEST(Tunnels, areOpenedAndKnownPayloadsHaveALine) {
     Octets wrong = inner;
     wrong[25] = 0xff; // the length of UDP
-    writeTunnel(gtpU(wrong));
-    check(
-        {{"netfloor verify $T/tunnel.pcap", 1, "UDP: the length is 255 octets, and the datagram has 28, at octet 60"}});
-    writeTunnel(gtpU(ipv4({.protocol = 17, .payload = hex("0001 0002 00")})));
-    check({{"netfloor verify $T/tunnel.pcap", 1, "1 octet after 'UDP Destination Port' at octet 59"}});
-}
-
-TEST(Payloads, thatAreKnownHaveALine) {
+    Octets cut = gtpU(inner);
+    cut.resize(36 + 22); // two octets of the inner UDP header
     const Octets m3ua = hex("01 00 01 01 00000010 61*8");
     const Octets data = hex("0b59 0b59 00000001 00000000 00 03 0020 00000007 0001 0000 00000003") + m3ua;
-    const struct {
-        Octets packet;
-        const char *line;
-    } rows[] = {
-        {inUdp(2123, hex("48 20 0008 00000012 00000100")), "GTP-C: create session request, 8 octets, TEID 0x12\n"},
-        {inUdp(2123, hex("40 01 0004 00000100")), "GTP-C: echo request, 4 octets\n"}, // version 2 without a TEID
-        {inUdp(2152, hex("30 fe 0000 00000012")), "GTP-U: end marker, 0 octets, TEID 0x12\n"},
-        {inUdp(2152, hex("30 63 0000 00000012")), "GTP-U: message 99, 0 octets, TEID 0x12\n"},
-        {ipv4({.protocol = 132, .payload = data}), "M3UA: DATA, 16 octets\n"},
-        {inUdp(2152, hex("00*8")), "Data=8 octets\n"}, // no version of GTP
+    const auto captured = [](const Octets &packet) { return static_cast<std::uint32_t>(packet.size()); };
+    struct Row {
+        PcapPacket packet;
+        const char *out;
+        const char *absent = "";
+        std::string command = "detail";
+        int exitCode = 0;
     };
-    for (const auto &[packet, line] : rows) {
-        writeTunnel(packet);
-        check({{"netfloor detail $T/tunnel.pcap", 0, line}});
+    const std::vector<Row> rows = {
+        {{gtpU(inner)},
+         "UDP Source Port...GTP-U: G-PDU, 48 octets, TEID 0x1b2c\n...[shown below: octets 36 to 83]\n..."
+         "  Inside GTP-U 0x1b2c, from octet 36 on\n...UDP Source Port...Data=20 octets\n...[layer 1, octets 36 to "},
+        {{cut, captured(gtpU(inner))},
+         "Inside GTP-U 0x1b2c...UDP Source Port...cut by the snap length",
+         "Port=Discard"},
+        {{gtpU(wrong)}, "UDP: the length is 255 octets, and the datagram has 28, at octet 60", "", "verify", 1},
+        {{gtpU(ipv4({.protocol = 17, .payload = hex("0001 0002 00")}))},
+         "1 octet after 'UDP Destination Port' at octet 59",
+         "",
+         "verify",
+         1},
+        {{inUdp(2123, hex("48 20 0008 00000012 00000100"))}, "GTP-C: create session request, 8 octets, TEID 0x12\n"},
+        {{inUdp(2123, hex("40 01 0004 00000100"))}, "GTP-C: echo request, 4 octets\n"}, // version 2 without a TEID
+        {{inUdp(2152, hex("30 fe 0000 00000012"))}, "GTP-U: end marker, 0 octets, TEID 0x12\n"},
+        {{inUdp(2152, hex("30 63 0000 00000012"))}, "GTP-U: message 99, 0 octets, TEID 0x12\n"},
+        {{ipv4({.protocol = 132, .payload = data})}, "M3UA: DATA, 16 octets\n"},
+        {{inUdp(2152, hex("00*8"))}, "Data=8 octets\n"}, // no version of GTP
+    };
+    for (const auto &[packet, out, absent, command, exitCode] : rows) {
+        writeFile("tunnel.pcap", pcapFile(linkTypeRaw, {packet}));
+        check({{"netfloor " + command + " $T/tunnel.pcap", exitCode, out, "", absent}});
     }
 }
 
