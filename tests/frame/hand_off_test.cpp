@@ -3,7 +3,6 @@
 #include <algorithm>
 #include <cstddef>
 #include <limits>
-#include <optional>
 #include <string>
 #include <vector>
 
@@ -208,16 +207,6 @@ TEST(HandOff, chunksEndThoughTheNextLayerAlwaysGoesBack) {
         EXPECT_EQ(run.enter(pass), 1);
         EXPECT_GE(run.modes.size(), 2u);
     }
-}
-
-TEST(HandOff, aFlagOfTheNextLayerCounts) {
-    BareRun run(examplePacket());
-    run.nextLayer = [&run] {
-        run.state().flags |= 0x2;
-        return run.take(96);
-    };
-    EXPECT_EQ(run.enter(Pass::mv), 1);
-    EXPECT_EQ(run.context().verdict, -52);
 }
 
 TEST(HandOff, aNegativeResultCutsThePassOff) {

@@ -233,34 +233,6 @@ TEST(FieldStep, packetThatEndsInsideAnOctet) {
     }
 }
 
-// A layer below may leave the cursor on any bit: the same is read, at other bits.
-TEST(FieldStep, packetAtEveryBitOfAnOctet) {
-    const Runs plain = runAll(examplePacket());
-    for (unsigned shift = 1; shift < 8; ++shift) {
-        SCOPED_TRACE("at bit " + std::to_string(shift));
-        TestRunOptions options;
-        options.state.cursor = 1 + shift;
-        options.state.totalBits = shift + 8 * static_cast<std::uint32_t>(examplePacket().size());
-        const Runs moved = runAll(shifted(examplePacket(), shift), options);
-        ASSERT_EQ(moved.md.fields.size(), plain.md.fields.size());
-        for (std::size_t i = 0; i < plain.md.fields.size(); ++i) {
-            const FieldReport &field = plain.md.fields[i];
-            const FieldReport &other = moved.md.fields[i];
-            EXPECT_EQ(other.name + other.text, field.name + field.text);
-            std::vector<ReportedRange> ranges = field.ranges;
-            for (ReportedRange &range : ranges) {
-                range.firstBit += shift;
-                range.lastBit += shift;
-            }
-            EXPECT_EQ(other.ranges, ranges) << field.name;
-        }
-        EXPECT_EQ(lines(moved.to), lines(plain.to));
-        EXPECT_EQ(lines(moved.xtr), lines(plain.xtr));
-        EXPECT_EQ(moved.md.cursor, plain.md.cursor + shift);
-        EXPECT_EQ(moved.md.bitsLeft, plain.md.bitsLeft);
-    }
-}
-
 TEST(FieldStep, smallStack) {
     onSmallStack([] { runAll(examplePacket()); });
 }
