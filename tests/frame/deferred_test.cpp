@@ -127,6 +127,7 @@ TEST(DeferredWriter, showsWhatMdShowsAfterAnOwner) {
 
 // An address that lies past the limit is shown, and not kept: the step back over it is the last one.
 TEST(DeferredWriter, showsTheStepBackOverAnAddress) {
+    compare(shortened(ipv6({.nextHeader = 41, .payload = ipv6({})}), 79)); // too short for a checked run
     compare(ipv6({.nextHeader = 41,
                   .payload = ipv6({.nextHeader = 43, .payload = hex("3b 02 00 01 00*4 61*8")}),
                   .payloadLength = std::uint16_t{56}}) +
@@ -147,16 +148,19 @@ TEST(DeferredWriter, showsWhatIsLeftInTheElementsOfAnAddress) {
         for (const std::size_t missing : {28u, 12u}) { // in the first address, and in the second
             compare(shortened(packet, packet.size() - missing) + hex("33*16"));
         }
-        compare(packet, {.bits = 100}); // nothing of the packet before is shown in the source address
+        compare(packet);
+        compare(ipv6({}), {.bits = 312}); // nothing of the packet before is shown in the destination address
     }
 }
 
 // A run asks for its room once. It takes no more than that, and all that it has where it needs it.
 TEST(DeferredWriter, keepsToTheRoomOnTheStacks) {
-    for (const Octets &packet :
-         {tcp(hex("01*20")), tcp(hex("01 00*3 01 00*3 01 00*7")), tcp(hex("02 04 05b4 01*12")), examplePacket(),
-          ipv6({.nextHeader = 6, .payload = hex("0035 9c40 00*8 a0 12 00*6 01*20")}),
-          ipv6({.nextHeader = 17, .payload = udp(53, 53, hex("61*12"))})}) {
+    // The last option is followed by a look for another one, and no padding.
+    const Octets withOptions = ipv4({.protocol = 17, .payload = udp(40000, 53, hex("6162")), .options = hex("01*4")});
+    for (const Octets &packet : {tcp(hex("01*20")), tcp(hex("01 00*3 01 00*3 01 00*7")), tcp(hex("02 04 05b4 01*12")),
+                                 tcp(hex("01 01 08 0a 00*8")), withOptions, examplePacket(),
+                                 ipv6({.nextHeader = 6, .payload = hex("0035 9c40 00*8 a0 12 00*6 01*20")}),
+                                 ipv6({.nextHeader = 17, .payload = udp(53, 53, hex("61*12"))})}) {
         for (std::uint32_t blocks = 1; blocks < 34; ++blocks) {
             compare(packet, {.blocks = blocks});
         }
