@@ -62,6 +62,18 @@ TEST(GrowthView, verdict) {
     }
 }
 
+// The packet with the bits of each octet reversed, from one octet on.
+Octets withBitsReversed(Octets packet, std::size_t from) {
+    std::for_each(packet.begin() + static_cast<std::ptrdiff_t>(from), packet.end(), [](std::uint8_t &each) {
+        std::uint8_t reversed = 0;
+        for (int bit = 0; bit < 8; ++bit) {
+            reversed = static_cast<std::uint8_t>(reversed << 1 | (each >> bit & 1));
+        }
+        each = reversed;
+    });
+    return packet;
+}
+
 // IPv6 addresses of SCTP parameters are read with the bits of each octet reversed, up to the end of the packet.
 TEST(GrowthView, workingCopyOfAReversedAddress) {
     const Octets packet = ipv4({.protocol = 132, .payload = hex(R"(
@@ -73,17 +85,7 @@ TEST(GrowthView, workingCopyOfAReversedAddress) {
     )")}) + hex("74 61 69");
     constexpr std::size_t firstAddress = 56;
     constexpr std::size_t secondAddress = 76;
-    const auto reversedFrom = [&](std::size_t octet) {
-        Octets copy = packet;
-        std::for_each(copy.begin() + static_cast<std::ptrdiff_t>(octet), copy.end(), [](std::uint8_t &each) {
-            std::uint8_t reversed = 0;
-            for (int bit = 0; bit < 8; ++bit) {
-                reversed = static_cast<std::uint8_t>(reversed << 1 | (each >> bit & 1));
-            }
-            each = reversed;
-        });
-        return hexText(copy);
-    };
+    const auto reversedFrom = [&](std::size_t octet) { return hexText(withBitsReversed(packet, octet)); };
     const auto runWithFull = [&](Pass pass, const StateOptions &full, const std::vector<std::size_t> &growths) {
         for (const bool allowed : {true, false}) {
             SCOPED_TRACE(std::string(passName(pass)) + (allowed ? "" : " without storage"));
@@ -119,6 +121,38 @@ TEST(GrowthView, workingCopyOfAReversedAddress) {
     for (const Pass pass : allPasses) {
         runWithFull(pass, roomFor(12), {firstAddress}); // full when the inner block of an address opens
         runWithFull(pass, roomFor(20, 8), {firstAddress, secondAddress}); // full with the elements of an address
+    }
+}
+
+// Of an address that the packet cuts, as much as there is; and of a packet longer than a length field can tell, all.
+TEST(GrowthView, workingCopyOfACutAndOfALongPacket) {
+    const Octets whole = ipv4({.protocol = 132, .payload = hex(R"(
+        0b 59 0b 5a 00 00 00 2a 00 00 00 00  01 00 00 28 00 00 00 01 00 00 00 00
+        00 01 00 01 00 00 00 01  00 06 00 14 20 01 0d b8 12*12
+    )")});
+    constexpr std::size_t address = 56;
+    for (const Pass pass : allPasses) {
+        for (std::size_t octets = 0; octets < 9; ++octets) {
+            const Octets packet = shortened(whole, address + octets);
+            std::string seen;
+            runWith(pass, packet, roomFor(12), [&](BareRun &run) {
+                seen = hexText({run.state().data, packet.size()});
+                return true;
+            });
+            EXPECT_EQ(seen, hexText(withBitsReversed(packet, address))) << passName(pass) << ' ' << octets;
+        }
+        const Octets packet = whole + Octets(70000, 0x35);
+        BareRun run(packet);
+        bool reversed = false;
+        run.afterCall = [&] {
+            if (run.state().fieldRecord.fieldId == 856) {
+                const Octets expected = withBitsReversed(packet, address);
+                reversed = std::equal(expected.begin(), expected.end(), run.state().data);
+            }
+        };
+        EXPECT_EQ(run.enter(pass), 1);
+        EXPECT_EQ(reversed, pass == Pass::md || pass == Pass::to);
+        EXPECT_TRUE(std::equal(packet.begin(), packet.end(), run.state().data));
     }
 }
 

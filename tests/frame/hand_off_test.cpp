@@ -233,6 +233,20 @@ TEST(HandOff, aNegativeResultCutsThePassOff) {
     }
 }
 
+// The port of the next layer is not written where the block around the choice finds no room.
+TEST(HandOff, noRoomForTheChoice) {
+    for (const Pass pass : allPasses) {
+        StateOptions options;
+        options.blockCapacity = 7;
+        options.allowGrowth = [](std::size_t) { return false; };
+        BareRun run(examplePacket(), options);
+        run.state().scratch[NETFLOOR_NEXT_LAYER_PORT] = unset;
+        EXPECT_EQ(run.enter(pass), 0);
+        EXPECT_EQ(run.state().scratch[NETFLOOR_NEXT_LAYER_OCTETS], 12u);
+        EXPECT_EQ(run.state().scratch[NETFLOOR_NEXT_LAYER_PORT], unset);
+    }
+}
+
 // Packets in packets, by way of the host. The pass has one set of variables: the decoder id that it writes back into
 // the context is that of the innermost entry.
 TEST(HandOff, entriesInsideOneAnother) {

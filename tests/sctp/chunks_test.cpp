@@ -196,6 +196,7 @@ TEST(SctpWalk, lengthsAndFields) {
         {"reserved, Length 5", hex("ff 00 00 05 61  0b 00 00 04  0b 00 00 04"),
          "802 809 808 813 805 892 808 805 892 808"},
         {"reserved, cut short", hex("ff 00 00 06 61"), "802 809 808", 0x10},
+        {"reserved, cut before its Length", hex("07 00 00 08 00 00 00 2a  ff 00 00"), "802 884 885 886 805 809", 0x10},
         {"DATA without user data", hex("00 03 00 10 00*12  0b 00 00 04"), data + " 805 892 808"},
         {"DATA cut before its user data", hex("00 03 00 40 00*11"), "802 814 815 816 808 817 818 819", 0x10},
         {"INIT's limit takes the next octet", hex("01 00 00 14 00*16  0b 00 00 04"), initAlone + " 805 814 815 816",
