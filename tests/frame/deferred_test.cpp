@@ -19,6 +19,7 @@ constexpr std::uint32_t sentinel = 0xdeadbeef;
 struct Room {
     std::uint32_t blocks = 60;
     std::uint32_t limits = 30;
+    std::uint32_t bits = 0; // that the layer below has left for the packet; 0: all
 };
 
 // A run, and all that the host can see where storage grows, at each hand-off and at the end.
@@ -43,7 +44,10 @@ private:
         StateOptions options;
         options.blockCapacity = room.blocks + 1;
         options.limitCapacity = room.limits + 1;
-        options.prepare = [this](DecodeState &state) {
+        options.prepare = [this, room](DecodeState &state) {
+            if (room.bits != 0) {
+                state.bitsLeft = state.limits.base[0] = room.bits;
+            }
             for (BitStack *const stack : {&state.blockStarts, &state.limits}) {
                 stack->base[--stack->capacity] = sentinel;
             }
@@ -123,18 +127,40 @@ TEST(DeferredWriter, showsWhatMdShowsAfterAnOwner) {
 
 // An address that lies past the limit is shown, and not kept: the step back over it is the last one.
 TEST(DeferredWriter, showsTheStepBackOverAnAddress) {
+    compare(shortened(ipv6({.nextHeader = 41, .payload = ipv6({})}), 79)); // too short for a checked run
     compare(ipv6({.nextHeader = 41,
                   .payload = ipv6({.nextHeader = 43, .payload = hex("3b 02 00 01 00*4 61*8")}),
                   .payloadLength = std::uint16_t{56}}) +
             hex("62*8"));
 }
 
+// An address in groups is the last field where its nibbles are past the limit. It shows what other fields have left in
+// its elements: nibbles of padding, and of an address.
+TEST(DeferredWriter, showsWhatIsLeftInTheElementsOfAnAddress) {
+    const std::string toRouting = " 2b 00 01 ";
+    const std::string toOptions = " 3c 00 01 ";
+    for (const std::string &front :
+         {std::string(), toRouting + "02 00*2", toRouting + "03 00*3", toRouting + "04 00*4",
+          toOptions + "04 00*4" + toRouting + "03 00*3", toOptions + "03 00*3" + toRouting + "02 00*2"}) {
+        const Octets headers = hex(front) + hex("3b 06 00 03 00*4 21*40");
+        const std::uint8_t first = front.empty() ? 43 : front.starts_with(" 3c") ? 0 : 60;
+        const Octets packet = ipv6({.nextHeader = first, .payload = headers});
+        for (const std::size_t missing : {28u, 12u}) { // in the first address, and in the second
+            compare(shortened(packet, packet.size() - missing) + hex("33*16"));
+        }
+        compare(packet);
+        compare(ipv6({}), {.bits = 312}); // nothing of the packet before is shown in the destination address
+    }
+}
+
 // A run asks for its room once. It takes no more than that, and all that it has where it needs it.
 TEST(DeferredWriter, keepsToTheRoomOnTheStacks) {
-    for (const Octets &packet :
-         {tcp(hex("01*20")), tcp(hex("01 00*3 01 00*3 01 00*7")), tcp(hex("02 04 05b4 01*12")), examplePacket(),
-          ipv6({.nextHeader = 6, .payload = hex("0035 9c40 00*8 a0 12 00*6 01*20")}),
-          ipv6({.nextHeader = 17, .payload = udp(53, 53, hex("61*12"))})}) {
+    // The last option is followed by a look for another one, and no padding.
+    const Octets withOptions = ipv4({.protocol = 17, .payload = udp(40000, 53, hex("6162")), .options = hex("01*4")});
+    for (const Octets &packet : {tcp(hex("01*20")), tcp(hex("01 00*3 01 00*3 01 00*7")), tcp(hex("02 04 05b4 01*12")),
+                                 tcp(hex("01 01 08 0a 00*8")), withOptions, examplePacket(),
+                                 ipv6({.nextHeader = 6, .payload = hex("0035 9c40 00*8 a0 12 00*6 01*20")}),
+                                 ipv6({.nextHeader = 17, .payload = udp(53, 53, hex("61*12"))})}) {
         for (std::uint32_t blocks = 1; blocks < 34; ++blocks) {
             compare(packet, {.blocks = blocks});
         }

@@ -167,22 +167,5 @@ TEST(Entry, verdictGoesByTheFlags) {
     EXPECT_EQ(clean.context().verdict, 1); // the host clears it, not the plug-in
 }
 
-TEST(Entry, startsAnewEachTime) {
-    const Octets fragment = ipv4({.protocol = 17, .payload = hex("61*3"), .fragment = 1});
-    for (const Pass pass : allPasses) {
-        std::string first;
-        for (int round = 0; round < 2; ++round) {
-            BareRun run(examplePacket());
-            EXPECT_EQ(run.enter(pass), 1);
-            std::string text = describe(run.state()) + run.keyText();
-            std::ranges::for_each(run.seen, [&text](const Seen &seen) { text += seen.text + seen.state; });
-            EXPECT_EQ(round == 0 ? text : first, text);
-            first = text;
-            BareRun between(fragment);
-            EXPECT_EQ(between.enter(pass), 1);
-        }
-    }
-}
-
 } // namespace
 } // namespace netfloor::test

@@ -3,7 +3,6 @@
 #include <algorithm>
 #include <cstddef>
 #include <limits>
-#include <optional>
 #include <string>
 #include <vector>
 
@@ -210,16 +209,6 @@ TEST(HandOff, chunksEndThoughTheNextLayerAlwaysGoesBack) {
     }
 }
 
-TEST(HandOff, aFlagOfTheNextLayerCounts) {
-    BareRun run(examplePacket());
-    run.nextLayer = [&run] {
-        run.state().flags |= 0x2;
-        return run.take(96);
-    };
-    EXPECT_EQ(run.enter(Pass::mv), 1);
-    EXPECT_EQ(run.context().verdict, -52);
-}
-
 TEST(HandOff, aNegativeResultCutsThePassOff) {
     for (const Pass pass : passesThatHandOn) {
         for (const std::int32_t result : {std::numeric_limits<std::int32_t>::min(), -1, 0, 1, 1000}) {
@@ -241,6 +230,20 @@ TEST(HandOff, aNegativeResultCutsThePassOff) {
                       refused ? "blocks 1 1 1 1 33 161 193 225 225 (8), limits 344 320 (1), \"NEXT LAYER\""
                               : "blocks 1 (8), limits 344 (1), \"NEXT LAYER\"");
         }
+    }
+}
+
+// The port of the next layer is not written where the block around the choice finds no room.
+TEST(HandOff, noRoomForTheChoice) {
+    for (const Pass pass : allPasses) {
+        StateOptions options;
+        options.blockCapacity = 7;
+        options.allowGrowth = [](std::size_t) { return false; };
+        BareRun run(examplePacket(), options);
+        run.state().scratch[NETFLOOR_NEXT_LAYER_PORT] = unset;
+        EXPECT_EQ(run.enter(pass), 0);
+        EXPECT_EQ(run.state().scratch[NETFLOOR_NEXT_LAYER_OCTETS], 12u);
+        EXPECT_EQ(run.state().scratch[NETFLOOR_NEXT_LAYER_PORT], unset);
     }
 }
 

@@ -62,24 +62,6 @@ TEST(QuotedHeader, everyFieldInEveryPass) {
     EXPECT_EQ(verdictLine(runs.mv), "verdict 0 flags 0x0\n");
 }
 
-TEST(QuotedHeader, names) {
-    const std::vector<std::string> precedences = {
-        "Routine",        "Priority", "Immediate", "Flash", "Flash override", "CRITIC/ECP", "Internetwork control",
-        "Network control"};
-    for (unsigned service = 0; service < 256; service += 4) {
-        const Report md = runPass(Pass::md, timeExceeded({0x45, static_cast<std::uint8_t>(service)}));
-        const auto text = [&](const char *name) { return md.field(name)->text; };
-        EXPECT_EQ(md.fields[md.fields.size() - 5].text, "  Precedence=" + precedences[service >> 5]);
-        EXPECT_EQ(text("D"), (service & 0x10) != 0 ? "  D=Low delay" : "  D=Normal delay");
-        EXPECT_EQ(text("T"), (service & 0x08) != 0 ? "  T=High throughput" : "  T=Normal throughput");
-        EXPECT_EQ(text("R"), (service & 0x04) != 0 ? "  R=High reliability" : "  R=Normal reliability");
-    }
-    const Report md = runPass(Pass::md, timeExceeded(hex("45 00 00 00 00 00 3f ff")));
-    EXPECT_EQ(md.field("Flags DF")->text, "  Flags DF=May fragment");
-    EXPECT_EQ(md.field("Flags MF")->text, "  Flags MF=More fragments");
-    EXPECT_EQ(md.fields.back().text, "  Fragment Offset=65528");
-}
-
 // The field of the protocol depends on the message, and on whether it came through a tunnel.
 TEST(QuotedHeader, protocolAndOuterProtocol) {
     struct MessageType {
@@ -143,7 +125,6 @@ TEST(QuotedHeader, thatEndsEarly) {
         EXPECT_EQ(runs.md.flags, 0u);
         EXPECT_EQ(runs.mv.flags, std::ranges::count(swept, octets) > 0 ? 0x10u : 0u);
     }
-    cutEverywhere(ipv4({.protocol = 1, .payload = hex("03 01 00*6") + header(6) + hex("88 04 12 34 61*12")}));
 }
 
 } // namespace

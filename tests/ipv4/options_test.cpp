@@ -94,23 +94,6 @@ TEST(Ipv4Options, timestampsOfEachForm) {
     EXPECT_EQ(runs.mv.flags, 0u);
 }
 
-TEST(Ipv4Options, namesOfSecurityLevels) {
-    std::vector<std::pair<const char *, std::string>> names = {
-        {"00 00", "Unclassified"}, {"f1 35", "Confidential"}, {"78 9a", "EFTO"},
-        {"bc 4d", "MMMM"},         {"5e 26", "PROG"},         {"af 13", "Restricted"},
-        {"d7 88", "Secret"},       {"6b c5", "Top Secret"},   {"35 f1", ""}};
-    for (const char *octets : {"35 e2", "9a f1", "4d 78", "24 bd", "13 5e", "89 af", "c4 d6", "e2 6b"}) {
-        names.emplace_back(octets, "(Reserved for future use)");
-    }
-    for (const auto &[octets, name] : names) {
-        const Runs runs = runAll(ipv4({.options = hex("82 06") + hex(octets) + hex("80 00 00 00")}));
-        EXPECT_EQ(linesWith(shortLines(runs.md), "325"), "325 \"Security (S Field)=" + name + "\"\n");
-        EXPECT_EQ(linesWith(lines(runs.to), "325"), "325 \"" + name + "\"\n");
-        EXPECT_EQ(runs.md.field("Compartments (C Field)")->text,
-                  "Compartments (C Field)=the compartments field may be obtained from the Defense Intelligence Agency");
-    }
-}
-
 struct OptionsCase {
     const char *octets;
     std::uint32_t flagsOfMv;
@@ -178,7 +161,6 @@ TEST(Ipv4Options, packetThatEndsInThem) {
                      {"end of the list in the payload", ipv4({.payload = hex("00 62"), .options = hex("88 04 12 34")}),
                       "357=88 358=4 361=1234 381=0 285=62", 0, 2},
                  });
-    cutEverywhere(withMostTypes());
 }
 
 } // namespace

@@ -81,19 +81,6 @@ TEST(Ipv6Header, payloadLengthLimitsTheDatagram) {
     EXPECT_EQ(linesWith(lines(runs.md), "954"), "");
 }
 
-// An address needs room for 17 octets in the key record, and takes 16 of them.
-TEST(Ipv6Header, roomForAddressesInTheKeyRecord) {
-    for (const std::uint16_t room : std::vector<std::uint16_t>{0, 1, 16, 17}) {
-        TestRunOptions options;
-        options.byteAreaSize = room;
-        const Report report = runPass(Pass::xtr, ipv6({}), options);
-        EXPECT_EQ(report.ending, room < 17 ? Ending::cutOff : Ending::complete) << room;
-        EXPECT_EQ(report.flags, 0u);
-        EXPECT_EQ(report.key("Payload Length")->number, 0u);
-        EXPECT_EQ(report.key("Destination IP Address") != nullptr, room >= 17);
-    }
-}
-
 // One header after another.
 TEST(Ipv6Chain, everyFieldInEveryPass) {
     const Runs runs = runAll(ipv6({.nextHeader = 0, .payload = hex(R"(
@@ -252,13 +239,6 @@ TEST(Ipv6Chain, headerInAHeader) {
         checkCase(one);
     }
     EXPECT_EQ(keyText(*runAll(ipv6({.nextHeader = 41, .payload = whole})).xtr.key("Source IP Address")), "fe80::");
-}
-
-TEST(Ipv6Chain, cutEverywhere) {
-    cutEverywhere(
-        ipv6({.nextHeader = 0,
-              .payload = hex("3c 00 01 04 00*4  2b 00 05 04 00*4  2c 02 00 01 00*4") + hex(thirdAddress) +
-                         hex("33 00 00 08 00*4  29 02 00*14") + ipv6({.nextHeader = 50, .payload = hex("00*10")})}));
 }
 
 Octets times(std::size_t count, const Octets &unit) {

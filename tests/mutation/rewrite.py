@@ -4,8 +4,9 @@
 
     rewrite.py PLUGIN INCLUDE COPY
 
-COPY gets the files of PLUGIN with each expression in calls of mutant.h, and a list `mutants.txt`: number, place,
-change, and the text that is changed. What is a constant for the compiler stays as it is: mutant.h sees to that.
+COPY gets the files of PLUGIN with each expression in calls of mutant.h, and two lists. `mutants.txt`: number, place,
+change, and the text that is changed. `functions.txt`: number, and the function that the place is in. What is a constant
+for the compiler stays as it is: mutant.h sees to that.
 """
 import pathlib
 import re
@@ -43,6 +44,7 @@ NAMES = {text: name for changes in OPERATORS.values() for name, text in changes}
 
 STATEMENTS = {Kind.CALL_EXPR, Kind.COMPOUND_ASSIGNMENT_OPERATOR, Kind.BINARY_OPERATOR, Kind.UNARY_OPERATOR,
               Kind.UNEXPOSED_EXPR, Kind.CXX_UNARY_EXPR}
+FUNCTIONS = {Kind.FUNCTION_DECL, Kind.FUNCTION_TEMPLATE, Kind.CXX_METHOD, Kind.CONSTRUCTOR, Kind.DESTRUCTOR}
 NUMBERS = {TypeKind.INT, TypeKind.UINT, TypeKind.UCHAR, TypeKind.USHORT, TypeKind.ULONG, TypeKind.LONG,
            TypeKind.SHORT, TypeKind.SCHAR}
 
@@ -54,6 +56,8 @@ class Rewriter:
         self.insertions = {}  # file -> [(offset, order, text)]
         self.done = set()
         self.mutants = []
+        self.function = ""  # of the cursor
+        self.functions = []  # of the mutants
 
     def text(self, name):
         if name not in self.texts:
@@ -94,10 +98,14 @@ class Rewriter:
             return
         if cursor.kind == Kind.CASE_STMT:
             children = children[1:]
+        outer = self.function
+        if cursor.kind in FUNCTIONS:
+            self.function = cursor.spelling
         if file:
             children = self.change(file, cursor, parent, children)
         for child in children:
             self.visit(child, cursor)
+        self.function = outer
 
     def is_constant(self, file, cursor):
         start, end = self.range(cursor)
@@ -218,6 +226,7 @@ class Rewriter:
         text = self.text(file)
         line = text[:start].count(b"\n") + 1
         what = " ".join(text[start:end].decode().split())
+        self.functions.append(f"{len(self.mutants)}\t{self.function}")
         self.mutants.append(f"{len(self.mutants)}\t{file}:{line}\t{change}\t{what}")
         return len(self.mutants) - 1
 
@@ -251,6 +260,7 @@ def main():
     for unit in UNITS:
         rewriter.parse(unit)
     rewriter.write()
+    (copy / "functions.txt").write_text("\n".join(rewriter.functions) + "\n")
     print(f"{len(rewriter.mutants)} mutants in {len(rewriter.insertions)} files")
 
 

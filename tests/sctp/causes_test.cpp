@@ -1,6 +1,5 @@
 // SPDX-License-Identifier: MIT
 // The causes in ABORT and ERROR (RFC 9260, 3.3.10).
-#include <string>
 #include <vector>
 
 #include <gtest/gtest.h>
@@ -160,13 +159,6 @@ TEST(SctpCauses, errorReadsOn) {
     };
     for (const SctpCase &one : cases) {
         checkCase(one, errorIds);
-    }
-}
-
-TEST(SctpCauses, cutEverywhere) {
-    for (const char *cause : {"00 02 00 0c 00 00 00 02 00 05 00 06", "00 05 00 0c 00 05 00 08 0a 00 00 01",
-                              "00 08 00 0c c0 00 00 08 00 00 01 02", "00 63 00 0a 01 02 03 04 05 06"}) {
-        cutEverywhere(sctp(abortChunk(cause) + errorChunk(cause) + hex("0b 00 00 04")));
     }
 }
 

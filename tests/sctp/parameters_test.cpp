@@ -1,6 +1,5 @@
 // SPDX-License-Identifier: MIT
 // The parameters of INIT and INIT ACK (RFC 9260, 3.3.2 and 3.3.3).
-#include <string>
 #include <vector>
 
 #include <gtest/gtest.h>
@@ -200,14 +199,6 @@ TEST(SctpInitAck, parametersFollowTheFields) {
     };
     for (const SctpCase &one : cases) {
         checkCase(one, initAckIds);
-    }
-}
-
-TEST(SctpInit, cutEverywhere) {
-    for (const std::uint8_t type : hex("01 02")) {
-        cutEverywhere(sctp(chunk(type, hex(R"(00*16  00 05 00 08 0a 00 00 01  00 06 00 14 20 01 0d b8 00*11 01
-            00 07 00 08 61 62 63 64  00 0b 00 08 68 69 00 00  00 0c 00 08 00 05 00 06  00 08 00 0c 00 63 00 08 61*4)")) +
-                           hex("0b 00 00 04")));
     }
 }
 

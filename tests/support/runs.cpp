@@ -204,17 +204,6 @@ Runs runAll(std::span<const std::uint8_t> packet, const TestRunOptions &options,
     return runs;
 }
 
-void cutEverywhere(const Octets &packet, const std::function<void(std::size_t, const Runs &)> &check, Host &host) {
-    for (std::size_t octets = 0; octets <= packet.size(); ++octets) {
-        SCOPED_TRACE("cut after " + std::to_string(octets) + " octets");
-        const Runs runs = runAll(std::span(packet).first(octets), {}, host);
-        if (check) {
-            check(octets, runs);
-        }
-        runAll(shortened(packet, octets), {}, host);
-    }
-}
-
 std::string lines(const Report &report) {
     std::ostringstream out;
     for (const FieldReport &field : report.fields) {

@@ -24,7 +24,6 @@
 #pragma once
 
 #include <array>
-#include <functional>
 #include <span>
 #include <string>
 #include <string_view>
@@ -57,11 +56,6 @@ struct Runs {
 // left, depth of the stacks, layers, hand-offs, number of fields and texts, the flags that all passes raise, the
 // verdict, and for each key field a field of that name and value in MD.
 Runs runAll(std::span<const std::uint8_t> packet, const TestRunOptions &options = {}, Host &host = sharedHost());
-
-// runAll for the first n octets of the packet, for every n, and once more with n in the packet's length field.
-// `check`, if there is one, gets n and the runs with the length field unchanged.
-void cutEverywhere(const Octets &packet, const std::function<void(std::size_t, const Runs &)> &check = {},
-                   Host &host = sharedHost());
 
 // All that a report holds, as lines, see above.
 [[nodiscard]] std::string lines(const Report &report);

@@ -150,7 +150,6 @@ TEST(Tcp, segmentThatEndsEarly) {
         EXPECT_EQ(runs.md.flags, whole ? 2u : 0u);
         EXPECT_EQ(runs.mv.flags, (whole ? 2u : octets > 12 ? 8u : 0u) | (swept ? 0x10u : 0u));
     }
-    cutEverywhere(withUsualOptions());
 }
 
 TEST(Tcp, destinationPortNamesTheOuterProtocol) {

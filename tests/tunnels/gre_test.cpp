@@ -1,9 +1,5 @@
 // SPDX-License-Identifier: MIT
 // Generic routing encapsulation (RFC 2784, 2890).
-#include <sstream>
-#include <string>
-#include <vector>
-
 #include <gtest/gtest.h>
 
 #include "support/listings.h"
@@ -53,7 +49,6 @@ TEST(Gre, everyFieldInEveryPass) {
         row 104 Sequence Number=4294967294
     )"));
     EXPECT_EQ(verdictLine(runs.mv), "verdict 0 flags 0x0\n");
-    cutEverywhere(packet);
 }
 
 TEST(Gre, framesAndLengths) {
@@ -81,24 +76,6 @@ TEST(Gre, framesAndLengths) {
              0, 0x10},
             {"payload ends inside the header", inTunnel(22, head + hex("45")), "", 2, 0x12},
         });
-}
-
-TEST(Gre, namesOfProtocols) {
-    std::istringstream names("0 Reserved|4 SNA|fe OSI network layer|200 PUP|600 XNS|800 IP|804 Chaos|806 RFC 826 ARP|"
-                             "808 Frame Relay ARP|bad VINES|bae VINES Echo|baf VINES Loopback|6003 DECnet (Phase IV)|"
-                             "6558 Transparent Ethernet Bridging|6559 Raw Frame Relay|8019 Apollo Domain|"
-                             "809b Ethertalk (Appletalk)|8137 Novell IPX|876b RFC 1144 TCP/IP compression|"
-                             "876c IP Autonomous Systems|876d Secure Data|880b PPP|8881 Unstructured Byte Stream|"
-                             "ffff Reserved|1 1|1234 1234|bb0 bb0|fffe fffe");
-    std::uint32_t protocol = 0;
-    while (names >> std::hex >> protocol) {
-        std::string name;
-        std::getline(names >> std::ws, name, '|');
-        const Runs runs = runAll(gre(hex("00 00") + be16(protocol)));
-        EXPECT_EQ(runs.md.fields.back().text, "GRE Protocol=" + name);
-        EXPECT_EQ(runs.to.displays.back().text, name);
-        EXPECT_EQ(runs.xtr.key("GRE Protocol")->number, protocol);
-    }
 }
 
 } // namespace

@@ -1,6 +1,5 @@
 // SPDX-License-Identifier: MIT
 // IP in IP (RFC 2003) and minimal encapsulation (RFC 2004).
-#include <algorithm>
 #include <string>
 #include <tuple>
 #include <vector>
@@ -138,11 +137,6 @@ TEST(Tunnels, lengthsOfHeadersAndPayload) {
                       });
 }
 
-TEST(Tunnels, cutAtEveryOctet) {
-    cutEverywhere(
-        tunnel(4, tunnel(55, hex("04 80 00 00 0a 00 00 01 0a 00 00 02") + tunnel(17, udp(53, 53, hex("61*5"))))));
-}
-
 // As deep as 65535 octets go, with a datagram innermost, and with nothing.
 TEST(Tunnels, deepestOnASmallStack) {
     for (const bool datagram : {true, false}) {
@@ -174,24 +168,6 @@ TEST(Tunnels, deepestOnASmallStack) {
                 }
             });
         }
-    }
-}
-
-// Each level has a block of its own, and the stack of blocks grows with them.
-TEST(Tunnels, growthThatFails) {
-    const Octets packet = tunnel(4, tunnel(4, tunnel(4, tunnel(4, tunnel(253, hex("61"))))));
-    for (std::uint32_t capacity = 6; capacity <= 10; ++capacity) {
-        SCOPED_TRACE(capacity);
-        TestRunOptions options;
-        options.state.blockCapacity = capacity;
-        options.state.allowGrowth = [](std::size_t) { return false; };
-        const Runs runs = runAll(packet, options);
-        // The service block of a level is at depth 6, 7 and so on, after the level's first two fields.
-        const std::size_t levels = capacity - 6;
-        const bool whole = levels == 4;
-        EXPECT_EQ(runs.md.ending, whole ? Ending::complete : Ending::cutOff);
-        EXPECT_EQ(runs.md.flags, whole ? 0u : static_cast<std::uint32_t>(NETFLOOR_FLAG_NO_STACK));
-        EXPECT_EQ(runs.md.fields.size(), 18 + 18 * levels + (whole ? 1 : 2));
     }
 }
 
