@@ -98,25 +98,6 @@ TEST(Layers, openPacketsInsideAPacket) {
     }
 }
 
-TEST(Layers, keepTheValuesOfEachLayer) {
-    Host host(PluginLibrary::open(NETFLOOR_PLUGIN));
-    LayerView view(host);
-    const Octets packet = overUdp(gtpU("30", ipv4({.protocol = 41, .payload = inner6, .timeToLive = 9})));
-    view.read(packet);
-    std::string text;
-    TextRoom room;
-    for (const Layer &layer : view.layers()) {
-        if (layer.kind == LayerKind::ip) {
-            text += std::to_string(layer.firstOctet) + " " +
-                    std::string(tunnelName(view.packets()[layer.packet].tunnel)) + " " +
-                    std::to_string(*view.number(layer, layerField("ip.ttl"))) + " " +
-                    std::string(view.address(layer, layerField("ip.source"), room)) + "\n";
-        }
-    }
-    EXPECT_EQ(text, "0  64 10.0.0.1\n36 GTP-U 9 10.0.0.1\n56 IP 64 2001:db8::1\n");
-    EXPECT_EQ(view.packets()[1].id, 7U);
-}
-
 // What the plug-in reads from a wrong place is left out, also inside a tunnel that it reads itself.
 TEST(Layers, leaveOutWhatIsMisread) {
     Host host(PluginLibrary::open(NETFLOOR_PLUGIN));
