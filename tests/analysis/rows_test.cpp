@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: MIT
 // The rows of a packet and their columns.
 #include <map>
-#include <optional>
 #include <string>
 
 #include <gtest/gtest.h>
@@ -111,19 +110,10 @@ TEST(Rows, haveWhatThereIsWithoutIp) {
     EXPECT_NE(rowsOf(captured(half)).find(" note=no whole IP header "), std::string::npos);
 }
 
-// What a column of that type can hold, in bits.
-std::optional<unsigned> mostBits(ColumnType type) {
-    switch (type) {
-    case ColumnType::boolean: return 1;
-    case ColumnType::u8: return 8;
-    case ColumnType::u16: return 16;
-    case ColumnType::u32: return 32;
-    default: return std::nullopt;
-    }
-}
-
 TEST(Columns, holdTheirFields) {
     const FieldTables tables(PluginLibrary::open(NETFLOOR_PLUGIN));
+    const std::map<ColumnType, unsigned> mostBits = {
+        {ColumnType::boolean, 1}, {ColumnType::u8, 8}, {ColumnType::u16, 16}, {ColumnType::u32, 32}};
     std::map<std::string_view, ColumnType> types;
     for (const RowKind kind : {RowKind::layer, RowKind::chunk}) {
         for (const Column &column : columns(kind)) {
@@ -138,8 +128,8 @@ TEST(Columns, holdTheirFields) {
         EXPECT_EQ(type == ColumnType::octets, row.value == LayerValue::octets) << row.name;
         for (const FieldDescription *field : tables.named(row.field.name)) {
             // The option is there: its number is no value.
-            if (row.field.fits(*field) && mostBits(type) && row.name != "tcp.sack_permitted") {
-                EXPECT_TRUE(field->width && *field->width <= *mostBits(type)) << row.name << " " << field->id;
+            if (row.field.fits(*field) && mostBits.contains(type) && row.name != "tcp.sack_permitted") {
+                EXPECT_TRUE(field->width && *field->width <= mostBits.at(type)) << row.name << " " << field->id;
             }
         }
     }
