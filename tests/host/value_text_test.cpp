@@ -38,8 +38,10 @@ TEST(Text, showsIpv6AddressesAsRfc5952Asks) {
     for (const auto &[octets, text] : cases) {
         EXPECT_EQ(ipv6Text(octetsOf(octets)), text);
     }
-    EXPECT_EQ(ipv4Text(0xc0a8000a), "192.168.0.10");
-    EXPECT_EQ(ipv4Text(0xffffffff), "255.255.255.255");
+    for (std::uint32_t octet = 0; octet < 256; ++octet) {
+        const std::string text = std::to_string(octet);
+        EXPECT_EQ(ipv4Text(octet << 24 | octet << 16 | 0x6400 | octet), text + "." + text + ".100." + text);
+    }
 }
 
 // `count` ranges of `bits` bits, one after the other.
