@@ -50,6 +50,7 @@ TEST(Condition, holdsForOneLayerAndOneChunk) {
         {inner, "tcp.source_port != 53", false}, // there is none
         {inner, "!(tcp.source_port == 53)", true},
         {inner, "udp.port == 53 and udp.port == 5000", true},
+        {chunks, "sctp.port == 2905 and not tcp.port == 2905", true},
         {inner, "udp.port in {1, 52-54}", true},
         {inner, "source_port in {53, 5000} and destination_port in {53, 5000}", true},
         {inner, "source_port == 2905", false},
@@ -61,6 +62,7 @@ TEST(Condition, holdsForOneLayerAndOneChunk) {
         {inner, "ip.source in 10.0.0.0/8", true},
         {inner, "ip.source in {11.0.0.0/8, 10.0.0.1}", true},
         {inner, "ip.source in 10.0.0.2/31", false},
+        {inner, "ip.source in 11.0.0.0/7", true},
         {inner, "ip.address == ::a00:1", false},
         {inner, "ip.source in 0.0.0.0/0", true},
         {overIpv6, "ip.source in 2001:db8::/32", true},
@@ -98,6 +100,7 @@ TEST(Condition, pointsAtAMistake) {
         {"ip.source == 10.0.0", "             ^^^^^^", "no IPv4 or IPv6 address"},
         {"ip.source == 1:::2", "             ^^^^^", "no IPv4 or IPv6 address"},
         {"ip.source in 10.0.0.0/33", "             ^^^^^^^^^^^", "from 0 to 32"},
+        {"ip.source in 10.0.0.0/", "             ^^^^^^^^^", "from 0 to 32"},
         {"ip.source < 10.0.0.1", "          ^", "have no order"},
         {"udp.port in {1 2}", "               ^", "a ',' or a '}'"},
         {"udp.port in 5-4", "             ^", "ends before it starts"},

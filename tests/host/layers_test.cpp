@@ -82,6 +82,11 @@ TEST(Layers, openPacketsInsideAPacket) {
         {"IPv6 in GTP-U", overUdp(gtpU("30", inner6)), "2152>53 5000>53", 2},
         {"VXLAN", overUdp(hex("08 000000 000102 00") + ethernet + inner, 4789), "4789>53 5000>53", 2},
         {"GRE", overGre("0000 0800", inner), "5000>53", 2},
+        {"GRE in minimal encapsulation", ipv4({.protocol = 55, .payload = hex("2f 00*3 0a*4 0000 0800") + inner}),
+         "5000>53", 3},
+        {"minimal encapsulation with a source",
+         ipv4({.protocol = 55, .payload = hex("2f 80 0000 0a*8 0000 0800") + inner}), "5000>53", 3},
+        {"minimal encapsulation that is cut", ipv4({.protocol = 55, .payload = hex("2f 00*3 0a*3")}), "", 2},
         {"GRE with key and sequence", overGre("3000 86dd 00000001 00000002", inner6), "5000>53", 2},
         {"Ethernet in GRE", overGre("0000 6558", ethernet + inner), "5000>53", 2},
         {"MPLS in GRE", overGre("0000 8847 00001040 00002140", inner), "5000>53", 2},
@@ -182,7 +187,7 @@ std::string_view sectionBefore(std::uint32_t flag, const Report &report, const F
 TEST(Layers, areTheSameWithoutAPass) {
     constexpr std::uint8_t icmpProtocol = 1;
     constexpr std::uint8_t tcpProtocol = 6;
-    const Octets values = hex("00 01 02 05 08 0a 12 13 20 45 50 ff");
+    const Octets values = hex("00 01 02 05 08 0a 13 1a 20 45 50 ff");
     const Octets tcpHead = hex("d431 0050 01234567 89abcdef");
     const auto tcp = [&](const std::string &rest) { return tcpHead + hex(rest); };
     const Octets payloads[] = {

@@ -81,10 +81,6 @@ TEST(Sink, showsLinksOfAChainSideBySide) {
          "Common Header{....}Chunk{.Abort Association{...}}"
          "Chunk{.Cookie Acknowledge{.Length{.}}}"
          "Chunk{.INIT{.......Init Option{..IPv4 Address{.}}Init Option{..IPv4 Address{.}}}}}}}"},
-        {"tunnels", tunnelled(ipv6({.nextHeader = 17, .payload = smallUdp}), 2),
-         "Ip Header{.IPv6 Header{...IPv6 Body{.Next Header{.}.IP Address{..}IP Address{..}}}"
-         "IPv6 Header{...IPv6 Body{.Next Header{.}.IP Address{..}IP Address{..}}}"
-         "IPv6 Header{...IPv6 Body{.Next Header{.}.IP Address{..}IP Address{..}User Datagram Protocol{....}}}}"},
         {"a header inside a header",
          ipv4({.protocol = 1, .payload = hex("03 01 00 00 00000000") + ipv4({.protocol = 17, .payload = smallUdp})}),
          "Destination Unreachable Message{...Internet Protocol Message in ICMP{..............Embedded IP Protocols{.}"

@@ -154,8 +154,11 @@ def tables(program, image):
             r"(?m)^ *\d+: ([0-9a-f]+) +(\w+) OBJECT +\w+ +\w+ +(\d+) (netfloor::.*)$", symbols):
         if section in constant and not re.search(r"^netfloor::test::|::(start|end)Text$", symbol):  # the text of the page
             at, size = int(at, 16), int(size, 0)
+            content = bytearray(image.content(at, size))
             pointers = tuple(offset for offset in range(0, size, 4) if at + offset in image.pointers)
-            found[symbol, image.content(at, size), pointers].add(at)
+            for offset in pointers:  # what they point to is elsewhere in each program
+                content[offset:offset + 8] = bytes(8)
+            found[symbol, bytes(content), pointers].add(at)
     return found
 
 
