@@ -51,11 +51,8 @@ struct EndOfRun final : Sink {
 // A capture file may hold megabytes after a packet. The plug-in gets what an IP header can reach, and they count as
 // left.
 TEST(Host, handsOverWhatAnIpHeaderCanReach) {
-    struct Case {
-        Octets packet;
-        std::uint32_t read; // octets
-    };
-    const std::vector<Case> cases = {
+    const std::pair<Octets, std::uint32_t> cases[] = {
+        // and the octets that are read
         {udpPacket(40001, twelveOctets), 40},
         {ipv6({.nextHeader = 59, .payload = Octets(65535, 0x61)}), 40 + 65535},
         // a jumbo payload (RFC 2675)
@@ -63,15 +60,15 @@ TEST(Host, handsOverWhatAnIpHeaderCanReach) {
          40},
     };
     Host host = freshHost();
-    for (const Case &one : cases) {
+    for (const auto &[beginning, read] : cases) {
         for (const Pass pass : allPasses) {
-            Octets packet = one.packet;
+            Octets packet = beginning;
             packet.resize(1'000'000);
             EndOfRun seen;
             EXPECT_EQ(host.run(pass, packet, seen), Ending::complete);
             EXPECT_EQ(seen.octets, 40u + 65535u);
-            const bool stops = pass == Pass::xtr && one.packet[0] >> 4 == 4; // at the hand-off
-            EXPECT_EQ(seen.bitsLeft, stops ? 0 : (packet.size() - one.read) * 8);
+            const bool stops = pass == Pass::xtr && packet[0] >> 4 == 4; // at the hand-off
+            EXPECT_EQ(seen.bitsLeft, stops ? 0 : (packet.size() - read) * 8);
         }
     }
 }
