@@ -128,6 +128,13 @@ TEST(Checks, findNothingInSoundPackets) {
         sealed(ipv4({.protocol = 4, .payload = udp4})),
         sealed(ipv4({.protocol = 47, .payload = hex("0000 0800") + tcpPlain})),
         sealed(ipv4({.protocol = 17, .payload = hex("00*24"), .fragment = 0x0010})), // a later fragment
+        sealed(ipv4({.options = hex("86 0e 00000001 01 04 0000 01 04 0000 00*2")})),
+        sealed(ipv4({.protocol = 1, .payload = hex("05 01 0000 0a000001") + udp4})),
+        icmp6(hex("8f 00 0000 0000 0001 04 00 0000 ff02 00*13 01")),
+        ipv6({.nextHeader = 44, .payload = hex("3b 00 0001 00000001 00*16")}), // a first fragment, and a later one
+        ipv6({.nextHeader = 44, .payload = hex("11 00 0008 00000001 00*3")}),
+        ipv6({.nextHeader = 17, .payload = udp(1, 4789)}), // a tunnel needs no checksum
+        sctp4(hex("82 00 0004 04 00 000c 0008 0008 8001 0004")),
         // The extension of an ICMP message has a checksum, and what a routing header leads to is in that of UDP.
         sealed(ipv4({.protocol = 1, .payload = hex("0b 00 0000 00080000") + udp4 + hex("00*2 2000 defa 0004 0101")})),
         ipv6({.nextHeader = 43,
@@ -149,6 +156,10 @@ TEST(Checks, nameEachFault) {
         Octets packet;
         const char *faults;
     };
+    Octets chain;
+    for (int header = 0; header < 17; ++header) {
+        chain = sealed(ipv4({.protocol = 4, .payload = chain}));
+    }
     const std::vector<Row> rows = {
         {hex("50*20"), "damage IP: the version is 5, at octet 0"},
         {withHeader(udp4, 0, 0x44), "damage IPv4: the header length is 16 octets, and 20 is the least, at octet 0"},
@@ -184,6 +195,16 @@ TEST(Checks, nameEachFault) {
          "damage ICMPv6: a multicast record ends 16 octets after the packet, at octet 48"},
         {icmp6(hex("82 00 0000 0000 0000 ff02 00*13 01 02 7d 0001")),
          "damage ICMPv6: the header ends 16 octets short of 44, at octet 40"},
+        {ipv6({.nextHeader = 17, .payload = udp(1, 2)}),
+         "damage UDP: the checksum is 0, which IPv6 does not allow, at octet 46"},
+        {with(udp6, 5, 0),
+         "note IPv6: the payload length is 0, as of a jumbogram or where the network card fills it in, "
+         "at octet 4"},
+        {ipv6({.nextHeader = 44, .payload = hex("3b 00 0001 00000001 00*3")}),
+         "damage IPv6: a fragment with others after it has 3 octets, which is no multiple of 8, at octet 40"},
+        {sealed(ipv4({.payload = hex("01"), .options = hex("94 04 0000")})),
+         "misread IPv4: the plug-in reads the octet after the options as one more, at octet 24"},
+        {chain, "note IP: more than 16 IP headers are not checked, at octet 320"},
         {sctp4(with(init, 3, 0x18)), "damage SCTP: chunk 1 ends 4 octets after the packet, at octet 32"},
         {sctp4(hex("05 00 0003")), "damage SCTP: chunk 5 has a length of 3, at octet 32"},
         {sctp4(hex("03 00 0010 00000001 00010000 0001 0000")),

@@ -169,10 +169,12 @@ def words(tree, checks):
     for table in sorted(found["netfloor"], key=lambda table: table[0]):
         symbol, content, pointers = table
         for offset in range(0, len(content), 4):
-            if offset in pointers or any(content[offset:offset + 4]):
-                places = ",".join(f"{name}:{at + offset:x}" for name, of in found.items() for at in of.get(table, ()))
+            word = content[offset:offset + 4]
+            if offset in pointers or any(word):
+                octet = offset + next((i for i, value in enumerate(word) if value), 0)  # one that counts
+                places = ",".join(f"{name}:{at + octet:x}" for name, of in found.items() for at in of.get(table, ()))
                 holding = {"command", "test_cli"} | {name for name, of in found.items() if table in of}
-                yield Mutant(symbol, "table", f"octet {offset}", {"NETFLOOR_MUTANT_WORD": places},
+                yield Mutant(symbol, "table", f"octet {octet}", {"NETFLOOR_MUTANT_WORD": places},
                              [check for check in checks if check.stage in holding])
 
 
