@@ -10,7 +10,7 @@ set -euo pipefail
 cd "$(dirname "$0")/.."
 work=build/mutants-host
 tree=$work/tree
-least=90 # of a hundred changes
+least=80 # of a hundred changes
 folders=(host analysis capture columns cli)
 tests=(test_host test_analysis test_capture test_columns test_cli)
 captures=$PWD/tests/captures

@@ -204,6 +204,15 @@ TEST(Checks, nameEachFault) {
          "damage IPv6: a fragment with others after it has 3 octets, which is no multiple of 8, at octet 40"},
         {sealed(ipv4({.payload = hex("01"), .options = hex("94 04 0000")})),
          "misread IPv4: the plug-in reads the octet after the options as one more, at octet 24"},
+        // The checksum is over the home address, which is the source of the other packet.
+        {ipv6({.nextHeader = 60,
+               .payload = hex("11 02 c9 10") + Octets(udp6.begin() + 8, udp6.begin() + 24) + hex("01 02 0000") +
+                          Octets(udp6.begin() + 40, udp6.end()),
+               .source = {0xfd}}),
+         "misread IPv6: the plug-in reads the options after the first as the next header, at octet 60"},
+        {ipv6({.nextHeader = 0, .payload = hex("3b 00 c2 04 00000008"), .payloadLength = 0}),
+         "note IPv6: the payload length is 0, as of a jumbogram or where the network card fills it in, at octet 4; "
+         "damage IPv6: the jumbo payload has 8 octets, which need no such option, at octet 42"},
         {chain, "note IP: more than 16 IP headers are not checked, at octet 320"},
         {sctp4(with(init, 3, 0x18)), "damage SCTP: chunk 1 ends 4 octets after the packet, at octet 32"},
         {sctp4(hex("05 00 0003")), "damage SCTP: chunk 5 has a length of 3, at octet 32"},
