@@ -1,7 +1,7 @@
 #!/bin/bash
 # SPDX-License-Identifier: MIT
 # Builds for llvm-cov, runs all tests, the whole sweep and the fuzz corpora, and prints what they reach: branch sides of
-# plugin/, lines of host/, capture/ and cli/, and for each what is not reached.
+# plugin/, lines of host/, analysis/, capture/ and cli/, and for each what is not reached.
 #
 #   scripts/coverage.sh [GLOB...]    only these tests, by ctest's names: scripts/coverage.sh 'fuzz\.'
 set -eu
@@ -32,5 +32,5 @@ figures() { # FOLDER OBJECT...
             folder, $2, $1, 100 * $2 / ($1 ? $1 : 1), $4, $3, 100 * $4 / ($3 ? $3 : 1) }'
 }
 figures plugin $build/plugin/libnetfloor.so
-[ $# -gt 0 ] || for folder in host capture cli; do figures $folder $build/cli/netfloor $build/libhs_HostServices.so; done
+[ $# -gt 0 ] || for folder in host analysis capture cli; do figures $folder $build/cli/netfloor $build/libhs_HostServices.so; done
 echo "not reached, of plugin/: llvm-cov show --show-branches=count --instr-profile=$profiles/all $build/plugin/libnetfloor.so plugin"
