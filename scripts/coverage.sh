@@ -1,7 +1,7 @@
 #!/bin/bash
 # SPDX-License-Identifier: MIT
 # Builds for llvm-cov, runs tests, the whole sweep and the fuzz corpora, and prints what they reach: branch sides of
-# plugin/, lines of host/, capture/ and cli/. Of plugin/ it names each side that is not reached, but those that
+# plugin/, lines of host/, analysis/, capture/ and cli/. Of plugin/ it names each side that is not reached, but those that
 # tests/coverage/explained.txt explains, and fails where they are too many.
 #
 #   scripts/coverage.sh              all tests
@@ -40,6 +40,6 @@ figures() { # FOLDER OBJECT...
         awk -v folder="$folder" '{ printf "%-8s branch sides %d of %d (%.1f %%), lines %d of %d (%.1f %%)\n",
             folder, $2, $1, 100 * $2 / ($1 ? $1 : 1), $4, $3, 100 * $4 / ($3 ? $3 : 1) }'
 }
-[ $# -gt 0 ] || for folder in host capture cli; do figures $folder $build/cli/netfloor $build/libhs_HostServices.so; done
+[ $# -gt 0 ] || for folder in host analysis capture cli; do figures $folder $build/cli/netfloor $build/libhs_HostServices.so; done
 llvm-cov export --instr-profile="$profiles/all" $build/plugin/libnetfloor.so plugin |
     tests/coverage/branch_sides.py plugin tests/coverage/explained.txt $least

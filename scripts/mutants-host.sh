@@ -1,9 +1,9 @@
 #!/bin/bash
 # SPDX-License-Identifier: MIT
-# Changes the host, the capture library and the command in some eight thousand places, one at a time, and counts the changes
-# that command lines or tests notice. All changes are compiled into one build, and one is chosen at run time. Tables are
-# changed in memory. Names each that is not noticed, but those of which tests/mutation/host_explained.txt says why. Fails
-# where they are too many.
+# Changes the host, the capture library and the command in some 9,600 places, one at a time, and counts the changes that
+# command lines or tests notice. All changes are compiled into one build, and one is chosen at run time. Tables are changed
+# in memory. Names each that is not noticed, but those of which tests/mutation/host_explained.txt says why. Fails
+# where they are too many. build/mutants-host/report.txt has a line for each change as soon as it is known what notices it.
 #
 #   scripts/mutants-host.sh [EVERY]    each EVERY-th change, 41
 set -euo pipefail
@@ -42,4 +42,4 @@ if [ "$(cat $work/sources 2>/dev/null)" != "$sources" ]; then
     echo "$sources" >$work/sources
 fi
 cp build/plugin/libnetfloor.so $tree/build/plugin/
-exec /usr/bin/python3 tests/mutation/run_host_mutants.py $tree "$captures" tests/mutation/host_explained.txt "${1:-41}" $least
+exec /usr/bin/python3 tests/mutation/run_host_mutants.py $tree "$captures" tests/mutation/host_explained.txt "${1:-41}" $least $work/report.txt

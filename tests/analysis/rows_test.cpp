@@ -17,8 +17,10 @@ class Lines final : public RowSink {
 public:
     void row(const Row &row) override {
         text += tableName(row.kind());
+        bool isTimed = false;
         row.forEach([&](std::size_t place, const Value &value) {
             const Column &column = columns(row.kind())[place];
+            isTimed |= column.name == "time";
             if (column.isRepeated) {
                 return;
             }
@@ -31,15 +33,16 @@ public:
             default: text += std::to_string(value.number); break;
             }
         });
-        text += '\n';
+        text += isTimed ? "\n" : " untimed\n";
     }
 
     std::string text;
 };
 
+// Of packets one after the other, by one object.
 std::string rowsOf(const CapturedPacket &captured, int linkType = 228) {
-    Host host(PluginLibrary::open(NETFLOOR_PLUGIN));
-    PacketRows rows(host);
+    static Host host(PluginLibrary::open(NETFLOOR_PLUGIN));
+    static PacketRows rows(host);
     Lines lines;
     const NetworkPart network = findNetworkPart(linkType, captured.octets);
     rows.read({captured, network, network.other.text()}, lines);
@@ -55,6 +58,8 @@ CapturedPacket captured(const Octets &octets) {
     packet.octets = octets;
     return packet;
 }
+
+constexpr CaptureTime outsideOfTime = {std::int64_t{1} << 40, 0}; // of what 64 bits of nanoseconds hold
 
 TEST(Rows, areOfPacketLayersChunksAndCauses) {
     // ABORT with two causes, the second longer than the chunk; a cause of length 0; a DATA chunk after it.
@@ -83,6 +88,9 @@ TEST(Rows, areOfPacketLayersChunksAndCauses) {
     for (const std::string_view part : wanted) {
         EXPECT_NE(text.find(part), std::string::npos) << part << "\nis not in\n" << text;
     }
+    CapturedPacket untimed = captured(packet);
+    untimed.time = outsideOfTime;
+    EXPECT_NE(rowsOf(untimed).find(" cause_value=61 61 untimed\n"), std::string::npos) << "no time of a packet before";
 }
 
 TEST(Rows, tellHowPacketsCameIn) {
@@ -100,12 +108,12 @@ TEST(Rows, tellHowPacketsCameIn) {
 TEST(Rows, haveWhatThereIsWithoutIp) {
     const Octets arp = hex("ff*6 02*6 0806 00*28");
     CapturedPacket packet = captured(arp);
-    packet.time = CaptureTime{std::int64_t{1} << 40, 0};
+    packet.time = outsideOfTime;
     packet.interfaceNumber = 2;
     packet.interfaceName = "caf\xc3\xa9 \xff";
     packet.wireOctets = 60;
     EXPECT_EQ(rowsOf(packet, 1), "packets packet=7 interface.number=2 interface.name=caf\xc3\xa9 \xef\xbf\xbd "
-                                 "link_type=228 length=60 captured_length=42 no_ip=ARP ip_layers=0\n");
+                                 "link_type=228 length=60 captured_length=42 no_ip=ARP ip_layers=0 untimed\n");
     const Octets half = hex("60");
     EXPECT_NE(rowsOf(captured(half)).find(" note=no whole IP header "), std::string::npos);
 }
@@ -114,6 +122,8 @@ TEST(Columns, holdTheirFields) {
     const std::map<ColumnType, std::uint32_t> mostBits = {
         {ColumnType::boolean, 1}, {ColumnType::u8, 8}, {ColumnType::u16, 16}, {ColumnType::u32, 32}};
     const FieldTables tables(PluginLibrary::open(NETFLOOR_PLUGIN));
+    const std::map<ColumnType, unsigned> mostBits = {
+        {ColumnType::boolean, 1}, {ColumnType::u8, 8}, {ColumnType::u16, 16}, {ColumnType::u32, 32}};
     std::map<std::string_view, ColumnType> types;
     for (const RowKind kind : {RowKind::layer, RowKind::chunk}) {
         for (const Column &column : columns(kind)) {

@@ -19,6 +19,11 @@ const Octets chunks = ipv4({.protocol = 132,
                                            "00 03 0011 00000007 0001 0000 00000000 61 000000"
                                            "00 03 0011 00000008 0002 0000 00000000 61 000000")});
 
+const Octets icmpv6Error = ipv6({.nextHeader = 58, .payload = hex("01 00 0000 00000000") + overIpv6});
+const Octets icmpError = ipv4({.protocol = 1, .payload = hex("03 01 0000 00000000") + inner});
+const Octets gre = ipv4({.protocol = 47, .payload = hex("0000 6003 00*8")});
+const Octets esp = ipv6({.nextHeader = 51, .payload = hex("3b 01 0000 00000001 00000001 00000000")});
+
 TEST(Condition, holdsForOneLayerAndOneChunk) {
     Host host(PluginLibrary::open(NETFLOOR_PLUGIN));
     LayerView view(host);
@@ -27,18 +32,25 @@ TEST(Condition, holdsForOneLayerAndOneChunk) {
         const char *text;
         bool holds;
     } cases[] = {
-        {inner, "udp", true},
-        {inner, "tcp", false},
+        {inner, "ip and udp and payload and not gre", true},
+        {inner, "tcp or sctp or chunk or security", false},
+        {gre, "gre and not icmp", true},
+        {icmpError, "icmp and quoted and not icmpv6 and not tcp and not udp", true},
+        {icmpv6Error, "icmpv6 and not quoted", true},
+        {chunks, "sctp and chunk and not security", true},
+        {esp, "security and not payload", true},
         {inner, "ip.ttl == 3", true},
         {inner, "ip.ttl = 0x3", true},
         {inner, "ip.ttl != 3", false},
         {inner, "ip.ttl < 3 or ip.ttl > 3", false},
         {inner, "ip.ttl <= 3 && ip.ttl >= 3", true},
         {inner, "ip.ttl < 0 || ip.ttl > 4294967295", false},
+        {inner, "ip.ttl eq 3 and ip.ttl ne 4 and ip.ttl lt 4 and ip.ttl le 3 and ip.ttl gt 2 and ip.ttl ge 3", true},
         {inner, "not udp.source_port == 53", true},
         {inner, "tcp.source_port != 53", false}, // there is none
         {inner, "!(tcp.source_port == 53)", true},
         {inner, "udp.port == 53 and udp.port == 5000", true},
+        {chunks, "sctp.port == 2905 and not tcp.port == 2905", true},
         {inner, "udp.port in {1, 52-54}", true},
         {inner, "source_port in {53, 5000} and destination_port in {53, 5000}", true},
         {inner, "source_port == 2905", false},
@@ -46,9 +58,11 @@ TEST(Condition, holdsForOneLayerAndOneChunk) {
         {inner, "udp.port in {1, 54-60}", false},
         {inner, "udp.source_port == 1 or udp.source_port == 2 and udp or ip.version == 4", true},
         {inner, "ip.dont_fragment", false}, // a flag that is not set
+        {inner, "ip.source", true},         // is there
         {inner, "ip.source in 10.0.0.0/8", true},
         {inner, "ip.source in {11.0.0.0/8, 10.0.0.1}", true},
         {inner, "ip.source in 10.0.0.2/31", false},
+        {inner, "ip.source in 11.0.0.0/7", true},
         {inner, "ip.address == ::a00:1", false},
         {inner, "ip.source in 0.0.0.0/0", true},
         {overIpv6, "ip.source in 2001:db8::/32", true},
@@ -86,6 +100,7 @@ TEST(Condition, pointsAtAMistake) {
         {"ip.source == 10.0.0", "             ^^^^^^", "no IPv4 or IPv6 address"},
         {"ip.source == 1:::2", "             ^^^^^", "no IPv4 or IPv6 address"},
         {"ip.source in 10.0.0.0/33", "             ^^^^^^^^^^^", "from 0 to 32"},
+        {"ip.source in 10.0.0.0/", "             ^^^^^^^^^", "from 0 to 32"},
         {"ip.source < 10.0.0.1", "          ^", "have no order"},
         {"udp.port in {1 2}", "               ^", "a ',' or a '}'"},
         {"udp.port in 5-4", "             ^", "ends before it starts"},

@@ -51,8 +51,6 @@ TEST(FieldKnowledge, namesWhatDoesNotFit) {
     } cases[] = {
         {"a protocol at the end", [&](Fields &all) { all.push_back(stranger); },
          "'Stranger' (9999) is in no section: add a row, or move an end, in 'sections'"},
-        {"a protocol between two", [&](Fields &all) { all.insert(place(all, 479), stranger); },
-         "'Stranger' (9999) is in no section: add a row, or move an end, in 'sections'"},
         {"the first of a section", [](Fields &all) { place(all, 479)->name = "Source"; },
          "UDP: 'UDP Source Port' is no field of the plug-in there"},
         {"an end that is no longer the only one", [&](Fields &all) { all.insert(place(all, 408), namesake); },
@@ -61,8 +59,6 @@ TEST(FieldKnowledge, namesWhatDoesNotFit) {
          "SCTP: 'Payload Protocol Identifier' is the last field of the row, but comes before its first"},
         {"a field in two sections", [](Fields &all) { std::swap(*place(all, 407), *place(all, 479)); },
          "UDP: 'Urgent Pointer' (408) is in two sections"},
-        {"a flag's field", [](Fields &all) { place(all, 698)->name = "Protocol Type"; },
-         "GRE: 'GRE Protocol' is no field of the plug-in there"},
         {"a length", [](Fields &all) { place(all, 946)->name = "Length"; },
          "SCTP ABORT, causes: 'Chunk Length' is a length, but no field"},
         {"a mask", [](Fields &all) { place(all, 604)->keyIndex = 0; },

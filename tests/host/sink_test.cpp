@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: MIT
 // Reports as they come: what a sink gets, in which order, and how chains of blocks are shown.
 #include <algorithm>
-#include <future>
 #include <sstream>
 #include <stdexcept>
 #include <string>
@@ -82,10 +81,6 @@ TEST(Sink, showsLinksOfAChainSideBySide) {
          "Common Header{....}Chunk{.Abort Association{...}}"
          "Chunk{.Cookie Acknowledge{.Length{.}}}"
          "Chunk{.INIT{.......Init Option{..IPv4 Address{.}}Init Option{..IPv4 Address{.}}}}}}}"},
-        {"tunnels", tunnelled(ipv6({.nextHeader = 17, .payload = smallUdp}), 2),
-         "Ip Header{.IPv6 Header{...IPv6 Body{.Next Header{.}.IP Address{..}IP Address{..}}}"
-         "IPv6 Header{...IPv6 Body{.Next Header{.}.IP Address{..}IP Address{..}}}"
-         "IPv6 Header{...IPv6 Body{.Next Header{.}.IP Address{..}IP Address{..}User Datagram Protocol{....}}}}"},
         {"a header inside a header",
          ipv4({.protocol = 1, .payload = hex("03 01 00 00 00000000") + ipv4({.protocol = 17, .payload = smallUdp})}),
          "Destination Unreachable Message{...Internet Protocol Message in ICMP{..............Embedded IP Protocols{.}"
@@ -183,10 +178,8 @@ private:
 // The fields of one id, as they come.
 class OneField final : public Sink {
 public:
-    explicit OneField(std::uint32_t id, bool wantsNoOther) : id_(id), wanted_(wantsNoOther ? id + 1 : 0) {
-        if (wantsNoOther) {
-            wanted_[id] = 1;
-        }
+    OneField(std::uint32_t id, bool wantsNoOther) : id_(id), wanted_(wantsNoOther ? id + 1 : 0) {
+        std::fill(wanted_.begin() + (wantsNoOther ? id : 0), wanted_.end(), std::uint8_t{1});
     }
     [[nodiscard]] bool wantsBlocks() const override { return false; }
     [[nodiscard]] std::span<const std::uint8_t> wantedFields() const override { return wanted_; }
@@ -194,12 +187,11 @@ public:
         if (field.id == id_) {
             text += std::string(field.text.view()) + std::to_string(field.recordHead[0]) +
                     std::to_string(field.recordHead[1]) + std::to_string(field.cursor) + "\n";
-        } else {
-            others += field.id != 0 ? 1 : 0;
+        } else if (field.id != 0) {
+            EXPECT_TRUE(wanted_.empty()) << field.id << " is not wanted";
         }
     }
     std::string text;
-    std::size_t others = 0;
 
 private:
     std::uint32_t id_;
@@ -219,7 +211,6 @@ TEST(Sink, getsTheFieldsThatItWants) {
         }
         EXPECT_EQ(one.text, all.text);
         EXPECT_NE(one.text, "");
-        EXPECT_EQ(one.others, 0U);
     }
 }
 
@@ -276,28 +267,21 @@ TEST(Busy, anOwnerMayRunAnotherPacketAndASinkMayNot) {
 TEST(Busy, saysWhatToDoForASecondThread) {
     const PluginLibrary library = PluginLibrary::open(NETFLOOR_PLUGIN);
     const Octets packet = ipv4({.protocol = 17, .payload = udp(40000, 7000, hex("00*12"))});
-    std::promise<void> entered;
-    std::promise<void> leave;
-    std::thread worker([&] {
-        Host host(library);
-        host.owners().add(7000, [&](NextLayer &next) {
-            entered.set_value();
-            leave.get_future().wait();
-            return takeAsData(next);
-        });
-        EXPECT_EQ(host.run(Pass::md, packet).ending, Ending::complete);
-    });
-    entered.get_future().wait();
+    Host first(library);
     Host second(library);
-    try {
-        static_cast<void>(second.run(Pass::mv, packet));
-        ADD_FAILURE() << "two threads in one load";
-    } catch (const PluginBusy &busy) {
-        EXPECT_NE(std::string(busy.what()).find("PluginLibrary::openCopy"), std::string::npos) << busy.what();
-    }
-    EXPECT_EQ(freshHost().run(Pass::mv, packet).ending, Ending::complete) << "a copy is free";
-    leave.set_value();
-    worker.join();
+    first.owners().add(7000, [&](NextLayer &next) {
+        std::thread([&] {
+            try {
+                static_cast<void>(second.run(Pass::mv, packet));
+                ADD_FAILURE() << "two threads in one load";
+            } catch (const PluginBusy &busy) {
+                EXPECT_NE(std::string(busy.what()).find("PluginLibrary::openCopy"), std::string::npos) << busy.what();
+            }
+            EXPECT_EQ(freshHost().run(Pass::mv, packet).ending, Ending::complete) << "a copy is free";
+        }).join();
+        return takeAsData(next);
+    });
+    EXPECT_EQ(first.run(Pass::md, packet).ending, Ending::complete);
     EXPECT_EQ(second.run(Pass::mv, packet).ending, Ending::complete);
 }
 
