@@ -1,8 +1,8 @@
 #!/bin/bash
 # SPDX-License-Identifier: MIT
 # Builds the plug-in and the host for the machines that hosts run on, runs their tests there, and compares what the
-# plug-in does with 2,000 packets on all of them. Ends with a line that counts what passed and what failed. A machine
-# that cannot be had is named and skipped.
+# plug-in does with every packet of the test captures on all of them. Ends with a line that counts what passed and what
+# failed. A machine that cannot be had is named and skipped.
 #
 #   scripts/check-hosts.sh [PRESET...]    linux-i686 windows-x86_64 windows-i686 linux-s390x
 set -uo pipefail
@@ -103,7 +103,7 @@ golden() {
     local preset=$1
     shift
     say "comparing: $preset"
-    "$@" 2>"$work/log" | tr -d '\r' >"$work/$preset.txt"
+    "$@" "$work/packets" 2>"$work/log" | tr -d '\r' >"$work/$preset.txt"
     if ! cmp -s "$work/release.txt" "$work/$preset.txt"; then
         tail -n 5 "$work/log"
         diff "$work/release.txt" "$work/$preset.txt" | head -n 6
@@ -117,8 +117,9 @@ golden() {
 say "packages"
 scripts/install-packages.sh hosts || exit 1
 
-build release golden || exit 1
-build/tests/golden/golden >"$work/release.txt"
+build release golden write_packets || exit 1
+build/tests/golden/write_packets "$work/packets" tests/captures/*.pcap* &&
+    build/tests/golden/golden "$work/packets" >"$work/release.txt"
 verdict "golden release" $?
 
 # Before wine's own files are made, which depend on it.

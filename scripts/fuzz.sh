@@ -17,11 +17,12 @@ findings=$build/findings
 executions=$build/executions/$target
 programs=$build/fuzz/targets
 packed=fuzz/corpus/$target.tar.gz
-leaks=1
-[ "$target" != passes ] || leaks=0 # the plug-in allocates nothing that could leak
+# Octets of 0 in front of a packet: an ordinary host, or no options. The plug-in allocates nothing that could leak.
+head=0 leaks=1
+case $target in passes) head=12 leaks=0 ;; command) head=4 ;; esac
 
 cmake --preset fuzz -DNETFLOOR_TESTS=ON >/dev/null
-ninja -C $build "fuzz_$target" "replay_$target" | sed '/no work to do/d'
+ninja -C $build "fuzz_$target" "replay_$target" write_packets | sed '/no work to do/d'
 mkdir -p "$inputs" "$findings" "$build/executions"
 
 # pack: the fewest inputs
@@ -35,9 +36,18 @@ if [ "${2:-}" = pack ]; then
     exit
 fi
 
-# seeds: what is known, which holds what the captures reach
+# seeds: what is known, and the captures
 [ ! -f "$packed" ] || tar -xzf "$packed" -C "$inputs"
-[ "$target" != capture ] || cp tests/captures/*.pcap* "$inputs"
+if [ "$target" = capture ]; then
+    cp tests/captures/*.pcap* "$inputs"
+else
+    packets=$(mktemp -d)
+    trap 'rm -rf "$packets"' EXIT
+    $build/tests/golden/write_packets "$packets" tests/captures/*.pcap*
+    for packet in "$packets"/*; do
+        { head -c $head /dev/zero && cat "$packet"; } >"$inputs/captured-${packet##*/}"
+    done
+fi
 
 # A short history of allocations: with a long one, each takes longer, and memory is read anew.
 export ASAN_OPTIONS=malloc_context_size=1:quarantine_size_mb=16

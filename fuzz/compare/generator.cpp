@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-#include "generator.h"
+#include "inputs.h"
 
 #include <algorithm>
 #include <cctype>

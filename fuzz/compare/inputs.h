@@ -5,10 +5,16 @@
 #include <string>
 #include <vector>
 
-#include "generator.h"
 #include "host.h"
+#include "random.h"
 
 namespace netfloor::compare {
+
+// A packet that follows the grammar, with lengths that are mostly right.
+[[nodiscard]] test::Octets generatedPacket(Random &random);
+
+// A piece of one: an option, a chunk, a parameter, a header that IP carries.
+[[nodiscard]] test::Octets generatedPart(Random &random);
 
 // What a plug-in keeps from one packet to the next is part of what is compared. So that a difference can be found again
 // soon, it starts as loaded after so many packets.

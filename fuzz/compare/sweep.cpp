@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: MIT
 // What is few enough to be gone through as a whole: each growth of storage refused, each place at which a packet can be
-// cut, each value of each octet.
+// cut, each number of the fields that choose how a packet is read on.
 //
 //     sweep PLUGIN          a sample, in seconds
 //     sweep PLUGIN --all    all of it, in minutes
@@ -19,7 +19,63 @@
 namespace netfloor::compare {
 namespace {
 
+using test::hex;
+using test::ipv4;
+using test::ipv6;
 using test::Octets;
+using test::operator+;
+
+// Two octets of a packet, all values of which are tried.
+struct Space {
+    const char *name;
+    std::size_t at;
+    Octets packet;
+};
+
+Octets sctp(std::string_view chunk) {
+    return ipv4({.protocol = 132, .payload = hex("0b59 0b5a 00*8") + hex(chunk)});
+}
+
+std::vector<Space> spaces() {
+    const Octets twenty = hex("0102030405060708090a0b0c0d0e0f1011121314");
+    const Octets datagram = test::udp(9000, 9000, twenty);
+    const Octets segment = hex("2328 2328 00*8 a0 12 00*6 01 04 0000 0000 05 0a 00*8 00 00") + twenty;
+    return {
+        {"IPv4 version, header length, service", 0, ipv4({.protocol = 17, .payload = datagram})},
+        {"IPv4 total length", 2, ipv4({.protocol = 17, .payload = datagram})},
+        {"IPv4 fragment", 6, ipv4({.protocol = 17, .payload = datagram})},
+        {"IPv4 time to live, protocol", 8, ipv4({.protocol = 0, .payload = twenty})},
+        {"IPv4 option", 20, ipv4({.protocol = 17, .payload = datagram, .options = hex("07 08 04 00*5")})},
+        {"second IPv4 option", 23,
+         ipv4({.protocol = 17, .payload = datagram, .options = hex("83 03 04 44 05 05 00*6")})},
+        {"ICMP type, code", 20, ipv4({.protocol = 1, .payload = hex("00*8") + ipv4({.payload = twenty})})},
+        {"ICMPv6 type, code", 40, ipv6({.nextHeader = 58, .payload = hex("00*8") + ipv6({.payload = twenty})})},
+        {"UDP source port", 20, ipv4({.protocol = 17, .payload = datagram})},
+        {"UDP destination port", 22, ipv4({.protocol = 17, .payload = datagram})},
+        {"UDP length", 24, ipv4({.protocol = 17, .payload = datagram})},
+        {"TCP data offset, flags", 32, ipv4({.protocol = 6, .payload = segment})},
+        {"TCP option", 41, ipv4({.protocol = 6, .payload = segment})},
+        {"GRE flags", 20, ipv4({.protocol = 47, .payload = hex("0000 0800") + twenty + twenty})},
+        {"GRE protocol", 22, ipv4({.protocol = 47, .payload = hex("0000 0000") + ipv4({.payload = twenty})})},
+        {"minimal encapsulation", 20, ipv4({.protocol = 55, .payload = hex("1180 00*10") + datagram})},
+        {"SCTP chunk type, flags", 32, sctp("0000 0018 00*8 00*12 0e00 0004")},
+        {"SCTP chunk length", 34, sctp("0003 0018 00*8 00*12 0e00 0004")},
+        {"parameter of INIT", 52, sctp("0100 0024 00*16 0000 0008 00*4 0006 0008 00*4")},
+        {"parameter length", 54, sctp("0100 0024 00*16 0005 0008 00*4 000b 0008 00*4")},
+        {"parameter of INIT ACK", 52, sctp("0200 0024 00*16 0000 0008 00*4 0008 0008 00*4")},
+        {"cause of ABORT", 36, sctp("0600 0014 0000 0008 00*4 0003 0008 00*4")},
+        {"cause of ERROR", 36, sctp("0900 0014 0000 0008 00*4 0001 0008 00*4")},
+        {"gap blocks of SACK", 44, sctp("0300 0018 00*8 0001 0001 0001 0002 00*4")},
+        {"IPv6 payload length", 4, ipv6({.nextHeader = 17, .payload = datagram})},
+        {"IPv6 next header, hop limit", 6, ipv6({.nextHeader = 0, .payload = hex("3b 00") + twenty})},
+        {"hop-by-hop option", 42, ipv6({.nextHeader = 0, .payload = hex("11 01 00 00 00*12") + datagram})},
+        {"destination option", 42, ipv6({.nextHeader = 60, .payload = hex("11 01 00 00 00*12") + datagram})},
+        {"routing header", 42, ipv6({.nextHeader = 43, .payload = hex("11 02 00 00 00*20") + datagram})},
+        {"header length of routing", 41, ipv6({.nextHeader = 43, .payload = hex("11 02 00 00 00*20") + datagram})},
+        {"fragment header", 42, ipv6({.nextHeader = 44, .payload = hex("11 00 0000 00*4") + datagram})},
+        {"authentication", 40, ipv6({.nextHeader = 51, .payload = hex("11 04 00*22") + datagram})},
+    };
+}
 
 class Sweep {
 public:
@@ -31,7 +87,7 @@ public:
         part("growths", [this] { refuseGrowths(); });
         part("hosts", [this] { changeHosts(); });
         part("cuts", [this] { cutEverywhere(); });
-        part("values", [this] { enumerate(); });
+        part("spaces", [this] { enumerate(); });
     }
 
 private:
@@ -89,17 +145,13 @@ private:
         }
     }
 
-    // Each octet of the headers in turn has each value; in the sample other values in each place.
     void enumerate() {
-        const std::size_t step = all_ ? 1 : 61;
-        for (Octets packet : std::span(inputs_.packets()).first(inputs_.variedPackets())) {
-            for (std::size_t at = 0; at < packet.size(); ++at) {
-                const std::uint8_t before = packet[at];
-                for (std::size_t value = at % step; value < 0x100; value += step) {
-                    packet[at] = static_cast<std::uint8_t>(value);
-                    check(packet, {});
-                }
-                packet[at] = before;
+        const std::uint32_t step = all_ ? 1 : 61;
+        for (Space &space : spaces()) {
+            for (std::uint32_t value = 0; value < 0x10000; value += step) {
+                space.packet.at(space.at) = static_cast<std::uint8_t>(value >> 8);
+                space.packet.at(space.at + 1) = static_cast<std::uint8_t>(value);
+                check(space.packet, {});
             }
         }
     }

@@ -11,7 +11,7 @@
 
 #include "decode.h"
 #include "exit_code.h"
-#include "generator.h"
+#include "inputs.h"
 #include "memory_file.h"
 #include "options.h"
 #include "packet_mutator.h"
@@ -24,7 +24,8 @@ using test::operator+;
 constexpr std::size_t headOctets = 4;
 constexpr std::size_t mostPacketOctets = 2048;
 
-constexpr std::array commands = {cli::Command::summary, cli::Command::detail, cli::Command::verify, cli::Command::keys};
+constexpr std::array commands = {cli::Command::summary, cli::Command::detail, cli::Command::verify, cli::Command::keys,
+                                 cli::Command::json};
 // Raw IP, Ethernet, null, PPP, Linux cooked v1 and v2, MPLS, Frame Relay.
 constexpr std::array<std::uint8_t, 8> linkTypes = {101, 1, 0, 9, 113, 20, 219, 107};
 constexpr std::array conditions = {"", "ip.ttl < 65 and not quoted", "sctp.chunk_type in {0-3, 192} or tcp.syn",
@@ -41,6 +42,7 @@ cli::Options optionsFrom(std::span<const std::uint8_t> head) {
     options.raw = on(3);
     options.perChunk = on(4);
     options.utc = on(5);
+    options.withFields = on(7);
     options.colour = on(6) ? cli::Colour::always : cli::Colour::never;
     options.plugin = NETFLOOR_PLUGIN;
     options.jobs = 1;
@@ -63,8 +65,11 @@ void require(bool holds, const char *what, const std::string &output) {
     }
 }
 
-bool mayBePrinted(char letter, bool colour) {
-    return letter == '\n' || (letter == '\x1b' && colour) || (letter >= ' ' && letter <= '~');
+// JSON has texts of packets in UTF-8.
+bool mayBePrinted(char letter, const cli::Options &options) {
+    const bool isColour = letter == '\x1b' && options.colour == cli::Colour::always;
+    const bool isUtf8 = static_cast<unsigned char>(letter) >= 0x80 && options.command == cli::Command::json;
+    return letter == '\n' || isColour || isUtf8 || (letter >= ' ' && letter <= '~');
 }
 
 // What is printed goes to standard output.
@@ -82,9 +87,9 @@ void runCommand(const cli::Options &options, std::size_t packetOctets) {
     const cli::ExitCode code = cli::decodeCapture(options);
     const std::string text = output.content();
     require(code == cli::ExitCode::good || code == cli::ExitCode::damagedPackets, "the command has failed", text);
-    require(text.size() <= 2 * (4096 + 100 * packetOctets), "the output is not bounded by the packet", text);
-    const bool colour = options.colour == cli::Colour::always;
-    require(std::ranges::all_of(text, [colour](char letter) { return mayBePrinted(letter, colour); }),
+    const std::size_t mostForOctet = options.command == cli::Command::json && options.withFields ? 160 : 100;
+    require(text.size() <= 2 * (4096 + mostForOctet * packetOctets), "the output is not bounded by the packet", text);
+    require(std::ranges::all_of(text, [&options](char letter) { return mayBePrinted(letter, options); }),
             "the output holds what a terminal would obey", text);
 }
 

@@ -3,7 +3,7 @@
 
 #include <algorithm>
 
-#include "generator.h"
+#include "inputs.h"
 
 extern "C" std::size_t LLVMFuzzerMutate(std::uint8_t *data, std::size_t size, std::size_t mostOctets);
 
@@ -17,14 +17,41 @@ void put16(Span octets, std::size_t at, std::size_t value) {
     octets[at + 1] = static_cast<std::uint8_t>(value);
 }
 
-// Makes the length of IP that of the octets that are there.
-void fitLength(Span packet) {
+void fitLengths(Span packet);
+
+// A chunk that reaches past the end ends there.
+void fitChunks(Span chunks) {
+    while (chunks.size() >= 4) {
+        const std::size_t length = std::size_t{chunks[2]} << 8 | chunks[3];
+        if (length < 4 || length > chunks.size()) {
+            put16(chunks, 2, chunks.size());
+            return;
+        }
+        chunks = chunks.subspan(std::min((length + 3) / 4 * 4, chunks.size()));
+    }
+}
+
+void fitPayload(std::uint8_t protocol, Span payload) {
+    if (protocol == 4 || protocol == 41) {
+        fitLengths(payload);
+    } else if (protocol == 17 && payload.size() >= 8) {
+        put16(payload, 4, payload.size());
+    } else if (protocol == 132 && payload.size() > 12) {
+        fitChunks(payload.subspan(12));
+    }
+}
+
+// Makes the lengths of IP, UDP and SCTP those of the octets that are there.
+void fitLengths(Span packet) {
     const int version = packet.empty() ? 0 : packet[0] >> 4;
     if (version == 4 && packet.size() >= 20) {
         put16(packet, 2, packet.size());
+        const std::size_t header = std::size_t{packet[0] & 0xfu} * 4;
+        fitPayload(packet[9], packet.subspan(std::clamp<std::size_t>(header, 20, packet.size())));
     }
     if (version == 6 && packet.size() >= 40) {
         put16(packet, 4, packet.size() - 40);
+        fitPayload(packet[6], packet.subspan(40));
     }
 }
 
@@ -53,7 +80,7 @@ std::size_t mutatePacket(Span room, std::size_t size, Random &random) {
     default: size = LLVMFuzzerMutate(room.data(), size, room.size()); break;
     }
     if (!random.oneIn(3)) {
-        fitLength(room.first(size));
+        fitLengths(room.first(size));
     }
     return size;
 }

@@ -122,8 +122,6 @@ TEST(Columns, holdTheirFields) {
     const std::map<ColumnType, std::uint32_t> mostBits = {
         {ColumnType::boolean, 1}, {ColumnType::u8, 8}, {ColumnType::u16, 16}, {ColumnType::u32, 32}};
     const FieldTables tables(PluginLibrary::open(NETFLOOR_PLUGIN));
-    const std::map<ColumnType, unsigned> mostBits = {
-        {ColumnType::boolean, 1}, {ColumnType::u8, 8}, {ColumnType::u16, 16}, {ColumnType::u32, 32}};
     std::map<std::string_view, ColumnType> types;
     for (const RowKind kind : {RowKind::layer, RowKind::chunk}) {
         for (const Column &column : columns(kind)) {

@@ -1,21 +1,25 @@
 // SPDX-License-Identifier: MIT
 // What the plug-in does with packets, as text that must be the same on every machine: all calls of the host in the four
-// passes with everything that the host can see at them, as a digest for each packet and pass. The packets are some that
-// hold every field, and generated ones.
+// passes with everything that the host can see at them, as a digest for each packet and pass.
 //
-//   golden           a line a packet: its number and the digests of MD, TO, MV and XTR
-//   golden NUMBER    the text of one packet, from which the digests are made
+//   golden PACKETS           a line a packet: its number and the digests of MD, TO, MV and XTR
+//   golden PACKETS NUMBER    the text of one packet, from which the digests are made
+//
+// PACKETS is a file of packets, each after its number of octets in four octets, the first the highest. Packets that
+// hold every field come after those of the file.
 #include <array>
 #include <cstddef>
 #include <cstdint>
 #include <cstdio>
 #include <cstdlib>
 #include <exception>
+#include <fstream>
+#include <iterator>
+#include <stdexcept>
 #include <string>
 #include <vector>
 
 #include "frame/bare_host.h"
-#include "generator.h"
 #include "support/corpus.h"
 #include "support/runs.h"
 
@@ -23,45 +27,62 @@ namespace netfloor::test {
 namespace {
 
 constexpr std::array passes = {Pass::md, Pass::to, Pass::mv, Pass::xtr};
-constexpr std::uint64_t generatedPackets = 2000;
 
-std::vector<Octets> allPackets() {
-    std::vector<Octets> packets = packetsOfAllFields();
-    for (std::uint64_t seed = 0; seed < generatedPackets; ++seed) {
-        compare::Random random(seed);
-        packets.push_back(compare::generatedPacket(random));
+std::vector<Octets> readPackets(const char *path) {
+    std::ifstream file(path, std::ios::binary);
+    const std::string content((std::istreambuf_iterator<char>(file)), std::istreambuf_iterator<char>());
+    const Octets octets(content.begin(), content.end());
+    std::vector<Octets> packets;
+    std::size_t at = 0;
+    while (octets.size() - at >= 4) {
+        const std::size_t size = std::size_t{octets[at]} << 24 | std::size_t{octets[at + 1]} << 16 |
+                                 std::size_t{octets[at + 2]} << 8 | octets[at + 3];
+        at += 4;
+        if (size > octets.size() - at) {
+            break;
+        }
+        const auto from = octets.begin() + static_cast<std::ptrdiff_t>(at);
+        packets.emplace_back(from, from + static_cast<std::ptrdiff_t>(size));
+        at += size;
+    }
+    if (packets.empty() || at != octets.size()) {
+        throw std::runtime_error(std::string(path) + " is no file of packets");
     }
     return packets;
 }
 
-std::string listed(const char *name, const auto &...numbers) {
+std::string words(const char *name, const std::uint32_t *first, std::size_t count) {
     std::string text = std::string(" ") + name;
-    ((text += ' ' + std::to_string(numbers)), ...);
+    for (std::size_t i = 0; i < count; ++i) {
+        text += ' ' + std::to_string(first[i]);
+    }
     return text;
 }
 
 // What describe() leaves out.
 std::string restOf(BareRun &run, Pass pass) {
     const DecodeState &state = run.state();
-    std::string text = " starts " + stackText(state.blockStarts) + " limits " + stackText(state.limits) +
-                       listed("flags", state.flags) + listed("handed", state.layerHandedOff) +
-                       listed("wide", state.fieldRecord.wideStart, state.fieldRecord.wideBits) + " scratch";
-    for (const std::uint32_t word : state.scratch) {
-        text += ' ' + std::to_string(word);
-    }
+    std::string text = " flags " + std::to_string(state.flags) + " starts " + stackText(state.blockStarts) +
+                       " limits " + stackText(state.limits) + words("scratch", state.scratch, 32) + " wide " +
+                       std::to_string(state.fieldRecord.wideStart) + ' ' + std::to_string(state.fieldRecord.wideBits) +
+                       " handed " + std::to_string(state.layerHandedOff);
     for (std::uint32_t i = 0; i <= state.layerIndex; ++i) {
         const LayerFrame &frame = state.layerFrames[i];
-        text += listed("frame", frame.firstBit, frame.nextLayerKey, frame.nextLayerProtocol);
+        text += " frame " + std::to_string(frame.firstBit) + ' ' + std::to_string(frame.nextLayerKey) + ' ' +
+                std::to_string(frame.nextLayerProtocol);
     }
     if (pass == Pass::xtr) {
-        return text + listed("left", run.xtr.bitsLeft) + listed("area", run.xtr.byteAreaOffset) + '\n';
+        return text + " left " + std::to_string(run.xtr.bitsLeft) + " area " + std::to_string(run.xtr.byteAreaOffset) +
+               '\n';
     }
     const PreDecodeContext &context = run.context();
-    text += listed("left", context.bitsLeft) + listed("layer", context.layerNumber, context.decoderId) +
-            listed("verdict", context.verdict) + listed("records", context.fieldRecordCount);
+    text += " left " + std::to_string(context.bitsLeft) + " layer " + std::to_string(context.layerNumber) +
+            " decoder " + std::to_string(context.decoderId) + " verdict " + std::to_string(context.verdict) +
+            " records " + std::to_string(context.fieldRecordCount);
     for (std::uint32_t i = 0; i <= context.layerInfoCount && i < run.layerInfo.size(); ++i) {
         const LayerInfoRecord &info = run.layerInfo[i];
-        text += listed("info", info.firstBit, info.lastBit, info.decoderId, info.layerNumber);
+        text += " info " + std::to_string(info.firstBit) + ' ' + std::to_string(info.lastBit) + ' ' +
+                std::to_string(info.decoderId) + ' ' + std::to_string(info.layerNumber);
     }
     return text + '\n';
 }
@@ -76,15 +97,16 @@ std::string textOf(const Octets &packet, Pass pass) {
     std::string text;
     run.afterCall = [&] {
         const Seen &call = run.seen.back();
-        text += std::to_string(call.id) + " \"" + call.text + '"' + listed("order", call.bitOrder) + ' ' + call.state +
-                restOf(run, pass);
+        text += std::to_string(call.id) + " \"" + call.text + "\" order " + std::to_string(call.bitOrder) + ' ' +
+                call.state + restOf(run, pass);
     };
     run.nextLayer = [&] {
-        text += listed("next layer in mode", run.modes.back()) + ' ' + describe(run.state()) + restOf(run, pass);
+        text +=
+            "next layer in mode " + std::to_string(run.modes.back()) + ' ' + describe(run.state()) + restOf(run, pass);
         return run.take(run.state().bitsLeft);
     };
     const std::int32_t result = run.enter(pass);
-    text += listed("result", result) + ' ' + describe(run.state()) + restOf(run, pass);
+    text += "result " + std::to_string(result) + ' ' + describe(run.state()) + restOf(run, pass);
     if (pass != Pass::xtr) {
         return text;
     }
@@ -101,14 +123,21 @@ std::uint64_t digestOf(const std::string &text) {
     return digest;
 }
 
-void showDigests(const std::vector<Octets> &packets) {
+std::string digits(std::uint64_t number) {
+    std::string text;
+    for (int shift = 60; shift >= 0; shift -= 4) {
+        text += "0123456789abcdef"[number >> shift & 0xf];
+    }
+    return text;
+}
+
+void show(const std::vector<Octets> &packets) {
     for (std::size_t number = 1; const Octets &packet : packets) {
-        std::printf("%u", static_cast<unsigned>(number++));
+        std::string line = std::to_string(number++);
         for (const Pass pass : passes) {
-            const std::uint64_t digest = digestOf(textOf(packet, pass));
-            std::printf(" %08x%08x", static_cast<unsigned>(digest >> 32), static_cast<unsigned>(digest));
+            line += ' ' + digits(digestOf(textOf(packet, pass)));
         }
-        std::puts("");
+        std::puts(line.c_str());
     }
 }
 
@@ -118,13 +147,20 @@ void showDigests(const std::vector<Octets> &packets) {
 int main(int count, char **arguments) {
     using namespace netfloor::test;
     try {
-        const std::vector<Octets> packets = allPackets();
-        if (count == 1) {
-            showDigests(packets);
+        if (count < 2) {
+            throw std::runtime_error("usage: golden PACKETS [NUMBER]");
+        }
+        std::vector<Octets> packets = readPackets(arguments[1]);
+        for (const Octets &packet : packetsOfAllFields()) {
+            packets.push_back(packet);
+        }
+        if (count == 2) {
+            show(packets);
             return 0;
         }
+        const Octets &packet = packets.at(static_cast<std::size_t>(std::atoi(arguments[2])) - 1);
         for (const netfloor::Pass pass : passes) {
-            std::puts(textOf(packets.at(static_cast<std::size_t>(std::atoi(arguments[1])) - 1), pass).c_str());
+            std::puts(textOf(packet, pass).c_str());
         }
         return 0;
     } catch (const std::exception &error) {
