@@ -51,6 +51,7 @@ Version
   place    1-4, 5-8, 9-12, 13-16, as often as the packet tells, 16 bits apart
   place    not told
 )"},
+        {"netfloor fields tcp.window | head -n 2", "Window Size\n  id       406, TCP\n"}, // as in --where
         {"netfloor fields 555 | head -n 4; netfloor fields discard packet | head -n 3", // names that are missing, short
          R"((no name)
   id       555, ICMP
