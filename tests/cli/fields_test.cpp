@@ -88,7 +88,7 @@ TEST(Fields, areListedInEachForm) {
          "netfloor fields | tail -n 1 | sed s/$n/all/; netfloor fields | grep '^ 384 '",
          "all\nall fields, 102 key fields among them\n"
          " 384        16    41  TCP                    TCP Source Port                              TCP Source "
-         "Port=%u\n"},
+         "Port=%-S (%u)\n"},
         {"netfloor fields --json | jq -cS '.[] | select(.id == 295) | [.protocol, .values[-1], .layout]'",
          "[\"IPv4\",{\"from\":138,\"name\":\"Unassigned\",\"to\":252},"
          "{\"count\":1,\"pieces\":[[1,8]],\"step\":8}]\n"},
