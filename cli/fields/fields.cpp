@@ -8,6 +8,7 @@
 
 #include "exit_code.h"
 #include "netfloor-host/field_knowledge.h"
+#include "netfloor-host/layer_fields.h"
 #include "output.h"
 #include "plugin_path.h"
 
@@ -32,9 +33,16 @@ std::string lower(std::string_view text) {
 // How well a field fits what was asked for. Who types a name knows it more or less.
 enum class Fit : std::uint8_t { none, part, otherCase, whole };
 
+// Whether --where and --column have the field under this name.
+bool isAskedForAs(const FieldDescription &field, std::string_view name) {
+    return std::ranges::any_of(layerFieldSources(),
+                               [&](const auto &row) { return row.name == name && row.field.fits(field); });
+}
+
 Fit fitOf(const ListedField &listed, const std::string &wanted) {
     const auto &[field, section] = listed;
-    if (field->id == idOf(wanted) || field->name == wanted || field->shortName == wanted) {
+    if (field->id == idOf(wanted) || field->name == wanted || field->shortName == wanted ||
+        isAskedForAs(*field, wanted)) {
         return Fit::whole;
     }
     const std::string word = lower(wanted);

@@ -51,6 +51,7 @@ Version
   place    1-4, 5-8, 9-12, 13-16, as often as the packet tells, 16 bits apart
   place    not told
 )"},
+        {"netfloor fields tcp.window | head -n 2", "Window Size\n  id       406, TCP\n"}, // as in --where
         {"netfloor fields 555 | head -n 4; netfloor fields discard packet | head -n 3", // names that are missing, short
          R"((no name)
   id       555, ICMP
@@ -87,7 +88,7 @@ TEST(Fields, areListedInEachForm) {
          "netfloor fields | tail -n 1 | sed s/$n/all/; netfloor fields | grep '^ 384 '",
          "all\nall fields, 102 key fields among them\n"
          " 384        16    41  TCP                    TCP Source Port                              TCP Source "
-         "Port=%u\n"},
+         "Port=%-S (%u)\n"},
         {"netfloor fields --json | jq -cS '.[] | select(.id == 295) | [.protocol, .values[-1], .layout]'",
          "[\"IPv4\",{\"from\":138,\"name\":\"Unassigned\",\"to\":252},"
          "{\"count\":1,\"pieces\":[[1,8]],\"step\":8}]\n"},

@@ -57,7 +57,8 @@ private:
         }
         const std::span<const std::uint8_t> octets = value.octets;
         if (octets.size() == 4) {
-            return ipv4Text(std::uint32_t{octets[0]} << 24U | octets[1] << 16U | octets[2] << 8U | octets[3]);
+            return ipv4Text(std::uint32_t{octets[0]} << 24U | std::uint32_t{octets[1]} << 16U |
+                            std::uint32_t{octets[2]} << 8U | std::uint32_t{octets[3]});
         }
         Ipv6Octets address = {};
         std::ranges::copy(octets, address.begin());
