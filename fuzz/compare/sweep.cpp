@@ -62,6 +62,7 @@ std::vector<Space> spaces() {
         {"SCTP chunk length", 34, sctp("0003 0018 00*8 00*12 0e00 0004")},
         {"parameter of INIT", 52, sctp("0100 0024 00*16 0000 0008 00*4 0006 0008 00*4")},
         {"parameter length", 54, sctp("0100 0024 00*16 0005 0008 00*4 000b 0008 00*4")},
+        {"length of supported address types", 54, sctp("0100 0024 00*16 000c 0008 00*4 000b 0008 00*4")},
         {"parameter of INIT ACK", 52, sctp("0200 0024 00*16 0000 0008 00*4 0008 0008 00*4")},
         {"cause of ABORT", 36, sctp("0600 0014 0000 0008 00*4 0003 0008 00*4")},
         {"cause of ERROR", 36, sctp("0900 0014 0000 0008 00*4 0001 0008 00*4")},
@@ -103,9 +104,11 @@ private:
         return checkPasses(plugin_, {packet, plan, "sweep"});
     }
 
-    // Arrays have room for one element, and each growth in turn is refused, up to the one that is not asked for.
+    // Arrays have room for one element, and each growth in turn is refused, up to the one that is not asked for. Arrays
+    // grow by doubling: so that each block is one for which there is no room, the stack of blocks starts at each depth.
     void refuseGrowths() {
         constexpr std::uint32_t mostGrowths = 2000;
+        constexpr std::uint32_t mostBlocks = 24;
         const Plan tight{
             .blockCapacity = 1, .limitCapacity = 1, .layerCapacity = 1, .rangeCapacity = 1, .layerInfoCapacity = 0};
         for (const Octets &packet : inputs_.packets()) {
@@ -113,6 +116,9 @@ private:
             do {
                 ++plan.refusedGrowth;
             } while (!check(packet, plan) && plan.refusedGrowth < mostGrowths);
+            for (std::uint32_t blocks = 1; blocks <= mostBlocks; ++blocks) {
+                check(packet, {.blockCapacity = blocks, .refusedGrowth = 1});
+            }
         }
     }
 

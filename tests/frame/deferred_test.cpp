@@ -44,7 +44,7 @@ private:
         StateOptions options;
         options.blockCapacity = room.blocks + 1;
         options.limitCapacity = room.limits + 1;
-        options.prepare = [this, room](DecodeState &state) {
+        options.prepare = [room](DecodeState &state) {
             if (room.bits != 0) {
                 state.bitsLeft = state.limits.base[0] = room.bits;
             }

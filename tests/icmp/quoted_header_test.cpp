@@ -79,7 +79,7 @@ TEST(QuotedHeader, protocolAndOuterProtocol) {
         for (const auto &[protocol, name] : {std::pair(17, "UDP"), std::pair(255, "")}) {
             const Octets message = Octets{one.type} + hex("00*7") + header(5, static_cast<std::uint8_t>(protocol));
             const Octets inner = ipv4({.protocol = 1, .payload = message});
-            const auto check = [&](const Octets &packet, bool tunnel) {
+            const auto check = [&, protocol = protocol, name = name](const Octets &packet, bool tunnel) {
                 const Runs runs = runAll(packet);
                 EXPECT_EQ(runs.md.field("Embedded IP Protocols")->id, tunnel ? one.idInTunnel : one.id);
                 EXPECT_EQ(runs.xtr.key("Embedded IP Protocols")->number, static_cast<std::uint32_t>(protocol));

@@ -166,8 +166,9 @@ TEST(SctpInit, parametersKeepTheirFaults) {
 
 // A parameter of Length 0, or a first head that does not fit, would be read again and again.
 TEST(SctpInit, listThatWouldNotEnd) {
-    for (const char *parameters : {"00 05 00 00", "00*8", "00 0b 00 06 68 69 00 00 00 00 00 00", "00 05 00 02 00 02",
-                                   "00 0c 00 06 00 05  00 05 00 00 00 00", "00 05 00 01", "00 00", "00 00 00", "00"}) {
+    for (const char *parameters :
+         {"00 05 00 00", "00*8", "00 0b 00 06 68 69 00 00 00 00 00 00", "00 05 00 02 00 02",
+          "00 0c 00 06 00 05  00 05 00 00 00 00", "00 05 00 01", "00 0c 00 02", "00 00", "00 00 00", "00"}) {
         SCOPED_TRACE(parameters);
         const Runs runs = runAll(sctp(init(hex(parameters)) + hex("00  0b 00 00 04")));
         EXPECT_EQ(runs.md.ending, Ending::complete);
