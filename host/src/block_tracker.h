@@ -8,7 +8,6 @@
 
 #include <cstddef>
 #include <cstdint>
-#include <cstring>
 #include <span>
 #include <string_view>
 #include <vector>
@@ -67,7 +66,7 @@ private:
     // cursor: single bits of an octet are read before the cursor moves on.
     [[nodiscard]] bool isStillOpen(const DecodeState &state) const;
     [[nodiscard]] bool hasItsName(const DecodeState &state, std::uint32_t level) const {
-        return std::strcmp(views_[level].name.data(), state.blockName) == 0;
+        return isBlockName(state.blockName, views_[level].name);
     }
     [[nodiscard]] std::uint32_t levelsKept(const DecodeState &state, std::uint32_t depth) const;
     void open(const DecodeState &state, std::uint32_t depth);

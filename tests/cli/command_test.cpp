@@ -63,6 +63,8 @@ protected:
         writeFile("foreign.txt", hex("48*300"));
         writeFile("other.zst", hex("28b52ffd 00*20"));
         writeFile("cut.pcap", pcapFile(228, {{udpPacket}, {{udpPacket.begin(), udpPacket.begin() + 24}, 36}}));
+        const Octets solicitation = hex("60000000 0020 3a ff fe80 00*13 01 ff02 00*13 02 8700 0000 00*4");
+        writeFile("cutSolicitation.pcap", pcapFile(229, {{solicitation, 72}}));
         writeFile("withTail.pcap", file + hex("00*3"));
         const Outcome packed = shell("gzip -k $T/five.pcap && head -c -20 $T/five.pcap.gz > $T/half.pcap.gz");
         ASSERT_EQ(packed.exitCode, 0) << packed.err;
@@ -79,6 +81,7 @@ TEST_F(Command, shows) {
          {},
          {"\x1b"},
          6},
+        {"netfloor $T/cutSolicitation.pcap", 0, {"neighbor solicitation  [cut by"}, {}, {"who has"}, 2},
         {"netfloor summary $T/cut.pcap", 0, {"[cut by the snap length: 24 of 36 octets]"}, {}, {"without"}, 2},
         {"netfloor --all $T/cut.pcap", 0, {"Normal Throughput"}, {}, {}, 2},
         {"netfloor --utc $T/five.pcap", 0, {"2001-09-09T01:46:40.000000Z"}, {}, {}, 6},
