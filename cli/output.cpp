@@ -63,10 +63,14 @@ void Output::escaped(std::string_view text) {
     }
 }
 
-void Output::untrustedWithRoom(std::string_view text, std::size_t blanksBefore) {
+void Output::untrustedOrEscaped(std::string_view text, std::size_t blanksBefore) {
     blanks(blanksBefore);
-    (void)room(usualBlanks + text.size());
-    untrusted(text);
+    (void)room(usualBlanks + text.size() + 1);
+    if (char *const end = copiedAfter(0, text)) {
+        next_ = end;
+    } else {
+        escaped(text);
+    }
 }
 
 void Output::grow(std::size_t octets) {

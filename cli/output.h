@@ -4,6 +4,7 @@
 
 #include <array>
 #include <charconv>
+#include <concepts>
 #include <cstddef>
 #include <cstdint>
 #include <cstring>
@@ -46,14 +47,8 @@ public:
         next_ = to + 1;
         return *this;
     }
-    Output &operator<<(std::uint64_t number) {
-        char *const to = room(mostDigits);
-        return advanceTo(std::to_chars(to, to + mostDigits, number).ptr);
-    }
-    Output &operator<<(std::uint32_t number) {
-        char *const to = room(mostDigits);
-        return advanceTo(std::to_chars(to, to + mostDigits, number).ptr);
-    }
+    Output &operator<<(std::uint64_t number) { return decimal(number); }
+    Output &operator<<(std::uint32_t number) { return decimal(number); }
     Output &operator<<(Hex value) {
         char *const to = room(mostDigits);
         return advanceTo(std::to_chars(to, to + mostDigits, value.number, 16).ptr);
@@ -70,15 +65,20 @@ public:
 
     // Text that came out of a packet, after blanks: what a terminal would not just print is shown as \x1b.
     void untrusted(std::string_view text, std::size_t blanksBefore = 0) {
-        if (blanksBefore > usualBlanks || roomLeft() < usualBlanks + text.size()) {
-            return untrustedWithRoom(text, blanksBefore);
-        }
-        std::memset(next_, ' ', usualBlanks); // of a known size, which is one or two instructions
-        next_ += blanksBefore;
-        if (copyPrintable(text, next_)) {
-            next_ += text.size();
+        if (char *const end = copiedAfter(blanksBefore, text)) {
+            next_ = end;
         } else {
-            escaped(text);
+            untrustedOrEscaped(text, blanksBefore);
+        }
+    }
+    // The same, and the end of the line. Inside its callers, as nearly all of a detailed view is such lines.
+    [[gnu::always_inline]] void untrustedLine(std::string_view text, std::size_t blanksBefore) {
+        if (char *const end = copiedAfter(blanksBefore, text)) {
+            *end = '\n';
+            next_ = end + 1;
+        } else {
+            untrustedOrEscaped(text, blanksBefore);
+            *this << '\n';
         }
     }
 
@@ -86,6 +86,15 @@ public:
     Output &start(Style style) { return colour_ ? startStyle(style) : *this; }
     Output &stop(Style style) { return colour_ && style != Style::plain ? *this << "\x1b[0m" : *this; }
     void styled(Style style, std::string_view text) { (start(style) << text).stop(style); }
+    // A line of that style.
+    [[gnu::always_inline]] void styledLine(Style style, std::string_view text, std::size_t blanksBefore) {
+        if (!colour_) {
+            return untrustedLine(text, blanksBefore);
+        }
+        blanks(blanksBefore);
+        startStyle(style).untrusted(text);
+        stop(style) << '\n';
+    }
 
     // Blanks up to `width`, then the text or the number.
     void rightAligned(std::string_view text, std::size_t width);
@@ -146,7 +155,8 @@ public:
     void flush();
 
 private:
-    static constexpr std::size_t flushOctets = std::size_t{256} * 1024;
+    // Larger blocks take the kernel no less time; with 256 KiB it takes a sixth more.
+    static constexpr std::size_t flushOctets = std::size_t{512} * 1024;
     static constexpr std::size_t firstRoom = flushOctets + std::size_t{64} * 1024;
     static constexpr std::size_t mostDigits = 24;
     static constexpr std::size_t usualBlanks = 32;
@@ -154,12 +164,12 @@ private:
     // As many characters as a register of nearly all machines holds, and half of them.
     using Characters [[gnu::vector_size(16)]] = unsigned char;
     using SignedCharacters [[gnu::vector_size(16)]] = signed char;
-    using Word = std::uint64_t;
 
     // Has the top bit of an octet set if one of the characters is not printable: below a blank, DEL, or with its own
     // top bit set. A borrow or a carry goes only to octets above one for which the answer is known already.
+    template <std::unsigned_integral Word>
     [[nodiscard]] static constexpr Word unprintableIn(Word word) {
-        constexpr Word ones = 0x0101010101010101;
+        constexpr Word ones = static_cast<Word>(0x0101010101010101);
         return (word | (word - ones * 0x20) | (word + ones)) & ones * 0x80;
     }
     // The same. One more than a printable character is a positive number above a blank; one more than any other is not.
@@ -168,35 +178,40 @@ private:
     }
     [[nodiscard]] static constexpr bool isPrintable(unsigned char octet) { return octet >= 0x20 && octet < 0x7f; }
 
-    [[nodiscard]] static bool isAnySet(Word word) { return word != 0; }
+    [[nodiscard]] static bool isAnySet(std::unsigned_integral auto word) { return word != 0; }
     [[nodiscard]] static bool isAnySet(Characters characters) {
-        std::array<Word, 2> words;
+        std::array<std::uint64_t, 2> words;
         std::memcpy(words.data(), &characters, sizeof characters);
         return (words[0] | words[1]) != 0;
     }
 
+    // Copies a piece and gives what is not printable in it.
+    template <typename Piece>
+    [[nodiscard, gnu::always_inline]] static Piece copyPiece(const char *from, char *to) {
+        Piece piece;
+        std::memcpy(&piece, from, sizeof piece);
+        std::memcpy(to, &piece, sizeof piece);
+        return unprintableIn(piece);
+    }
     // Copies a text of at least one piece and tells whether all of it is printable, in one go.
     template <typename Piece>
-    [[nodiscard]] static bool copyPieces(std::string_view text, char *to) {
-        const auto copyPiece = [&](std::size_t at) {
-            Piece piece;
-            std::memcpy(&piece, text.data() + at, sizeof piece);
-            std::memcpy(to + at, &piece, sizeof piece);
-            return unprintableIn(piece);
-        };
+    [[nodiscard, gnu::always_inline]] static bool copyPieces(std::string_view text, char *to) {
         const std::size_t last = text.size() - sizeof(Piece); // overlaps the piece before
-        Piece found = copyPiece(last);
+        Piece found = copyPiece<Piece>(text.data() + last, to + last);
         for (std::size_t at = 0; at < last; at += sizeof(Piece)) {
-            found |= copyPiece(at);
+            found |= copyPiece<Piece>(text.data() + at, to + at);
         }
         return !isAnySet(found);
     }
-    [[nodiscard]] static bool copyPrintable(std::string_view text, char *to) {
-        if (text.size() >= sizeof(Characters)) {
-            return copyPieces<Characters>(text, to);
+    [[nodiscard, gnu::always_inline]] static bool copyPrintable(std::string_view text, char *to) {
+        return text.size() >= sizeof(Characters) ? copyPieces<Characters>(text, to) : copyShort(text, to);
+    }
+    [[nodiscard]] static bool copyShort(std::string_view text, char *to) {
+        if (text.size() >= sizeof(std::uint64_t)) {
+            return copyPieces<std::uint64_t>(text, to);
         }
-        if (text.size() >= sizeof(Word)) {
-            return copyPieces<Word>(text, to);
+        if (text.size() >= sizeof(std::uint32_t)) {
+            return copyPieces<std::uint32_t>(text, to);
         }
         bool all = true;
         for (std::size_t i = 0; i < text.size(); ++i) {
@@ -205,8 +220,19 @@ private:
         }
         return all;
     }
+    // Puts blanks and the text after what is there, with room for one more character, and gives the end of it. They
+    // are not part of the text yet. Null where that takes more than a few instructions: for room, many blanks, or what
+    // is not printable.
+    [[nodiscard, gnu::always_inline]] char *copiedAfter(std::size_t blanks, std::string_view text) {
+        if (blanks > usualBlanks || roomLeft() <= usualBlanks + text.size()) {
+            return nullptr;
+        }
+        std::memset(next_, ' ', usualBlanks); // of a known size, which is one or two instructions
+        char *const to = next_ + blanks;
+        return copyPrintable(text, to) ? to + text.size() : nullptr;
+    }
+    void untrustedOrEscaped(std::string_view text, std::size_t blanksBefore);
     void escaped(std::string_view text);
-    void untrustedWithRoom(std::string_view text, std::size_t blanksBefore);
 
     [[nodiscard]] std::size_t roomLeft() const { return static_cast<std::size_t>(limit_ - next_); }
     // The end of the text, with room for so many octets.
@@ -236,6 +262,15 @@ private:
     Output &advanceTo(char *end) {
         next_ = end;
         return *this;
+    }
+    template <typename Number>
+    Output &decimal(Number number) {
+        constexpr Number base = 10;
+        if (number < base) { // as many are
+            return *this << static_cast<char>('0' + number);
+        }
+        char *const to = room(mostDigits);
+        return advanceTo(std::to_chars(to, to + mostDigits, number).ptr);
     }
     void grow(std::size_t octets);
     Output &startStyle(Style style);

@@ -501,7 +501,9 @@ void SummaryLine::writeIcmpv6(const Layer &icmp) {
     writeNumber(icmp, " seq ", layerField("icmpv6.sequence_number"));
     TextRoom room;
     if (type == neighborSolicitation || type == neighborAdvertisement) {
-        out_ << (type == neighborSolicitation ? " who has " : " ") << ipv6At(icmp.firstOctet + headOctets, room);
+        if (const std::string_view target = ipv6At(icmp.firstOctet + headOctets, room); !target.empty()) { // not cut
+            out_ << (type == neighborSolicitation ? " who has " : " ") << target;
+        }
     } else if (type <= mostIcmpv6Error) {
         writeQuotedIpv6(icmp.firstOctet + headOctets);
     }

@@ -29,9 +29,8 @@ void Tree::begin(Pass /*pass*/, std::span<const std::uint8_t> packet) {
 void Tree::blockOpened(const BlockView &block) {
     endRun();
     writeGapsBefore(octetOf(block.firstBit), block.depth);
-    newLine(block.depth);
-    out_.styled(Style::bold, withoutLeadingBlanks(block.name));
-    out_ << '\n';
+    depth_ = block.depth;
+    out_.styledLine(Style::bold, withoutLeadingBlanks(block.name), indent(block.depth));
 }
 
 // Inside its callers, as nearly all lines come from here.
@@ -40,10 +39,21 @@ void Tree::blockOpened(const BlockView &block) {
     if (bits > numberBits) {
         return writeWide(field, bits, text);
     }
-    writeText(field, text);
-    if ((bits == bitsPerOctet || bits == 2 * bitsPerOctet) && !showsItsNumber(text, field.value)) {
-        (out_.start(Style::dim) << "  (" << field.value << ')').stop(Style::dim); // of types and codes, no single bits
+    const bool mayBeNamed = bits == bitsPerOctet || bits == 2 * bitsPerOctet; // as types and codes are, no single bits
+    if (mayBeNamed && !showsItsNumber(text, field.value)) {
+        return writeWithNumber(field, text);
     }
+    if (bits_) {
+        writeText(field, text);
+        return endField(field);
+    }
+    depth_ = field.depth;
+    out_.untrustedLine(shownOf(field, text), indent(field.depth));
+}
+
+void Tree::writeWithNumber(const FieldView &field, std::string_view text) {
+    writeText(field, text);
+    (out_.start(Style::dim) << "  (" << field.value << ')').stop(Style::dim);
     endField(field);
 }
 
@@ -54,6 +64,8 @@ void Tree::field(const FieldView &field) {
         }
         endRun();
     }
+    // First, as after it most fields are written without another call, for which registers would be saved.
+    const std::string_view text = field.text.view();
     out_.mayFlush();
     const auto [octets, bits] = extentOf(field);
     const std::uint32_t passed = octetOf(field.cursor);
@@ -64,7 +76,6 @@ void Tree::field(const FieldView &field) {
             return writeOpened(field);
         }
     }
-    const std::string_view text = field.text.view();
     if (text.empty() && isReadAgain(field)) {
         return;
     }

@@ -59,11 +59,15 @@ private:
     // A field of octets that hold the packet that was opened.
     void writeOpened(const FieldView &field);
     void writeField(const FieldView &field, std::uint32_t bits, std::string_view text);
-    [[gnu::always_inline]] void writeText(const FieldView &field, std::string_view text) {
+    [[gnu::always_inline]] std::string_view shownOf(const FieldView &field, std::string_view text) {
         const std::string_view shown = withoutLeadingBlanks(text);
-        depth_ = field.depth;
-        out_.untrusted(shown.empty() ? nameOf(field) : shown, indent(field.depth));
+        return shown.empty() ? nameOf(field) : shown;
     }
+    void writeText(const FieldView &field, std::string_view text) {
+        depth_ = field.depth;
+        out_.untrusted(shownOf(field, text), indent(field.depth));
+    }
+    void writeWithNumber(const FieldView &field, std::string_view text);
     // A field of more bits than a number holds.
     void writeWide(const FieldView &field, std::uint32_t bits, std::string_view text);
     void endField(const FieldView &field) {

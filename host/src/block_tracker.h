@@ -16,6 +16,7 @@
 
 #include "field_names.h"
 #include "netfloor-host/sink.h"
+#include "netfloor-host/testing.h"
 
 namespace netfloor {
 
@@ -26,19 +27,16 @@ public:
     // Before a packet.
     void reset();
 
-    // Moves to the block of the field that is being reported, and tells whether another one may be open now. The sink
-    // gets the blocks that are closed and opened for that. The cost grows with the number of blocks that changed.
-    [[nodiscard]] bool moveTo(const DecodeState &state, NamedField &field, Sink &sink) {
-        const auto depth = static_cast<std::uint32_t>(state.blockStarts.top - state.blockStarts.base);
+    // For each field that is being reported, first: whether it is in the same block as the field before.
+    [[nodiscard]] bool isAt(const DecodeState &state) const {
         const std::uint32_t firstBit = *state.blockStarts.top;
-        const bool isSame = depth == depth_ && firstBit == firstBit_ && isOld(firstBit);
-        if (!isSame) {
-            change(state, depth, field, sink);
-            firstBit_ = firstBit;
-        }
-        lastCursor_ = state.cursor;
-        return !isSame;
+        return firstBit == firstBit_ && depthOf(state.blockStarts) == depth_ && (isOld(firstBit) || isStillOpen(state));
     }
+    // Second: if it is not, moves to its block. The sink gets the blocks that are closed and opened for that. The cost
+    // grows with the number of blocks that changed.
+    void moveTo(const DecodeState &state, NamedField &field, Sink &sink);
+    // Third.
+    void passField(const DecodeState &state) { lastCursor_ = state.cursor; }
 
     // After the last field.
     void closeAll(Sink &sink) { closeDownTo(0, sink); }
@@ -48,32 +46,37 @@ public:
 
 private:
     static constexpr std::uint32_t none = static_cast<std::uint32_t>(-1);
+    static constexpr std::uint32_t noChain = none - 1;
 
     // What belongs to an open block in addition to its view. Blocks are given by their index among the open ones.
     struct Level {
         bool hasField = false;        // a field was read directly in it, so that its name is known
         bool wasShown = false;        // opened in the sink
-        bool isInChain = false;       // `chainParent` is where its links are shown
         std::uint32_t limitDepth = 0; // limits open when it was first seen
         std::uint32_t shownParent = none;
-        std::uint32_t chainParent = none;
+        std::uint32_t shown = none;          // itself, if it is shown, or else shownParent
+        std::uint32_t chainParent = noChain; // where the links of its chain are shown
     };
 
     // Whether a block that begins at this bit was open when the field before was reported, and all around it: what is
     // opened after a field begins at or after the cursor of that call.
     [[nodiscard]] bool isOld(std::uint32_t firstBit) const { return firstBit < lastCursor_; }
 
-    void change(const DecodeState &state, std::uint32_t depth, NamedField &field, Sink &sink);
+    // Whether the blocks that are open, as many as before, are the same ones, although the innermost one begins at the
+    // cursor: single bits of an octet are read before the cursor moves on.
+    [[nodiscard]] bool isStillOpen(const DecodeState &state) const;
+    [[nodiscard]] bool hasItsName(const DecodeState &state, std::uint32_t level) const {
+        return isBlockName(state.blockName, views_[level].name);
+    }
     [[nodiscard]] std::uint32_t levelsKept(const DecodeState &state, std::uint32_t depth) const;
-    void open(std::uint32_t firstBit, std::uint32_t limitDepth);
+    void open(const DecodeState &state, std::uint32_t depth);
+    [[nodiscard]] std::uint32_t shownParentIn(std::uint32_t parent, Level &level) const;
     [[nodiscard]] bool beginsWithItsParent(std::uint32_t level) const;
     void name(std::string_view name);
-    void show(Sink &sink);
+    void show(std::uint32_t target, Sink &sink);
+    void showAllAround(std::uint32_t target, Sink &sink);
     void openInSink(std::uint32_t level, Sink &sink);
     void closeDownTo(std::uint32_t depth, Sink &sink);
-    [[nodiscard]] bool isShown(std::uint32_t level) const {
-        return levels_[level].hasField && !views_[level].name.empty();
-    }
     [[nodiscard]] bool isOpenInSink(std::uint32_t level) const {
         const BlockView &view = views_[level];
         return view.depth < shownDepth_ && shown_[view.depth].number == view.number;

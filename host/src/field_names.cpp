@@ -12,6 +12,11 @@ constexpr std::uint32_t mostIds = 65536;
 } // namespace
 
 FieldNames::FieldNames(NetfloorGetTable getTable) : fields_(1) {
+    readTable(getTable);
+    count_ = static_cast<std::uint32_t>(fields_.size());
+}
+
+void FieldNames::readTable(NetfloorGetTable getTable) {
     const void *table = nullptr;
     if (getTable(NETFLOOR_TABLE_FIELDS, &table) != NETFLOOR_TABLE_FOUND || table == nullptr) {
         return;
@@ -25,13 +30,14 @@ FieldNames::FieldNames(NetfloorGetTable getTable) : fields_(1) {
     }
 }
 
-void FieldNames::findBlockName(NamedField &field, std::string_view name) {
+std::string_view FieldNames::findBlockName(NamedField &field, std::string_view name) {
     auto found = blockNames_.find(name);
     if (found == blockNames_.end()) {
         found = blockNames_.emplace(name).first;
     }
     field.lastBlock = found->c_str();
     field.lastBlockSize = static_cast<std::uint32_t>(found->size());
+    return *found;
 }
 
 } // namespace netfloor

@@ -91,6 +91,7 @@ std::int32_t PacketRun::runPass(Pass pass, Sink &sink, const TestRunOptions *tes
     withBlocks_ = pass == Pass::md && sink.wantsBlocks();
     withBlockNames_ = sink.wantsBlockNames();
     wantedFields_ = withBlocks_ ? std::span<const std::uint8_t>() : sink.wantedFields();
+    reportsAll_ = !cut_.isCut() && wantedFields_.empty();
     view_.depth = 0;
     view_.blocks = {};
     view_.blockName = {};
@@ -245,6 +246,14 @@ HandOff PacketRun::describeHandOff() const {
     return record;
 }
 
+// Out of line, so that a field in the block of the one before saves no registers for it.
+[[gnu::noinline]] void PacketRun::moveToBlock(NamedField &field) {
+    blocks_.moveTo(state(), field, *sink_);
+    view_.depth = blocks_.shownDepth();
+    view_.blocks = blocks_.open();
+    view_.blockName = LazyText(view_.blocks.empty() ? std::string_view() : view_.blocks.back().name);
+}
+
 // Completes the view by what the decode state tells. Inside its callers: it is what most of the MD pass's time in the
 // host goes to.
 [[gnu::always_inline]] inline void PacketRun::reportField(NamedField &field) {
@@ -252,20 +261,56 @@ HandOff PacketRun::describeHandOff() const {
     view_.flags = state.flags;
     view_.cursor = state.cursor;
     if (withBlocks_) {
-        if (blocks_.moveTo(state, field, *sink_)) {
-            view_.depth = blocks_.shownDepth();
-            view_.blocks = blocks_.open();
-            view_.blockName = LazyText(view_.blocks.empty() ? std::string_view() : view_.blocks.back().name);
+        if (!blocks_.isAt(state)) {
+            moveToBlock(field);
         }
+        blocks_.passField(state);
     } else if (withBlockNames_) {
         view_.blockName = LazyText(names_.blockName(field, state.blockName));
     }
     sink_->field(view_);
 }
 
+// Fills the view by what the plug-in gives with the call. Inside its callers, as reportField.
+[[gnu::always_inline]] inline NamedField &PacketRun::takeField(std::uint32_t outputRangeCount, const BitRange *ranges,
+                                                               const char *display, const char *fieldName,
+                                                               std::uint32_t fieldId, std::uint32_t bitOrder) {
+    NamedField &field = names_.find(fieldId);
+    view_.id = fieldId;
+    view_.name = field.name;
+    view_.isKey = field.isKey;
+    view_.text = LazyText(display);
+    view_.reportedName = LazyText(fieldName);
+    view_.value = state().fieldRecord.value;
+    view_.ranges = {ranges, outputRangeCount};
+    view_.bitOrder = bitOrder;
+    std::memcpy(view_.recordHead.data(), fieldRecordHead(), headOctets);
+    nextFieldRecord();
+    if (!field.isKnown) { // last, so that it saves no registers
+        view_.name = withoutLeadingBlanks(view_.reportedName.view());
+    }
+    return field;
+}
+
 std::int32_t PacketRun::addField(std::uint32_t outputRangeCount, const BitRange *ranges, const char *display,
-                                 std::uint32_t /*zero*/, const char *fieldName, std::uint32_t fieldId,
-                                 std::uint32_t /*otherZero*/, std::uint32_t bitOrder) noexcept {
+                                 std::uint32_t zero, const char *fieldName, std::uint32_t fieldId,
+                                 std::uint32_t otherZero, std::uint32_t bitOrder) noexcept {
+    if (!reportsAll_) {
+        return addChosenField(outputRangeCount, ranges, display, zero, fieldName, fieldId, otherZero, bitOrder);
+    }
+    try {
+        NamedField &field = takeField(outputRangeCount, ranges, display, fieldName, fieldId, bitOrder);
+        reportField(field);
+    } catch (...) {
+        keepException();
+    }
+    return 0;
+}
+
+// A field that may not be for the sink. With the arguments of addField, so that it is called by a jump.
+std::int32_t PacketRun::addChosenField(std::uint32_t outputRangeCount, const BitRange *ranges, const char *display,
+                                       std::uint32_t /*zero*/, const char *fieldName, std::uint32_t fieldId,
+                                       std::uint32_t /*otherZero*/, std::uint32_t bitOrder) noexcept {
     if (exception_) {
         return 0;
     }
@@ -275,22 +320,10 @@ std::int32_t PacketRun::addField(std::uint32_t outputRangeCount, const BitRange 
         return 0;
     }
     try {
-        NamedField &field = names_.find(fieldId);
-        const LazyText reportedName(fieldName);
-        view_.id = fieldId;
-        view_.name = field.isKnown ? field.name : withoutLeadingBlanks(reportedName.view());
-        view_.isKey = field.isKey;
-        view_.text = LazyText(display);
-        view_.reportedName = reportedName;
-        view_.value = state().fieldRecord.value;
-        view_.ranges = {ranges, outputRangeCount};
-        view_.bitOrder = bitOrder;
-        std::memcpy(view_.recordHead.data(), fieldRecordHead(), headOctets);
+        NamedField &field = takeField(outputRangeCount, ranges, display, fieldName, fieldId, bitOrder);
         if (!cut_.isCut() || (isCaptured(view_.name, view_.ranges) && isWanted)) {
             reportField(field);
         }
-        preDecode_.context.fieldRecordCount = (preDecode_.context.fieldRecordCount + 1) % fieldRecordCount;
-        fillFieldRecordHead();
     } catch (...) {
         keepException();
     }
@@ -382,6 +415,7 @@ bool PacketRun::isCaptured(std::string_view name, std::span<const BitRange> rang
 void PacketRun::keepException() noexcept {
     if (!exception_) {
         exception_ = std::current_exception();
+        reportsAll_ = false;
     }
 }
 

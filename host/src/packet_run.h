@@ -74,6 +74,16 @@ private:
     }
     // Fills the head of the current field record, so that the host sees what the plug-in did not write.
     void fillFieldRecordHead() { std::memset(fieldRecordHead(), untouchedOctet, headOctets); }
+    void nextFieldRecord() {
+        preDecode_.context.fieldRecordCount = (preDecode_.context.fieldRecordCount + 1) % fieldRecordCount;
+        fillFieldRecordHead();
+    }
+    NamedField &takeField(std::uint32_t outputRangeCount, const BitRange *ranges, const char *display,
+                          const char *fieldName, std::uint32_t fieldId, std::uint32_t bitOrder);
+    std::int32_t addChosenField(std::uint32_t outputRangeCount, const BitRange *ranges, const char *display,
+                                std::uint32_t zero, const char *fieldName, std::uint32_t fieldId,
+                                std::uint32_t otherZero, std::uint32_t bitOrder) noexcept;
+    void moveToBlock(NamedField &field);
     void reportField(NamedField &field);
     [[nodiscard]] bool isWanted(std::uint32_t fieldId) const {
         return wantedFields_.empty() || (fieldId < wantedFields_.size() && wantedFields_[fieldId] != 0);
@@ -112,7 +122,8 @@ private:
     bool withBlocks_ = true; // the sink wants them
     bool withBlockNames_ = true;
     std::span<const std::uint8_t> wantedFields_; // empty: all
-    FieldView view_; // of the field at hand; to clear a new one takes as long as all else that is done for it
+    bool reportsAll_ = true; // all fields are wanted, none is compared, and nothing was thrown: one test for each field
+    FieldView view_;         // of the field at hand; to clear a new one takes as long as all else that is done for it
     RunOptions options_;
     bool followStop_ = true;
     bool isReadToCut_ = false;             // a field was not captured

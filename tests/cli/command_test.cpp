@@ -32,6 +32,8 @@ protected:
         writeFile("tiny.pcap", pcapFile(228, {{hex("45*10")}, {hex("05*10")}}));
         writeFile("long.pcap", pcapFile(228, std::vector<PcapPacket>(3000, {udpPacket})));
         writeFile("cut.pcap", pcapFile(228, {{udpPacket}, {{udpPacket.begin(), udpPacket.begin() + 24}, 36}}));
+        const Octets solicitation = hex("60000000 0020 3a ff fe80 00*13 01 ff02 00*13 02 8700 0000 00*4");
+        writeFile("cutSolicitation.pcap", pcapFile(229, {{solicitation, 72}}));
         const Outcome packed = shell("gzip -k $T/five.pcap && head -c -20 $T/five.pcap.gz > $T/half.pcap.gz");
         ASSERT_EQ(packed.exitCode, 0) << packed.err;
     }
@@ -44,6 +46,7 @@ TEST_F(Command, shows) {
          " 10.0.0.1:40000 > 192.168.0.2:53 ...no IP: ARP...no IP: LLDP...5 packets: 2 with IP, 3 without (2 ARP, 1 "
          "LLDP)",
          "", "\x1b", 6},
+        {"netfloor $T/cutSolicitation.pcap", 0, "neighbor solicitation  [cut by", "", "who has", 2},
         {"netfloor summary $T/cut.pcap", 0, "[cut by the snap length: 24 of 36 octets]", "", "without", 2},
         {"netfloor --all $T/cut.pcap", 0, "Normal Throughput", "", "", 2},
         {"netfloor --utc $T/five.pcap", 0, "2001-09-09T01:46:40.000000Z", "", "", 6},
