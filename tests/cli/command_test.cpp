@@ -46,7 +46,7 @@ TEST_F(Command, shows) {
          " 10.0.0.1:40000 > 192.168.0.2:53 ...no IP: ARP...no IP: LLDP...5 packets: 2 with IP, 3 without (2 ARP, 1 "
          "LLDP)",
          "", "\x1b", 6},
-        {"netfloor $T/cutSolicitation.pcap", 0, "neighbor solicitation  [cut by", "", "who has", 2},
+        {"netfloor $T/cutSolicitation.pcap", 0, "neighbor solicitation  [cut by", "", "who has", 1},
         {"netfloor summary $T/cut.pcap", 0, "[cut by the snap length: 24 of 36 octets]", "", "without", 2},
         {"netfloor --all $T/cut.pcap", 0, "Normal Throughput", "", "", 2},
         {"netfloor --utc $T/five.pcap", 0, "2001-09-09T01:46:40.000000Z", "", "", 6},
