@@ -4,7 +4,8 @@
 #
 #   scripts/install-packages.sh decode    what the build of the command needs
 #   scripts/install-packages.sh all       that, and what the tests, the checks and the benchmarks need
-#   scripts/install-packages.sh long      what ./check long needs besides: another compiler, and what finds expressions to change
+#   scripts/install-packages.sh proof     what ./check proof needs besides: it finds expressions to change
+#   scripts/install-packages.sh long      what ./check long needs besides: that, and another compiler
 #   scripts/install-packages.sh hosts     what ./check hosts needs: compilers for other machines, and what runs their programs
 #   scripts/install-packages.sh page      what ./check page needs: a browser, and what drives it
 #   scripts/install-packages.sh python    what ./check python and ./spark need: Python's headers, Java, GNU parallel
@@ -15,7 +16,8 @@ set -eu
 decode="g++ cmake ninja-build pkg-config libpcap-dev libcli11-dev zlib1g-dev libisal-dev nlohmann-json3-dev libsqlite3-dev libtbb-dev"
 all="$decode libgtest-dev libbenchmark-dev libtins-dev clang libclang-rt-14-dev llvm valgrind clang-format clang-tidy
     tshark tcpdump time help2man abigail-tools jq sqlite3 python3-fastjsonschema"
-long="$all clang-19 python3-clang-14"
+proof="$all python3-clang-14"
+long="$proof clang-19"
 # The versioned multilib: the other one excludes all cross compilers.
 hosts="$decode libgtest-dev googletest g++-12-multilib g++-s390x-linux-gnu g++-mingw-w64-i686-posix
     g++-mingw-w64-x86-64-posix wine64 qemu-user"
@@ -27,12 +29,13 @@ packages="$decode help2man dpkg-dev file debootstrap"
 case "${1:-all}" in
 decode) wanted=$decode ;;
 all) wanted=$all ;;
+proof) wanted=$proof ;;
 long) wanted=$long ;;
 hosts) wanted=$hosts ;;
 page) wanted=$page ;;
 python) wanted=$python ;;
 packages) wanted=$packages ;;
-*) echo "usage: $0 [decode|all|long|hosts|page|python|packages]" >&2; exit 2 ;;
+*) echo "usage: $0 [decode|all|proof|long|hosts|page|python|packages]" >&2; exit 2 ;;
 esac
 
 if ! command -v apt-get >/dev/null 2>&1; then
