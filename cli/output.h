@@ -197,7 +197,7 @@ private:
     template <typename Piece>
     [[nodiscard, gnu::always_inline]] static bool copyPieces(std::string_view text, char *to) {
         const std::size_t last = text.size() - sizeof(Piece); // overlaps the piece before
-        Piece found = copyPiece<Piece>(text.data() + last, to + last);
+        auto found = copyPiece<Piece>(text.data() + last, to + last);
         for (std::size_t at = 0; at < last; at += sizeof(Piece)) {
             found |= copyPiece<Piece>(text.data() + at, to + at);
         }
