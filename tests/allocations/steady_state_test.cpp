@@ -41,7 +41,7 @@ TEST(SteadyState, allocatesNothing) {
             }
             return *allocations() - before;
         };
-        const std::size_t atFirst = runPackets();
+        const std::uint64_t atFirst = runPackets();
         EXPECT_EQ(runPackets(), 0U) << passName(pass);
         // The counting works.
         EXPECT_TRUE(atFirst != 0 || pass != Pass::md);
