@@ -68,7 +68,7 @@ void PageTree::endRun() {
 }
 
 void PageTree::writeGapsBefore(std::uint32_t octet, std::uint32_t depth) {
-    while (const auto gap = gaps_.before(octet)) {
+    if (const auto gap = gaps_.before(octet)) {
         writeOctets(PageItems::Kind::note, "in no field", {gap->firstOctet, gap->firstOctet + gap->octets}, depth);
     }
 }

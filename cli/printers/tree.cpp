@@ -109,7 +109,7 @@ bool Tree::isReadAgain(const FieldView &field) const {
 }
 
 void Tree::writeGaps(std::uint32_t octet, std::uint32_t depth) {
-    while (const auto gap = gaps_.before(octet)) {
+    if (const auto gap = gaps_.before(octet)) {
         newLine(depth);
         out_.start(Style::dim) << "[in no field: ";
         writePlace({gap->firstOctet, gap->firstOctet + gap->octets});
